@@ -1,0 +1,27 @@
+#pragma once
+
+#include <sstream>
+#include <string_view>
+
+#include "platform/mutex.h"
+
+namespace vexel_yaml {
+
+/// Set by "-h": messages go to standard error only, never to a dialog.
+extern bool gHeadlessEnabled;
+
+/// Guards the error channel.
+extern Mutex s_cerrLock;
+
+/// Where the commands collect the text of a message before they call `ErrMsg`.
+extern std::stringstream errs;
+
+/// Shows everything collected in `stream` so far: on standard error and, unless headless, in a dialog
+/// where the system has one. The text stays in the stream, so the next call shows it again; the stream's
+/// error flags are reset. On a terminal an open last line is ended.
+void ErrMsg(std::stringstream& stream);
+
+/// Writes one line to standard error, from any thread, without a dialog and without touching `errs`.
+void WriteErrorLine(std::string_view line);
+
+}  // namespace vexel_yaml

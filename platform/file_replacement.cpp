@@ -1,0 +1,102 @@
+#include "platform/file_replacement.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
+#include <system_error>
+
+namespace vexel_yaml {
+
+namespace {
+
+// The link's target, also where that does not exist yet.
+std::string FollowLinks(const std::string& path) {
+  std::error_code error;
+  std::filesystem::path target = path;
+  // A chain longer than this is a loop; opening it reports that.
+  for (int links = 0; links < 40 && std::filesystem::is_symlink(target, error); ++links) {
+    const std::filesystem::path next = std::filesystem::read_symlink(target, error);
+    target = next.is_absolute() ? next : target.parent_path() / next;
+  }
+  return target.string();
+}
+
+// A new file in the folder of `target` with the permissions that the umask gives. Where there can be none,
+// the result is empty and errno says why.
+std::string CreateBeside(const std::string& target) {
+  const std::string stem =
+      target.substr(0, target.rfind('/') + 1) + ".merge" + std::to_string(getpid()) + ".";
+  for (int attempt = 0; attempt < 100; ++attempt) {
+    std::string path = stem + std::to_string(attempt);
+    const int file = open(path.c_str(), O_CREAT | O_EXCL | O_WRONLY | O_CLOEXEC, 0666);
+    if (file >= 0) {
+      close(file);
+      return path;
+    }
+    if (errno != EEXIST) break;
+  }
+  return {};
+}
+
+}  // namespace
+
+FileError::FileError(const std::string& path, int error_number)
+    : std::runtime_error("Cannot write '" + path + "': " + std::strerror(error_number)) {}
+
+FileReplacement::FileReplacement(const std::string& path) : path_(path), target_(FollowLinks(path)) {
+  struct stat status = {};
+  const bool exists = stat(target_.c_str(), &status) == 0;
+  if (exists && !S_ISREG(status.st_mode)) {
+    OpenInPlace();
+    return;
+  }
+  if (exists && access(target_.c_str(), W_OK) != 0) throw FileError(path_, errno);
+  beside_ = CreateBeside(target_);
+  if (beside_.empty()) {
+    // Any other reason (a full disk, say) must not truncate what stands there.
+    if (errno != EACCES && errno != EPERM && errno != EROFS) throw FileError(path_, errno);
+    OpenInPlace();
+    return;
+  }
+  stream_.open(beside_, std::ios::binary | std::ios::trunc);
+  if (!stream_) {
+    const int error_number = errno;
+    unlink(beside_.c_str());
+    throw FileError(path_, error_number);
+  }
+  if (exists) chmod(beside_.c_str(), status.st_mode & 07777);
+}
+
+FileReplacement::~FileReplacement() {
+  if (!beside_.empty()) unlink(beside_.c_str());
+}
+
+void FileReplacement::OpenInPlace() {
+  stream_.open(target_, std::ios::binary | std::ios::trunc);
+  if (!stream_) throw FileError(path_, errno);
+}
+
+void FileReplacement::Commit() {
+  errno = 0;
+  stream_.close();
+  // The stream remembers that an earlier write failed, but not why; a full disk is nearly always the reason.
+  if (!stream_) throw FileError(path_, errno != 0 ? errno : ENOSPC);
+  if (beside_.empty()) return;
+  if (std::rename(beside_.c_str(), target_.c_str()) != 0) throw FileError(path_, errno);
+  beside_.clear();
+}
+
+void CopyFileContent(const std::string& source, const std::string& destination) {
+  FileReplacement replacement(destination);
+  std::ifstream input(source, std::ios::binary);
+  if (!input) throw FileError(destination, errno);
+  // Inserting an empty buffer counts as a failed insertion.
+  if (input.peek() != std::ifstream::traits_type::eof()) replacement.Stream() << input.rdbuf();
+  replacement.Commit();
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,13 @@
+#pragma once
+
+#include <mutex>
+
+namespace vexel_yaml {
+
+/// A lock that its holder may take again: freeing a pooled tree frees its children into the same pool.
+using Mutex = std::recursive_mutex;
+
+/// Holds a `Mutex` for its own lifetime.
+using AutoLock = std::lock_guard<Mutex>;
+
+}  // namespace vexel_yaml

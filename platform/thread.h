@@ -1,0 +1,36 @@
+#pragma once
+
+#include <exception>
+#include <functional>
+#include <thread>
+
+namespace vexel_yaml {
+
+/// Runs one function on a thread of its own and carries its exception back to the thread that joins it.
+class Thread {
+ public:
+  Thread() = default;
+  Thread(const Thread&) = delete;
+  Thread& operator=(const Thread&) = delete;
+
+  /// Joins a thread that is still running, so that an exception between start and join ends no process.
+  ~Thread();
+
+  /// Starts `function`. One function a `Thread`.
+  void Start(std::function<void()> function);
+
+  /// Waits for the function to return. Throws nothing that the function threw.
+  void Join();
+
+  /// After `Join`: throws again what the function threw, if it did.
+  void CheckForExceptions();
+
+ private:
+  static void Thread_Helper(Thread* self);
+
+  std::thread handle_;
+  std::function<void()> function_;
+  std::exception_ptr exception_;
+};
+
+}  // namespace vexel_yaml
