@@ -1,0 +1,75 @@
+#include "yaml/asset_text.h"
+
+#include <algorithm>
+#include <string>
+
+#include "yaml/yaml_error.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+void CheckEncoding(std::string_view text) {
+  const std::string_view mark = text.substr(0, 2);
+  if (mark != "\xFF\xFE" && mark != "\xFE\xFF") return;
+  throw YAMLError("YAML file is not UTF-8 encoded, all files must be UTF-8 encoded for performance reasons");
+}
+
+// Where libyaml would end the document: at a "---" that starts a line and stands alone or before a blank,
+// also inside a text.
+size_t FindDocumentEnd(std::string_view text, size_t start) {
+  size_t found = text.find("\n---", start);
+  while (found != std::string_view::npos) {
+    const size_t after = found + 4;
+    if (after == text.size() || std::string_view(" \t\r\n").find(text[after]) != std::string_view::npos) {
+      return found + 1;
+    }
+    found = text.find("\n---", after);
+  }
+  return text.size();
+}
+
+size_t CountLines(std::string_view text) {
+  return static_cast<size_t>(std::count(text.begin(), text.end(), '\n'));
+}
+
+}  // namespace
+
+AssetText::AssetText(std::string_view text) : header_(text.substr(0, text.find("---"))) {
+  CheckEncoding(text);
+  if (text.size() <= header_.size() + 5) {
+    CheckOnlyDirectives();
+    return;
+  }
+  size_t line = CountLines(header_);
+  for (size_t start = header_.size(); start < text.size();) {
+    const size_t end = FindDocumentEnd(text, start);
+    documents_.push_back({text.substr(start, end - start), line});
+    line += CountLines(documents_.back().text);
+    start = end;
+  }
+}
+
+// A file without objects is fine, but text that belongs to no object must not vanish.
+void AssetText::CheckOnlyDirectives() const {
+  size_t line = 1;
+  for (size_t begin = 0; begin < header_.size(); ++line) {
+    const size_t end = std::min(header_.find('\n', begin), header_.size());
+    const std::string_view content = header_.substr(begin, end - begin);
+    const size_t first = content.find_first_not_of(line == 1 ? " \t\r\xEF\xBB\xBF" : " \t\r");
+    if (first != std::string_view::npos && content[first] != '%' && content[first] != '#') {
+      throw YAMLError("did not find expected <document start> at line " + std::to_string(line));
+    }
+    begin = end + 1;
+  }
+}
+
+std::string_view AssetText::GetTagPrefix() const {
+  constexpr std::string_view kDirective = "%TAG !v! ";
+  const size_t found = header_.find(kDirective);
+  if (found == std::string_view::npos) return {};
+  const std::string_view prefix = header_.substr(found + kDirective.size());
+  return prefix.substr(0, prefix.find_first_of(" \t\r\n"));
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,27 @@
+#pragma once
+
+#include <fstream>
+#include <string>
+
+#include "yaml/document_cache.h"
+#include "yaml/vexel_objects.h"
+
+namespace vexel_yaml {
+
+/// Reads an asset file into `objects`, which should be empty. What was read before a failure stays there.
+/// Returns false only when libyaml can't start (or the stream can't be read to its end). Throws YAMLError:
+/// "Cannot open file" (a folder counts), the 'Force text' message for a file that isn't one,
+/// "Error locating end of document sequence", or what libyaml finds wrong, with the 1-based line.
+/// With a `cache`, documents that another reader of it has read are copied instead of parsed.
+bool ParseYAMLFile(const std::string& path, VexelObjects& objects, DocumentCache* cache = nullptr);
+bool ParseYAMLFile(std::ifstream& stream, VexelObjects& objects, DocumentCache* cache = nullptr);
+
+/// The same for a text without the check of its first line. The text is taken by value, since a cache keeps
+/// it.
+bool ParseYAMLString(std::string text, VexelObjects& objects, DocumentCache* cache = nullptr);
+
+/// `ParseYAMLFile` for the commands: every failure is a YAMLError "Error parsing file '<path>': <reason>",
+/// and keys that had to be left out are reported, a line each, on standard error.
+void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache* cache = nullptr);
+
+}  // namespace vexel_yaml

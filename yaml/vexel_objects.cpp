@@ -1,0 +1,50 @@
+#include "yaml/vexel_objects.h"
+
+#include "yaml/yaml_error.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+void AppendPresent(YAMLMapping& object, const YAMLScalar* key, YAMLNode* value) {
+  if (value != nullptr) object.Append(key, value);
+}
+
+std::string_view TextOf(const YAMLNode* value) {
+  const YAMLScalar* scalar = value == nullptr ? nullptr : value->AsScalar();
+  return scalar == nullptr ? std::string_view() : std::string_view(scalar->GetText());
+}
+
+void OutputObject(std::ostream& out, YAMLMapping& object) {
+  YAMLNode* file_id = object.Steal(YAMLScalar::fileIDPlaceHolderName);
+  YAMLNode* class_id = object.Steal(YAMLScalar::classIDPlaceHolderName);
+  YAMLNode* stripped = object.Steal(YAMLScalar::strippedPrefabPlaceHolderName);
+  out << "--- !v!" << TextOf(class_id) << " &" << TextOf(file_id);
+  if (stripped != nullptr) out << " stripped";
+  out << '\n' << object.GetYAMLString() << '\n';
+  AppendPresent(object, YAMLScalar::fileIDPlaceHolderName, file_id);
+  AppendPresent(object, YAMLScalar::classIDPlaceHolderName, class_id);
+  AppendPresent(object, YAMLScalar::strippedPrefabPlaceHolderName, stripped);
+}
+
+}  // namespace
+
+void VexelObjects::Output(std::ostream& out) {
+  out << "%YAML 1.1\n%TAG !v! " << tag_prefix_ << '\n';
+  for (const Slot& slot : *this) {
+    YAMLMapping* object = slot.value->AsMapping();
+    if (object == nullptr)
+      throw YAMLError("Cannot write an object that is not a mapping: " + slot.key->GetText());
+    OutputObject(out, *object);
+  }
+  out.flush();
+}
+
+VexelObjects* VexelObjects::Clone() const {
+  auto* clone = new VexelObjects;
+  CloneInto(*clone);
+  clone->tag_prefix_ = tag_prefix_;
+  return clone;
+}
+
+}  // namespace vexel_yaml

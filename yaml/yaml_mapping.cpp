@@ -1,0 +1,246 @@
+#include "yaml/yaml_mapping.h"
+
+#include <algorithm>
+
+#include "yaml/yaml_alloc.h"
+#include "yaml/yaml_error.h"
+#include "yaml/yaml_sequence.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+constexpr size_t kIndexFrom = 16;
+constexpr size_t kNotFound = static_cast<size_t>(-1);
+
+}  // namespace
+
+YAMLMapping::~YAMLMapping() { Clear(); }
+
+void YAMLMapping::RefuseDuplicates() const {
+  if (duplicates_) throw YAMLError("Cannot perform this operation on a YAML file with duplicate keys");
+}
+
+size_t YAMLMapping::FindSlot(const YAMLScalar* key) const {
+  if (index_) {
+    const auto found = index_->find(key);
+    return found == index_->end() ? kNotFound : found->second;
+  }
+  const auto found =
+      std::find_if(slots_.begin(), slots_.end(), [&](const Slot& slot) { return slot.key == key; });
+  return found == slots_.end() ? kNotFound : static_cast<size_t>(found - slots_.begin());
+}
+
+YAMLNode* YAMLMapping::Find(const YAMLScalar* key) const {
+  RefuseDuplicates();
+  const size_t slot = FindSlot(key);
+  return slot == kNotFound ? nullptr : slots_[slot].value;
+}
+
+void YAMLMapping::BuildIndex() {
+  index_.reset();
+  if (slots_.size() < kIndexFrom) return;
+  index_ = std::make_unique<Index>(slots_.capacity());
+  for (size_t i = 0; i < slots_.size(); ++i) {
+    if (slots_[i].key != nullptr) index_->emplace(slots_[i].key, i);
+  }
+}
+
+void YAMLMapping::AddSlot(const YAMLScalar* key, YAMLNode* value) {
+  slots_.push_back({key, value});
+  if (index_) {
+    index_->emplace(key, slots_.size() - 1);
+  } else if (slots_.size() >= kIndexFrom) {
+    BuildIndex();
+  }
+}
+
+void YAMLMapping::Append(const YAMLScalar* key, YAMLNode* value) {
+  if (duplicates_) {
+    duplicates_->push_back({key, value});
+    return;
+  }
+  const size_t present = FindSlot(key);
+  if (present == kNotFound) {
+    AddSlot(key, value);
+    return;
+  }
+  if (slots_[present].value->Equals(value)) return;
+  CloseGaps();
+  duplicates_ = std::make_unique<std::vector<Slot>>(std::move(slots_));
+  duplicates_->push_back({key, value});
+  slots_.clear();
+  index_.reset();
+}
+
+void YAMLMapping::Insert(const YAMLScalar* key, YAMLNode* value) {
+  if (HasKey(key)) throw YAMLError("Cannot add existing key in YAMLMapping");
+  AddSlot(key, value);
+}
+
+YAMLNode* YAMLMapping::Change(const YAMLScalar* key, YAMLNode* value) {
+  RefuseDuplicates();
+  const size_t slot = FindSlot(key);
+  if (slot == kNotFound) throw YAMLError("Cannot change non existing key in YAMLMapping");
+  return std::exchange(slots_[slot].value, value);
+}
+
+void YAMLMapping::ChangeKey(const YAMLScalar* old_key, const YAMLScalar* new_key) {
+  RefuseDuplicates();
+  const size_t slot = FindSlot(old_key);
+  if (slot == kNotFound) throw YAMLError("Cannot change key of non existing key in YAMLMapping");
+  if (old_key == new_key) return;
+  const size_t existing = FindSlot(new_key);
+  if (existing != kNotFound) {
+    slots_[slot].value->Free();
+    slots_[slot].value = slots_[existing].value;
+    slots_[existing] = {nullptr, nullptr};
+    ++gaps_;
+  }
+  slots_[slot].key = new_key;
+  if (index_) {
+    index_->erase(old_key);
+    index_->insert_or_assign(new_key, slot);
+  }
+}
+
+YAMLNode& YAMLMapping::GetRef(const YAMLScalar* key) {
+  YAMLNode* value = Find(key);
+  if (value == nullptr) throw YAMLError("Cannot get unknown key from yaml mapping");
+  return *value;
+}
+
+YAMLNode* YAMLMapping::Steal(const YAMLScalar* key) {
+  RefuseDuplicates();
+  const size_t slot = FindSlot(key);
+  if (slot == kNotFound) return nullptr;
+  YAMLNode* value = slots_[slot].value;
+  if (index_) index_->erase(key);
+  if (slot + 1 == slots_.size()) {
+    slots_.pop_back();
+    return value;
+  }
+  // Leaves a gap: closing it at once would move every later pair, for each of many removed objects.
+  slots_[slot] = {nullptr, nullptr};
+  ++gaps_;
+  if (gaps_ > slots_.size() / 2) CloseGaps();
+  return value;
+}
+
+void YAMLMapping::Remove(const YAMLScalar* key) {
+  if (YAMLNode* value = Steal(key)) value->Free();
+}
+
+void YAMLMapping::CloseGaps() {
+  if (gaps_ == 0) return;
+  std::erase_if(slots_, [](const Slot& slot) { return slot.key == nullptr; });
+  gaps_ = 0;
+  BuildIndex();
+}
+
+size_t YAMLMapping::Size() const {
+  RefuseDuplicates();
+  return slots_.size() - gaps_;
+}
+
+YAMLMapping::Iterator YAMLMapping::begin() const {
+  RefuseDuplicates();
+  const Slot* end = slots_.data() + slots_.size();
+  return {slots_.data(), end};
+}
+
+YAMLMapping::Iterator YAMLMapping::end() const {
+  const Slot* end = slots_.data() + slots_.size();
+  return {end, end};
+}
+
+void YAMLMapping::Reorder(const std::vector<const YAMLScalar*>& order) {
+  std::vector<Slot> reordered;
+  reordered.reserve(order.size());
+  for (const YAMLScalar* key : order) {
+    if (YAMLNode* value = Find(key)) reordered.push_back({key, value});
+  }
+  if (reordered.size() != Size()) throw YAMLError("Unmapped key when trying to reorder mapping keys");
+  slots_ = std::move(reordered);
+  gaps_ = 0;
+  BuildIndex();
+}
+
+YAMLSequence* YAMLMapping::ToSequence() const {
+  auto* sequence = YAMLAlloc<YAMLSequence>::create(flow_);
+  const auto append = [&](const Slot& slot) {
+    auto* pair = YAMLAlloc<YAMLMapping>::create(false);
+    pair->AddSlot(slot.key, slot.value->Clone());
+    sequence->Append(pair);
+  };
+  if (duplicates_) {
+    for (const Slot& slot : *duplicates_) append(slot);
+  } else {
+    for (const Slot& slot : *this) append(slot);
+  }
+  return sequence;
+}
+
+void YAMLMapping::Clear() {
+  for (const Slot& slot : slots_) {
+    if (slot.value != nullptr) slot.value->Free();
+  }
+  slots_.clear();
+  gaps_ = 0;
+  index_.reset();
+  if (!duplicates_) return;
+  for (const Slot& slot : *duplicates_) slot.value->Free();
+  duplicates_->clear();
+}
+
+void YAMLMapping::CloneInto(YAMLMapping& target) const {
+  target.slots_.reserve(slots_.size() - gaps_);
+  target.SetFlow(flow_);
+  target.SetHash(GetHash());
+  target.SetLine(GetLine());
+  if (duplicates_) return;
+  for (const Slot& slot : *this) target.AddSlot(slot.key, slot.value->Clone());
+}
+
+const std::vector<YAMLMapping::Slot>& YAMLMapping::GetDuplicatePairs() const {
+  static const std::vector<Slot> none;
+  return duplicates_ ? *duplicates_ : none;
+}
+
+void YAMLMapping::Free() { YAMLAlloc<YAMLMapping>::free(this); }
+
+YAMLMapping* YAMLMapping::Clone() const {
+  auto* clone = YAMLAlloc<YAMLMapping>::create(flow_);
+  CloneInto(*clone);
+  return clone;
+}
+
+bool YAMLMapping::Equals(const YAMLNode* other) const {
+  if (other != nullptr && GetHash() != 0 && other->GetHash() != 0) return GetHash() == other->GetHash();
+  return EqualsExpensive(other);
+}
+
+bool YAMLMapping::EqualsExpensive(const YAMLNode* other) const {
+  const YAMLMapping* mapping = other == nullptr ? nullptr : other->AsMapping();
+  if (mapping == nullptr || mapping->Size() != Size()) return false;
+  // Only the keys are compared: with interned keys this mapping's own values would be compared with
+  // themselves, and values are the business of the hash.
+  Iterator other_slot = mapping->begin();
+  for (const Slot& slot : *this) {
+    if (slot.key != (*other_slot).key) return false;
+    ++other_slot;
+  }
+  return true;
+}
+
+void YAMLMapping::RebuildHash(bool shallow) {
+  uint32_t hash = 0;
+  uint32_t position = 0;
+  for (const Slot& slot : *this) {
+    if (!shallow) slot.value->RebuildHash(false);
+    hash = Combine(Combine(Combine(hash, slot.key->GetHash()), slot.value->GetHash()), position++);
+  }
+  SetHash(hash);
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,149 @@
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <unordered_map>
+#include <utility>
+#include <vector>
+
+#include "yaml/yaml_scalar.h"
+
+namespace vexel_yaml {
+
+/// An ordered set of key/value pairs. Owns its values; its keys are interned.
+///
+/// A key appended again with another value puts the mapping into duplicate-key mode: all pairs are kept, in
+/// document order, but every operation marked "keyed" throws the YAMLError
+/// "Cannot perform this operation on a YAML file with duplicate keys" and leaves the mapping as it was.
+/// Scenes hold such mappings where the engine writes lists as mappings; reading and writing them must work.
+class YAMLMapping : public YAMLNode {
+ public:
+  /// One pair of a mapping. A slot without a key is a gap that a removed pair has left.
+  struct Slot {
+    const YAMLScalar* key;
+    YAMLNode* value;
+  };
+
+  /// Walks the pairs in order, over the gaps.
+  class Iterator {
+   public:
+    Iterator(const Slot* slot, const Slot* end) : slot_(slot), end_(end) { SkipGaps(); }
+    const Slot& operator*() const { return *slot_; }
+    Iterator& operator++() {
+      ++slot_;
+      SkipGaps();
+      return *this;
+    }
+    bool operator==(const Iterator& other) const { return slot_ == other.slot_; }
+
+   private:
+    void SkipGaps() {
+      while (slot_ != end_ && slot_->key == nullptr) ++slot_;
+    }
+    const Slot* slot_;
+    const Slot* end_;
+  };
+
+  /// `flow`: written in braces.
+  explicit YAMLMapping(bool flow) : YAMLNode(Kind::kMapping), flow_(flow) {}
+  ~YAMLMapping() override;
+
+  bool IsFlow() const { return flow_; }
+  void SetFlow(bool flow) { flow_ = flow; }
+  bool HasDuplicateKeys() const { return duplicates_ != nullptr; }
+
+  /// Adds a pair at the end; the mapping then owns `value`. A pair whose key is present with an equal value
+  /// is dropped (and not freed); with another value it starts duplicate-key mode. Never throws.
+  void Append(const YAMLScalar* key, YAMLNode* value);
+
+  /// Keyed. Adds a pair at the end. Throws "Cannot add existing key in YAMLMapping".
+  void Insert(const YAMLScalar* key, YAMLNode* value);
+
+  /// Keyed. Replaces the value of a key, which keeps its place; returns the old value, now the caller's.
+  /// Throws "Cannot change non existing key in YAMLMapping".
+  YAMLNode* Change(const YAMLScalar* key, YAMLNode* value);
+
+  /// Keyed. Renames a key in its place. Where the new key exists already, its value stays and the renamed
+  /// pair's value is freed. Throws "Cannot change key of non existing key in YAMLMapping".
+  void ChangeKey(const YAMLScalar* old_key, const YAMLScalar* new_key);
+
+  /// Keyed. The value, null when absent.
+  const YAMLNode* Get(const YAMLScalar* key) const { return Find(key); }
+  YAMLNode* Get(const YAMLScalar* key) { return Find(key); }
+
+  /// Keyed. Throws "Cannot get unknown key from yaml mapping".
+  YAMLNode& GetRef(const YAMLScalar* key);
+
+  /// Keyed.
+  bool HasKey(const YAMLScalar* key) const { return Find(key) != nullptr; }
+
+  /// Keyed. Takes the pair out and returns its value to the caller, null when absent.
+  YAMLNode* Steal(const YAMLScalar* key);
+
+  /// Keyed. Takes the pair out and frees its value.
+  void Remove(const YAMLScalar* key);
+
+  /// Keyed. The number of keys.
+  size_t Size() const;
+
+  /// Keyed. The pairs in order. Adding, removing or reordering ends the validity of iterators.
+  Iterator begin() const;
+  Iterator end() const;
+
+  /// Keyed. The first key and its value; only on a mapping that is not empty.
+  const YAMLScalar* FirstKey() const { return (*begin()).key; }
+  const YAMLNode* First() const { return (*begin()).value; }
+  YAMLNode* First() { return (*begin()).value; }
+
+  /// Puts the keys into the order of `order`, whose unknown keys are skipped.
+  /// Throws "Unmapped key when trying to reorder mapping keys" when `order` lacks one, and changes nothing.
+  void Reorder(const std::vector<const YAMLScalar*>& order);
+
+  /// A new sequence, owned by the caller, of one-pair mappings (copies); works in duplicate-key mode.
+  YAMLSequence* ToSequence() const;
+
+  /// Frees every value. Duplicate-key mode stays.
+  void Clear();
+
+  /// Makes `target`, which must hold no pair, a deep copy of this mapping's keyed view: a mapping with
+  /// duplicate keys copies as an empty one with the same hash.
+  void CloneInto(YAMLMapping& target) const;
+
+  /// The pairs of duplicate-key mode, in document order; empty in the normal state.
+  const std::vector<Slot>& GetDuplicatePairs() const;
+
+  void Free() override;
+  YAMLMapping* Clone() const override;
+  bool Equals(const YAMLNode* other) const override;
+  bool EqualsExpensive(const YAMLNode* other) const override;
+  int PopulateDocument(yaml_document_s* document) const override;
+  void Accept(YAMLNodeVisitor& visitor) override { visitor.Visit(*this); }
+  void ResetForAlloc() override { Clear(); }
+  void RebuildHash(bool shallow) override;
+
+ private:
+  using Index = std::unordered_map<const YAMLScalar*, size_t>;
+
+  void RefuseDuplicates() const;
+  YAMLNode* Find(const YAMLScalar* key) const;
+  size_t FindSlot(const YAMLScalar* key) const;
+  void AddSlot(const YAMLScalar* key, YAMLNode* value);
+  void CloseGaps();
+  void BuildIndex();
+
+  std::vector<Slot> slots_;
+  // Only for mappings with many keys: the root of a file has one an object, an object only a few.
+  std::unique_ptr<Index> index_;
+  std::unique_ptr<std::vector<Slot>> duplicates_;
+  size_t gaps_ = 0;
+  bool flow_;
+};
+
+inline const YAMLMapping* YAMLNode::AsMapping() const {
+  return kind_ == Kind::kMapping ? static_cast<const YAMLMapping*>(this) : nullptr;
+}
+inline YAMLMapping* YAMLNode::AsMapping() {
+  return kind_ == Kind::kMapping ? static_cast<YAMLMapping*>(this) : nullptr;
+}
+
+}  // namespace vexel_yaml

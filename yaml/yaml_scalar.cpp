@@ -1,0 +1,182 @@
+#include "yaml/yaml_scalar.h"
+
+#include <array>
+#include <cstring>
+#include <locale>
+#include <sstream>
+#include <unordered_set>
+
+#include "platform/mutex.h"
+#include "yaml/murmur_hash.h"
+#include "yaml/yaml_alloc.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// A text on its way into the registry, hashed once for both the thread's table and the registry.
+struct Probe {
+  std::string_view text;
+  uint64_t hash;
+};
+
+uint64_t RegistryHash(std::string_view text) {
+  uint64_t hash = 0;
+  size_t offset = 0;
+  for (; offset + 4 <= text.size(); offset += 4) {
+    uint32_t group = 0;
+    std::memcpy(&group, text.data() + offset, 4);
+    hash = hash * 37 + group;
+  }
+  const auto byte = [&](size_t i) { return static_cast<uint64_t>(static_cast<uint8_t>(text[offset + i])); };
+  switch (text.size() - offset) {
+    case 1:
+      return hash * 37 + byte(0);
+    case 2:
+      return hash * 37 + (byte(0) + byte(1) * 256);
+    case 3:
+      // The odd one out; kept, so that the spread of hashes stays what it has been measured to be.
+      return hash * 37 + (byte(0) * 256 + byte(1) * 65536 + byte(2));
+  }
+  return hash;
+}
+
+struct YAMLScalarPointerCompare {
+  using is_transparent = void;
+  size_t operator()(const YAMLScalar* scalar) const { return RegistryHash(scalar->GetText()); }
+  size_t operator()(const Probe& probe) const { return probe.hash; }
+  bool operator()(const YAMLScalar* a, const YAMLScalar* b) const { return a->GetText() == b->GetText(); }
+  bool operator()(const Probe& a, const YAMLScalar* b) const { return a.text == b->GetText(); }
+  bool operator()(const YAMLScalar* a, const Probe& b) const { return a->GetText() == b.text; }
+};
+
+// One piece of the registry. With a single one, three reader threads stand in line for its lock for most of
+// their time.
+struct RegistryShard {
+  Mutex g_LookupMutex;
+  std::unordered_set<const YAMLScalar*, YAMLScalarPointerCompare, YAMLScalarPointerCompare> s_YAMLScalarSet;
+};
+
+const YAMLScalar* LookupInRegistry(const Probe& probe) {
+  // Never destroyed: scalars must outlive every other static object.
+  static auto& shards = *new std::array<RegistryShard, 256>;
+  RegistryShard& shard = shards[(probe.hash ^ (probe.hash >> 11)) % shards.size()];
+  AutoLock lock(shard.g_LookupMutex);
+  const auto found = shard.s_YAMLScalarSet.find(probe);
+  if (found != shard.s_YAMLScalarSet.end()) return *found;
+  const YAMLScalar* scalar = YAMLAlloc<YAMLScalar>::create(probe.text);
+  shard.s_YAMLScalarSet.insert(scalar);
+  return scalar;
+}
+
+}  // namespace
+
+const YAMLScalar* YAMLScalar::underscore;
+const YAMLScalar* YAMLScalar::empty;
+const YAMLScalar* YAMLScalar::zero;
+const YAMLScalar* YAMLScalar::one;
+const YAMLScalar* YAMLScalar::monoBehaviour;
+const YAMLScalar* YAMLScalar::mScript;
+const YAMLScalar* YAMLScalar::mFather;
+const YAMLScalar* YAMLScalar::transform;
+const YAMLScalar* YAMLScalar::rectTransform;
+const YAMLScalar* YAMLScalar::fileID;
+const YAMLScalar* YAMLScalar::star;
+const YAMLScalar* YAMLScalar::prefab;
+const YAMLScalar* YAMLScalar::prefabInstance;
+const YAMLScalar* YAMLScalar::mModification;
+const YAMLScalar* YAMLScalar::mTransformParent;
+const YAMLScalar* YAMLScalar::mPrefabInstance;
+const YAMLScalar* YAMLScalar::mPrefabInternal;
+const YAMLScalar* YAMLScalar::mPrefab;
+const YAMLScalar* YAMLScalar::guid;
+const YAMLScalar* YAMLScalar::fileIDPlaceHolderName;
+const YAMLScalar* YAMLScalar::classIDPlaceHolderName;
+const YAMLScalar* YAMLScalar::strippedPrefabPlaceHolderName;
+const YAMLScalar* YAMLScalar::mergeTypeInfo;
+const YAMLScalar* YAMLScalar::mergeTypeInfoPersistentTypeID;
+const YAMLScalar* YAMLScalar::mergeTypeInfoTypeName;
+const YAMLScalar* YAMLScalar::mergeTypeInfoIsMultiInstance;
+const YAMLScalar* YAMLScalar::mergeTypeInfoBasePersistentTypeID;
+const YAMLScalar* YAMLScalar::mergeTypeInfoRequires;
+const YAMLScalar* YAMLScalar::mergeTypeInfoConflicts;
+const YAMLScalar* YAMLScalar::gameObject;
+const YAMLScalar* YAMLScalar::mComponent;
+const YAMLScalar* YAMLScalar::mGameObject;
+
+YAMLScalar::YAMLScalar(std::string_view text) : YAMLNode(Kind::kScalar), text_(text) {
+  SetHash(MurmurHash3(text, 42));
+}
+
+const YAMLScalar* YAMLScalar::Lookup(std::string_view text) {
+  // Three reader threads ask for the same few thousand texts again and again: most are found here, without
+  // the lock.
+  thread_local std::array<const YAMLScalar*, 8192> recent = {};
+  const Probe probe = {text, RegistryHash(text)};
+  const YAMLScalar*& slot = recent[(probe.hash ^ (probe.hash >> 13) ^ (probe.hash >> 29)) % recent.size()];
+  if (slot == nullptr || slot->text_ != text) slot = LookupInRegistry(probe);
+  return slot;
+}
+
+void YAMLScalar::initializeConstants() {
+  underscore = Lookup("_");
+  empty = Lookup("");
+  zero = Lookup("0");
+  one = Lookup("1");
+  monoBehaviour = Lookup("MonoBehaviour");
+  mScript = Lookup("m_Script");
+  mFather = Lookup("m_Father");
+  transform = Lookup("Transform");
+  rectTransform = Lookup("RectTransform");
+  fileID = Lookup("fileID");
+  star = Lookup("*");
+  prefab = Lookup("Prefab");
+  prefabInstance = Lookup("PrefabInstance");
+  mModification = Lookup("m_Modification");
+  mTransformParent = Lookup("m_TransformParent");
+  mPrefabInstance = Lookup("m_PrefabInstance");
+  mPrefabInternal = Lookup("m_PrefabInternal");
+  mPrefab = Lookup("m_Prefab");
+  guid = Lookup("guid");
+  fileIDPlaceHolderName = Lookup("MERGE_FileID");
+  classIDPlaceHolderName = Lookup("MERGE_ClassID");
+  strippedPrefabPlaceHolderName = Lookup("MERGE_StrippedPrefab");
+  mergeTypeInfo = Lookup("MergeTypeInfo");
+  mergeTypeInfoPersistentTypeID = Lookup("id");
+  mergeTypeInfoTypeName = Lookup("name");
+  mergeTypeInfoIsMultiInstance = Lookup("ismulti");
+  mergeTypeInfoBasePersistentTypeID = Lookup("baseid");
+  mergeTypeInfoRequires = Lookup("requires");
+  mergeTypeInfoConflicts = Lookup("conflicts");
+  gameObject = Lookup("GameObject");
+  mComponent = Lookup("m_Component");
+  mGameObject = Lookup("m_GameObject");
+}
+
+bool YAMLScalar::EqualsExpensive(const YAMLNode* other) const {
+  const YAMLScalar* scalar = other == nullptr ? nullptr : other->AsScalar();
+  return scalar != nullptr && scalar->text_ == text_;
+}
+
+namespace {
+
+template <typename Number>
+Number ParsePrefix(const std::string& text) {
+  std::istringstream stream(text);
+  stream.imbue(std::locale::classic());
+  Number number = 0;
+  stream >> number;
+  return number;
+}
+
+}  // namespace
+
+int32_t YAMLScalar::GetIntValue() const { return ParsePrefix<int32_t>(text_); }
+
+float YAMLScalar::GetFloatValue() const { return ParsePrefix<float>(text_); }
+
+void initialize() { YAMLScalar::initializeConstants(); }
+
+std::string IntToString(int value) { return std::to_string(value); }
+
+}  // namespace vexel_yaml
