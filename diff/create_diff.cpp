@@ -1,0 +1,176 @@
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <memory>
+#include <vector>
+
+#include "diff/yaml_mapping_diff.h"
+#include "diff/yaml_sequence_diff.h"
+#include "yaml/yaml_alloc.h"
+#include "yaml/yaml_error.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// Stands one level deeper in a path for its own lifetime.
+class PathStep {
+ public:
+  PathStep(FieldPath& path, const YAMLScalar* component) : path_(path) { path_.push_back(component); }
+  PathStep(const PathStep&) = delete;
+  PathStep& operator=(const PathStep&) = delete;
+  ~PathStep() { path_.pop_back(); }
+
+ private:
+  FieldPath& path_;
+};
+
+struct FreeNode {
+  void operator()(YAMLNode* node) const { node->Free(); }
+};
+
+bool IsMergeable(const FieldPath& path, const YAMLNode* node) {
+  bool matched = false;
+  return YAMLSequenceRemapper::IsMergeablePath(path, node, matched);
+}
+
+bool IsWithinTolerance(const ComparisonInfo& rule, const YAMLScalar& from, const YAMLScalar& to) {
+  if (!(rule.relativeTolerance > 0) || !(rule.absoluteTolerance > 0)) return false;
+  const float a = from.GetFloatValue();
+  const float b = to.GetFloatValue();
+  if (a == b) return true;
+  const float magnitude = std::min(std::abs(a) + std::abs(b), std::numeric_limits<float>::max());
+  return std::abs(a - b) < std::max(rule.absoluteTolerance, rule.relativeTolerance * magnitude);
+}
+
+Operation* DiffScalars(const FieldPath& path, const YAMLScalar& from, const YAMLScalar& to) {
+  if (from.Equals(&to)) return nullptr;
+  const ComparisonInfo* rule = YAMLSequenceRemapper::FindComparison(path);
+  if (rule != nullptr && IsWithinTolerance(*rule, from, to)) return nullptr;
+  return YAMLAlloc<ChangeOperation>::create(&to);
+}
+
+// Whether two edits of one mapping may be merged field by field. Values written in braces, such as vectors,
+// are units unless they are references.
+bool IsMergeableMapping(const FieldPath& path, const YAMLMapping& from, const YAMLMapping& to) {
+  bool matched = false;
+  const bool by_content = YAMLSequenceRemapper::IsMergeablePath(path, &to, matched);
+  if (matched) return by_content;
+  if (const ExclusionPathInfo* rule = YAMLSequenceRemapper::FindExclusion(path)) return rule->mergeable;
+  if (!from.IsFlow() && !to.IsFlow()) return true;
+  return from.HasKey(YAMLScalar::fileID) || to.HasKey(YAMLScalar::fileID);
+}
+
+// The fields of a script object belong to its script: with another script they are other fields.
+bool IsScriptReplaced(const FieldPath& path, const YAMLMappingDiff& diff) {
+  return path.size() == 2 && path[1] == YAMLScalar::monoBehaviour && diff.HasKey(YAMLScalar::mScript);
+}
+
+Operation* DiffMappings(FieldPath& path, const YAMLMapping& from, const YAMLMapping& to) {
+  YAMLMappingDiff* diff = YAMLMappingDiff::Diff(path, from, to);
+  // A nested mapping whose keys were only reordered counts as unchanged.
+  if (diff->GetEntries().empty()) return nullptr;
+  const bool mergeable = IsMergeableMapping(path, from, to) && !IsScriptReplaced(path, *diff);
+  return YAMLAlloc<ChangeMappingOperation>::create(diff, mergeable);
+}
+
+// The elements of `from` where `remapper` puts them, without touching `from`.
+std::vector<YAMLNode*> Rearranged(const YAMLSequence& from, const YAMLSequenceRemapper& remapper) {
+  std::vector<YAMLNode*> items(remapper.GetDestinationCount(), nullptr);
+  const std::vector<uint32_t>& mapping = remapper.GetMapping();
+  for (size_t i = 0; i < mapping.size(); ++i) {
+    if (mapping[i] != YAMLSequenceRemapper::kDropped) items[mapping[i]] = from.GetItems()[i];
+  }
+  return items;
+}
+
+Operation* DiffSequences(FieldPath& path, const YAMLSequence& from, const YAMLSequence& to) {
+  YAMLSequenceRemapper* remapper = YAMLSequenceRemapper::FindMapping(path, from, to);
+  YAMLSequenceDiff* diff = nullptr;
+  if (remapper != nullptr) {
+    diff = YAMLSequenceDiff::Diff(path, Rearranged(from, *remapper), to.GetItems());
+  } else {
+    diff = YAMLSequenceDiff::Diff(path, from.GetItems(), to.GetItems());
+    if (diff->GetEntries().empty()) return nullptr;
+  }
+  return YAMLAlloc<ChangeSequenceOperation>::create(diff, remapper, IsMergeable(path, &to));
+}
+
+bool HaveSameKeys(const YAMLMapping& from, const YAMLMapping& to) {
+  return from.Size() == to.Size() &&
+         std::equal(from.begin(), from.end(), to.begin(),
+                    [](const YAMLMapping::Slot& a, const YAMLMapping::Slot& b) { return a.key == b.key; });
+}
+
+std::unique_ptr<YAMLSequence, FreeNode> KeySequence(const YAMLMapping& mapping) {
+  std::unique_ptr<YAMLSequence, FreeNode> keys(YAMLAlloc<YAMLSequence>::create(false));
+  keys->Reserve(mapping.Size());
+  for (const auto& [key, value] : mapping) keys->Append(key->AsValue());
+  return keys;
+}
+
+ChangeSequenceOperation* DiffKeyOrder(const YAMLMapping& from, const YAMLMapping& to) {
+  if (!HaveSameKeys(from, to)) {
+    FieldPath path = {YAMLScalar::underscore};
+    // Scalars own themselves, so the operation outlives the two key lists.
+    return static_cast<ChangeSequenceOperation*>(DiffSequences(path, *KeySequence(from), *KeySequence(to)));
+  }
+  return YAMLAlloc<ChangeSequenceOperation>::create(
+      YAMLAlloc<YAMLSequenceDiff>::create(),
+      YAMLSequenceRemapper::CreateIdentity(static_cast<uint32_t>(from.Size())), true);
+}
+
+}  // namespace
+
+Operation* CreateDiffOperation(FieldPath& path, const YAMLNode* from, const YAMLNode* to) {
+  if (from == to) return nullptr;
+  if (to == nullptr) return YAMLAlloc<RemoveOperation>::create(IsMergeable(path, from));
+  if (from == nullptr) return YAMLAlloc<AddOperation>::create(to, IsMergeable(path, to));
+  if (from->GetHash() == to->GetHash()) return nullptr;
+  if (from->GetKind() != to->GetKind()) return YAMLAlloc<ChangeOperation>::create(to);
+  switch (from->GetKind()) {
+    case YAMLNode::Kind::kScalar:
+      return DiffScalars(path, *from->AsScalar(), *to->AsScalar());
+    case YAMLNode::Kind::kMapping:
+      return DiffMappings(path, *from->AsMapping(), *to->AsMapping());
+    case YAMLNode::Kind::kSequence:
+      return DiffSequences(path, *from->AsSequence(), *to->AsSequence());
+  }
+  throw YAMLError("Cannot diff unknown yaml value");
+}
+
+YAMLMappingDiff* YAMLMappingDiff::Diff(FieldPath& path, const YAMLMapping& from, const YAMLMapping& to) {
+  auto* diff = YAMLAlloc<YAMLMappingDiff>::create();
+  for (const auto& [key, value] : from) {
+    const PathStep step(path, key);
+    if (Operation* operation = CreateDiffOperation(path, value, to.Get(key))) diff->Add(key, operation);
+  }
+  for (const auto& [key, value] : to) {
+    if (from.HasKey(key)) continue;
+    const PathStep step(path, key);
+    diff->Add(key, YAMLAlloc<AddOperation>::create(value, IsMergeable(path, value)));
+  }
+  diff->SetKeyOrder(DiffKeyOrder(from, to));
+  return diff;
+}
+
+YAMLMappingDiff* YAMLMappingDiff::Diff(const YAMLMapping& from, const YAMLMapping& to) {
+  FieldPath path;
+  return Diff(path, from, to);
+}
+
+YAMLSequenceDiff* YAMLSequenceDiff::Diff(FieldPath& path, std::span<YAMLNode* const> from,
+                                         std::span<YAMLNode* const> to) {
+  auto* diff = YAMLAlloc<YAMLSequenceDiff>::create();
+  const size_t count = std::max(from.size(), to.size());
+  for (size_t i = 0; i < count; ++i) {
+    const YAMLNode* a = i < from.size() ? from[i] : nullptr;
+    const YAMLNode* b = i < to.size() ? to[i] : nullptr;
+    if (a == b) continue;
+    const PathStep step(path, YAMLScalar::Lookup(IntToString(static_cast<int>(i))));
+    if (Operation* operation = CreateDiffOperation(path, a, b)) diff->Add(static_cast<int>(i), operation);
+  }
+  return diff;
+}
+
+}  // namespace vexel_yaml
