@@ -1,0 +1,78 @@
+#include <algorithm>
+#include <optional>
+#include <string>
+
+#include "merge/conflict_record_file.h"
+#include "yaml/yaml_error.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+bool Contains(std::string_view line, std::string_view text) {
+  return line.find(text) != std::string_view::npos;
+}
+
+std::optional<MergeResolve> HandlingOf(std::string_view word) {
+  std::string lower(word);
+  std::transform(lower.begin(), lower.end(), lower.begin(),
+                 [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; });
+  if (lower == "left") return MergeResolve::kLeft;
+  if (lower == "right") return MergeResolve::kRight;
+  if (lower == "base") return MergeResolve::kBase;
+  // "breakCycle" is no resolution that can be read back: a cycle is always broken.
+  return std::nullopt;
+}
+
+// One line of the handling section; nothing for a line that is skipped.
+std::optional<RecordingConflictResolver::RecordResolve> ParseHandling(std::string_view line, int number) {
+  const std::string place = std::to_string(number);
+  const size_t blank = line.find(' ');
+  if (blank == std::string_view::npos) {
+    throw YAMLError("No handling type (left,right,base) specified on line " + place);
+  }
+  const std::string_view word = line.substr(0, blank);
+  const std::optional<MergeResolve> handling = HandlingOf(word);
+  if (!handling) {
+    if (line.front() == '>') return std::nullopt;
+    throw YAMLError("Unknown handling type '" + std::string(word) +
+                    "' (should be left,right or base) specified on line " + place);
+  }
+  const size_t begin = line.find_first_not_of(' ', blank);
+  if (begin == std::string_view::npos) throw YAMLError("No property path specified on line " + place);
+  const std::string_view path = line.substr(begin, line.find(' ', begin) - begin);
+  return RecordingConflictResolver::RecordResolve{StringToPath(path), *handling};
+}
+
+}  // namespace
+
+FieldPath StringToPath(std::string_view text) {
+  FieldPath path;
+  for (size_t begin = 0;;) {
+    const size_t dot = text.find('.', begin);
+    path.push_back(YAMLScalar::Lookup(text.substr(begin, dot - begin)));
+    if (dot == std::string_view::npos) return path;
+    begin = dot + 1;
+  }
+}
+
+void InputConflictRecords(std::istream& in, RecordingConflictResolver& resolver) {
+  std::vector<RecordingConflictResolver::RecordResolve> resolutions;
+  bool handling = false;
+  std::string line;
+  for (int number = 1; std::getline(in, line); ++number) {
+    // An editor may have given the file other line ends.
+    if (!line.empty() && line.back() == '\r') line.pop_back();
+    if (line.empty() || line.front() == '#') continue;
+    if (Contains(line, "Conflicts:") || Contains(line, "Non-conflicts:")) {
+      handling = false;
+    } else if (Contains(line, "Conflict handling:")) {
+      handling = true;
+    } else if (handling) {
+      if (auto resolution = ParseHandling(line, number)) resolutions.push_back(std::move(*resolution));
+    }
+  }
+  resolver.SetResolveMethodForPaths(std::move(resolutions));
+}
+
+}  // namespace vexel_yaml

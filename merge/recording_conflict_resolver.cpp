@@ -1,0 +1,218 @@
+#include "merge/recording_conflict_resolver.h"
+
+#include <algorithm>
+
+#include "diff/merge_tree_visitor.h"
+#include "merge/merge_additions.h"
+#include "yaml/yaml_alloc.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// A deep copy whose scalar values are all empty.
+const Operation* Blanked(const Operation* operation) {
+  Operation* blank = MergeTreeCloneVisitor::Clone(operation);
+  MergeTreeClearVisitor visitor;
+  blank->Accept(visitor);
+  return blank;
+}
+
+}  // namespace
+
+bool RecordingConflictResolver::HasPendingConflicts() const {
+  return std::any_of(records_.begin(), records_.end(),
+                     [](const Record& record) { return record.resolution == MergeResolve::kConflict; });
+}
+
+MergeResolve RecordingConflictResolver::FindResolution(const FieldPath& path) const {
+  for (const RecordResolve& resolve : resolutions_) {
+    if (MatchesPattern(resolve.pattern, path)) return resolve.resolution;
+  }
+  return MergeResolve::kAutomatic;
+}
+
+void RecordingConflictResolver::AddRecord(ConflictType type, MergeResolve resolution, const Operation* left,
+                                          const Operation* right) {
+  records_.push_back({GetPath(), type, resolution, left, right});
+}
+
+template <typename T>
+const Operation* RecordingConflictResolver::SingleSideResolve(const T* operation, ConflictType type) {
+  const bool from_left = IsLeftType(type);
+  const MergeResolve resolution = FindResolution(GetPath());
+  AddRecord(type, resolution, from_left ? operation : nullptr, from_left ? nullptr : operation);
+  switch (resolution) {
+    case MergeResolve::kBase:
+    case MergeResolve::kConflict:
+      return nullptr;
+    case MergeResolve::kLeft:
+      return from_left ? operation : nullptr;
+    case MergeResolve::kRight:
+      return from_left ? nullptr : operation;
+    case MergeResolve::kAutomatic:
+    case MergeResolve::kBlank:
+    case MergeResolve::kBreakCycle:
+      break;
+  }
+  return operation;
+}
+
+const Operation* RecordingConflictResolver::OnValueAdded(const AddOperation* operation, ConflictType type) {
+  return SingleSideResolve(operation, type);
+}
+
+const Operation* RecordingConflictResolver::OnValueChanged(const ChangeOperation* operation,
+                                                           ConflictType type) {
+  return SingleSideResolve(operation, type);
+}
+
+const Operation* RecordingConflictResolver::OnValueRemoved(const RemoveOperation* operation,
+                                                           ConflictType type) {
+  const Operation* result = SingleSideResolve(operation, type);
+  records_.back().left = nullptr;
+  records_.back().right = nullptr;
+  return result;
+}
+
+const Operation* RecordingConflictResolver::OnMappingChanged(const ChangeMappingOperation* operation,
+                                                             ConflictType type) {
+  return SingleSideResolve(operation, type);
+}
+
+const Operation* RecordingConflictResolver::OnSequenceChanged(const ChangeSequenceOperation* operation,
+                                                              ConflictType type) {
+  return SingleSideResolve(operation, type);
+}
+
+const Operation* RecordingConflictResolver::ProvisionalResult(const Operation* left, const Operation* right,
+                                                              const Operation* blank_source) const {
+  switch (default_side_) {
+    case MergeResolve::kLeft:
+      return left;
+    case MergeResolve::kRight:
+      return right;
+    case MergeResolve::kBlank:
+      return Blanked(blank_source);
+    case MergeResolve::kBase:
+    case MergeResolve::kAutomatic:
+    case MergeResolve::kConflict:
+    case MergeResolve::kBreakCycle:
+      break;
+  }
+  return nullptr;
+}
+
+template <typename Settle>
+const Operation* RecordingConflictResolver::TwoSidedResolve(ConflictType type, const Operation* left,
+                                                            const Operation* right,
+                                                            const Operation* blank_source, Settle settle) {
+  MergeResolve resolution = FindResolution(GetPath());
+  const Operation* result = nullptr;
+  if (resolution == MergeResolve::kLeft) {
+    result = left;
+  } else if (resolution == MergeResolve::kRight) {
+    result = right;
+  } else if (resolution == MergeResolve::kAutomatic) {
+    result = settle();
+    if (result == nullptr) resolution = MergeResolve::kConflict;
+  }
+  if (resolution == MergeResolve::kConflict) result = ProvisionalResult(left, right, blank_source);
+  AddRecord(type, resolution, left, right);
+  return result;
+}
+
+const Operation* RecordingConflictResolver::MergeAdditions(const AddOperation* left,
+                                                           const AddOperation* right) {
+  if (YAMLSequenceRemapper::IsMergeablePath(GetPath())) {
+    if (const AddOperation* merged = MergeAddedValues(*left, *right, *this)) return merged;
+  }
+  return OperationEquals(*left, *right) ? left : nullptr;
+}
+
+const Operation* RecordingConflictResolver::OnSameValueAdded(const AddOperation* left,
+                                                             const AddOperation* right) {
+  return TwoSidedResolve(ConflictType::kBothAdd, left, right, left,
+                         [&] { return MergeAdditions(left, right); });
+}
+
+const Operation* RecordingConflictResolver::OnSameValueChanged(const ChangeOperation* left,
+                                                               const ChangeOperation* right) {
+  return TwoSidedResolve(ConflictType::kBothChange, left, right, left,
+                         [&] { return OperationEquals(*left, *right) ? left : nullptr; });
+}
+
+const Operation* RecordingConflictResolver::OnSameValueChanged(const RemoveOperation* left,
+                                                               const ChangeOperation* right) {
+  return TwoSidedResolve(ConflictType::kLeftRemovesRightChanges, left, right, right, [] { return nullptr; });
+}
+
+const Operation* RecordingConflictResolver::OnSameValueChanged(const RemoveOperation* left,
+                                                               const ChangeMappingOperation* right) {
+  return TwoSidedResolve(ConflictType::kLeftRemovesRightChanges, left, right, right, [] { return nullptr; });
+}
+
+const Operation* RecordingConflictResolver::OnSameValueRemoved(const RemoveOperation* left,
+                                                               const RemoveOperation* right) {
+  return TwoSidedResolve(ConflictType::kBothRemove, left, right, left, [&] { return left; });
+}
+
+const Operation* RecordingConflictResolver::OnSameMappingChanged(const ChangeMappingOperation* left,
+                                                                 const ChangeMappingOperation* right) {
+  return TwoSidedResolve(ConflictType::kBothChange, left, right, left, [&]() -> const Operation* {
+    if (left->IsMergeable() && right->IsMergeable() && YAMLSequenceRemapper::IsMergeablePath(GetPath())) {
+      return ChangeMappingOperation::Merge(*left, *right, *this);
+    }
+    return OperationEquals(*left, *right) ? left : nullptr;
+  });
+}
+
+const Operation* RecordingConflictResolver::OnSameSequenceChanged(const ChangeSequenceOperation* left,
+                                                                  const ChangeSequenceOperation* right) {
+  return TwoSidedResolve(ConflictType::kBothChange, left, right, left, [&]() -> const Operation* {
+    if (left->IsMergeable() && right->IsMergeable() && YAMLSequenceRemapper::IsMergeablePath(GetPath())) {
+      return ChangeSequenceOperation::Merge(*left, *right, *this, true);
+    }
+    return OperationEquals(*left, *right) ? left : nullptr;
+  });
+}
+
+void RecordingConflictResolver::OnTransformCycleDetected(const YAMLScalar* object,
+                                                         const YAMLMapping* transform,
+                                                         const YAMLScalar* /*cycle*/) {
+  const YAMLScalar* body =
+      transform->HasKey(YAMLScalar::transform) ? YAMLScalar::transform : YAMLScalar::rectTransform;
+  const FieldPath path = {object, body, YAMLScalar::mFather};
+  MergeResolve resolution = FindResolution(path);
+  if (resolution == MergeResolve::kAutomatic) resolution = MergeResolve::kConflict;
+  records_.push_back({path, ConflictType::kTransformCycle, resolution, nullptr, nullptr});
+}
+
+bool RecordingConflictResolver::OnComponentDependencyConflict(const ComponentDependencyConflict& conflict) {
+  const YAMLScalar* object = conflict.first != YAMLScalar::null ? conflict.first : conflict.second;
+  const FieldPath path = {object};
+  auto record =
+      std::find_if(records_.begin(), records_.end(), [&](const Record& r) { return r.path == path; });
+  if (record == records_.end()) {
+    records_.push_back({path, conflict.type, MergeResolve::kAutomatic, nullptr, nullptr});
+    record = records_.end() - 1;
+    record->resolution = FindResolution(path);
+  }
+  const bool settled =
+      record->resolution != MergeResolve::kAutomatic && record->resolution != MergeResolve::kConflict;
+  if (!settled) record->resolution = MergeResolve::kConflict;
+  if (conflict.type == ConflictType::kRightRemoves) {
+    record->right = YAMLAlloc<RemoveOperation>::create(true);
+  } else if (conflict.type == ConflictType::kLeftRemoves) {
+    record->left = YAMLAlloc<RemoveOperation>::create(true);
+  }
+  return !settled;
+}
+
+bool RecordingConflictResolverRecordComparer(const RecordingConflictResolver::Record& a,
+                                             const RecordingConflictResolver::Record& b) {
+  return std::lexicographical_compare(a.path.begin(), a.path.end(), b.path.begin(), b.path.end(),
+                                      ScalarTextLess());
+}
+
+}  // namespace vexel_yaml

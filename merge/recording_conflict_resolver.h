@@ -1,0 +1,84 @@
+#pragma once
+
+#include <vector>
+
+#include "merge/conflict_resolver.h"
+
+namespace vexel_yaml {
+
+/// The resolver of the merge command: settles what it can by itself, applies the user's resolutions, lets the
+/// default side stand in for real conflicts, and records every decision.
+class RecordingConflictResolver final : public ConflictResolver {
+ public:
+  struct Record {
+    FieldPath path;
+    ConflictType type;
+    MergeResolve resolution;
+    /// Not owned; null where that side did nothing, and in records of one-sided removals.
+    const Operation* left;
+    const Operation* right;
+  };
+
+  struct RecordResolve {
+    /// "*" stands for any one component.
+    FieldPath pattern;
+    MergeResolve resolution;
+  };
+
+  explicit RecordingConflictResolver(MergeResolve default_side) : default_side_(default_side) {}
+
+  /// Replaces the user's resolutions; the first one that matches a place wins.
+  void SetResolveMethodForPaths(std::vector<RecordResolve> resolutions) {
+    resolutions_ = std::move(resolutions);
+  }
+
+  bool HasPendingConflicts() const;
+  const std::vector<Record>& GetRecords() const { return records_; }
+  const std::vector<RecordResolve>& GetResolutions() const { return resolutions_; }
+
+  const Operation* OnValueAdded(const AddOperation* operation, ConflictType type) override;
+  const Operation* OnValueChanged(const ChangeOperation* operation, ConflictType type) override;
+  const Operation* OnValueRemoved(const RemoveOperation* operation, ConflictType type) override;
+  const Operation* OnMappingChanged(const ChangeMappingOperation* operation, ConflictType type) override;
+  const Operation* OnSequenceChanged(const ChangeSequenceOperation* operation, ConflictType type) override;
+  void OnTransformCycleDetected(const YAMLScalar* object, const YAMLMapping* transform,
+                                const YAMLScalar* cycle) override;
+  const Operation* OnSameValueAdded(const AddOperation* left, const AddOperation* right) override;
+  const Operation* OnSameValueChanged(const ChangeOperation* left, const ChangeOperation* right) override;
+  const Operation* OnSameValueChanged(const RemoveOperation* left, const ChangeOperation* right) override;
+  const Operation* OnSameValueChanged(const RemoveOperation* left,
+                                      const ChangeMappingOperation* right) override;
+  const Operation* OnSameValueRemoved(const RemoveOperation* left, const RemoveOperation* right) override;
+  const Operation* OnSameMappingChanged(const ChangeMappingOperation* left,
+                                        const ChangeMappingOperation* right) override;
+  const Operation* OnSameSequenceChanged(const ChangeSequenceOperation* left,
+                                         const ChangeSequenceOperation* right) override;
+  bool OnComponentDependencyConflict(const ComponentDependencyConflict& conflict) override;
+
+ private:
+  MergeResolve FindResolution(const FieldPath& path) const;
+
+  template <typename T>
+  const Operation* SingleSideResolve(const T* operation, ConflictType type);
+
+  /// Settles a two-sided place: by the user's resolution, else by `settle` (the operation that both sides'
+  /// edits agree on, or null), else as a conflict. `blank_source` is emptied where the default side is blank.
+  template <typename Settle>
+  const Operation* TwoSidedResolve(ConflictType type, const Operation* left, const Operation* right,
+                                   const Operation* blank_source, Settle settle);
+
+  const Operation* ProvisionalResult(const Operation* left, const Operation* right,
+                                     const Operation* blank_source) const;
+  const Operation* MergeAdditions(const AddOperation* left, const AddOperation* right);
+  void AddRecord(ConflictType type, MergeResolve resolution, const Operation* left, const Operation* right);
+
+  MergeResolve default_side_;
+  std::vector<Record> records_;
+  std::vector<RecordResolve> resolutions_;
+};
+
+/// Record order in files: by path, component by component, byte-wise; a path before its extensions.
+bool RecordingConflictResolverRecordComparer(const RecordingConflictResolver::Record& a,
+                                             const RecordingConflictResolver::Record& b);
+
+}  // namespace vexel_yaml
