@@ -1,0 +1,64 @@
+#include "fixups/duplicate_keys.h"
+
+#include "fixups/engine_keys.h"
+#include "yaml/yaml_error.h"
+#include "yaml/yaml_sequence.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+bool HoldsDuplicateKeys(const YAMLNode* node) {
+  if (node == nullptr) return false;
+  if (const YAMLMapping* mapping = node->AsMapping()) {
+    if (mapping->HasDuplicateKeys()) return true;
+    for (const auto& [key, value] : *mapping) {
+      if (HoldsDuplicateKeys(value)) return true;
+    }
+  } else if (const YAMLSequence* sequence = node->AsSequence()) {
+    for (const YAMLNode* item : sequence->GetItems()) {
+      if (HoldsDuplicateKeys(item)) return true;
+    }
+  }
+  return false;
+}
+
+// The transitions themselves may repeat keys, their values may not.
+bool TransitionsHoldDuplicateKeys(const YAMLNode* node) {
+  const YAMLMapping* transitions = node->AsMapping();
+  if (transitions == nullptr || !transitions->HasDuplicateKeys()) return HoldsDuplicateKeys(node);
+  for (const auto& [key, value] : transitions->GetDuplicatePairs()) {
+    if (HoldsDuplicateKeys(value)) return true;
+  }
+  return false;
+}
+
+bool ObjectHoldsDuplicateKeys(const YAMLMapping& object) {
+  if (object.HasDuplicateKeys()) return true;
+  const YAMLMapping* state_machine = GetSubmapping(object, AnimatorStateMachineKey());
+  if (state_machine == nullptr || state_machine->HasDuplicateKeys()) return HoldsDuplicateKeys(&object);
+  for (const auto& [key, value] : *state_machine) {
+    if (key == StateMachineTransitionsKey() ? TransitionsHoldDuplicateKeys(value)
+                                            : HoldsDuplicateKeys(value)) {
+      return true;
+    }
+  }
+  for (const auto& [key, value] : object) {
+    if (value != state_machine && HoldsDuplicateKeys(value)) return true;
+  }
+  return false;
+}
+
+}  // namespace
+
+void RefuseDuplicateKeys(const VexelObjects& objects, const std::string& path) {
+  if (!objects.HoldsDuplicateKeys()) return;
+  for (const auto& [file_id, value] : objects) {
+    const YAMLMapping* object = value->AsMapping();
+    if (object == nullptr || !ObjectHoldsDuplicateKeys(*object)) continue;
+    throw YAMLError("Cannot perform this operation on a YAML file with duplicate keys: file '" + path +
+                    "', object " + file_id->GetText());
+  }
+}
+
+}  // namespace vexel_yaml

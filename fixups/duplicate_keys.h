@@ -1,0 +1,14 @@
+#pragma once
+
+#include <string>
+
+#include "yaml/vexel_objects.h"
+
+namespace vexel_yaml {
+
+/// Throws YAMLError when a mapping of the file repeats a key, other than the transitions of a state machine:
+/// a copy of such a mapping would be empty, so merging it would lose it. The message names `path` and the
+/// object.
+void RefuseDuplicateKeys(const VexelObjects& objects, const std::string& path);
+
+}  // namespace vexel_yaml

@@ -1,0 +1,14 @@
+#pragma once
+
+#include "merge/conflict_resolver.h"
+
+namespace vexel_yaml {
+
+/// Repairs a merged document so that it loads: orphaned prefab transforms, transform parents that the merge
+/// removed, parent cycles (each is reported to the resolver and broken), prefab-internal references to
+/// nothing; turns state-machine transitions back into mappings.
+/// Throws YAMLError and std::runtime_error as the single repairs do.
+void PostProcessMergeOnly(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right,
+                          ConflictResolver& resolver);
+
+}  // namespace vexel_yaml

@@ -1,0 +1,102 @@
+#include "fixups/prefab_repairs.h"
+
+#include <vector>
+
+#include "fixups/engine_keys.h"
+#include "yaml/yaml_sequence.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+void RemoveObjects(YAMLMapping& root, const std::vector<const YAMLScalar*>& file_ids) {
+  for (const YAMLScalar* file_id : file_ids) root.Remove(file_id);
+}
+
+// Walks a file and sanitizes its prefab-internal references.
+class PostProcessVisitor final : public YAMLNodeVisitor {
+ public:
+  explicit PostProcessVisitor(const YAMLMapping& root) : root_(root) {}
+
+  void Visit(const YAMLScalar& /*scalar*/) override {}
+
+  void Visit(YAMLMapping& mapping) override {
+    if (mapping.HasDuplicateKeys()) {
+      for (const auto& [key, value] : mapping.GetDuplicatePairs()) VisitAt(key, value);
+      return;
+    }
+    const bool is_prefab_reference = key_ == YAMLScalar::mPrefabInternal;
+    for (const auto& [key, value] : mapping) {
+      if (is_prefab_reference && key == YAMLScalar::fileID && value->AsScalar() != nullptr) {
+        SanitizePrefabInteralReferences(mapping, value->AsScalar());
+      } else {
+        VisitAt(key, value);
+      }
+    }
+  }
+
+  void Visit(YAMLSequence& sequence) override {
+    for (YAMLNode* item : sequence.GetItems()) {
+      // An index stands in the path between the key and the element.
+      if (item != nullptr) VisitAt(nullptr, item);
+    }
+  }
+
+  // Whether a reference was cleared since the last question.
+  bool TakeCleared() { return std::exchange(cleared_, false); }
+
+ private:
+  void VisitAt(const YAMLScalar* key, YAMLNode* value) {
+    key_ = key;
+    value->Accept(*this);
+  }
+
+  void SanitizePrefabInteralReferences(YAMLMapping& reference, const YAMLScalar* file_id) {
+    if (IsNullReference(file_id) || root_.HasKey(file_id)) return;
+    reference.Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
+    cleared_ = true;
+  }
+
+  const YAMLMapping& root_;
+  // The key under which the node being visited stands.
+  const YAMLScalar* key_ = nullptr;
+  bool cleared_ = false;
+};
+
+}  // namespace
+
+void RepairOrphanedPrefabTransforms(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right) {
+  std::vector<const YAMLScalar*> orphans;
+  for (const auto& [file_id, value] : merged) {
+    YAMLMapping* body = value->AsMapping() == nullptr ? nullptr : GetTransformBody(*value->AsMapping());
+    if (body == nullptr) continue;
+    const YAMLScalar* prefab = GetMappingPath(*body, YAMLScalar::mPrefabInternal, YAMLScalar::fileID);
+    if (IsNullReference(prefab) || merged.HasKey(prefab)) continue;
+    if (!left.HasKey(prefab) && !right.HasKey(prefab)) continue;
+    const YAMLScalar* game_object = GetMappingPath(*body, YAMLScalar::mGameObject, YAMLScalar::fileID);
+    if (!IsNullReference(game_object) && merged.HasKey(game_object)) {
+      GetSubmapping(*body, YAMLScalar::mPrefabInternal)
+          ->Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
+    } else {
+      orphans.push_back(file_id);
+    }
+  }
+  RemoveObjects(merged, orphans);
+}
+
+void ClearDanglingPrefabReferences(YAMLMapping& merged) {
+  std::vector<const YAMLScalar*> removed;
+  PostProcessVisitor visitor(merged);
+  for (const auto& [file_id, value] : merged) {
+    value->Accept(visitor);
+    if (!visitor.TakeCleared()) continue;
+    YAMLMapping* object = value->AsMapping();
+    if (object != nullptr && GetTransformBody(*object) != nullptr &&
+        object->HasKey(YAMLScalar::strippedPrefabPlaceHolderName)) {
+      removed.push_back(file_id);
+    }
+  }
+  RemoveObjects(merged, removed);
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,14 @@
+#pragma once
+
+#include "fixups/transform_parents.h"
+#include "merge/conflict_resolver.h"
+
+namespace vexel_yaml {
+
+/// Reports and breaks every loop of transform parents: first at the transforms whose parent both sides
+/// changed, as the resolver collected them, then at any other transform, in file order. Throws
+/// std::runtime_error where a collected transform is not in the file or a walk up from it meets a transform
+/// without a recorded parent.
+void BreakTransformCycles(YAMLMapping& merged, TransformParents& parents, ConflictResolver& resolver);
+
+}  // namespace vexel_yaml
