@@ -1,0 +1,43 @@
+#include "app/diffing.h"
+
+#include <exception>
+
+#include "platform/thread.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+void DiffingThreadFunction(DiffingInfo& info) { info.diff = YAMLMappingDiff::Diff(info.from, info.to); }
+
+void CreateDiff(DiffingInfo& info, TimerStat& timer, const char* label) {
+  TimerStat step(timer, label);
+  DiffingThreadFunction(info);
+}
+
+}  // namespace
+
+DiffPair CreateDiffPair(DiffingInfo left, DiffingInfo right, bool threads, TimerStat& timer) {
+  if (!threads) {
+    CreateDiff(left, timer, "Creating left diff");
+    CreateDiff(right, timer, "Creating right diff");
+    return {left.diff, right.diff};
+  }
+  Thread left_thread;
+  left_thread.Start([&] { DiffingThreadFunction(left); });
+  std::exception_ptr right_exception;
+  try {
+    CreateDiff(right, timer, "Creating right diff");
+  } catch (...) {
+    right_exception = std::current_exception();
+  }
+  {
+    TimerStat step(timer, "Waiting for left diff");
+    left_thread.Join();
+  }
+  left_thread.CheckForExceptions();
+  if (right_exception) std::rethrow_exception(right_exception);
+  return {left.diff, right.diff};
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,56 @@
+#include "app/inner_main.h"
+
+#include "app/merge_command.h"
+#include "app/usage.h"
+#include "platform/error_channel.h"
+#include "yaml/yaml_scalar.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+constexpr int kFirstOption = 2;
+
+int ReportNotBuilt(const std::string& command) {
+  errs << "The " << command << " command is not built yet\n";
+  ErrMsg(errs);
+  return 1;
+}
+
+}  // namespace
+
+int InnerMain(const CommandLineArguments& arguments) {
+  initialize();
+  if (arguments.size() < 2) {
+    errs << "Error: need 'merge' command specified\n";
+    ErrMsg(errs);
+    usage();
+    return 1;
+  }
+  const std::string& command = arguments[1];
+  if (command == kCmdStrip) {
+    StripConfig config;
+    return ParseStripArgs(arguments, kFirstOption, config) ? ReportNotBuilt(command) : 1;
+  }
+  if (command == kCmdDiff) {
+    DiffConfig config;
+    return ParseDiffArgs(arguments, kFirstOption, config) ? ReportNotBuilt(command) : 1;
+  }
+  if (command == kCmdMerge) {
+    MergeConfig config;
+    return ParseMergeArgs(arguments, kFirstOption, config) ? ProcessMergeCommand(config) : 1;
+  }
+  if (command == kCmdUnittest) return ReportNotBuilt(command);
+  if (command.starts_with('-')) {
+    errs << "Missing command (e.g. 'merge') before option " << command;
+    ErrMsg(errs);
+    return 1;
+  }
+  if (IsSubversionCall(arguments)) return ProcessMergeCommand(SubversionMergeConfig(arguments));
+  errs << "Error: unknown command " << command;
+  ErrMsg(errs);
+  usage();
+  return 1;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,35 @@
+#pragma once
+
+#include <array>
+#include <string>
+#include <vector>
+
+#include "app/diffing.h"
+#include "merge/recording_conflict_resolver.h"
+#include "platform/timer_stat.h"
+#include "yaml/vexel_objects.h"
+
+namespace vexel_yaml {
+
+/// The three versions of one asset.
+struct MergeDocuments {
+  VexelObjects base;
+  VexelObjects left;
+  VexelObjects right;
+};
+
+/// A version of the asset for a text merge tool: everything that could be merged, and `side`'s values where
+/// there were conflicts.
+struct PremergeTarget {
+  MergeResolve side;
+  const std::string& path;
+};
+
+/// Writes both premerged files, each on a thread of its own if `threads`, with the user's resolutions.
+/// Throws what merging and post-processing throw, and FileError; the first target's exception first.
+void RunPremerges(const std::array<PremergeTarget, 2>& targets, const MergeDocuments& documents,
+                  const DiffPair& diffs,
+                  const std::vector<RecordingConflictResolver::RecordResolve>& resolutions, bool threads,
+                  TimerStat& timer);
+
+}  // namespace vexel_yaml
