@@ -17,7 +17,7 @@ void YAMLSequenceDiff::Replace(int index, const Operation* operation) {
   found->second = operation;
 }
 
-void YAMLSequenceDiff::RemoveAndShiftMany(std::set<int> removed) {
+void YAMLSequenceDiff::RemoveAndShiftMany(const std::set<int>& removed) {
   std::map<int, const Operation*> shifted;
   int shift = 0;
   auto next_removed = removed.begin();

@@ -36,7 +36,7 @@ class YAMLSequenceDiff {
   void Replace(int index, const Operation* operation);
 
   /// Drops the operations at the removed indices and moves the later ones down.
-  void RemoveAndShiftMany(std::set<int> removed);
+  void RemoveAndShiftMany(const std::set<int>& removed);
 
   /// The operation at `index`, null where there is none.
   const Operation* Get(int index) const;

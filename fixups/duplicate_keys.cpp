@@ -52,9 +52,8 @@ bool ObjectHoldsDuplicateKeys(const YAMLMapping& object) {
 }  // namespace
 
 void RefuseDuplicateKeys(const VexelObjects& objects, const std::string& path) {
-  if (!objects.HoldsDuplicateKeys()) return;
-  for (const auto& [file_id, value] : objects) {
-    const YAMLMapping* object = value->AsMapping();
+  for (const YAMLScalar* file_id : objects.GetObjectsWithDuplicateKeys()) {
+    const YAMLMapping* object = GetSubmapping(objects, file_id);
     if (object == nullptr || !ObjectHoldsDuplicateKeys(*object)) continue;
     throw YAMLError("Cannot perform this operation on a YAML file with duplicate keys: file '" + path +
                     "', object " + file_id->GetText());

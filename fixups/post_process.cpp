@@ -1,9 +1,11 @@
 #include "fixups/post_process.h"
 
+#include "fixups/component_dependencies.h"
 #include "fixups/prefab_repairs.h"
 #include "fixups/state_machine_transitions.h"
 #include "fixups/transform_cycles.h"
 #include "fixups/transform_parents.h"
+#include "yaml/type_info.h"
 
 namespace vexel_yaml {
 
@@ -14,6 +16,17 @@ void PostProcessMergeOnly(YAMLMapping& merged, const YAMLMapping& left, const YA
   BreakTransformCycles(merged, parents, resolver);
   ClearDanglingPrefabReferences(merged);
   TransitionsToMappings(merged);
+}
+
+bool PostProcess(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right,
+                 ConflictResolver& resolver) {
+  PostProcessMergeOnly(merged, left, right, resolver);
+  if (GetTypeInfoManager().IsEmpty()) return false;
+  bool pending = false;
+  for (const ComponentDependencyConflict& conflict : FindComponentDependencyConflicts(merged, left, right)) {
+    pending |= resolver.OnComponentDependencyConflict(conflict);
+  }
+  return pending;
 }
 
 }  // namespace vexel_yaml

@@ -11,4 +11,9 @@ namespace vexel_yaml {
 void PostProcessMergeOnly(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right,
                           ConflictResolver& resolver);
 
+/// The same and, where type information is loaded, the component dependency checks, whose conflicts the
+/// resolver gets. Returns whether one of them is pending.
+bool PostProcess(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right,
+                 ConflictResolver& resolver);
+
 }  // namespace vexel_yaml

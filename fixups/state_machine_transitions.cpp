@@ -51,7 +51,9 @@ void TransitionsToMappings(YAMLMapping& root) {
   const YAMLScalar* key = StateMachineTransitionsKey();
   ForEachStateMachine(root, [&](YAMLMapping& /*object*/, YAMLMapping& body) {
     YAMLNode* value = body.Get(key);
-    YAMLSequence* transitions = value == nullptr ? nullptr : value->AsSequence();
+    // Stripping may have left nothing of them.
+    if (value == nullptr) return;
+    YAMLSequence* transitions = value->AsSequence();
     if (transitions == nullptr) throw YAMLError("Expected key to point to yaml sequence: " + key->GetText());
     body.Change(key, ToMapping(*transitions))->Free();
   });

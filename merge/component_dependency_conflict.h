@@ -12,6 +12,8 @@ struct ComponentDependencyConflict {
   const YAMLScalar* second;
   int count;
   ConflictType type;
+
+  bool operator==(const ComponentDependencyConflict&) const = default;
 };
 
 }  // namespace vexel_yaml

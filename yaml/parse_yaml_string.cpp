@@ -36,7 +36,7 @@ class FileReader {
   void MoveInto(VexelObjects& objects) {
     for (const ReadObject& read : objects_) {
       objects.Append(read.file_id, read.object);
-      if (read.holds_duplicate_keys) objects.SetHoldsDuplicateKeys();
+      if (read.holds_duplicate_keys) objects.AddObjectWithDuplicateKeys(read.file_id);
       for (const size_t line : read.skipped_key_lines) objects.AddSkippedKey({read.file_id, line});
     }
     if (!text_.GetTagPrefix().empty()) objects.SetTagPrefix(std::string(text_.GetTagPrefix()));

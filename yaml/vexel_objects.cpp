@@ -15,28 +15,30 @@ std::string_view TextOf(const YAMLNode* value) {
   return scalar == nullptr ? std::string_view() : std::string_view(scalar->GetText());
 }
 
-void OutputObject(std::ostream& out, YAMLMapping& object) {
-  YAMLNode* file_id = object.Steal(YAMLScalar::fileIDPlaceHolderName);
-  YAMLNode* class_id = object.Steal(YAMLScalar::classIDPlaceHolderName);
-  YAMLNode* stripped = object.Steal(YAMLScalar::strippedPrefabPlaceHolderName);
-  out << "--- !v!" << TextOf(class_id) << " &" << TextOf(file_id);
-  if (stripped != nullptr) out << " stripped";
-  out << '\n' << object.GetYAMLString() << '\n';
-  AppendPresent(object, YAMLScalar::fileIDPlaceHolderName, file_id);
-  AppendPresent(object, YAMLScalar::classIDPlaceHolderName, class_id);
-  AppendPresent(object, YAMLScalar::strippedPrefabPlaceHolderName, stripped);
-}
-
 }  // namespace
 
-void VexelObjects::Output(std::ostream& out) {
+void VexelObjects::OutputObject(std::ostream& out, const Slot& slot) {
+  YAMLMapping* object = slot.value->AsMapping();
+  if (object == nullptr)
+    throw YAMLError("Cannot write an object that is not a mapping: " + slot.key->GetText());
+  YAMLNode* file_id = object->Steal(YAMLScalar::fileIDPlaceHolderName);
+  YAMLNode* class_id = object->Steal(YAMLScalar::classIDPlaceHolderName);
+  YAMLNode* stripped = object->Steal(YAMLScalar::strippedPrefabPlaceHolderName);
+  out << "--- !v!" << TextOf(class_id) << " &" << TextOf(file_id);
+  if (stripped != nullptr) out << " stripped";
+  out << '\n' << object->GetYAMLString() << '\n';
+  AppendPresent(*object, YAMLScalar::fileIDPlaceHolderName, file_id);
+  AppendPresent(*object, YAMLScalar::classIDPlaceHolderName, class_id);
+  AppendPresent(*object, YAMLScalar::strippedPrefabPlaceHolderName, stripped);
+}
+
+void VexelObjects::OutputHeader(std::ostream& out) const {
   out << "%YAML 1.1\n%TAG !v! " << tag_prefix_ << '\n';
-  for (const Slot& slot : *this) {
-    YAMLMapping* object = slot.value->AsMapping();
-    if (object == nullptr)
-      throw YAMLError("Cannot write an object that is not a mapping: " + slot.key->GetText());
-    OutputObject(out, *object);
-  }
+}
+
+void VexelObjects::Output(std::ostream& out) {
+  OutputHeader(out);
+  for (const Slot& slot : *this) OutputObject(out, slot);
   out.flush();
 }
 

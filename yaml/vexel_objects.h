@@ -35,13 +35,22 @@ class VexelObjects final : public YAMLMapping {
   const std::vector<SkippedKey>& GetSkippedKeys() const { return skipped_keys_; }
   void AddSkippedKey(SkippedKey key) { skipped_keys_.push_back(key); }
 
-  /// Whether any mapping of the file repeats a key with another value, at the root or inside an object.
-  bool HoldsDuplicateKeys() const { return holds_duplicate_keys_ || HasDuplicateKeys(); }
-  void SetHoldsDuplicateKeys() { holds_duplicate_keys_ = true; }
+  /// The file IDs of the objects in which some mapping repeats a key with another value, in file order.
+  const std::vector<const YAMLScalar*>& GetObjectsWithDuplicateKeys() const {
+    return objects_with_duplicate_keys_;
+  }
+  void AddObjectWithDuplicateKeys(const YAMLScalar* file_id) {
+    objects_with_duplicate_keys_.push_back(file_id);
+  }
 
-  /// Writes the file: the two directives, then a document for each object. The pseudo keys are at the end of
-  /// each object afterwards. Throws YAMLError when libyaml refuses an object.
+  /// Writes the file: the two directives, then a document for each object. Throws what OutputObject throws.
   void Output(std::ostream& out);
+
+  /// The two parts of it, for callers that write objects on several threads.
+  void OutputHeader(std::ostream& out) const;
+  /// Throws YAMLError when the object is no mapping or libyaml refuses it. The pseudo keys are at its end
+  /// afterwards.
+  static void OutputObject(std::ostream& out, const Slot& slot);
 
   /// A deep copy of all objects, owned by the caller.
   VexelObjects* Clone() const override;
@@ -52,7 +61,7 @@ class VexelObjects final : public YAMLMapping {
  private:
   std::string tag_prefix_ = "tag:vexel.com,2011:";
   std::vector<SkippedKey> skipped_keys_;
-  bool holds_duplicate_keys_ = false;
+  std::vector<const YAMLScalar*> objects_with_duplicate_keys_;
 };
 
 }  // namespace vexel_yaml
