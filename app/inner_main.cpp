@@ -1,8 +1,10 @@
 #include "app/inner_main.h"
 
+#include "app/file_pair_commands.h"
 #include "app/merge_command.h"
 #include "app/usage.h"
 #include "platform/error_channel.h"
+#include "yaml/yaml_error.h"
 #include "yaml/yaml_scalar.h"
 
 namespace vexel_yaml {
@@ -10,6 +12,18 @@ namespace vexel_yaml {
 namespace {
 
 constexpr int kFirstOption = 2;
+
+// Runs a command on two files; a library error is reported as it is.
+template <typename Config>
+int RunOnFilePair(int (*handle)(const Config&), const Config& config) {
+  try {
+    return handle(config);
+  } catch (const YAMLError& error) {
+    errs << error.what() << "\n";
+    ErrMsg(errs);
+    return 1;
+  }
+}
 
 int ReportNotBuilt(const std::string& command) {
   errs << "The " << command << " command is not built yet\n";
@@ -30,11 +44,11 @@ int InnerMain(const CommandLineArguments& arguments) {
   const std::string& command = arguments[1];
   if (command == kCmdStrip) {
     StripConfig config;
-    return ParseStripArgs(arguments, kFirstOption, config) ? ReportNotBuilt(command) : 1;
+    return ParseStripArgs(arguments, kFirstOption, config) ? RunOnFilePair(HandleStripCommand, config) : 1;
   }
   if (command == kCmdDiff) {
     DiffConfig config;
-    return ParseDiffArgs(arguments, kFirstOption, config) ? ReportNotBuilt(command) : 1;
+    return ParseDiffArgs(arguments, kFirstOption, config) ? RunOnFilePair(HandleDiffCommand, config) : 1;
   }
   if (command == kCmdMerge) {
     MergeConfig config;

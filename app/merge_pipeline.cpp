@@ -8,6 +8,8 @@
 #include "app/diffing.h"
 #include "app/premerge.h"
 #include "app/reading.h"
+#include "app/setup.h"
+#include "app/writing.h"
 #include "diff/yaml_mapping_diff.h"
 #include "fixups/duplicate_keys.h"
 #include "fixups/file_id_collisions.h"
@@ -84,7 +86,7 @@ class MergeRun {
       merged_diff->Apply(*merged_);
     }
     TimerStat step(timer_, "Post process merged changes");
-    PostProcessMergeOnly(*merged_, documents_.left, documents_.right, resolver_);
+    breaks_dependency_ = PostProcess(*merged_, documents_.left, documents_.right, resolver_);
   }
 
   void OutputConflicts() {
@@ -102,7 +104,7 @@ class MergeRun {
   void OutputResult(const std::string& path) {
     TimerStat step(timer_, "Output result");
     FileReplacement file(VexelToNativePath(path));
-    merged_->Output(file.Stream());
+    WriteObjects(*merged_, file.Stream(), config_.threads);
     file.Commit();
   }
 
@@ -118,7 +120,10 @@ class MergeRun {
                  documents_, diffs_, resolver_.GetResolutions(), config_.threads, timer_);
   }
 
-  bool HasPendingConflicts() const { return resolver_.HasPendingConflicts(); }
+  int GetResult() const {
+    if (!resolver_.HasPendingConflicts()) return 0;
+    return breaks_dependency_ ? 3 : 2;
+  }
 
  private:
   const MergeConfig& config_;
@@ -127,22 +132,18 @@ class MergeRun {
   DiffPair diffs_;
   RecordingConflictResolver resolver_;
   std::unique_ptr<VexelObjects> merged_;
+  bool breaks_dependency_ = false;
 };
 
 }  // namespace
 
 int HandleMergeCommand(const MergeConfig& config, const std::string& output_path) {
-  if (config.type_info_file != kDefaultTypeInfoFile) {
-    errs << "Type information is not built yet\n";
-    ErrMsg(errs);
-    return 1;
-  }
   TimerStat timer("Merge Command", config.timing ? &std::cout : nullptr);
-  {
-    TimerStat step(timer, "Reading unique keys");
-    SetupRules(config.rules_file);
-  }
-  MergeRun run(config, timer);
+  SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
+  // Kept until the process ends: giving back the nodes of three scenes one by one would take as long as
+  // merging them.
+  static auto& runs = *new std::vector<std::unique_ptr<MergeRun>>;
+  MergeRun& run = *runs.emplace_back(std::make_unique<MergeRun>(config, timer));
   run.Read();
   run.CreateMappings();
   run.CreateDiffs();
@@ -151,7 +152,7 @@ int HandleMergeCommand(const MergeConfig& config, const std::string& output_path
   run.OutputConflicts();
   run.OutputResult(output_path);
   run.OutputPremerge();
-  return run.HasPendingConflicts() ? 2 : 0;
+  return run.GetResult();
 }
 
 }  // namespace vexel_yaml

@@ -1,0 +1,19 @@
+#include "app/setup.h"
+
+#include "app/command_line.h"
+#include "rules/yaml_sequence_remapper.h"
+#include "yaml/type_info.h"
+
+namespace vexel_yaml {
+
+void SetupRulesAndTypes(const std::string& rules_file, const std::string& type_info_file, TimerStat& timer) {
+  {
+    TimerStat step(timer, "Reading unique keys");
+    SetupRules(rules_file);
+  }
+  if (type_info_file == kDefaultTypeInfoFile) return;
+  TimerStat step(timer, "Read type info");
+  SetupTypeInfo(type_info_file);
+}
+
+}  // namespace vexel_yaml
