@@ -1,0 +1,3 @@
+#!/bin/sh
+echo half done >"$1"
+exit 7
