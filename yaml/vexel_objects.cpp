@@ -21,6 +21,11 @@ void VexelObjects::OutputObject(std::ostream& out, const Slot& slot) {
   YAMLMapping* object = slot.value->AsMapping();
   if (object == nullptr)
     throw YAMLError("Cannot write an object that is not a mapping: " + slot.key->GetText());
+  // Its header line could not be read again.
+  if (TextOf(object->Get(YAMLScalar::fileIDPlaceHolderName)).empty() ||
+      TextOf(object->Get(YAMLScalar::classIDPlaceHolderName)).empty()) {
+    throw YAMLError("Cannot write an object without class ID or file ID: '" + slot.key->GetText() + "'");
+  }
   YAMLNode* file_id = object->Steal(YAMLScalar::fileIDPlaceHolderName);
   YAMLNode* class_id = object->Steal(YAMLScalar::classIDPlaceHolderName);
   YAMLNode* stripped = object->Steal(YAMLScalar::strippedPrefabPlaceHolderName);
