@@ -128,10 +128,13 @@ bool DocumentReader::Read(const AssetText::Document& document, bool last, ReadOb
   // With the next document's start libyaml sees where this one ends.
   if (!last) chunk_ += "---";
 
-  // In the chunk the document starts on the line behind the header, in the file on a line of its own.
+  // In the chunk the document starts on the line behind the header, in the file on a line of its own. libyaml
+  // counts the end of a text as one line more.
   const auto header_lines = static_cast<size_t>(std::count(header_.begin(), header_.end(), '\n'));
+  const size_t last_line =
+      static_cast<size_t>(std::count(document.text.begin(), document.text.end() - 1, '\n'));
   const auto line_in_file = [&](size_t line) {
-    return document.line + 1 + (line > header_lines ? line - header_lines : 0);
+    return document.line + 1 + std::min(line > header_lines ? line - header_lines : 0, last_line);
   };
   LoadedDocument loaded;
   try {
