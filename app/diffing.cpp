@@ -8,26 +8,24 @@ namespace vexel_yaml {
 
 namespace {
 
-void DiffingThreadFunction(DiffingInfo& info) { info.diff = YAMLMappingDiff::Diff(info.from, info.to); }
-
-void CreateDiff(DiffingInfo& info, TimerStat& timer, const char* label) {
+void DiffingThreadFunction(DiffingInfo& info, TimerStat& timer, const char* label) {
   TimerStat step(timer, label);
-  DiffingThreadFunction(info);
+  info.diff = YAMLMappingDiff::Diff(info.from, info.to);
 }
 
 }  // namespace
 
 DiffPair CreateDiffPair(DiffingInfo left, DiffingInfo right, bool threads, TimerStat& timer) {
   if (!threads) {
-    CreateDiff(left, timer, "Creating left diff");
-    CreateDiff(right, timer, "Creating right diff");
+    DiffingThreadFunction(left, timer, "Creating left diff");
+    DiffingThreadFunction(right, timer, "Creating right diff");
     return {left.diff, right.diff};
   }
   Thread left_thread;
-  left_thread.Start([&] { DiffingThreadFunction(left); });
+  left_thread.Start([&] { DiffingThreadFunction(left, timer, "Creating left diff"); });
   std::exception_ptr right_exception;
   try {
-    CreateDiff(right, timer, "Creating right diff");
+    DiffingThreadFunction(right, timer, "Creating right diff");
   } catch (...) {
     right_exception = std::current_exception();
   }

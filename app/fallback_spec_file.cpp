@@ -96,7 +96,7 @@ const FallbackCommandEntry* FindExistingTool(const FallbackCommandMap& map, cons
 std::string GetSpecFilename(const std::string& spec) {
   if (spec != kDefaultSpecFile) return spec;
   const std::string own = GetUserHomeDir() + "/." + std::string(kSpecFileName);
-  return FileExists(own) ? own : GetDataFilesDir() + std::string(kSpecFileName);
+  return FileExists(own) ? own : GetDataFilePath(std::string(kSpecFileName));
 }
 
 bool PopulateFallbacks(FallbackCommandMap& map, const std::string& path) {

@@ -1,9 +1,12 @@
 #include "app/merge_pipeline.h"
 
 #include <cerrno>
+#include <filesystem>
 #include <fstream>
 #include <iostream>
 #include <memory>
+#include <system_error>
+#include <vector>
 
 #include "app/diffing.h"
 #include "app/premerge.h"
@@ -27,11 +30,27 @@ namespace vexel_yaml {
 
 namespace {
 
+// What is kept until the process ends: giving back the nodes of three scenes one by one would take as long as
+// merging them.
+struct KeptDocuments {
+  MergeDocuments read;
+  std::unique_ptr<VexelObjects> merged;
+};
+
+KeptDocuments& NewKeptDocuments() {
+  static auto& kept = *new std::vector<std::unique_ptr<KeptDocuments>>;
+  return *kept.emplace_back(std::make_unique<KeptDocuments>());
+}
+
 // One run of the merge command, step by step.
 class MergeRun {
  public:
-  MergeRun(const MergeConfig& config, TimerStat& timer)
-      : config_(config), timer_(timer), resolver_(static_cast<MergeResolve>(config.resolve_mode)) {}
+  MergeRun(const MergeConfig& config, KeptDocuments& documents, TimerStat& timer)
+      : config_(config),
+        documents_(documents.read),
+        merged_(documents.merged),
+        timer_(timer),
+        resolver_(static_cast<MergeResolve>(config.resolve_mode)) {}
 
   void Read() {
     const std::vector<FileToRead> files = {{"Read base", config_.base_path, documents_.base},
@@ -61,8 +80,9 @@ class MergeRun {
   bool ReadResolutions() {
     if (config_.merge_file.empty()) return true;
     TimerStat step(timer_, "Reading resolve file");
+    std::error_code error;
     std::ifstream file(VexelToNativePath(config_.merge_file));
-    if (!file) {
+    if (!file || std::filesystem::is_directory(config_.merge_file, error)) {
       errs << "Couldn't open merge resolve file '" << config_.merge_file << "'";
       ErrMsg(errs);
       return false;
@@ -127,11 +147,11 @@ class MergeRun {
 
  private:
   const MergeConfig& config_;
+  MergeDocuments& documents_;
+  std::unique_ptr<VexelObjects>& merged_;
   TimerStat& timer_;
-  MergeDocuments documents_;
   DiffPair diffs_;
   RecordingConflictResolver resolver_;
-  std::unique_ptr<VexelObjects> merged_;
   bool breaks_dependency_ = false;
 };
 
@@ -140,10 +160,7 @@ class MergeRun {
 int HandleMergeCommand(const MergeConfig& config, const std::string& output_path) {
   TimerStat timer("Merge Command", config.timing ? &std::cout : nullptr);
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
-  // Kept until the process ends: giving back the nodes of three scenes one by one would take as long as
-  // merging them.
-  static auto& runs = *new std::vector<std::unique_ptr<MergeRun>>;
-  MergeRun& run = *runs.emplace_back(std::make_unique<MergeRun>(config, timer));
+  MergeRun run(config, NewKeptDocuments(), timer);
   run.Read();
   run.CreateMappings();
   run.CreateDiffs();

@@ -7,23 +7,35 @@
 
 namespace vexel_yaml {
 
-void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer) {
-  DocumentCache cache;
-  if (!threads) {
-    for (const FileToRead& file : files) {
-      TimerStat step(timer, file.label);
-      ReadYAMLPath(file.path, file.objects, &cache);
-    }
-    return;
-  }
+namespace {
+
+void ReadFile(const FileToRead& file, DocumentCache& cache, TimerStat& timer) {
+  TimerStat step(timer, file.label);
+  ReadYAMLPath(file.path, file.objects, &cache);
+}
+
+void ReadOnThreads(const std::vector<FileToRead>& files, DocumentCache& cache, TimerStat& timer) {
   TimerStat step(timer, "Read base, left and right");
   std::vector<std::unique_ptr<Thread>> readers;
   for (const FileToRead& file : files) {
     readers.push_back(std::make_unique<Thread>());
-    readers.back()->Start([&file, &cache] { ReadYAMLPath(file.path, file.objects, &cache); });
+    readers.back()->Start([&] { ReadFile(file, cache, step); });
   }
   for (const auto& reader : readers) reader->Join();
   for (const auto& reader : readers) reader->CheckForExceptions();
+}
+
+}  // namespace
+
+void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer) {
+  DocumentCache cache;
+  if (threads) {
+    ReadOnThreads(files, cache, timer);
+  } else {
+    for (const FileToRead& file : files) ReadFile(file, cache, timer);
+  }
+  // Not before: the order of the lines must not depend on which thread was faster.
+  for (const FileToRead& file : files) ReportSkippedKeys(file.path, file.objects);
 }
 
 }  // namespace vexel_yaml

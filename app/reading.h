@@ -16,7 +16,8 @@ struct FileToRead {
 };
 
 /// Reads the files, each on a thread of its own if `threads`. Where several fail, the first one's exception
-/// is thrown, after all have ended.
+/// is thrown, after all have ended. Keys that had to be left out are reported, a line each, on standard
+/// error.
 void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer);
 
 }  // namespace vexel_yaml

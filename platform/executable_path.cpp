@@ -1,5 +1,6 @@
 #include "platform/executable_path.h"
 
+#include <cstdint>
 #include <filesystem>
 #include <system_error>
 

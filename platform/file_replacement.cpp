@@ -5,9 +5,12 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstdio>
 #include <cstring>
 #include <filesystem>
 #include <system_error>
+
+#include "platform/temporary_files.h"
 
 namespace vexel_yaml {
 
@@ -35,11 +38,17 @@ std::string CreateBeside(const std::string& target) {
     const int file = open(path.c_str(), O_CREAT | O_EXCL | O_WRONLY | O_CLOEXEC, 0666);
     if (file >= 0) {
       close(file);
+      RememberTempFile(path);
       return path;
     }
     if (errno != EEXIST) break;
   }
   return {};
+}
+
+void CopyContent(std::ifstream& from, std::ostream& to) {
+  // Inserting an empty buffer counts as a failed insertion.
+  if (from.peek() != std::ifstream::traits_type::eof()) to << from.rdbuf();
 }
 
 }  // namespace
@@ -65,14 +74,19 @@ FileReplacement::FileReplacement(const std::string& path) : path_(path), target_
   stream_.open(beside_, std::ios::binary | std::ios::trunc);
   if (!stream_) {
     const int error_number = errno;
-    unlink(beside_.c_str());
+    RemoveBeside();
     throw FileError(path_, error_number);
   }
   if (exists) chmod(beside_.c_str(), status.st_mode & 07777);
 }
 
-FileReplacement::~FileReplacement() {
-  if (!beside_.empty()) unlink(beside_.c_str());
+FileReplacement::~FileReplacement() { RemoveBeside(); }
+
+void FileReplacement::RemoveBeside() {
+  if (beside_.empty()) return;
+  unlink(beside_.c_str());
+  ForgetTempFile(beside_);
+  beside_.clear();
 }
 
 void FileReplacement::OpenInPlace() {
@@ -80,22 +94,35 @@ void FileReplacement::OpenInPlace() {
   if (!stream_) throw FileError(path_, errno);
 }
 
-void FileReplacement::Commit() {
+void FileReplacement::Close() {
   errno = 0;
   stream_.close();
   // The stream remembers that an earlier write failed, but not why; a full disk is nearly always the reason.
   if (!stream_) throw FileError(path_, errno != 0 ? errno : ENOSPC);
+}
+
+void FileReplacement::Commit() {
+  Close();
   if (beside_.empty()) return;
-  if (std::rename(beside_.c_str(), target_.c_str()) != 0) throw FileError(path_, errno);
-  beside_.clear();
+  if (std::rename(beside_.c_str(), target_.c_str()) == 0) {
+    ForgetTempFile(beside_);
+    beside_.clear();
+    return;
+  }
+  // Somebody else's file in a shared folder, or a mount point, may be written but not replaced.
+  if (errno != EPERM && errno != EACCES && errno != EBUSY) throw FileError(path_, errno);
+  std::ifstream text(beside_, std::ios::binary);
+  OpenInPlace();
+  CopyContent(text, stream_);
+  Close();
 }
 
 void CopyFileContent(const std::string& source, const std::string& destination) {
-  FileReplacement replacement(destination);
   std::ifstream input(source, std::ios::binary);
+  // Before the destination is touched.
   if (!input) throw FileError(destination, errno);
-  // Inserting an empty buffer counts as a failed insertion.
-  if (input.peek() != std::ifstream::traits_type::eof()) replacement.Stream() << input.rdbuf();
+  FileReplacement replacement(destination);
+  CopyContent(input, replacement.Stream());
   replacement.Commit();
 }
 

@@ -45,4 +45,9 @@ std::string GetDataFilesDir() {
   return executable.substr(0, separator + 1);
 }
 
+std::string GetDataFilePath(const std::string& name) {
+  const std::string folder = GetDataFilesDir();
+  return folder.empty() ? std::string() : folder + name;
+}
+
 }  // namespace vexel_yaml

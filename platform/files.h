@@ -23,4 +23,8 @@ std::string GetUserHomeDir();
 /// default "mergerules.txt" and "mergespecfile.txt". Empty after an error, which has been reported.
 std::string GetDataFilesDir();
 
+/// The path of a data file of that name, empty where the folder is not known: a bare name would be looked for
+/// in the current folder, where a stranger's repository may have put one.
+std::string GetDataFilePath(const std::string& name);
+
 }  // namespace vexel_yaml

@@ -4,7 +4,7 @@
 
 namespace vexel_yaml {
 
-/// A lock that its holder may take again: freeing a pooled tree frees its children into the same pool.
+/// A lock that its holder may take again, so that code under a pool's lock may still use the pool.
 using Mutex = std::recursive_mutex;
 
 /// Holds a `Mutex` for its own lifetime.

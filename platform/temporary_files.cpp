@@ -2,53 +2,77 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <atomic>
 #include <csignal>
 #include <cstdlib>
-#include <cstring>
+
+#include "platform/mutex.h"
 
 namespace vexel_yaml {
 
 namespace {
 
-constexpr char kTemplate[] = "/tmp/MERGEXXXXXX";
-
 // Fixed storage, so that a signal handler can walk it: a person who interrupts a merge in a hurry would
-// otherwise leave copies of the scene in the temporary folder. A merge makes at most four files.
-constexpr size_t kCapacity = 8;
-std::array<std::array<char, sizeof(kTemplate)>, kCapacity> paths;
-std::atomic<size_t> path_count = 0;
+// otherwise leave copies of the scene in the temporary folder or, worse, in the working copy. A merge has at
+// most four temporary files and two that wait to take the place of others.
+struct Slot {
+  std::array<char, 4096> path;
+  std::atomic<bool> used = false;
+};
+
+std::array<Slot, 16> slots;
+Mutex slots_mutex;
 
 extern "C" void RemoveTempFilesAndDie(int signal_number) {
-  RemoveTempFiles();
+  for (Slot& slot : slots) {
+    if (slot.used) unlink(slot.path.data());
+  }
   std::signal(signal_number, SIG_DFL);
   raise(signal_number);
 }
 
-void HandleSignal(int signal_number) {
-  // A signal that the caller has switched off (nohup) stays off.
-  if (std::signal(signal_number, RemoveTempFilesAndDie) == SIG_IGN) std::signal(signal_number, SIG_IGN);
+void HandleSignals() {
+  for (const int signal_number : {SIGHUP, SIGINT, SIGTERM}) {
+    // A signal that the caller has switched off (nohup) stays off.
+    if (std::signal(signal_number, RemoveTempFilesAndDie) == SIG_IGN) std::signal(signal_number, SIG_IGN);
+  }
 }
 
 }  // namespace
 
+void RememberTempFile(const std::string& path) {
+  AutoLock lock(slots_mutex);
+  static const bool handled = (HandleSignals(), true);
+  Slot* slot = std::find_if(slots.begin(), slots.end(), [](const Slot& s) { return !s.used; });
+  if (!handled || slot == slots.end() || path.size() >= slot->path.size()) return;
+  *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';
+  slot->used = true;
+}
+
+void ForgetTempFile(const std::string& path) {
+  AutoLock lock(slots_mutex);
+  for (Slot& slot : slots) {
+    if (slot.used && path == slot.path.data()) slot.used = false;
+  }
+}
+
 std::string CreateTempFile() {
-  if (path_count == kCapacity) return {};
-  char path[sizeof(kTemplate)];
-  std::memcpy(path, kTemplate, sizeof(path));
-  const int file = mkstemp(path);
+  std::string path = "/tmp/MERGEXXXXXX";
+  const int file = mkstemp(path.data());
   if (file < 0) return {};
   close(file);
-  std::memcpy(paths[path_count].data(), path, sizeof(path));
-  if (path_count++ == 0) {
-    for (const int signal_number : {SIGHUP, SIGINT, SIGTERM}) HandleSignal(signal_number);
-  }
+  RememberTempFile(path);
   return path;
 }
 
 void RemoveTempFiles() {
-  for (size_t i = path_count.exchange(0); i > 0; --i) unlink(paths[i - 1].data());
+  AutoLock lock(slots_mutex);
+  for (Slot& slot : slots) {
+    if (slot.used) unlink(slot.path.data());
+    slot.used = false;
+  }
 }
 
 }  // namespace vexel_yaml

@@ -4,11 +4,19 @@
 
 namespace vexel_yaml {
 
-/// Makes a new, empty file in /tmp that only its owner may read (the name starts with "MERGE") and
-/// remembers it for `RemoveTempFiles`. Returns its path, empty on failure.
+/// Remembers a file that must not outlive the process: `RemoveTempFiles` removes it, and so does a signal
+/// that ends the process. Beyond a handful of files at once, or for a path that the system could not open
+/// anyway, it is not remembered. May be called from any thread, as the other functions here.
+void RememberTempFile(const std::string& path);
+
+/// Forgets it again: it has been removed or has become a file of the user's.
+void ForgetTempFile(const std::string& path);
+
+/// Makes a new, empty file in /tmp that only its owner may read (the name starts with "MERGE") and remembers
+/// it. Returns its path, empty on failure.
 std::string CreateTempFile();
 
-/// Removes every file that `CreateTempFile` has made and that is still remembered.
+/// Removes every file that is still remembered.
 void RemoveTempFiles();
 
 /// Calls `RemoveTempFiles` at the end of its scope, also when an exception passes.

@@ -179,7 +179,7 @@ void YAMLSequenceRemapper::AddComparisonFieldPath(FieldPath path, float relative
 }
 
 void SetupRules(const std::string& path) {
-  const std::string file = path == "auto" ? GetDataFilesDir() + "mergerules.txt" : path;
+  const std::string file = path == "auto" ? GetDataFilePath("mergerules.txt") : path;
   const std::string native = VexelToNativePath(file);
   std::error_code error;
   std::ifstream stream(native);

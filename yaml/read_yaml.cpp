@@ -35,18 +35,11 @@ std::string ReadWhole(std::ifstream& stream) {
   return text;
 }
 
-void ReportSkippedKeys(const std::string& path, const VexelObjects& objects) {
-  for (const VexelObjects::SkippedKey& key : objects.GetSkippedKeys()) {
-    WriteErrorLine("Skipping a key that is not a scalar in file '" + path + "', object " +
-                   key.file_id->GetText() + ", line " + std::to_string(key.line));
-  }
-}
-
 }  // namespace
 
 bool ParseYAMLFile(std::ifstream& stream, VexelObjects& objects, DocumentCache* cache) {
   std::string text = ReadWhole(stream);
-  if (stream.bad() || (stream.fail() && !stream.eof())) return false;
+  if (stream.fail()) return false;
   CheckHeader(text);
   return ParseYAMLString(std::move(text), objects, cache);
 }
@@ -67,7 +60,13 @@ void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache*
   } catch (const std::exception& error) {
     throw YAMLError(prefix + " caught unknown exception: " + error.what());
   }
-  ReportSkippedKeys(path, objects);
+}
+
+void ReportSkippedKeys(const std::string& path, const VexelObjects& objects) {
+  for (const VexelObjects::SkippedKey& key : objects.GetSkippedKeys()) {
+    WriteErrorLine("Skipping a key that is not a scalar in file '" + path + "', object " +
+                   key.file_id->GetText() + ", line " + std::to_string(key.line));
+  }
 }
 
 }  // namespace vexel_yaml

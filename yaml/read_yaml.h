@@ -8,7 +8,7 @@
 
 namespace vexel_yaml {
 
-/// Reads an asset file into `objects`, which should be empty. What was read before a failure stays there.
+/// Reads an asset file into `objects`, which should be empty and stays so after a failure.
 /// Returns false only when libyaml can't start (or the stream can't be read to its end). Throws YAMLError:
 /// "Cannot open file" (a folder counts), the 'Force text' message for a file that isn't one,
 /// "Error locating end of document sequence", or what libyaml finds wrong, with the 1-based line.
@@ -20,8 +20,10 @@ bool ParseYAMLFile(std::ifstream& stream, VexelObjects& objects, DocumentCache* 
 /// it.
 bool ParseYAMLString(std::string text, VexelObjects& objects, DocumentCache* cache = nullptr);
 
-/// `ParseYAMLFile` for the commands: every failure is a YAMLError "Error parsing file '<path>': <reason>",
-/// and keys that had to be left out are reported, a line each, on standard error.
+/// `ParseYAMLFile` for the commands: every failure is a YAMLError "Error parsing file '<path>': <reason>".
 void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache* cache = nullptr);
+
+/// Reports the keys of a file that had to be left out, a line each, on standard error.
+void ReportSkippedKeys(const std::string& path, const VexelObjects& objects);
 
 }  // namespace vexel_yaml

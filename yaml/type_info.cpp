@@ -88,6 +88,7 @@ YAMLTypeInfoManager& GetTypeInfoManager() {
 void SetupTypeInfo(const std::string& path) {
   VexelObjects objects;
   ReadYAMLPath(path, objects);
+  ReportSkippedKeys(path, objects);
   GetTypeInfoManager().Read(objects);
 }
 
