@@ -1,5 +1,5 @@
-#include <memory>
 #include <typeinfo>
+#include <unordered_map>
 #include <unordered_set>
 
 #include "diff/yaml_mapping_diff.h"
@@ -21,7 +21,7 @@ YAMLSequence& RequireSequence(YAMLNode* node) {
   return *sequence;
 }
 
-void FreeNode(YAMLNode* node) {
+void FreeOld(YAMLNode* node) {
   if (node != nullptr) node->Free();
 }
 
@@ -30,11 +30,11 @@ void FreeNode(YAMLNode* node) {
 void RemoveOperation::Apply(YAMLMapping& mapping, const YAMLScalar* key) const { mapping.Remove(key); }
 
 void RemoveOperation::Apply(YAMLSequence& sequence, int index) const {
-  FreeNode(sequence.Set(index, nullptr));
+  FreeOld(sequence.Set(index, nullptr));
 }
 
 void ChangeOperation::Apply(YAMLMapping& mapping, const YAMLScalar* key) const {
-  FreeNode(mapping.Change(key, GetValue()->Clone()));
+  FreeOld(mapping.Change(key, GetValue()->Clone()));
 }
 
 void ChangeOperation::Apply(YAMLSequence& sequence, int index) const {

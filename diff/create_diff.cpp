@@ -25,10 +25,6 @@ class PathStep {
   FieldPath& path_;
 };
 
-struct FreeNode {
-  void operator()(YAMLNode* node) const { node->Free(); }
-};
-
 bool IsMergeable(const FieldPath& path, const YAMLNode* node) {
   bool matched = false;
   return YAMLSequenceRemapper::IsMergeablePath(path, node, matched);
@@ -67,6 +63,8 @@ bool IsScriptReplaced(const FieldPath& path, const YAMLMappingDiff& diff) {
 }
 
 Operation* DiffMappings(FieldPath& path, const YAMLMapping& from, const YAMLMapping& to) {
+  // What can't be compared key by key is shown as a whole.
+  if (from.HasDuplicateKeys() || to.HasDuplicateKeys()) return YAMLAlloc<ChangeOperation>::create(&to);
   YAMLMappingDiff* diff = YAMLMappingDiff::Diff(path, from, to);
   // A nested mapping whose keys were only reordered counts as unchanged.
   if (diff->GetEntries().empty()) return nullptr;
@@ -102,8 +100,8 @@ bool HaveSameKeys(const YAMLMapping& from, const YAMLMapping& to) {
                     [](const YAMLMapping::Slot& a, const YAMLMapping::Slot& b) { return a.key == b.key; });
 }
 
-std::unique_ptr<YAMLSequence, FreeNode> KeySequence(const YAMLMapping& mapping) {
-  std::unique_ptr<YAMLSequence, FreeNode> keys(YAMLAlloc<YAMLSequence>::create(false));
+OwnedNodePtr<YAMLSequence> KeySequence(const YAMLMapping& mapping) {
+  OwnedNodePtr<YAMLSequence> keys(YAMLAlloc<YAMLSequence>::create(false));
   keys->Reserve(mapping.Size());
   for (const auto& [key, value] : mapping) keys->Append(key->AsValue());
   return keys;
@@ -126,8 +124,10 @@ Operation* CreateDiffOperation(FieldPath& path, const YAMLNode* from, const YAML
   if (from == to) return nullptr;
   if (to == nullptr) return YAMLAlloc<RemoveOperation>::create(IsMergeable(path, from));
   if (from == nullptr) return YAMLAlloc<AddOperation>::create(to, IsMergeable(path, to));
-  if (from->GetHash() == to->GetHash()) return nullptr;
+  // Before the hashes: an empty list and an empty mapping have the same one.
   if (from->GetKind() != to->GetKind()) return YAMLAlloc<ChangeOperation>::create(to);
+  // Scalars are compared as they are, which costs no more than their hashes.
+  if (from->GetHash() == to->GetHash() && from->AsScalar() == nullptr) return nullptr;
   switch (from->GetKind()) {
     case YAMLNode::Kind::kScalar:
       return DiffScalars(path, *from->AsScalar(), *to->AsScalar());

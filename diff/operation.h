@@ -1,5 +1,7 @@
 #pragma once
 
+#include <cstdint>
+
 #include "rules/yaml_sequence_remapper.h"
 #include "yaml/yaml_mapping.h"
 #include "yaml/yaml_sequence.h"
@@ -161,7 +163,7 @@ class ChangeSequenceOperation final : public Operation {
 /// cannot be matched.
 Operation* CreateDiffOperation(FieldPath& path, const YAMLNode* from, const YAMLNode* to);
 
-/// Whether two operations are deeply equal. Neither may be null.
+/// Whether two operations are deeply equal: they make the same of the same base. Neither may be null.
 bool OperationEquals(const Operation& a, const Operation& b);
 
 }  // namespace vexel_yaml

@@ -1,5 +1,3 @@
-#include <memory>
-
 #include "diff/yaml_diff_output.h"
 #include "diff/yaml_mapping_diff.h"
 #include "diff/yaml_sequence_diff.h"
@@ -8,22 +6,24 @@ namespace vexel_yaml {
 
 namespace {
 
-struct FreeNode {
-  void operator()(YAMLNode* node) const { node->Free(); }
-};
-
 // The text of an added value; an added object is shown without its pseudo keys.
 std::string AddedText(const YAMLNode& value) {
   const YAMLMapping* mapping = value.AsMapping();
-  if (mapping == nullptr || mapping->HasDuplicateKeys() ||
-      !mapping->HasKey(YAMLScalar::classIDPlaceHolderName)) {
-    return value.GetYAMLString();
+  if (mapping == nullptr) return value.GetYAMLString();
+  YAMLMapping shown(mapping->IsFlow());
+  bool is_object = false;
+  const auto show = [&](const YAMLMapping::Slot& slot) {
+    is_object |= slot.key == YAMLScalar::classIDPlaceHolderName;
+    if (!slot.key->IsPseudoKey()) shown.Append(slot.key, slot.value);
+  };
+  if (mapping->HasDuplicateKeys()) {
+    for (const YAMLMapping::Slot& slot : mapping->GetDuplicatePairs()) show(slot);
+  } else {
+    for (const YAMLMapping::Slot& slot : *mapping) show(slot);
   }
-  const std::unique_ptr<YAMLMapping, FreeNode> object(mapping->Clone());
-  object->Remove(YAMLScalar::classIDPlaceHolderName);
-  object->Remove(YAMLScalar::fileIDPlaceHolderName);
-  object->Remove(YAMLScalar::strippedPrefabPlaceHolderName);
-  return object->GetYAMLString();
+  std::string text = is_object ? shown.GetYAMLString() : value.GetYAMLString();
+  shown.ForgetPairs();
+  return text;
 }
 
 // Positions are those after the earlier deletions: a deleted element does not advance the position.

@@ -11,7 +11,8 @@ namespace vexel_yaml {
 namespace {
 
 bool AreEqual(const YAMLNode* a, const YAMLNode* b) {
-  return a == b || (a != nullptr && b != nullptr && a->Equals(b));
+  // In two long lists that were edited throughout, many pairs are compared: some have equal hashes by chance.
+  return a == b || (a != nullptr && b != nullptr && a->Equals(b) && a->HasSameContent(*b));
 }
 
 // Whether `node` has content but no hash, so that only a comparison can tell what it equals.
@@ -60,10 +61,13 @@ class UnusedElements {
  private:
   static constexpr uint32_t kNone = YAMLSequenceRemapper::kDropped;
 
-  // Equal elements are in one bucket. Without a hash are, apart from a rare text, empty slots, empty mappings
-  // and empty sequences: each kind has a bucket of its own, beyond all hashes.
+  // Equal elements are in one bucket: a scalar's is its own, since texts with one hash are easily made.
+  // Without a hash are empty slots, empty mappings and empty sequences: each kind has a bucket, beyond all
+  // hashes.
   uint64_t BucketOf(const YAMLNode* node) const {
     if (!by_hash_) return 0;
+    if (node != nullptr && node->AsScalar() != nullptr)
+      return (uint64_t{1} << 63) | reinterpret_cast<uintptr_t>(node);
     if (node == nullptr) return uint64_t{1} << 32;
     if (node->GetHash() != 0) return node->GetHash();
     return (uint64_t{2} << 32) + static_cast<uint64_t>(node->GetKind());

@@ -26,8 +26,6 @@ bool YAMLSequenceRemapper::IsIdentity() const {
   return true;
 }
 
-void YAMLSequenceRemapper::RemoveDestination(uint32_t index) { RemoveDestinations({index}); }
-
 void YAMLSequenceRemapper::RemoveDestinations(const std::vector<uint32_t>& ascending) {
   for (uint32_t& destination : mapping_) {
     if (destination == kDropped) continue;

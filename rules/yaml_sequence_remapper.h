@@ -65,11 +65,8 @@ class YAMLSequenceRemapper {
   bool IsSetRemapper() const { return is_set_; }
   bool IsIdentity() const;
 
-  /// Takes the destination position `index` out: the later ones move down by one. It must lie below the
+  /// Takes destination positions out, each named once; the later ones move down. Each must lie below the
   /// destination count, and no source element may be mapped to it.
-  void RemoveDestination(uint32_t index);
-
-  /// Takes several out, each named once, in one pass over the mapping. The same conditions.
   void RemoveDestinations(const std::vector<uint32_t>& ascending);
 
   /// Matches `base` with `changed`, both at field path `path`: by keys, or by equality where the rules want

@@ -13,10 +13,6 @@ namespace vexel_yaml {
 
 namespace {
 
-struct FreeNode {
-  void operator()(YAMLNode* node) const { node->Free(); }
-};
-
 std::string_view ScalarText(const yaml_node_t* node) {
   return {reinterpret_cast<const char*>(node->data.scalar.value), node->data.scalar.length};
 }
@@ -50,7 +46,7 @@ YAMLNode* DocumentConverter::YAMLDocNodeToScalar(const yaml_node_t* node) {
 }
 
 YAMLNode* DocumentConverter::YAMLDocNodeToMapping(const yaml_node_t* node) {
-  std::unique_ptr<YAMLMapping, FreeNode> mapping(
+  OwnedNodePtr<YAMLMapping> mapping(
       YAMLAlloc<YAMLMapping>::create(node->data.mapping.style == YAML_FLOW_MAPPING_STYLE));
   const yaml_node_pair_t* begin = node->data.mapping.pairs.start;
   const yaml_node_pair_t* end = node->data.mapping.pairs.top;
@@ -74,7 +70,7 @@ YAMLNode* DocumentConverter::YAMLDocNodeToMapping(const yaml_node_t* node) {
 }
 
 YAMLNode* DocumentConverter::YAMLDocNodeToSequence(const yaml_node_t* node) {
-  std::unique_ptr<YAMLSequence, FreeNode> sequence(
+  OwnedNodePtr<YAMLSequence> sequence(
       YAMLAlloc<YAMLSequence>::create(node->data.sequence.style == YAML_FLOW_SEQUENCE_STYLE));
   const yaml_node_item_t* begin = node->data.sequence.items.start;
   const yaml_node_item_t* end = node->data.sequence.items.top;

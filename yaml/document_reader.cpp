@@ -31,6 +31,7 @@ class LoadedDocument {
   bool Load(std::string_view chunk) {
     if (yaml_parser_initialize(&parser_) == 0) return false;
     parser_started_ = true;
+    chunk_ = chunk;
     yaml_parser_set_input_string(&parser_, reinterpret_cast<const unsigned char*>(chunk.data()),
                                  chunk.size());
     loaded_ = yaml_parser_load(&parser_, &document_) != 0;
@@ -44,9 +45,8 @@ class LoadedDocument {
     if (yaml_parser_parse(&parser_, &event) == 0) Fail();
     const yaml_event_type_t type = event.type;
     yaml_event_delete(&event);
-    if (type != (last ? YAML_STREAM_END_EVENT : YAML_DOCUMENT_START_EVENT)) {
-      throw YAMLError("Error locating end of document sequence");
-    }
+    if (type == (last ? YAML_STREAM_END_EVENT : YAML_DOCUMENT_START_EVENT)) return;
+    throw YAMLError("did not find expected <document start>");
   }
 
   yaml_document_t& Get() { return document_; }
@@ -67,10 +67,15 @@ class LoadedDocument {
 
  private:
   void Fail() {
-    problem_line_ = parser_.problem_mark.line;
+    // A byte that is no text is found before lines are counted.
+    problem_line_ =
+        parser_.error == YAML_READER_ERROR
+            ? static_cast<size_t>(std::ranges::count(chunk_.substr(0, parser_.problem_offset), '\n'))
+            : parser_.problem_mark.line;
     throw YAMLError(parser_.problem == nullptr ? "unknown problem" : parser_.problem);
   }
 
+  std::string_view chunk_;
   yaml_parser_t parser_ = {};
   yaml_document_t document_ = {};
   bool parser_started_ = false;
@@ -86,12 +91,24 @@ void AppendPseudoKey(YAMLMapping& object, const YAMLScalar* key, const YAMLScala
   object.SetHash(YAMLNode::Combine(hash, position));
 }
 
+// A file that holds one as a key of its own could not be told from what is read from the header line.
+void RefusePseudoKeys(const YAMLMapping& object) {
+  const auto refuse = [](const YAMLMapping::Slot& slot) {
+    if (slot.key->IsPseudoKey())
+      throw YAMLError("The object holds the reserved key '" + slot.key->GetText() + "'");
+  };
+  for (const YAMLMapping::Slot& slot : object.GetDuplicatePairs()) refuse(slot);
+  if (object.HasDuplicateKeys()) return;
+  for (const YAMLMapping::Slot& slot : object) refuse(slot);
+}
+
 void Convert(LoadedDocument& document, std::string_view chunk, bool stripped, ReadObject& result) {
   const yaml_node_t* root = document.GetRoot();
   if (root->type != YAML_MAPPING_NODE) throw YAMLError("The object is not a mapping");
   DocumentConverter converter(document.Get());
   result.object = converter.Convert(document.GetRoot())->AsMapping();
   result.holds_duplicate_keys = converter.FoundDuplicateKeys();
+  RefusePseudoKeys(*result.object);
   result.skipped_key_lines = converter.GetSkippedKeyLines();
 
   const size_t anchor = chunk.find('&');
@@ -111,9 +128,7 @@ void Convert(LoadedDocument& document, std::string_view chunk, bool stripped, Re
 bool DocumentReader::TakeStrippedMark() {
   constexpr std::string_view kStripped = "stripped";
   const size_t line_end = chunk_.find_first_of("\r\n", header_.size());
-  if (line_end == std::string::npos || line_end == header_.size()) {
-    throw YAMLError("Error locating end of document sequence");
-  }
+  if (line_end == std::string::npos) throw YAMLError("Error locating end of document sequence");
   if (line_end < kStripped.size()) return false;
   const size_t mark = line_end - kStripped.size();
   if (chunk_.compare(mark, kStripped.size(), kStripped) != 0) return false;

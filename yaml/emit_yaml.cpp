@@ -16,9 +16,10 @@ int StringOutputHandler(void* data, unsigned char* buffer, size_t size) {
   return 1;
 }
 
-int CheckedId(int id) {
-  if (id == 0) throw YAMLError("Cannot write a value that is not UTF-8");
-  return id;
+// libyaml's functions return 0 for a text that is not UTF-8 and for a document with too many nodes.
+int CheckedId(int result) {
+  if (result == 0) throw YAMLError("Cannot write a value that is not UTF-8, or an object that is too large");
+  return result;
 }
 
 // Holds libyaml's objects over exceptions.
@@ -79,7 +80,7 @@ int YAMLMapping::PopulateDocument(yaml_document_s* document) const {
   const auto append = [&](const Slot& slot) {
     const int key = slot.key->PopulateDocument(document);
     const int value = slot.value->PopulateDocument(document);
-    yaml_document_append_mapping_pair(document, id, key, value);
+    CheckedId(yaml_document_append_mapping_pair(document, id, key, value));
   };
   if (duplicates_) {
     for (const Slot& slot : *duplicates_) append(slot);
@@ -96,7 +97,7 @@ int YAMLSequence::PopulateDocument(yaml_document_s* document) const {
     // The engine's lists know no empty elements: a slot that no edit has filled is not part of the list.
     if (item == nullptr) continue;
     const int item_id = item->PopulateDocument(document);
-    yaml_document_append_sequence_item(document, id, item_id);
+    CheckedId(yaml_document_append_sequence_item(document, id, item_id));
   }
   return id;
 }

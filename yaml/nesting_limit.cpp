@@ -10,8 +10,7 @@ namespace vexel_yaml {
 namespace {
 
 // An upper bound of the nesting depth that costs one pass over the bytes: every flow collection has its
-// opening bracket, and a block collection starts at least one column further right than the one around it
-// ("- - -" may open several on one line), but for a list that stands level with its key.
+// opening bracket, and of block collections at most two start at one column, a list level with its key.
 bool IsSurelyShallow(std::string_view text) {
   size_t brackets = 0;
   size_t widest_indent = 0;
@@ -28,7 +27,7 @@ bool IsSurelyShallow(std::string_view text) {
       brackets += c == '[' || c == '{' ? 1 : 0;
     }
   }
-  return brackets + widest_indent + 2 < DocumentConverter::kDeepest;
+  return brackets + 2 * widest_indent + 2 < DocumentConverter::kDeepest;
 }
 
 class EventReader {

@@ -48,14 +48,14 @@ class VexelObjects final : public YAMLMapping {
 
   /// The two parts of it, for callers that write objects on several threads.
   void OutputHeader(std::ostream& out) const;
-  /// Throws YAMLError when the object is no mapping or libyaml refuses it. The pseudo keys are at its end
-  /// afterwards.
+  /// Throws YAMLError when the object is no mapping, repeats its own keys, has no class ID or file ID, or
+  /// libyaml refuses it. The pseudo keys are at its end afterwards.
   static void OutputObject(std::ostream& out, const Slot& slot);
 
   /// A deep copy of all objects, owned by the caller.
   VexelObjects* Clone() const override;
 
-  /// Objects of this class never come from a pool.
+  /// Only for objects that `Clone` or `new` made: none comes from a pool.
   void Free() override { delete this; }
 
  private:

@@ -8,7 +8,14 @@
 
 #include "platform/mutex.h"
 
-#if defined(__SANITIZE_ADDRESS__)
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define VEXEL_POISONS_FREED_STORAGE
+#endif
+#elif defined(__SANITIZE_ADDRESS__)
+#define VEXEL_POISONS_FREED_STORAGE
+#endif
+#ifdef VEXEL_POISONS_FREED_STORAGE
 #include <sanitizer/asan_interface.h>
 #define VEXEL_POISON(address, size) ASAN_POISON_MEMORY_REGION(address, size)
 #define VEXEL_UNPOISON(address, size) ASAN_UNPOISON_MEMORY_REGION(address, size)

@@ -155,10 +155,15 @@ YAMLMapping::Iterator YAMLMapping::end() const {
 }
 
 void YAMLMapping::Reorder(const std::vector<const YAMLScalar*>& order) {
+  RefuseDuplicates();
   std::vector<Slot> reordered;
   reordered.reserve(order.size());
+  std::vector<bool> placed(slots_.size(), false);
   for (const YAMLScalar* key : order) {
-    if (YAMLNode* value = Find(key)) reordered.push_back({key, value});
+    const size_t slot = FindSlot(key);
+    if (slot == kNotFound || placed[slot]) continue;
+    placed[slot] = true;
+    reordered.push_back(slots_[slot]);
   }
   if (reordered.size() != Size()) throw YAMLError("Unmapped key when trying to reorder mapping keys");
   slots_ = std::move(reordered);
@@ -202,6 +207,13 @@ void YAMLMapping::CloneInto(YAMLMapping& target) const {
   for (const Slot& slot : *this) target.AddSlot(slot.key, slot.value->Clone());
 }
 
+void YAMLMapping::ForgetPairs() {
+  slots_.clear();
+  gaps_ = 0;
+  index_.reset();
+  duplicates_.reset();
+}
+
 const std::vector<YAMLMapping::Slot>& YAMLMapping::GetDuplicatePairs() const {
   static const std::vector<Slot> none;
   return duplicates_ ? *duplicates_ : none;
@@ -222,7 +234,9 @@ bool YAMLMapping::Equals(const YAMLNode* other) const {
 
 bool YAMLMapping::EqualsExpensive(const YAMLNode* other) const {
   const YAMLMapping* mapping = other == nullptr ? nullptr : other->AsMapping();
-  if (mapping == nullptr || mapping->Size() != Size()) return false;
+  if (mapping == nullptr) return false;
+  if (duplicates_ || mapping->duplicates_) return HasSameContent(*mapping);
+  if (mapping->Size() != Size()) return false;
   // Only the keys are compared: with interned keys this mapping's own values would be compared with
   // themselves, and values are the business of the hash.
   Iterator other_slot = mapping->begin();

@@ -95,7 +95,7 @@ class YAMLMapping : public YAMLNode {
   const YAMLNode* First() const { return (*begin()).value; }
   YAMLNode* First() { return (*begin()).value; }
 
-  /// Puts the keys into the order of `order`, whose unknown keys are skipped.
+  /// Puts the keys into the order of `order`, whose unknown and repeated keys are skipped.
   /// Throws "Unmapped key when trying to reorder mapping keys" when `order` lacks one, and changes nothing.
   void Reorder(const std::vector<const YAMLScalar*>& order);
 
@@ -104,6 +104,9 @@ class YAMLMapping : public YAMLNode {
 
   /// Frees every value. Duplicate-key mode stays.
   void Clear();
+
+  /// Empties the mapping without freeing any value: for one that only showed values of others.
+  void ForgetPairs();
 
   /// Makes `target`, which must hold no pair, a deep copy of this mapping's keyed view: a mapping with
   /// duplicate keys copies as an empty one with the same hash.

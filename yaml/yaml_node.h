@@ -2,6 +2,7 @@
 
 #include <atomic>
 #include <cstdint>
+#include <memory>
 #include <string>
 
 struct yaml_document_s;
@@ -41,6 +42,10 @@ class YAMLNode {
   /// Whether both nodes have the same content, decided by the structural hashes where both are computed
   /// (not 0), else by `EqualsExpensive`.
   virtual bool Equals(const YAMLNode* other) const = 0;
+
+  /// Whether both nodes are equal to the last scalar, whatever their hashes say: of many pairs with equal
+  /// hashes some are not equal. Keys and elements must be in the same order; styles don't count.
+  bool HasSameContent(const YAMLNode& other) const;
 
   /// Equality without hashes. Two mappings count as equal when their ordered key lists are.
   virtual bool EqualsExpensive(const YAMLNode* other) const = 0;
@@ -93,5 +98,12 @@ class YAMLNode {
   mutable std::atomic<uint32_t> line_ = 0;
   Kind kind_;
 };
+
+/// Owns a node outside the trees.
+struct FreeNode {
+  void operator()(YAMLNode* node) const { node->Free(); }
+};
+template <typename Node>
+using OwnedNodePtr = std::unique_ptr<Node, FreeNode>;
 
 }  // namespace vexel_yaml

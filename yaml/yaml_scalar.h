@@ -30,6 +30,12 @@ class YAMLScalar final : public YAMLNode {
   int32_t GetIntValue() const;
   float GetFloatValue() const;
 
+  /// Whether this is a key that stands for a part of an object's header line.
+  bool IsPseudoKey() const {
+    return this == fileIDPlaceHolderName || this == classIDPlaceHolderName ||
+           this == strippedPrefabPlaceHolderName;
+  }
+
   /// This scalar as a value in a tree. Dropping the const is safe: no operation of a node changes a scalar.
   YAMLNode* AsValue() const { return const_cast<YAMLScalar*>(this); }
 

@@ -33,7 +33,8 @@ TEST(MergeRules, ErrorsNameTheLineOfTheFile) {
       {"[premerge]\nblank", action + "2\n"},
   };
   for (const auto& [text, message] : cases) {
-    EXPECT_THAT([&rules_text = text] { const ScopedRules rules(rules_text); }, testing::ThrowsMessage<std::runtime_error>(message));
+    EXPECT_THAT([&rules_text = text] { const ScopedRules rules(rules_text); },
+                testing::ThrowsMessage<std::runtime_error>(message));
   }
 }
 

@@ -8,10 +8,7 @@
 
 namespace vexel_yaml {
 
-struct FreeNode {
-  void operator()(YAMLNode* node) const { node->Free(); }
-};
-using OwnedNode = std::unique_ptr<YAMLNode, FreeNode>;
+using OwnedNode = OwnedNodePtr<YAMLNode>;
 
 /// The objects of an asset file, given without its two directives. Throws YAMLError.
 std::unique_ptr<VexelObjects> ObjectsFromText(std::string_view documents);
