@@ -1,6 +1,11 @@
 #include "fixups/component_dependencies.h"
 
 #include <algorithm>
+#include <map>
+#include <set>
+#include <tuple>
+#include <unordered_map>
+#include <utility>
 
 #include "fixups/game_object_components.h"
 
@@ -11,60 +16,66 @@ namespace {
 // Type information comes from a file and may hold a loop of bases.
 constexpr int kMostBases = 64;
 
-// The type's own ID and those of its bases.
-std::vector<const YAMLScalar*> Lineage(const YAMLTypeInfo& type) {
-  std::vector<const YAMLScalar*> lineage = {type.persistent_type_id};
-  const YAMLTypeInfo* current = &type;
-  for (int step = 0; step < kMostBases; ++step) {
-    lineage.push_back(current->base_persistent_type_id);
-    current = GetTypeInfoManager().GetTypeInfo(current->base_persistent_type_id);
-    if (current == nullptr) break;
+// What the types of a scene have to do with one another, found out once for each type or pair of types.
+class TypeRelations {
+ public:
+  bool IsOrDerivesFrom(const Component& component, const YAMLScalar* type) {
+    return component.type != nullptr && std::ranges::count(LineageOf(*component.type), type) != 0;
   }
-  return lineage;
-}
 
-bool IsOrDerivesFrom(const Component& component, const YAMLScalar* type) {
-  if (component.type == nullptr) return false;
-  const std::vector<const YAMLScalar*> lineage = Lineage(*component.type);
-  return std::find(lineage.begin(), lineage.end(), type) != lineage.end();
-}
+  const Component* FindOfType(const ComponentList& components, const YAMLScalar* type) {
+    const auto found = std::ranges::find_if(
+        components, [&](const Component& component) { return IsOrDerivesFrom(component, type); });
+    return found == components.end() ? nullptr : &*found;
+  }
 
-const Component* FindOfType(const ComponentList& components, const YAMLScalar* type) {
-  const auto found = std::find_if(components.begin(), components.end(), [&](const Component& component) {
-    return IsOrDerivesFrom(component, type);
-  });
-  return found == components.end() ? nullptr : &*found;
-}
+  bool CanStandTogether(const YAMLTypeInfo& a, const YAMLTypeInfo& b) {
+    const auto [known, is_new] = can_stand_together_.try_emplace({&a, &b}, true);
+    if (!is_new) return known->second;
+    const bool doubled = a.persistent_type_id == b.persistent_type_id && !a.is_multi_instance;
+    return known->second = !doubled && !Excludes(a, b) && !Excludes(b, a);
+  }
+
+ private:
+  // The type's own ID and those of its bases.
+  const std::vector<const YAMLScalar*>& LineageOf(const YAMLTypeInfo& type) {
+    std::vector<const YAMLScalar*>& lineage = lineages_[&type];
+    if (!lineage.empty()) return lineage;
+    lineage.push_back(type.persistent_type_id);
+    const YAMLTypeInfo* current = &type;
+    for (int step = 0; step < kMostBases && current != nullptr; ++step) {
+      lineage.push_back(current->base_persistent_type_id);
+      current = GetTypeInfoManager().GetTypeInfo(current->base_persistent_type_id);
+    }
+    return lineage;
+  }
+
+  // Whether a type of `a`'s lineage names one of `b`'s as one it can't stand beside.
+  bool Excludes(const YAMLTypeInfo& a, const YAMLTypeInfo& b) {
+    const std::vector<const YAMLScalar*> others = LineageOf(b);
+    return std::ranges::any_of(LineageOf(a), [&](const YAMLScalar* id) {
+      const YAMLTypeInfo* type = GetTypeInfoManager().GetTypeInfo(id);
+      return type != nullptr && std::ranges::any_of(others, [&](const YAMLScalar* other) {
+               return type->conflicts_types.contains(other);
+             });
+    });
+  }
+
+  std::unordered_map<const YAMLTypeInfo*, std::vector<const YAMLScalar*>> lineages_;
+  std::map<std::pair<const YAMLTypeInfo*, const YAMLTypeInfo*>, bool> can_stand_together_;
+};
 
 bool Holds(const ComponentList& components, const YAMLScalar* file_id) {
   return std::any_of(components.begin(), components.end(),
                      [&](const Component& component) { return component.file_id == file_id; });
 }
 
-// Whether a type of `a`'s lineage names one of `b`'s as one it can't stand beside.
-bool Excludes(const YAMLTypeInfo& a, const YAMLTypeInfo& b) {
-  const std::vector<const YAMLScalar*> others = Lineage(b);
-  for (const YAMLScalar* id : Lineage(a)) {
-    const YAMLTypeInfo* type = GetTypeInfoManager().GetTypeInfo(id);
-    if (type == nullptr) continue;
-    for (const YAMLScalar* other : others) {
-      if (type->conflicts_types.contains(other)) return true;
-    }
-  }
-  return false;
-}
-
-bool CannotStandTogether(const YAMLTypeInfo& a, const YAMLTypeInfo& b) {
-  if (a.persistent_type_id == b.persistent_type_id && !a.is_multi_instance) return true;
-  return Excludes(a, b) || Excludes(b, a);
-}
-
 // Compares the component lists of one game object in the merged, left and right file.
 class DependencyCheck {
  public:
   DependencyCheck(const ComponentList& merged, const ComponentList& left, const ComponentList& right,
-                  std::vector<ComponentDependencyConflict>& conflicts)
-      : merged_(merged), left_(left), right_(right), conflicts_(conflicts) {}
+                  TypeRelations& types, std::vector<ComponentDependencyConflict>& conflicts)
+      : merged_(merged), left_(left), right_(right), types_(types), conflicts_(conflicts) {}
 
   void Run() {
     for (size_t i = 0; i < merged_.size(); ++i) {
@@ -79,9 +90,9 @@ class DependencyCheck {
  private:
   // A required component that one side had and the other removed.
   void CheckRequired(const YAMLScalar* type) {
-    if (FindOfType(merged_, type) != nullptr) return;
-    const Component* in_left = FindOfType(left_, type);
-    const Component* in_right = FindOfType(right_, type);
+    if (types_.FindOfType(merged_, type) != nullptr) return;
+    const Component* in_left = types_.FindOfType(left_, type);
+    const Component* in_right = types_.FindOfType(right_, type);
     if (in_left != nullptr && in_right == nullptr) {
       conflicts_.push_back({YAMLScalar::null, in_left->file_id, 1, ConflictType::kRightRemoves});
     } else if (in_left == nullptr && in_right != nullptr) {
@@ -91,7 +102,7 @@ class DependencyCheck {
 
   // Two components that only the merge brought together.
   void CheckPair(const Component& a, const Component& b) {
-    if (!CannotStandTogether(*a.type, *b.type)) return;
+    if (types_.CanStandTogether(*a.type, *b.type)) return;
     if (Holds(left_, a.file_id) && Holds(left_, b.file_id)) return;
     if (Holds(right_, a.file_id) && Holds(right_, b.file_id)) return;
     if (Holds(right_, b.file_id)) {
@@ -104,6 +115,7 @@ class DependencyCheck {
   const ComponentList& merged_;
   const ComponentList& left_;
   const ComponentList& right_;
+  TypeRelations& types_;
   std::vector<ComponentDependencyConflict>& conflicts_;
 };
 
@@ -117,12 +129,14 @@ void CheckDangling(const YAMLScalar* game_object, const YAMLMapping& left, const
   }
 }
 
-void RemoveRepeated(std::vector<ComponentDependencyConflict>& conflicts) {
+std::vector<ComponentDependencyConflict> WithoutRepeats(
+    const std::vector<ComponentDependencyConflict>& conflicts) {
+  std::set<std::tuple<const YAMLScalar*, const YAMLScalar*, ConflictType>> seen;
   std::vector<ComponentDependencyConflict> unique;
   for (const ComponentDependencyConflict& conflict : conflicts) {
-    if (std::find(unique.begin(), unique.end(), conflict) == unique.end()) unique.push_back(conflict);
+    if (seen.emplace(conflict.first, conflict.second, conflict.type).second) unique.push_back(conflict);
   }
-  conflicts = std::move(unique);
+  return unique;
 }
 
 }  // namespace
@@ -136,13 +150,13 @@ std::vector<ComponentDependencyConflict> FindComponentDependencyConflicts(const 
 
   const GameObjectComponents in_left = CollectGameObjectComponents(left);
   const GameObjectComponents in_right = CollectGameObjectComponents(right);
+  TypeRelations types;
   for (const YAMLScalar* game_object : in_merged.game_objects) {
     DependencyCheck(in_merged.GetComponents(game_object), in_left.GetComponents(game_object),
-                    in_right.GetComponents(game_object), conflicts)
+                    in_right.GetComponents(game_object), types, conflicts)
         .Run();
   }
-  RemoveRepeated(conflicts);
-  return conflicts;
+  return WithoutRepeats(conflicts);
 }
 
 }  // namespace vexel_yaml

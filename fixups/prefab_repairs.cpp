@@ -21,10 +21,6 @@ class PostProcessVisitor final : public YAMLNodeVisitor {
   void Visit(const YAMLScalar& /*scalar*/) override {}
 
   void Visit(YAMLMapping& mapping) override {
-    if (mapping.HasDuplicateKeys()) {
-      for (const auto& [key, value] : mapping.GetDuplicatePairs()) VisitAt(key, value);
-      return;
-    }
     const bool is_prefab_reference = key_ == YAMLScalar::mPrefabInternal;
     for (const auto& [key, value] : mapping) {
       if (is_prefab_reference && key == YAMLScalar::fileID && value->AsScalar() != nullptr) {
@@ -41,6 +37,8 @@ class PostProcessVisitor final : public YAMLNodeVisitor {
       if (item != nullptr) VisitAt(nullptr, item);
     }
   }
+
+  void VisitObject(YAMLNode& object) { VisitAt(nullptr, &object); }
 
   // Whether a reference was cleared since the last question.
   bool TakeCleared() { return std::exchange(cleared_, false); }
@@ -88,7 +86,7 @@ void ClearDanglingPrefabReferences(YAMLMapping& merged) {
   std::vector<const YAMLScalar*> removed;
   PostProcessVisitor visitor(merged);
   for (const auto& [file_id, value] : merged) {
-    value->Accept(visitor);
+    visitor.VisitObject(*value);
     if (!visitor.TakeCleared()) continue;
     YAMLMapping* object = value->AsMapping();
     if (object != nullptr && GetTransformBody(*object) != nullptr &&

@@ -10,7 +10,7 @@ namespace vexel_yaml {
 
 namespace {
 
-// A hierarchy as deep as this is taken for a loop.
+// A transform with more parents above it than this is taken to be in a loop.
 constexpr int kDeepestHierarchy = 100;
 
 bool IsInCycle(const TransformParents& parents, const YAMLScalar* transform) {

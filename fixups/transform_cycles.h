@@ -5,8 +5,8 @@
 
 namespace vexel_yaml {
 
-/// Reports and breaks every loop of transform parents: first at the transforms whose parent both sides
-/// changed, as the resolver collected them, then at any other transform, in file order. Throws
+/// Reports and breaks every loop of transform parents: first at the transforms that the resolver
+/// collected, then at any other transform, in file order. Throws
 /// std::runtime_error where a collected transform is not in the file or a walk up from it meets a transform
 /// without a recorded parent.
 void BreakTransformCycles(YAMLMapping& merged, TransformParents& parents, ConflictResolver& resolver);

@@ -12,8 +12,6 @@ struct ComponentDependencyConflict {
   const YAMLScalar* second;
   int count;
   ConflictType type;
-
-  bool operator==(const ComponentDependencyConflict&) const = default;
 };
 
 }  // namespace vexel_yaml

@@ -41,6 +41,7 @@ class ConflictResolver {
   /// Returns whether the conflict is pending, that is, not settled by the user.
   virtual bool OnComponentDependencyConflict(const ComponentDependencyConflict& conflict) = 0;
 
+  /// Descends to `key`. Notes the object whose transform's parent is being merged.
   void PushPath(const YAMLScalar* key);
 
   /// Throws YAMLError "Tried to pop on empty ConflictResolver path".
@@ -51,7 +52,7 @@ class ConflictResolver {
   /// Replaces the path and returns the old one.
   FieldPath ExchangePath(FieldPath path);
 
-  /// File IDs of the objects whose transform's parent was merged from both sides.
+  /// File IDs of the objects whose transform both sides edited, one of them at least its parent.
   const std::set<const YAMLScalar*, ScalarTextLess>& GetMergedTransforms() const {
     return merged_transforms_;
   }

@@ -4,7 +4,7 @@
 
 namespace vexel_yaml {
 
-/// How a place is resolved. The numbers are fixed: the command line and the rules use them.
+/// How a place is resolved. The numbers are fixed: the command line uses them.
 enum class MergeResolve {
   kBase = 1,
   kLeft = 2,       // "theirs"

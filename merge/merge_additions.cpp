@@ -10,8 +10,7 @@ namespace {
 
 // An object without its file ID or class could not be written; while the conflict is pending, left's stand.
 void RestorePseudoKeys(const YAMLMapping& left, YAMLMapping& merged) {
-  for (const YAMLScalar* key : {YAMLScalar::fileIDPlaceHolderName, YAMLScalar::classIDPlaceHolderName,
-                                YAMLScalar::strippedPrefabPlaceHolderName}) {
+  for (const YAMLScalar* key : {YAMLScalar::fileIDPlaceHolderName, YAMLScalar::classIDPlaceHolderName}) {
     const YAMLNode* value = left.Get(key);
     if (value != nullptr && !merged.HasKey(key)) merged.Insert(key, value->Clone());
   }
@@ -52,7 +51,6 @@ const AddOperation* MergeAddedValues(const AddOperation& left, const AddOperatio
   YAMLNode* merged = left_value.AsMapping() != nullptr
                          ? MergeAddedMappings(*left_value.AsMapping(), *right_value.AsMapping(), resolver)
                          : MergeAddedSequences(*left_value.AsSequence(), *right_value.AsSequence(), resolver);
-  merged->RebuildHash(false);
   return YAMLAlloc<AddOperation>::create(merged, left.IsMergeable());
 }
 

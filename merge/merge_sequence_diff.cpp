@@ -1,3 +1,5 @@
+#include <unordered_set>
+
 #include "diff/merge_tree_visitor.h"
 #include "merge/conflict_resolver.h"
 #include "yaml/yaml_alloc.h"
@@ -83,7 +85,17 @@ class SequenceMerge {
   }
 
   YAMLSequenceDiff* MergeDiffs(std::set<int>& dropped) {
-    return YAMLSequenceDiff::Merge(*left_diff_, *right_diff_, dropped, resolver_);
+    if (settled_.empty()) return YAMLSequenceDiff::Merge(*left_diff_, *right_diff_, dropped, resolver_);
+    // What a pair was settled to is decided. Asked again, as an addition of left's alone, the user's choice
+    // of right's would refuse it, and the element would be gone from both sides.
+    YAMLSequenceDiff open;
+    YAMLSequenceDiff decided;
+    for (const auto& [index, operation] : left_diff_->GetEntries()) {
+      (settled_.contains(operation) ? decided : open).Add(index, operation);
+    }
+    YAMLSequenceDiff* merged = YAMLSequenceDiff::Merge(open, *right_diff_, dropped, resolver_);
+    for (const auto& [index, operation] : decided.GetEntries()) merged->Add(index, operation);
+    return merged;
   }
 
  private:
@@ -113,7 +125,18 @@ class SequenceMerge {
   const YAMLSequenceRemapper* left_remapper_;
   const YAMLSequenceRemapper* right_remapper_;
   ConflictResolver& resolver_;
+  // What pairs of additions were merged to.
+  std::unordered_set<const Operation*> settled_;
 };
+
+// Whether both sides made the same edit of a list. Elements that are told apart by keys of a rule's own are
+// paired instead, one by one, so that each gets its record.
+bool IsSameEdit(const ChangeSequenceOperation& left, const ChangeSequenceOperation& right,
+                const std::vector<FieldPath>& key_paths) {
+  const bool by_rule = left.GetRemapper()->IsSetRemapper() && right.GetRemapper()->IsSetRemapper() &&
+                       key_paths != YAMLSequenceRemapper::defaultPath;
+  return !by_rule && !left.GetDiff()->GetEntries().empty() && OperationEquals(left, right);
+}
 
 // "No operation" leaves a place as it is in base: a base element stays, but the slot of an addition that was
 // not taken goes, and what stands behind it moves down.
@@ -158,10 +181,7 @@ const ChangeSequenceOperation* ChangeSequenceOperation::Merge(const ChangeSequen
   SequenceMerge merge(left, right, resolver);
   if (left.remapper_ != nullptr && right.remapper_ != nullptr) {
     const std::vector<FieldPath>& key_paths = YAMLSequenceRemapper::ChooseKeyPaths(resolver.GetPath());
-    if (key_paths == YAMLSequenceRemapper::defaultPath && !left.diff_->GetEntries().empty() &&
-        !right.diff_->GetEntries().empty() && OperationEquals(left, right)) {
-      return &left;
-    }
+    if (IsSameEdit(left, right, key_paths)) return &left;
     if (left.remapper_->IsSetRemapper()) merge.PairAdditions(key_paths);
   }
   YAMLSequenceRemapper* remapper = merge.Align(drop_if_removed_on_either_side);

@@ -19,6 +19,16 @@ bool SequenceDiffsEqual(const YAMLSequenceDiff& a, const YAMLSequenceDiff& b) {
                     });
 }
 
+// Two removals or two moves have nothing but the layout to tell them apart.
+bool LayoutsEqual(const YAMLSequenceRemapper* a, const YAMLSequenceRemapper* b) {
+  if (a == nullptr || b == nullptr) return a == b;
+  return a->GetDestinationCount() == b->GetDestinationCount() && a->GetMapping() == b->GetMapping();
+}
+
+bool ChangeSequencesEqual(const ChangeSequenceOperation& a, const ChangeSequenceOperation& b) {
+  return LayoutsEqual(a.GetRemapper(), b.GetRemapper()) && SequenceDiffsEqual(*a.GetDiff(), *b.GetDiff());
+}
+
 bool MappingDiffsEqual(const YAMLMappingDiff& a, const YAMLMappingDiff& b) {
   const auto entries_equal = [](const YAMLMappingDiff::Entry& x, const YAMLMappingDiff::Entry& y) {
     return x.key == y.key && x.index == y.index && OperationEquals(*x.operation, *y.operation);
@@ -47,8 +57,8 @@ bool OperationEquals(const Operation& a, const Operation& b) {
       return MappingDiffsEqual(*static_cast<const ChangeMappingOperation&>(a).GetDiff(),
                                *static_cast<const ChangeMappingOperation&>(b).GetDiff());
     case Operation::Kind::kChangeSequence:
-      return SequenceDiffsEqual(*static_cast<const ChangeSequenceOperation&>(a).GetDiff(),
-                                *static_cast<const ChangeSequenceOperation&>(b).GetDiff());
+      return ChangeSequencesEqual(static_cast<const ChangeSequenceOperation&>(a),
+                                  static_cast<const ChangeSequenceOperation&>(b));
   }
   return false;
 }

@@ -25,23 +25,42 @@ bool RecordingConflictResolver::HasPendingConflicts() const {
                      [](const Record& record) { return record.resolution == MergeResolve::kConflict; });
 }
 
-MergeResolve RecordingConflictResolver::FindResolution(const FieldPath& path) const {
-  for (const RecordResolve& resolve : resolutions_) {
-    if (MatchesPattern(resolve.pattern, path)) return resolve.resolution;
+void RecordingConflictResolver::SetResolveMethodForPaths(std::vector<RecordResolve> resolutions) {
+  resolutions_ = std::move(resolutions);
+  resolutions_by_first_.clear();
+  for (size_t i = 0; i < resolutions_.size(); ++i) {
+    resolutions_by_first_[resolutions_[i].pattern.front()].push_back(i);
   }
-  return MergeResolve::kAutomatic;
 }
 
-void RecordingConflictResolver::AddRecord(ConflictType type, MergeResolve resolution, const Operation* left,
-                                          const Operation* right) {
-  records_.push_back({GetPath(), type, resolution, left, right});
+size_t RecordingConflictResolver::FindResolution(const YAMLScalar* first, const FieldPath& path) const {
+  const auto found = resolutions_by_first_.find(first);
+  if (found == resolutions_by_first_.end()) return resolutions_.size();
+  const auto match = std::ranges::find_if(
+      found->second, [&](size_t i) { return MatchesPattern(resolutions_[i].pattern, path); });
+  return match == found->second.end() ? resolutions_.size() : *match;
+}
+
+MergeResolve RecordingConflictResolver::FindResolution(const FieldPath& path) const {
+  if (resolutions_.empty()) return MergeResolve::kAutomatic;
+  const size_t first = std::min(FindResolution(path.front(), path), FindResolution(YAMLScalar::star, path));
+  return first == resolutions_.size() ? MergeResolve::kAutomatic : resolutions_[first].resolution;
+}
+
+RecordingConflictResolver::Record& RecordingConflictResolver::AddRecord(FieldPath path, ConflictType type,
+                                                                        MergeResolve resolution,
+                                                                        const Operation* left,
+                                                                        const Operation* right) {
+  if (path.size() == 1) object_records_.emplace(path.front(), records_.size());
+  records_.push_back({std::move(path), type, resolution, left, right});
+  return records_.back();
 }
 
 template <typename T>
 const Operation* RecordingConflictResolver::SingleSideResolve(const T* operation, ConflictType type) {
   const bool from_left = IsLeftType(type);
   const MergeResolve resolution = FindResolution(GetPath());
-  AddRecord(type, resolution, from_left ? operation : nullptr, from_left ? nullptr : operation);
+  AddRecord(GetPath(), type, resolution, from_left ? operation : nullptr, from_left ? nullptr : operation);
   switch (resolution) {
     case MergeResolve::kBase:
     case MergeResolve::kConflict:
@@ -93,7 +112,7 @@ const Operation* RecordingConflictResolver::ProvisionalResult(const Operation* l
     case MergeResolve::kRight:
       return right;
     case MergeResolve::kBlank:
-      return Blanked(blank_source);
+      return GetPath().back()->IsPseudoKey() ? blank_source : Blanked(blank_source);
     case MergeResolve::kBase:
     case MergeResolve::kAutomatic:
     case MergeResolve::kConflict:
@@ -118,7 +137,7 @@ const Operation* RecordingConflictResolver::TwoSidedResolve(ConflictType type, c
     if (result == nullptr) resolution = MergeResolve::kConflict;
   }
   if (resolution == MergeResolve::kConflict) result = ProvisionalResult(left, right, blank_source);
-  AddRecord(type, resolution, left, right);
+  AddRecord(GetPath(), type, resolution, left, right);
   return result;
 }
 
@@ -185,26 +204,22 @@ void RecordingConflictResolver::OnTransformCycleDetected(const YAMLScalar* objec
   const FieldPath path = {object, body, YAMLScalar::mFather};
   MergeResolve resolution = FindResolution(path);
   if (resolution == MergeResolve::kAutomatic) resolution = MergeResolve::kConflict;
-  records_.push_back({path, ConflictType::kTransformCycle, resolution, nullptr, nullptr});
+  AddRecord(path, ConflictType::kTransformCycle, resolution, nullptr, nullptr);
 }
 
 bool RecordingConflictResolver::OnComponentDependencyConflict(const ComponentDependencyConflict& conflict) {
   const YAMLScalar* object = conflict.first != YAMLScalar::null ? conflict.first : conflict.second;
-  const FieldPath path = {object};
-  auto record =
-      std::find_if(records_.begin(), records_.end(), [&](const Record& r) { return r.path == path; });
-  if (record == records_.end()) {
-    records_.push_back({path, conflict.type, MergeResolve::kAutomatic, nullptr, nullptr});
-    record = records_.end() - 1;
-    record->resolution = FindResolution(path);
-  }
+  const auto found = object_records_.find(object);
+  Record& record = found != object_records_.end()
+                       ? records_[found->second]
+                       : AddRecord({object}, conflict.type, FindResolution({object}), nullptr, nullptr);
   const bool settled =
-      record->resolution != MergeResolve::kAutomatic && record->resolution != MergeResolve::kConflict;
-  if (!settled) record->resolution = MergeResolve::kConflict;
+      record.resolution != MergeResolve::kAutomatic && record.resolution != MergeResolve::kConflict;
+  if (!settled) record.resolution = MergeResolve::kConflict;
   if (conflict.type == ConflictType::kRightRemoves) {
-    record->right = YAMLAlloc<RemoveOperation>::create(true);
+    record.right = YAMLAlloc<RemoveOperation>::create(true);
   } else if (conflict.type == ConflictType::kLeftRemoves) {
-    record->left = YAMLAlloc<RemoveOperation>::create(true);
+    record.left = YAMLAlloc<RemoveOperation>::create(true);
   }
   return !settled;
 }

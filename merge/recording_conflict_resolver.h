@@ -1,5 +1,7 @@
 #pragma once
 
+#include <unordered_map>
+#include <utility>
 #include <vector>
 
 #include "merge/conflict_resolver.h"
@@ -25,13 +27,13 @@ class RecordingConflictResolver final : public ConflictResolver {
     MergeResolve resolution;
   };
 
+  /// `default_side`: base, left or right; blank empties what is in conflict.
   explicit RecordingConflictResolver(MergeResolve default_side) : default_side_(default_side) {}
 
   /// Replaces the user's resolutions; the first one that matches a place wins.
-  void SetResolveMethodForPaths(std::vector<RecordResolve> resolutions) {
-    resolutions_ = std::move(resolutions);
-  }
+  void SetResolveMethodForPaths(std::vector<RecordResolve> resolutions);
 
+  /// Whether a record is neither settled by the user nor by itself.
   bool HasPendingConflicts() const;
   const std::vector<Record>& GetRecords() const { return records_; }
   const std::vector<RecordResolve>& GetResolutions() const { return resolutions_; }
@@ -57,6 +59,8 @@ class RecordingConflictResolver final : public ConflictResolver {
 
  private:
   MergeResolve FindResolution(const FieldPath& path) const;
+  /// The place of the first resolution that begins with `first` and matches `path`.
+  size_t FindResolution(const YAMLScalar* first, const FieldPath& path) const;
 
   template <typename T>
   const Operation* SingleSideResolve(const T* operation, ConflictType type);
@@ -70,11 +74,17 @@ class RecordingConflictResolver final : public ConflictResolver {
   const Operation* ProvisionalResult(const Operation* left, const Operation* right,
                                      const Operation* blank_source) const;
   const Operation* MergeAdditions(const AddOperation* left, const AddOperation* right);
-  void AddRecord(ConflictType type, MergeResolve resolution, const Operation* left, const Operation* right);
+  Record& AddRecord(FieldPath path, ConflictType type, MergeResolve resolution, const Operation* left,
+                    const Operation* right);
 
   MergeResolve default_side_;
   std::vector<Record> records_;
   std::vector<RecordResolve> resolutions_;
+  // The places in resolutions_ of the patterns that begin with a component, "*" being one: a user may have
+  // settled thousands of conflicts one by one.
+  std::unordered_map<const YAMLScalar*, std::vector<size_t>> resolutions_by_first_;
+  // The first record of each path of one component.
+  std::unordered_map<const YAMLScalar*, size_t> object_records_;
 };
 
 /// Record order in files: by path, component by component, byte-wise; a path before its extensions.
