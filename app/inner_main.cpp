@@ -2,6 +2,7 @@
 
 #include "app/file_pair_commands.h"
 #include "app/merge_command.h"
+#include "app/self_check.h"
 #include "app/usage.h"
 #include "platform/error_channel.h"
 #include "yaml/yaml_error.h"
@@ -13,22 +14,16 @@ namespace {
 
 constexpr int kFirstOption = 2;
 
-// Runs a command on two files; a library error is reported as it is.
-template <typename Config>
-int RunOnFilePair(int (*handle)(const Config&), const Config& config) {
+// Runs a command whose library errors are reported as they are.
+template <typename Argument>
+int Run(int (*handle)(const Argument&), const Argument& argument) {
   try {
-    return handle(config);
+    return handle(argument);
   } catch (const YAMLError& error) {
     errs << error.what() << "\n";
     ErrMsg(errs);
     return 1;
   }
-}
-
-int ReportNotBuilt(const std::string& command) {
-  errs << "The " << command << " command is not built yet\n";
-  ErrMsg(errs);
-  return 1;
 }
 
 }  // namespace
@@ -44,17 +39,17 @@ int InnerMain(const CommandLineArguments& arguments) {
   const std::string& command = arguments[1];
   if (command == kCmdStrip) {
     StripConfig config;
-    return ParseStripArgs(arguments, kFirstOption, config) ? RunOnFilePair(HandleStripCommand, config) : 1;
+    return ParseStripArgs(arguments, kFirstOption, config) ? Run(HandleStripCommand, config) : 1;
   }
   if (command == kCmdDiff) {
     DiffConfig config;
-    return ParseDiffArgs(arguments, kFirstOption, config) ? RunOnFilePair(HandleDiffCommand, config) : 1;
+    return ParseDiffArgs(arguments, kFirstOption, config) ? Run(HandleDiffCommand, config) : 1;
   }
   if (command == kCmdMerge) {
     MergeConfig config;
     return ParseMergeArgs(arguments, kFirstOption, config) ? ProcessMergeCommand(config) : 1;
   }
-  if (command == kCmdUnittest) return ReportNotBuilt(command);
+  if (command == kCmdUnittest) return Run(HandleUnittestCommand, arguments);
   if (command.starts_with('-')) {
     errs << "Missing command (e.g. 'merge') before option " << command;
     ErrMsg(errs);

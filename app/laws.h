@@ -1,0 +1,39 @@
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <vector>
+
+#include "app/random_scenes.h"
+
+namespace vexel_yaml {
+
+/// What a merge must do whatever the scenes are, checked on one triple of them after another.
+class Laws {
+ public:
+  struct Result {
+    std::string law;
+    size_t checked = 0;
+    size_t broken = 0;
+    /// The smallest triple that broke the law, as text.
+    std::string example;
+  };
+
+  Laws();
+
+  /// Checks every law on `triple`. False where its lists can't be matched, which a merge reports as an error:
+  /// equal elements at both ends of a list that gets shorter can't be told apart. Throws what diffing,
+  /// merging and writing throw otherwise.
+  bool Check(const SceneTriple& triple);
+
+  const std::vector<Result>& GetResults() const { return results_; }
+
+ private:
+  void CheckSide(const SceneTriple& triple, VexelObjects& side);
+  void CheckBothSides(const SceneTriple& triple);
+  void Expect(size_t law, bool holds, const SceneTriple& triple);
+
+  std::vector<Result> results_;
+};
+
+}  // namespace vexel_yaml

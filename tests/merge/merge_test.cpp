@@ -1,0 +1,174 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <sstream>
+
+#include "diff/yaml_mapping_diff.h"
+#include "diff/yaml_sequence_diff.h"
+#include "merge/conflict_record_file.h"
+#include "tests/support/yaml_text.h"
+
+namespace vexel_yaml {
+namespace {
+
+using Recording = RecordingConflictResolver;
+
+TEST(OperationMerge, RowsOfTheTableAreTriedInOrder) {
+  YAMLMappingDiff no_entries;
+  YAMLSequenceDiff no_elements;
+  const RemoveOperation remove(true);
+  const ChangeOperation change(YAMLScalar::one);
+  const AddOperation add(YAMLScalar::one, true);
+  const ChangeMappingOperation mapping(&no_entries, false);
+  const ChangeSequenceOperation sequence(&no_elements, nullptr, false);
+  const Operation* const kinds[] = {&remove, &change, &add, &mapping, &sequence};
+  // The types of the records; those up to 3 and 11 are two-sided.
+  constexpr int kTypes[5][5] = {
+      {3, 11, 8, 11, 8}, {9, 2, 6, 6, 6}, {9, 7, 1, 4, 4}, {9, 7, 5, 2, 6}, {9, 7, 5, 7, 2}};
+  for (size_t left = 0; left < 5; ++left) {
+    for (size_t right = 0; right < 5; ++right) {
+      Recording resolver(MergeResolve::kRight);
+      const Operation* merged = Operation::Merge(kinds[left], kinds[right], resolver);
+      const auto type = static_cast<int>(resolver.GetRecords().at(0).type);
+      EXPECT_EQ(type, kTypes[left][right]) << left << " with " << right;
+      EXPECT_EQ(merged, kinds[type == 11 || (type > 3 && type % 2 == 1) ? right : left]);
+    }
+  }
+}
+
+Recording Resolver(const std::string& resolutions, MergeResolve default_side = MergeResolve::kBase) {
+  Recording resolver(default_side);
+  std::istringstream file("Conflict handling:\n" + resolutions);
+  InputConflictRecords(file, resolver);
+  return resolver;
+}
+
+std::unique_ptr<VexelObjects> Merged(const VexelObjects& base, const VexelObjects& left,
+                                     const VexelObjects& right, ConflictResolver& resolver) {
+  const ScopedRules rules("");
+  std::unique_ptr<VexelObjects> merged(base.Clone());
+  const auto* left_diff = YAMLMappingDiff::Diff(base, left);
+  YAMLMappingDiff::Merge(*left_diff, *YAMLMappingDiff::Diff(base, right), resolver)->Apply(*merged);
+  return merged;
+}
+
+// Merges the field at 1.C.f; an empty text stands for a version without it. Each side also adds a field of
+// its own, so that both edit the object and the merge looks into it.
+std::string MergedField(const std::string& base, const std::string& left, const std::string& right,
+                        ConflictResolver& resolver) {
+  const auto scene = [](const std::string& value, const std::string& other) {
+    return ObjectsFromText("--- !v!114 &1\nC:\n  z: 0\n" + (value.empty() ? "" : "  f: " + value + "\n") +
+                           other);
+  };
+  const auto merged = Merged(*scene(base, ""), *scene(left, "  l: 1\n"), *scene(right, "  r: 1\n"), resolver);
+  const YAMLNode* field = merged->First()->AsMapping()->First()->AsMapping()->Get(YAMLScalar::Lookup("f"));
+  return field == nullptr ? "none" : field->GetYAMLString();
+}
+
+std::string MergedList(const std::string& base, const std::string& left, const std::string& right,
+                       const std::string& resolutions = "") {
+  Recording resolver = Resolver(resolutions);
+  return MergedField(base, left, right, resolver);
+}
+
+TEST(SequenceMerge, AlignsBothSidesElements) {
+  EXPECT_EQ(MergedList("[a, b]", "[x, a, p, b]", "[y, a, q, b, r]"), "[x, y, a, p, q, b, r]");
+  EXPECT_EQ(MergedList("[a, b, c]", "[b, c, x]", "[a, b]"), "[b, x]");
+  EXPECT_EQ(MergedList("[a]", "[a, x]", "[a, x]"), "[a, x]");
+  // What both added is there once, also where it stands at different places.
+  EXPECT_EQ(MergedList("[{fileID: 1}]", "[{fileID: 1}, {fileID: 2}, {fileID: 3}]",
+                       "[{fileID: 1}, {fileID: 3}, {fileID: 4}]"),
+            "[{fileID: 1}, {fileID: 2}, {fileID: 3}, {fileID: 4}]");
+  // One side only edits in place, the other moves.
+  EXPECT_EQ(MergedList("[{fileID: 1}, {fileID: 2}]", "[{fileID: 1}, {fileID: 2, v: 5}]",
+                       "[{fileID: 2}, {fileID: 9}, {fileID: 1}]"),
+            "[{fileID: 2, v: 5}, {fileID: 9}, {fileID: 1}]");
+}
+
+TEST(SequenceMerge, RefusedAdditionsLeaveNoSlotAndRefusedEditsTheBaseElement) {
+  EXPECT_EQ(MergedList("[a]", "[a, x, z]", "[a, y]", "base 1.C.f.1"), "[a, z, y]");
+  EXPECT_EQ(MergedList("[a]", "[a, x, z]", "[a, y]", "right 1.C.f.*"), "[a, y]");
+  EXPECT_EQ(
+      MergedList("[{fileID: 1}, {fileID: 2}]", "[{fileID: 7}, {fileID: 1}, {fileID: 2, v: 3}, {fileID: 3}]",
+                 "[{fileID: 1}, {fileID: 2}, {fileID: 4}]", "base 1.C.f.0\nbase 1.C.f.2"),
+      "[{fileID: 1}, {fileID: 2}, {fileID: 3}, {fileID: 4}]");
+}
+
+TEST(RecordingResolver, AResolutionGivesThatVersionOfTheField) {
+  const std::string cases[][3] = {{"1", "2", "1"},
+                                  {"1", "1", "2"},
+                                  {"", "2", ""},
+                                  {"1", "", "1"},
+                                  {"1", "1", ""},
+                                  {"[a]", "[a]", "[b]"},
+                                  {"\n    p: 1", "\n    p: 2", "\n    p: 1"},
+                                  {"1", "2", "3"},
+                                  {"", "{a: 1}", "{b: 2}"},
+                                  {"1", "", "2"},
+                                  {"1", "", ""},
+                                  {"[a]", "[a, b]", "[a, c]"},
+                                  {"{fileID: 1}", "", "{fileID: 2}"},
+                                  {"{x: 1, y: 1}", "{x: 2, y: 1}", "{x: 1, y: 2}"}};
+  const std::string words[] = {"base", "LEFT", "right"};
+  for (const auto& versions : cases) {
+    for (size_t i = 0; i < 3; ++i) {
+      const std::string& other = words[(i + 1) % 3];
+      Recording resolver =
+          Resolver(other + " 1.C.f.*\n" + words[i] + "  *.C.f x\n# " + other + "\n" + other + " *.*.f");
+      EXPECT_EQ(MergedField(versions[0], versions[1], versions[2], resolver),
+                MergedList(versions[0], versions[i], versions[0]))
+          << words[i] << " of " << testing::PrintToString(versions);
+      EXPECT_FALSE(resolver.HasPendingConflicts());
+    }
+  }
+}
+
+TEST(RecordingResolver, TheDefaultSideStandsInForAConflict) {
+  constexpr MergeResolve kSides[] = {MergeResolve::kBase, MergeResolve::kLeft, MergeResolve::kRight,
+                                     MergeResolve::kBlank};
+  const auto merged = [&](const std::string& base, const std::string& left, const std::string& right) {
+    std::vector<std::string> fields;
+    for (const MergeResolve side : kSides) {
+      Recording resolver(side);
+      fields.push_back(MergedField(base, left, right, resolver));
+      EXPECT_TRUE(resolver.HasPendingConflicts());
+    }
+    return fields;
+  };
+  EXPECT_THAT(merged("{x: 1, y: 1}", "{x: 2, y: 1}", "{x: 1, y: 3}"),
+              testing::ElementsAre("{x: 1, y: 1}", "{x: 2, y: 1}", "{x: 1, y: 3}", "{x: '', y: 1}"));
+  EXPECT_THAT(merged("{x: 1, y: 1}", "", "{x: 1, y: 3}"),
+              testing::ElementsAre("{x: 1, y: 1}", "none", "{x: 1, y: 3}", "{x: 1, y: ''}"));
+  EXPECT_THAT(merged("", "4", "5"), testing::ElementsAre("none", "4", "5", ""));
+}
+
+TEST(ConflictRecords, OfObjectsAddedOnBothSidesAreWrittenInOrder) {
+  const VexelObjects base;
+  const auto left = ObjectsFromText("--- !v!1 &5\nC:\n  a: 1\n  b: 1\n");
+  const auto right = ObjectsFromText("--- !v!2 &5\nC:\n  b: 2\n  c: 3\n");
+  Recording resolver = Resolver("> note\nleft *.x\n");
+  const auto merged = Merged(base, *left, *right, resolver);
+  std::ostringstream text, records;
+  merged->Output(text);
+  EXPECT_THAT(text.str(), testing::EndsWith("--- !v!1 &5\nC:\n  a: 1\n  c: 3\n"));
+  OutputConflictRecords(records, resolver, true);
+  EXPECT_THAT(records.str(),
+              testing::StartsWith("Conflicts:\nLeft  5.C.b add as 1\nRight 5.C.b add as 2\n"
+                                  "Left  5.MERGE_ClassID add as 1\nRight 5.MERGE_ClassID add as 2\n"
+                                  "Conflict handling:\nLeft *.x\nNon-conflicts:\nBoth adds 5 content\n"
+                                  "Both adds 5.C content\nLeft adds 5.C.a add as 1\n"));
+}
+
+TEST(RecordingResolver, ADependencyConflictMarksTheObjectsRecord) {
+  const YAMLScalar *object = YAMLScalar::one, *settled = YAMLScalar::Lookup("3");
+  Recording resolver = Resolver("base 3");
+  EXPECT_TRUE(resolver.OnComponentDependencyConflict({object, nullptr, 1, ConflictType::kLeftRemoves}));
+  EXPECT_FALSE(resolver.OnComponentDependencyConflict({nullptr, settled, 1, ConflictType::kRightAdds}));
+  EXPECT_TRUE(resolver.OnComponentDependencyConflict({nullptr, object, 1, ConflictType::kRightRemoves}));
+  std::ostringstream text;
+  OutputConflictRecords(text, resolver, false);
+  EXPECT_EQ(text.str(), "Conflicts:\nLeft  1 delete\nRight 1 delete\nConflict handling:\nBase 3\n");
+}
+
+}  // namespace
+}  // namespace vexel_yaml
