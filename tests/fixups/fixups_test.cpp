@@ -72,6 +72,12 @@ TEST(StateMachineTransitions, GoThereAndBackWithRepeatedKeys) {
   EXPECT_THAT(Written(*objects), testing::HasSubstr("\n  - data:\n      a: 2\n"));
   TransitionsToMappings(*objects);
   EXPECT_EQ(Written(*objects), text);
+
+  const auto nested = ObjectsFromText(
+      Object(1, "A") + Object(7, "AnimatorStateMachine", "m_StateMachineTransitions: {d: {a: 1, a: 2}}"));
+  EXPECT_THAT([&] { RefuseDuplicateKeys(*nested, "my.scene"); },
+              ThrowsError("Cannot perform this operation on a YAML file with duplicate keys: "
+                          "file 'my.scene', object 7"));
 }
 
 // The repaired file, for a merge in which left still had `removed`.

@@ -7,6 +7,7 @@
 #include "diff/yaml_sequence_diff.h"
 #include "merge/conflict_record_file.h"
 #include "tests/support/yaml_text.h"
+#include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 namespace {
@@ -157,6 +158,18 @@ TEST(ConflictRecords, OfObjectsAddedOnBothSidesAreWrittenInOrder) {
                                   "Left  5.MERGE_ClassID add as 1\nRight 5.MERGE_ClassID add as 2\n"
                                   "Conflict handling:\nLeft *.x\nNon-conflicts:\nBoth adds 5 content\n"
                                   "Both adds 5.C content\nLeft adds 5.C.a add as 1\n"));
+}
+
+TEST(ConflictRecords, ErrorsNameTheLine) {
+  const std::string unknown = "' (should be left,right or base) specified on line ";
+  const std::pair<std::string, std::string> cases[] = {
+      {"left", "No handling type (left,right,base) specified on line 2"},
+      {"\n#\nleft ", "No property path specified on line 4"},
+      {"left a\r\nBreakCycle a.b", "Unknown handling type 'BreakCycle" + unknown + "3"}};
+  for (const auto& [text, message] : cases) {
+    EXPECT_THAT([&] { Resolver(text); },
+                testing::Throws<YAMLError>(testing::Property(&YAMLError::what, message)));
+  }
 }
 
 TEST(RecordingResolver, ADependencyConflictMarksTheObjectsRecord) {
