@@ -60,8 +60,10 @@ class SequenceMerge {
       const int left_index = left.GetIndex(i);
       const int right_index = right.GetIndex(partner);
       const ResolverPathStep step(resolver_, IndexScalar(left_index));
-      paired->Replace(left_index, Operation::Merge(left_diff_->Get(left_index), right_diff_->Get(right_index),
-                                                   resolver_));
+      const Operation* settled =
+          Operation::Merge(left_diff_->Get(left_index), right_diff_->Get(right_index), resolver_);
+      paired->Replace(left_index, settled);
+      if (settled != nullptr) settled_.insert(settled);
       right_copies.insert(right_index);
     }
     YAMLAlloc<YAMLSequenceRemapper>::free(partners);
