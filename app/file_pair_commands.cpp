@@ -37,7 +37,9 @@ class Output {
 // The diff from the first file to the second; the files are read into `files`.
 const YAMLMappingDiff* PrepareDiff(const FilePairConfig& config, FilePair& files, TimerStat& timer) {
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
-  ReadFiles({{"Read base", config.first_path, files.first}, {"Read left", config.second_path, files.second}},
+  // On threads, only both together are timed.
+  ReadFiles({{config.threads ? "" : "Read base", config.first_path, files.first},
+             {config.threads ? "" : "Read left", config.second_path, files.second}},
             config.threads, timer);
   {
     TimerStat step(timer, "Creating mappings");

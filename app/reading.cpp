@@ -1,6 +1,7 @@
 #include "app/reading.h"
 
 #include <memory>
+#include <optional>
 
 #include "platform/thread.h"
 #include "yaml/read_yaml.h"
@@ -10,7 +11,8 @@ namespace vexel_yaml {
 namespace {
 
 void ReadFile(const FileToRead& file, DocumentCache& cache, TimerStat& timer) {
-  TimerStat step(timer, file.label);
+  std::optional<TimerStat> step;
+  if (!file.label.empty()) step.emplace(timer, file.label);
   ReadYAMLPath(file.path, file.objects, &cache);
 }
 

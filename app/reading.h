@@ -9,7 +9,7 @@
 namespace vexel_yaml {
 
 struct FileToRead {
-  /// Names the step in timings.
+  /// Names the step in timings; empty for a step that is not timed.
   std::string label;
   const std::string& path;
   VexelObjects& objects;
