@@ -20,8 +20,9 @@ namespace {
 std::string FollowLinks(const std::string& path) {
   std::error_code error;
   std::filesystem::path target = path;
-  // A chain longer than this is a loop; opening it reports that.
-  for (int links = 0; links < 40 && std::filesystem::is_symlink(target, error); ++links) {
+  for (int links = 0; std::filesystem::is_symlink(target, error); ++links) {
+    // A longer chain is a loop.
+    if (links == 40) throw FileError(path, ELOOP);
     const std::filesystem::path next = std::filesystem::read_symlink(target, error);
     target = next.is_absolute() ? next : target.parent_path() / next;
   }
@@ -49,6 +50,7 @@ std::string CreateBeside(const std::string& target) {
 void CopyContent(std::ifstream& from, std::ostream& to) {
   // Inserting an empty buffer counts as a failed insertion.
   if (from.peek() != std::ifstream::traits_type::eof()) to << from.rdbuf();
+  if (from.bad()) to.setstate(std::ios::badbit);
 }
 
 }  // namespace

@@ -42,13 +42,14 @@ void HandleSignals() {
 
 }  // namespace
 
-void RememberTempFile(const std::string& path) {
+bool RememberTempFile(const std::string& path) {
   AutoLock lock(slots_mutex);
   static const bool handled = (HandleSignals(), true);
   Slot* slot = std::find_if(slots.begin(), slots.end(), [](const Slot& s) { return !s.used; });
-  if (!handled || slot == slots.end() || path.size() >= slot->path.size()) return;
+  if (!handled || slot == slots.end() || path.size() >= slot->path.size()) return false;
   *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';
   slot->used = true;
+  return true;
 }
 
 void ForgetTempFile(const std::string& path) {
@@ -63,8 +64,9 @@ std::string CreateTempFile() {
   const int file = mkstemp(path.data());
   if (file < 0) return {};
   close(file);
-  RememberTempFile(path);
-  return path;
+  if (RememberTempFile(path)) return path;
+  unlink(path.c_str());
+  return {};
 }
 
 void RemoveTempFiles() {

@@ -5,9 +5,9 @@
 namespace vexel_yaml {
 
 /// Remembers a file that must not outlive the process: `RemoveTempFiles` removes it, and so does a signal
-/// that ends the process. Beyond a handful of files at once, or for a path that the system could not open
-/// anyway, it is not remembered. May be called from any thread, as the other functions here.
-void RememberTempFile(const std::string& path);
+/// that ends the process. Returns false where it can't: beyond a handful of files at once, and for a path
+/// that is too long. May be called from any thread, as the other functions here.
+bool RememberTempFile(const std::string& path);
 
 /// Forgets it again: it has been removed or has become a file of the user's.
 void ForgetTempFile(const std::string& path);

@@ -5,7 +5,7 @@
 #include <algorithm>
 
 #include "yaml/convert_document.h"
-#include "yaml/nesting_limit.h"
+#include "yaml/document_limits.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -153,7 +153,7 @@ bool DocumentReader::Read(const AssetText::Document& document, bool last, ReadOb
   };
   LoadedDocument loaded;
   try {
-    CheckNestingDepth(chunk_);
+    CheckDocumentLimits(chunk_);
     if (!loaded.Load(chunk_)) return false;
     loaded.CheckEnd(last);
     Convert(loaded, chunk_, stripped, result);
