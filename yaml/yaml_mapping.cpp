@@ -199,12 +199,16 @@ void YAMLMapping::Clear() {
 }
 
 void YAMLMapping::CloneInto(YAMLMapping& target) const {
-  target.slots_.reserve(slots_.size() - gaps_);
   target.SetFlow(flow_);
   target.SetHash(GetHash());
   target.SetLine(GetLine());
-  if (duplicates_) return;
-  for (const Slot& slot : *this) target.AddSlot(slot.key, slot.value->Clone());
+  target.slots_ = slots_;
+  target.gaps_ = gaps_;
+  for (Slot& slot : target.slots_) {
+    // Most values are scalars, which are their own copies.
+    if (slot.value != nullptr && slot.value->AsScalar() == nullptr) slot.value = slot.value->Clone();
+  }
+  target.BuildIndex();
 }
 
 void YAMLMapping::ForgetPairs() {
