@@ -131,13 +131,13 @@ class SequenceMerge {
   std::unordered_set<const Operation*> settled_;
 };
 
-// Whether both sides made the same edit of a list. Elements that are told apart by keys of a rule's own are
-// paired instead, one by one, so that each gets its record.
+// Whether both sides made the same edit of a list. Elements that were added and are told apart by keys of a
+// rule's own are paired instead, one by one, so that each gets its record.
 bool IsSameEdit(const ChangeSequenceOperation& left, const ChangeSequenceOperation& right,
                 const std::vector<FieldPath>& key_paths) {
   const bool by_rule = left.GetRemapper()->IsSetRemapper() && right.GetRemapper()->IsSetRemapper() &&
                        key_paths != YAMLSequenceRemapper::defaultPath;
-  return !by_rule && !left.GetDiff()->GetEntries().empty() && OperationEquals(left, right);
+  return (!by_rule || left.GetDiff()->GetEntries().empty()) && OperationEquals(left, right);
 }
 
 // "No operation" leaves a place as it is in base: a base element stays, but the slot of an addition that was
