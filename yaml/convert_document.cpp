@@ -60,7 +60,7 @@ YAMLNode* DocumentConverter::YAMLDocNodeToMapping(const yaml_node_t* node) {
     const YAMLScalar* key = YAMLDocNodeToScalar(key_node)->AsScalar();
     YAMLNode* value = ConvertById(pair->value);
     hash = YAMLNode::Combine(hash, key->GetHash());
-    hash = YAMLNode::Combine(hash, value->GetHash());
+    hash = YAMLNode::Combine(hash, value->GetHashInParent());
     hash = YAMLNode::Combine(hash, static_cast<uint32_t>(pair - begin));
     mapping->Append(key, value);
   }
@@ -78,7 +78,7 @@ YAMLNode* DocumentConverter::YAMLDocNodeToSequence(const yaml_node_t* node) {
   uint32_t hash = 0;
   for (const yaml_node_item_t* item = begin; item != end; ++item) {
     YAMLNode* value = ConvertById(*item);
-    hash = YAMLNode::Combine(hash, value->GetHash());
+    hash = YAMLNode::Combine(hash, value->GetHashInParent());
     hash = YAMLNode::Combine(hash, static_cast<uint32_t>(item - begin));
     sequence->Append(value);
   }

@@ -256,7 +256,7 @@ void YAMLMapping::RebuildHash(bool shallow) {
   uint32_t position = 0;
   for (const Slot& slot : *this) {
     if (!shallow) slot.value->RebuildHash(false);
-    hash = Combine(Combine(Combine(hash, slot.key->GetHash()), slot.value->GetHash()), position++);
+    hash = Combine(Combine(Combine(hash, slot.key->GetHash()), slot.value->GetHashInParent()), position++);
   }
   SetHash(hash);
 }

@@ -79,6 +79,9 @@ class YAMLNode {
   uint32_t GetHash() const { return hash_; }
   void SetHash(uint32_t hash) { hash_ = hash; }
 
+  /// What this node adds to its parent's hash: an empty list must not look like an empty mapping there.
+  uint32_t GetHashInParent() const { return hash_ == 0 && kind_ == Kind::kSequence ? 1 : hash_; }
+
   /// 0-based line, within the text of its own document, at which the reader last saw this node start; 0 for
   /// a node built in memory. A scalar, being shared, knows its latest occurrence only.
   uint32_t GetLine() const { return line_.load(std::memory_order_relaxed); }

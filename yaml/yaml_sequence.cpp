@@ -71,7 +71,7 @@ void YAMLSequence::RebuildHash(bool shallow) {
   uint32_t hash = 0;
   for (size_t i = 0; i < items_.size(); ++i) {
     if (!shallow && items_[i] != nullptr) items_[i]->RebuildHash(false);
-    const uint32_t item_hash = items_[i] == nullptr ? 0 : items_[i]->GetHash();
+    const uint32_t item_hash = items_[i] == nullptr ? 0 : items_[i]->GetHashInParent();
     hash = Combine(Combine(hash, item_hash), static_cast<uint32_t>(i));
   }
   SetHash(hash);
