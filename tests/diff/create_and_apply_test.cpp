@@ -1,0 +1,104 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+
+#include "diff/merge_tree_visitor.h"
+#include "diff/yaml_mapping_diff.h"
+#include "diff/yaml_sequence_diff.h"
+#include "tests/support/yaml_text.h"
+
+namespace vexel_yaml {
+namespace {
+
+// Diffs two values at `path`; the diff and its copy must make the second of the first, in any place. Tells
+// where the elements of two lists went and which ones of the new list are new or edited.
+std::string Turn(std::string_view from_text, std::string_view to_text, std::string_view at = "1.A.list") {
+  const OwnedNode from = ValueFromText(from_text);
+  const OwnedNode to = ValueFromText(to_text);
+  FieldPath path = PathFromText(at);
+  const Operation* made = CreateDiffOperation(path, from.get(), to.get());
+  EXPECT_EQ(path, PathFromText(at));
+  EXPECT_EQ(from->GetYAMLString(), ValueFromText(from_text)->GetYAMLString());
+  const Operation* copy = MergeTreeCloneVisitor::Clone(made);
+  EXPECT_TRUE(OperationEquals(*copy, *made) && copy->IsMergeable() == made->IsMergeable());
+  YAMLSequence list(false);
+  for (const Operation* operation : {made, copy}) {
+    list.Append(from->Clone());
+    operation->Apply(list, static_cast<int>(list.Size()) - 1);
+    EXPECT_EQ(list.GetItems().back()->GetYAMLString(), to->GetYAMLString());
+  }
+  std::string text;
+  if (made->GetKind() != Operation::Kind::kChangeSequence) return text;
+  const auto* changed = static_cast<const ChangeSequenceOperation*>(made);
+  if (const auto* remapper = changed->GetRemapper()) {
+    for (const uint32_t index : remapper->GetMapping()) {
+      text += index == YAMLSequenceRemapper::kDropped ? "-" : std::to_string(index);
+    }
+  }
+  for (const auto& [index, operation] : changed->GetDiff()->GetEntries()) {
+    text += (operation->GetKind() == Operation::Kind::kAdd ? " new " : " edited ") + std::to_string(index);
+  }
+  return text;
+}
+
+TEST(CreateAndApply, ListsAreTurnedIntoOneAnother) {
+  const ScopedRules rules("[arrays]\nset *.A.keyed id");
+  EXPECT_EQ(Turn("[{id: 1, v: a}, {id: 2, v: b}, {id: 3, v: c}]", "[{id: 3, v: x}, {id: 4}, {id: 1, v: a}]",
+                 "1.A.keyed"),
+            "2-0 edited 0 new 1");
+  EXPECT_EQ(Turn("[{id: 1}, {id: 2, v: b}]", "[{id: 1}, {id: 2, v: c}]", "1.A.keyed"), " edited 1");
+  EXPECT_EQ(Turn("[a, b, c]", "[a, x, c]"), "0-2 new 1");
+  EXPECT_EQ(Turn("[a, b, c, d]", "[d, c, b, a]"), "3210");
+  EXPECT_EQ(Turn("[[a, b], [c]]", "[[c], [a, x]]"), "-0 new 1");
+  EXPECT_EQ(Turn("[a]", "[z, a, {b: []}]"), "1 new 0 new 2");
+  EXPECT_EQ(Turn("[a, b]", "[]"), "--");
+}
+
+TEST(CreateAndApply, FieldsAreTurnedIntoOneAnother) {
+  Turn("{a: 1, b: {c: [1, 2], d: x}, e: []}", "{b: {d: [x], c: [2, 1], n: 1}, e: {}, f: {g: [h]}}");
+  Turn("{a: 1, b: 2, c: 3, d: 4}", "{d: 4, n: 0, b: 5, a: 1}");
+  Turn("{a: 1}", "{}");
+  Turn("{}", "{a: {b: [c]}}");
+}
+
+TEST(CreateAndApply, RulesHoldAtThePathsOfNestedElements) {
+  const ScopedRules rules(
+      "[arrays]\nset *.A.outer id\nset *.A.outer.*.inner id\n[comparisons]\nfloat *.A.outer.1.size 0.1 0.1");
+  YAMLSequence list(false);
+  list.Append(
+      ValueFromText("[{id: 1, size: 1, inner: [{id: 5}, {id: 6, v: 1}]}, {id: 2, size: 1}]").release());
+  const OwnedNode to =
+      ValueFromText("[{id: 2, size: 1.05}, {id: 1, size: 1.05, inner: [{id: 6, v: 2}, {id: 5}]}]");
+  FieldPath path = PathFromText("1.A.outer");
+  CreateDiffOperation(path, list.Get(0), to.get())->Apply(list, 0);
+  // An index in a path is the place in the new list.
+  EXPECT_EQ(list.Get(0)->GetYAMLString(),
+            "[{id: 2, size: 1.05}, {id: 1, size: 1, inner: [{id: 6, v: 2}, {id: 5}]}]");
+}
+
+TEST(CreateAndApply, TheTolerancesBorderIsNotTolerated) {
+  const ScopedRules rules("[comparisons]\nfloat *.A.half 0.0001 0.5\nfloat *.A.tenth 0.1 0.0001");
+  const auto is_equal = [](std::string_view from, std::string_view to, std::string_view at) {
+    FieldPath path = PathFromText(at);
+    return CreateDiffOperation(path, ValueFromText(from).get(), ValueFromText(to).get()) == nullptr;
+  };
+  EXPECT_TRUE(is_equal("1", "1.4999", "1.A.half") && is_equal("-100", "-122", "1.A.tenth"));
+  for (const auto* to : {"1.5", "0.5"}) EXPECT_FALSE(is_equal("1", to, "1.A.half"));
+  for (const auto* to : {"-123", "100"}) EXPECT_FALSE(is_equal("-100", to, "1.A.tenth"));
+  EXPECT_FALSE(is_equal("1", "1.4", "1.A.half.below"));
+}
+
+TEST(CreateAndApply, ListsThatCannotBeMatchedNameTheirPath) {
+  FieldPath path = PathFromText("12.A");
+  try {
+    CreateDiffOperation(path, ValueFromText("{list: [a, a, a]}").get(), ValueFromText("{list: [a]}").get());
+    ADD_FAILURE();
+  } catch (const std::length_error& error) {
+    EXPECT_THAT(error.what(), testing::HasSubstr("12.A.list"));
+  }
+  EXPECT_EQ(path, PathFromText("12.A"));
+}
+
+}  // namespace
+}  // namespace vexel_yaml
