@@ -17,7 +17,7 @@ namespace {
 
 constexpr uint32_t kRandomScenes = 500;
 
-// A lamp that both sides edit: a component, a list of references and a state machine are in it.
+// A lamp that one side renames, moves and gives a child, and the other makes flicker with a new component.
 constexpr const char* kLamp =
     "--- !v!1 &10\nGameObject:\n  m_Component:\n  - component: {fileID: 11}\n  - component: {fileID: 12}\n"
     "  m_Name: Lamp\n"

@@ -114,6 +114,7 @@ void FileReplacement::Commit() {
   // Somebody else's file in a shared folder, or a mount point, may be written but not replaced.
   if (errno != EPERM && errno != EACCES && errno != EBUSY) throw FileError(path_, errno);
   std::ifstream text(beside_, std::ios::binary);
+  if (!text) throw FileError(path_, errno);
   OpenInPlace();
   CopyContent(text, stream_);
   Close();

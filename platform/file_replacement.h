@@ -16,8 +16,8 @@ class FileError : public std::runtime_error {
 ///
 /// The text goes to a new file beside the destination, which takes the destination's place (and its
 /// permission bits) on `Commit`. A symbolic link is followed to its target. What is not a regular file (a
-/// device, a pipe) is written in place, and so is a file in a folder that is not writable or that can't be
-/// replaced. Without a `Commit` the destination stays as it was, except where it is written in place.
+/// device, a pipe) is written in place, and so is a file that can't be replaced or whose folder is not
+/// writable. Without a `Commit` the destination stays as it was, except where it is written in place.
 class FileReplacement {
  public:
   /// Throws FileError when nothing can be opened for writing.
