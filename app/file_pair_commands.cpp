@@ -4,12 +4,12 @@
 #include <iostream>
 #include <memory>
 
-#include "app/reading.h"
-#include "app/setup.h"
 #include "diff/strip_unchanged.h"
 #include "diff/yaml_diff_output.h"
 #include "fixups/state_machine_transitions.h"
 #include "platform/files.h"
+#include "rules/setup.h"
+#include "yaml/read_files.h"
 
 namespace vexel_yaml {
 

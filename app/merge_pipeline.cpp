@@ -1,30 +1,21 @@
 #include "app/merge_pipeline.h"
 
 #include <cerrno>
-#include <filesystem>
-#include <fstream>
 #include <iostream>
 #include <memory>
-#include <system_error>
 #include <vector>
 
-#include "app/diffing.h"
 #include "app/premerge.h"
-#include "app/reading.h"
-#include "app/setup.h"
 #include "app/writing.h"
-#include "diff/yaml_mapping_diff.h"
-#include "fixups/duplicate_keys.h"
-#include "fixups/file_id_collisions.h"
 #include "fixups/post_process.h"
-#include "fixups/state_machine_transitions.h"
+#include "fixups/three_way_merge.h"
 #include "merge/conflict_record_file.h"
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
 #include "platform/timer_stat.h"
+#include "rules/setup.h"
 #include "rules/yaml_sequence_remapper.h"
-#include "yaml/vexel_objects.h"
 
 namespace vexel_yaml {
 
@@ -53,21 +44,14 @@ class MergeRun {
         resolver_(static_cast<MergeResolve>(config.resolve_mode)) {}
 
   void Read() {
-    const std::vector<FileToRead> files = {{"Read base", config_.base_path, documents_.base},
-                                           {"Read left", config_.left_path, documents_.left},
-                                           {"Read right", config_.right_path, documents_.right}};
-    ReadFiles(files, config_.threads, timer_);
-    for (const FileToRead& file : files) RefuseDuplicateKeys(file.objects, file.path);
+    ReadMergeDocuments(config_.base_path, config_.left_path, config_.right_path, documents_, config_.threads,
+                       timer_);
   }
 
   void CreateMappings() {
     TimerStat step(timer_, "Creating mappings");
     TimerStat preprocessing(step, "Preprocess mappings");
-    for (VexelObjects* objects : {&documents_.base, &documents_.left, &documents_.right}) {
-      TransitionsToSequences(*objects);
-    }
-    RemapCollidingAddFileIDs(FindCollidingAdditions(documents_.base, documents_.left, documents_.right),
-                             documents_.base, documents_.left, documents_.right);
+    PrepareForDiff(documents_.base, documents_.left, documents_.right);
   }
 
   void CreateDiffs() {
@@ -80,31 +64,14 @@ class MergeRun {
   bool ReadResolutions() {
     if (config_.merge_file.empty()) return true;
     TimerStat step(timer_, "Reading resolve file");
-    std::error_code error;
-    std::ifstream file(VexelToNativePath(config_.merge_file));
-    if (!file || std::filesystem::is_directory(config_.merge_file, error)) {
-      errs << "Couldn't open merge resolve file '" << config_.merge_file << "'";
-      ErrMsg(errs);
-      return false;
-    }
-    InputConflictRecords(file, resolver_);
-    return true;
+    if (InputConflictRecords(config_.merge_file, resolver_)) return true;
+    errs << "Couldn't open merge resolve file '" << config_.merge_file << "'";
+    ErrMsg(errs);
+    return false;
   }
 
   void Merge() {
-    const YAMLMappingDiff* merged_diff = nullptr;
-    {
-      TimerStat step(timer_, "Merging");
-      merged_diff = YAMLMappingDiff::Merge(*diffs_.left, *diffs_.right, resolver_);
-    }
-    {
-      TimerStat step(timer_, "Cloning base roots");
-      merged_.reset(documents_.base.Clone());
-    }
-    {
-      TimerStat step(timer_, "Applying merged changes");
-      merged_diff->Apply(*merged_);
-    }
+    merged_ = MergeIntoCopy(documents_.base, diffs_, resolver_, timer_);
     TimerStat step(timer_, "Post process merged changes");
     breaks_dependency_ = PostProcess(*merged_, documents_.left, documents_.right, resolver_);
   }

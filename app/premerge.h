@@ -4,19 +4,11 @@
 #include <string>
 #include <vector>
 
-#include "app/diffing.h"
+#include "fixups/three_way_merge.h"
 #include "merge/recording_conflict_resolver.h"
 #include "platform/timer_stat.h"
-#include "yaml/vexel_objects.h"
 
 namespace vexel_yaml {
-
-/// The three versions of one asset.
-struct MergeDocuments {
-  VexelObjects base;
-  VexelObjects left;
-  VexelObjects right;
-};
 
 /// A version of the asset for a text merge tool: everything that could be merged, and `side`'s values where
 /// there were conflicts.

@@ -5,8 +5,7 @@
 
 #include "app/laws.h"
 #include "fixups/duplicate_keys.h"
-#include "fixups/file_id_collisions.h"
-#include "fixups/state_machine_transitions.h"
+#include "fixups/three_way_merge.h"
 #include "platform/error_channel.h"
 #include "rules/yaml_sequence_remapper.h"
 #include "yaml/read_yaml.h"
@@ -39,15 +38,6 @@ constexpr const char* kLampFlickering =
     "--- !v!108 &12\nLight:\n  m_GameObject: {fileID: 10}\n  m_Intensity: 5\n  m_Range: 10\n"
     "--- !v!114 &13\nMonoBehaviour:\n  m_GameObject: {fileID: 10}\n  rhythm:\n  - 0.1\n  - 0.25\n";
 
-// What a merge does with its files before it diffs them.
-void Prepare(SceneTriple& triple) {
-  for (VexelObjects* scene : {triple.base.get(), triple.left.get(), triple.right.get()}) {
-    TransitionsToSequences(*scene);
-  }
-  RemapCollidingAddFileIDs(FindCollidingAdditions(*triple.base, *triple.left, *triple.right), *triple.base,
-                           *triple.left, *triple.right);
-}
-
 std::unique_ptr<VexelObjects> ReadFile(const std::string& path) {
   auto objects = std::make_unique<VexelObjects>();
   ReadYAMLPath(path, *objects);
@@ -59,7 +49,7 @@ std::unique_ptr<VexelObjects> ReadFile(const std::string& path) {
 bool CheckUsersScene(const CommandLineArguments& arguments, Laws& laws) {
   // Nobody knows whether something was moved in the user's scene.
   SceneTriple triple = {ReadFile(arguments[2]), ReadFile(arguments[3]), ReadFile(arguments[4]), true};
-  Prepare(triple);
+  PrepareForDiff(*triple.base, *triple.left, *triple.right);
   if (laws.Check(triple)) return true;
   errs << "The lists of these files can't be matched; merge says which\n";
   ErrMsg(errs);

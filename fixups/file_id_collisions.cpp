@@ -72,8 +72,8 @@ FileIDSet FindCollidingAdditions(const YAMLMapping& base, const YAMLMapping& lef
   return colliding;
 }
 
-void RemapCollidingAddFileIDs(const FileIDSet& conflicting, const YAMLMapping& base, const YAMLMapping& left,
-                              YAMLMapping& right) {
+std::vector<RenumberedObject> RemapCollidingAddFileIDs(const FileIDSet& conflicting, const YAMLMapping& base,
+                                                       const YAMLMapping& left, YAMLMapping& right) {
   Renumbering renumbering;
   FileIDSet taken;
   // 0 is the null reference.
@@ -93,20 +93,19 @@ void RemapCollidingAddFileIDs(const FileIDSet& conflicting, const YAMLMapping& b
     throw YAMLError("Cannot create new fileID for conflicting fileID: " + file_id->GetText());
   };
 
-  std::vector<const YAMLScalar*> renumbered;
+  std::vector<RenumberedObject> renumbered;
   for (const YAMLScalar* file_id : conflicting) {
     // Of one class, the two are taken for the same object and merged into one.
     if (ClassName(left, file_id) == ClassName(right, file_id)) continue;
     const YAMLScalar* new_id = find_free(file_id);
     taken.insert(new_id);
     renumbering.emplace(file_id, new_id);
-    renumbered.push_back(file_id);
+    renumbered.push_back({file_id, new_id});
   }
-  if (renumbering.empty()) return;
+  if (renumbered.empty()) return renumbered;
 
-  for (const YAMLScalar* file_id : renumbered) {
-    const YAMLScalar* new_id = renumbering.at(file_id);
-    right.ChangeKey(file_id, new_id);
+  for (const auto& [old_id, new_id] : renumbered) {
+    right.ChangeKey(old_id, new_id);
     YAMLMapping* object = right.Get(new_id)->AsMapping();
     object->Change(YAMLScalar::fileIDPlaceHolderName, new_id->AsValue());
     object->RebuildHash(false);
@@ -118,6 +117,7 @@ void RemapCollidingAddFileIDs(const FileIDSet& conflicting, const YAMLMapping& b
     if (visitor.TakeChanged()) object->RebuildHash(false);
   }
   right.RebuildHash(true);
+  return renumbered;
 }
 
 }  // namespace vexel_yaml

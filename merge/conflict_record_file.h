@@ -2,6 +2,7 @@
 
 #include <istream>
 #include <ostream>
+#include <string>
 #include <string_view>
 
 #include "merge/recording_conflict_resolver.h"
@@ -19,5 +20,8 @@ void OutputConflictRecords(std::ostream& out, const RecordingConflictResolver& r
 /// "Unknown handling type '<word>' (should be left,right or base) specified on line ",
 /// "No property path specified on line ".
 void InputConflictRecords(std::istream& in, RecordingConflictResolver& resolver);
+
+/// The same for the record file at `path`. Returns false where it can't be opened (a folder counts).
+bool InputConflictRecords(const std::string& path, RecordingConflictResolver& resolver);
 
 }  // namespace vexel_yaml

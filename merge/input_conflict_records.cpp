@@ -1,8 +1,12 @@
 #include <algorithm>
+#include <filesystem>
+#include <fstream>
 #include <optional>
 #include <string>
+#include <system_error>
 
 #include "merge/conflict_record_file.h"
+#include "platform/files.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -73,6 +77,15 @@ void InputConflictRecords(std::istream& in, RecordingConflictResolver& resolver)
     }
   }
   resolver.SetResolveMethodForPaths(std::move(resolutions));
+}
+
+bool InputConflictRecords(const std::string& path, RecordingConflictResolver& resolver) {
+  const std::string native = VexelToNativePath(path);
+  std::error_code error;
+  std::ifstream file(native);
+  if (!file || std::filesystem::is_directory(native, error)) return false;
+  InputConflictRecords(file, resolver);
+  return true;
 }
 
 }  // namespace vexel_yaml

@@ -1,4 +1,4 @@
-#include "app/diffing.h"
+#include "diff/diff_pair.h"
 
 #include <exception>
 

@@ -1,6 +1,5 @@
-#include "app/setup.h"
+#include "rules/setup.h"
 
-#include "app/command_line.h"
 #include "rules/yaml_sequence_remapper.h"
 #include "yaml/type_info.h"
 
@@ -11,7 +10,7 @@ void SetupRulesAndTypes(const std::string& rules_file, const std::string& type_i
     TimerStat step(timer, "Reading unique keys");
     SetupRules(rules_file);
   }
-  if (type_info_file == kDefaultTypeInfoFile) return;
+  if (type_info_file.empty()) return;
   TimerStat step(timer, "Read type info");
   SetupTypeInfo(type_info_file);
 }

@@ -1,4 +1,4 @@
-#include "app/reading.h"
+#include "yaml/read_files.h"
 
 #include <memory>
 #include <optional>
