@@ -1,0 +1,47 @@
+#include "report/merged_files.h"
+
+#include "fixups/post_process.h"
+#include "fixups/state_machine_transitions.h"
+#include "merge/conflict_record_file.h"
+#include "rules/setup.h"
+#include "yaml/yaml_error.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+void Merge(MergedFiles& files, TimerStat& timer) {
+  auto merged = MergeIntoCopy(files.read.base, files.diffs, files.resolver, timer);
+  std::unique_ptr<VexelObjects> unrepaired(merged->Clone());
+  PostProcess(*merged, files.read.left, files.read.right, files.resolver);
+  // Mappings with repeated keys can't be compared, and neither can nodes whose hashes are out of date.
+  TransitionsToSequences(*merged);
+  merged->RebuildHash(false);
+  unrepaired->RebuildHash(false);
+  files.unrepaired = std::move(unrepaired);
+  files.merged = std::move(merged);
+}
+
+}  // namespace
+
+void MergeForReport(const ReportConfig& config, MergedFiles& files) {
+  TimerStat silent("", nullptr);
+  SetupRulesAndTypes(config.rules_file, config.type_info_file, silent);
+  MergeDocuments& read = files.read;
+  ReadMergeDocuments(config.base_path, config.left_path, config.right_path, read, true, silent);
+  files.renumbered = PrepareForDiff(read.base, read.left, read.right);
+  files.diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, true, silent);
+  if (!config.merge_file.empty() && !InputConflictRecords(config.merge_file, files.resolver)) {
+    throw YAMLError("Couldn't open merge resolve file '" + config.merge_file + "'");
+  }
+  // What both sides did is worth a look all the same where the merge fails.
+  try {
+    Merge(files, silent);
+  } catch (const YAMLError& error) {
+    files.error = error.what();
+  } catch (const std::exception& error) {
+    files.error = error.what();
+  }
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,40 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "fixups/three_way_merge.h"
+#include "merge/recording_conflict_resolver.h"
+
+namespace vexel_yaml {
+
+/// What a report was asked for.
+struct ReportConfig {
+  std::string base_path;
+  std::string left_path;   ///< Theirs.
+  std::string right_path;  ///< Mine.
+  std::string merge_file;  ///< Where resolutions are read from; empty for none.
+  std::string rules_file = "auto";
+  std::string type_info_file;
+};
+
+/// A merge with everything it went through, ready to be looked at. What was converted for the diff is not
+/// converted back.
+struct MergedFiles {
+  MergeDocuments read;
+  std::vector<RenumberedObject> renumbered;
+  DiffPair diffs;
+  RecordingConflictResolver resolver{MergeResolve::kBase};
+  /// Before and after the repairs; null where the merge failed.
+  std::unique_ptr<VexelObjects> unrepaired;
+  std::unique_ptr<VexelObjects> merged;
+  /// Why the merge failed after both sides had been compared with base; empty where it didn't.
+  std::string error;
+};
+
+/// Merges the three files as the merge command does, conflicts to base. Throws what reading and diffing
+/// throw, and YAMLError where the resolutions can't be read.
+void MergeForReport(const ReportConfig& config, MergedFiles& files);
+
+}  // namespace vexel_yaml

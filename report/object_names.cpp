@@ -1,0 +1,164 @@
+#include "report/object_names.h"
+
+#include <algorithm>
+#include <unordered_set>
+
+#include "fixups/engine_keys.h"
+#include "yaml/yaml_sequence.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// Longer paths would tell nobody anything, and cost much where thousands of objects have one.
+constexpr size_t kMostNames = 50;
+
+const YAMLScalar* NameKey() {
+  static const YAMLScalar* const key = YAMLScalar::Lookup("m_Name");
+  return key;
+}
+
+bool IsTransform(std::string_view name) { return name == "Transform" || name == "RectTransform"; }
+
+const YAMLNode* Field(const YAMLMapping* mapping, const YAMLScalar* key) {
+  return mapping == nullptr || mapping->HasDuplicateKeys() ? nullptr : mapping->Get(key);
+}
+
+std::string TextOf(const YAMLNode* value) {
+  const YAMLScalar* scalar = value == nullptr ? nullptr : value->AsScalar();
+  return scalar == nullptr ? std::string() : scalar->GetText();
+}
+
+const YAMLScalar* ReferenceAt(const YAMLMapping* body, const YAMLScalar* key) {
+  return LocalReference(Field(body, key));
+}
+
+const YAMLMapping* Modification(const YAMLMapping* body) {
+  const YAMLNode* value = Field(body, YAMLScalar::mModification);
+  return value == nullptr ? nullptr : value->AsMapping();
+}
+
+// The name that a prefab instance gives to its root, where it gives one.
+std::string ModifiedName(const YAMLMapping* body) {
+  static const YAMLScalar* const modifications = YAMLScalar::Lookup("m_Modifications");
+  static const YAMLScalar* const property_path = YAMLScalar::Lookup("propertyPath");
+  static const YAMLScalar* const value_key = YAMLScalar::Lookup("value");
+  const YAMLNode* list = Field(Modification(body), modifications);
+  if (list == nullptr || list->AsSequence() == nullptr) return {};
+  for (const YAMLNode* item : list->AsSequence()->GetItems()) {
+    const YAMLMapping* entry = item == nullptr ? nullptr : item->AsMapping();
+    if (Field(entry, property_path) == NameKey()) return TextOf(Field(entry, value_key));
+  }
+  return {};
+}
+
+}  // namespace
+
+const YAMLScalar* LocalReference(const YAMLNode* value) {
+  const YAMLMapping* reference = value == nullptr ? nullptr : value->AsMapping();
+  const YAMLNode* file_id = Field(reference, YAMLScalar::fileID);
+  // With a "guid" it leads into another file.
+  if (file_id == nullptr || Field(reference, YAMLScalar::guid) != nullptr) return nullptr;
+  return IsNullReference(file_id->AsScalar()) ? nullptr : file_id->AsScalar();
+}
+
+const YAMLMapping* ObjectNames::Body(const YAMLScalar* file_id) const {
+  for (const VexelObjects* version : versions_) {
+    const YAMLMapping* object = GetSubmapping(*version, file_id);
+    if (object != nullptr && !object->HasDuplicateKeys()) return GetSubmapping(*object, object->FirstKey());
+  }
+  return nullptr;
+}
+
+std::string ObjectNames::GetClass(const YAMLScalar* file_id) const {
+  for (const VexelObjects* version : versions_) {
+    const YAMLMapping* object = GetSubmapping(*version, file_id);
+    if (object == nullptr || object->HasDuplicateKeys()) continue;
+    const YAMLScalar* key = object->FirstKey();
+    return key->IsPseudoKey() ? std::string() : key->GetText();
+  }
+  return {};
+}
+
+std::string ObjectNames::GetOwnName(const YAMLScalar* file_id) const {
+  const YAMLMapping* body = Body(file_id);
+  const std::string name = TextOf(Field(body, NameKey()));
+  return name.empty() ? ModifiedName(body) : name;
+}
+
+std::string ObjectNames::GetOwnerName(const YAMLScalar* file_id) const {
+  const YAMLScalar* game_object = ReferenceAt(Body(file_id), YAMLScalar::mGameObject);
+  if (game_object != nullptr) return GetOwnName(game_object);
+  // What a prefab instance brings along names no game object of this file.
+  const YAMLScalar* instance = ReferenceAt(Body(file_id), YAMLScalar::mPrefabInstance);
+  return instance == nullptr ? std::string() : GetOwnName(instance);
+}
+
+// The elements of "m_Component" are mappings of one entry, whatever its name, around a reference.
+const YAMLScalar* ObjectNames::TransformOf(const YAMLScalar* game_object) const {
+  const YAMLNode* components = Field(Body(game_object), YAMLScalar::mComponent);
+  if (components == nullptr || components->AsSequence() == nullptr) return nullptr;
+  for (const YAMLNode* item : components->AsSequence()->GetItems()) {
+    const YAMLMapping* entry = item == nullptr ? nullptr : item->AsMapping();
+    if (entry == nullptr || entry->HasDuplicateKeys() || entry->Size() != 1) continue;
+    const YAMLScalar* component = LocalReference(entry->First());
+    if (component == nullptr) continue;
+    if (IsTransform(GetClass(component))) return component;
+  }
+  return nullptr;
+}
+
+const YAMLScalar* ObjectNames::ParentOf(const YAMLScalar* transform) const {
+  const YAMLMapping* body = Body(transform);
+  if (Field(body, YAMLScalar::mFather) != nullptr) return ReferenceAt(body, YAMLScalar::mFather);
+  const YAMLScalar* instance = ReferenceAt(body, YAMLScalar::mPrefabInstance);
+  const YAMLMapping* prefab = instance == nullptr ? body : Body(instance);
+  return ReferenceAt(Modification(prefab), YAMLScalar::mTransformParent);
+}
+
+std::string ObjectNames::TransformPath(const YAMLScalar* transform) const {
+  std::vector<std::string> names;
+  std::unordered_set<const YAMLScalar*> seen;
+  for (; transform != nullptr && seen.insert(transform).second; transform = ParentOf(transform)) {
+    std::string name = GetOwnName(transform);
+    if (name.empty()) name = GetOwnerName(transform);
+    if (name.empty()) break;
+    if (names.size() == kMostNames) {
+      names.emplace_back("...");
+      break;
+    }
+    names.push_back(std::move(name));
+  }
+  std::ranges::reverse(names);
+  std::string path;
+  for (const std::string& name : names) {
+    if (!path.empty()) path += '/';
+    path += name;
+  }
+  return path;
+}
+
+std::string ObjectNames::FindPath(const YAMLScalar* file_id) const {
+  const YAMLMapping* body = Body(file_id);
+  const YAMLScalar* game_object = ReferenceAt(body, YAMLScalar::mGameObject);
+  if (game_object == nullptr && GetClass(file_id) == YAMLScalar::gameObject->GetText()) game_object = file_id;
+  const YAMLScalar* transform = game_object == nullptr ? file_id : TransformOf(game_object);
+  std::string path = transform == nullptr ? std::string() : TransformPath(transform);
+  if (!path.empty()) return path;
+  return GetOwnName(game_object == nullptr ? file_id : game_object);
+}
+
+const std::string& ObjectNames::GetPath(const YAMLScalar* file_id) {
+  const auto [entry, is_new] = paths_.try_emplace(file_id);
+  if (is_new) entry->second = FindPath(file_id);
+  return entry->second;
+}
+
+std::string ObjectNames::Describe(const YAMLScalar* file_id) {
+  std::string name = GetClass(file_id);
+  const std::string& path = GetPath(file_id);
+  if (path.empty()) return name;
+  return name == "GameObject" || IsTransform(name) ? path : name + " of " + path;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,181 @@
+#include "report/report_command.h"
+
+#include <filesystem>
+#include <fstream>
+#include <iostream>
+#include <sstream>
+
+#include "platform/error_channel.h"
+#include "platform/file_replacement.h"
+#include "platform/files.h"
+#include "platform/temporary_files.h"
+#include "report/merged_files.h"
+#include "report/readable_headers.h"
+#include "report/value_text.h"
+#include "report/write_page.h"
+#include "yaml/yaml_error.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using Record = RecordingConflictResolver::Record;
+
+constexpr std::string_view kUsage =
+    "usage: vexel-merge-report [options] <base> <left> <right>\n"
+    "           writes what a merge of the three files does as a page for the browser\n"
+    "       vexel-merge-report --conflicts [options] <base> <left> <right>\n"
+    "           prints one line a conflict: path, what left did, what right did, between tabs\n"
+    "       vexel-merge-report --text <file>\n"
+    "           prints a scene or prefab with the names of its objects in their header lines\n"
+    "\n"
+    "options: -o FILE         where the page goes (report.html)\n"
+    "         --title TEXT    the page's title\n"
+    "         -i FILE         settle conflicts as FILE says\n"
+    "         --rules FILE    other merge rules than the default ones\n"
+    "         --typeInfo FILE check components, with the type information in FILE\n"
+    "         --version, --help\n";
+
+enum class Mode { kPage, kConflicts, kText };
+
+struct Arguments {
+  Mode mode = Mode::kPage;
+  std::string output = "report.html";
+  std::string title;
+  ReportConfig config;
+  std::string text_file;
+};
+
+int Fail(const std::string& message) {
+  WriteErrorLine(OnOneLine("vexel-merge-report: " + message));
+  return 1;
+}
+
+// Where the value of an option goes, null for what is no option with a value.
+std::string* ValueTarget(std::string_view option, Arguments& parsed) {
+  if (option == "-o") return &parsed.output;
+  if (option == "--title") return &parsed.title;
+  if (option == "-i") return &parsed.config.merge_file;
+  if (option == "--rules") return &parsed.config.rules_file;
+  if (option == "--typeInfo") return &parsed.config.type_info_file;
+  return nullptr;
+}
+
+// Throws std::runtime_error for arguments that make no sense.
+Arguments Parse(const std::vector<std::string>& arguments) {
+  Arguments parsed;
+  size_t index = 0;
+  for (; index < arguments.size(); ++index) {
+    const std::string& argument = arguments[index];
+    if (argument == "--conflicts") {
+      parsed.mode = Mode::kConflicts;
+    } else if (argument == "--text") {
+      parsed.mode = Mode::kText;
+    } else if (std::string* target = ValueTarget(argument, parsed)) {
+      if (++index == arguments.size()) throw std::runtime_error("option " + argument + " needs a value");
+      *target = arguments[index];
+    } else {
+      break;
+    }
+  }
+  ReportConfig& config = parsed.config;
+  std::vector<std::string*> paths = {&config.base_path, &config.left_path, &config.right_path};
+  if (parsed.mode == Mode::kText) paths = {&parsed.text_file};
+  const size_t given = arguments.size() - index;
+  if (given != paths.size()) {
+    if (given > 0 && arguments[index].starts_with('-')) {
+      throw std::runtime_error("unknown option " + arguments[index] + "; see vexel-merge-report --help");
+    }
+    throw std::runtime_error("needs " + std::to_string(paths.size()) +
+                             (paths.size() == 1 ? " path" : " paths") + ", not " + std::to_string(given) +
+                             "; see vexel-merge-report --help");
+  }
+  for (std::string* path : paths) *path = arguments[index++];
+  return parsed;
+}
+
+int PrintText(const std::string& path) {
+  std::ifstream file(VexelToNativePath(path), std::ios::binary);
+  std::ostringstream text;
+  std::error_code error;
+  if (!file || std::filesystem::is_directory(path, error)) return Fail("Cannot open file '" + path + "'");
+  text << file.rdbuf();
+  WriteWithReadableHeaders(std::cout, text.str());
+  return 0;
+}
+
+std::string SideText(const Record& record, const Operation* operation, bool is_left) {
+  const std::string_view dependency = DependencyText(record);
+  if (!dependency.empty()) return IsLeftType(record.type) == is_left ? std::string(dependency) : "-";
+  if (record.type == ConflictType::kTransformCycle) return "parents in a circle, broken here";
+  return operation == nullptr ? "-" : OperationText(*operation);
+}
+
+void PrintConflicts(const RecordingConflictResolver& resolver) {
+  for (const Record& record : resolver.GetRecords()) {
+    if (record.resolution != MergeResolve::kConflict) continue;
+    std::cout << OnOneLine(PathToString(record.path)) << '\t' << SideText(record, record.left, true) << '\t'
+              << SideText(record, record.right, false) << '\n';
+  }
+}
+
+void WritePageFile(const Arguments& arguments, const MergedFiles& files) {
+  const ReportConfig& config = arguments.config;
+  const std::string title = arguments.title.empty() ? "Merge report" : arguments.title;
+  const TempFilesGuard guard;
+  FileReplacement file(VexelToNativePath(arguments.output));
+  WritePage(file.Stream(), {title, config.base_path, config.left_path, config.right_path, files.error},
+            CollectReport(files));
+  file.Commit();
+}
+
+// Kept until the process ends: giving three scenes back node by node takes longer than reporting on them.
+MergedFiles& NewMergedFiles() {
+  static auto& kept = *new std::vector<std::unique_ptr<MergedFiles>>;
+  return *kept.emplace_back(std::make_unique<MergedFiles>());
+}
+
+int Report(const Arguments& arguments) {
+  MergedFiles& files = NewMergedFiles();
+  const std::string prefix = "Cannot merge file '" + arguments.config.base_path + "': ";
+  try {
+    MergeForReport(arguments.config, files);
+    if (arguments.mode == Mode::kPage) {
+      WritePageFile(arguments, files);
+    } else if (!files.error.empty()) {
+      throw YAMLError(files.error);
+    } else {
+      PrintConflicts(files.resolver);
+    }
+  } catch (const FileError& error) {
+    return Fail(error.what());
+  } catch (const YAMLError& error) {
+    return Fail(prefix + error.what());
+  } catch (const std::exception& error) {
+    return Fail(prefix + error.what());
+  }
+  return 0;
+}
+
+}  // namespace
+
+int RunReport(const std::vector<std::string>& arguments) {
+  initialize();
+  if (arguments.size() == 1 && arguments.front() == "--version") {
+    std::cout << "vexel-merge-report " VEXEL_VERSION "\n";
+    return 0;
+  }
+  if (arguments.size() == 1 && arguments.front() == "--help") {
+    std::cout << kUsage;
+    return 0;
+  }
+  Arguments parsed;
+  try {
+    parsed = Parse(arguments);
+  } catch (const std::exception& error) {
+    return Fail(error.what());
+  }
+  return parsed.mode == Mode::kText ? PrintText(parsed.text_file) : Report(parsed);
+}
+
+}  // namespace vexel_yaml

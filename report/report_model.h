@@ -1,0 +1,64 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "report/merged_files.h"
+
+namespace vexel_yaml {
+
+/// What stands at one place in one version, or what was done there.
+struct ReportCell {
+  /// kEdited: only parts of it changed, and the text says which.
+  enum class Kind { kUnchanged, kChanged, kEdited, kAdded, kRemoved };
+
+  Kind kind = Kind::kUnchanged;
+  /// A short text, which may have several lines.
+  std::string text;
+  /// The whole text where `text` is only the start of it, else empty.
+  std::string full;
+
+  bool operator==(const ReportCell&) const = default;
+};
+
+/// One place in an object.
+struct ReportRow {
+  /// From the file ID on; elements of lists go by their index in base. The file ID alone is the whole object.
+  FieldPath path;
+  ReportCell base;
+  ReportCell left;
+  ReportCell right;
+  ReportCell result;
+  /// What became of it, in a word or two; empty where the merge failed.
+  std::string_view state;
+  /// Whether the conflict still waits for somebody, and under which path it is settled.
+  bool pending = false;
+  std::string record_path;
+  bool repaired = false;
+  std::string note;
+};
+
+/// An object that somebody changed, or that the merge is in trouble with.
+struct ReportObject {
+  const YAMLScalar* file_id;
+  std::string class_name;
+  std::string path;
+  bool left = false;
+  bool right = false;
+  bool added = false;
+  bool changed = false;
+  bool removed = false;
+  bool pending = false;
+  bool repaired = false;
+  std::vector<ReportRow> rows;
+};
+
+/// Everything a merge did, object by object: those with conflicts first, then by their names.
+std::vector<ReportObject> CollectReport(const MergedFiles& files);
+
+/// Why a record is about components that need or exclude one another, from its side's point of view; empty
+/// for other records.
+std::string_view DependencyText(const RecordingConflictResolver::Record& record);
+
+}  // namespace vexel_yaml

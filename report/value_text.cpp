@@ -1,0 +1,157 @@
+#include "report/value_text.h"
+
+#include <algorithm>
+#include <sstream>
+
+#include "diff/yaml_diff_output.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+constexpr size_t kMostOfOperation = 60;
+
+bool IsContinuation(char byte) { return (static_cast<unsigned char>(byte) & 0xC0) == 0x80; }
+
+bool IsControl(std::string_view character) {
+  const auto byte = static_cast<unsigned char>(character.front());
+  // U+0080 to U+009F are control characters, too.
+  return byte < 0x20 || byte == 0x7F || (byte == 0xC2 && static_cast<unsigned char>(character[1]) < 0xA0);
+}
+
+// The number of bytes of the UTF-8 character that `text` starts with, 0 where it starts with none.
+size_t CharacterLength(std::string_view text) {
+  const auto first = static_cast<unsigned char>(text.front());
+  if (first < 0x80) return 1;
+  const size_t length = first < 0xC2 ? 0 : first < 0xE0 ? 2 : first < 0xF0 ? 3 : first < 0xF5 ? 4 : 0;
+  if (length == 0 || text.size() < length) return 0;
+  for (size_t i = 1; i < length; ++i) {
+    if (!IsContinuation(text[i])) return 0;
+  }
+  const auto second = static_cast<unsigned char>(text[1]);
+  const bool overlong = (first == 0xE0 && second < 0xA0) || (first == 0xF0 && second < 0x90);
+  const bool surrogate = first == 0xED && second >= 0xA0;
+  const bool too_large = first == 0xF4 && second >= 0x90;
+  return overlong || surrogate || too_large ? 0 : length;
+}
+
+template <typename Control>
+std::string Decoded(std::string_view text, Control on_control) {
+  std::string result;
+  result.reserve(text.size());
+  while (!text.empty()) {
+    const size_t length = CharacterLength(text);
+    const std::string_view character = text.substr(0, std::max<size_t>(length, 1));
+    text.remove_prefix(character.size());
+    if (length == 0) {
+      result += "\uFFFD";
+    } else if (IsControl(character)) {
+      on_control(character, result);
+    } else {
+      result += character;
+    }
+  }
+  return result;
+}
+
+// Writes a value until there is enough of it.
+class ValueWriter {
+ public:
+  ValueWriter(ObjectNames& names, size_t most) : names_(names), most_(most) {}
+
+  void Write(const YAMLNode* value) {
+    if (value == nullptr || text_.size() > most_) return;
+    if (const YAMLScalar* scalar = value->AsScalar()) {
+      text_ += scalar == YAMLScalar::empty ? "\"\"" : scalar->GetText();
+    } else if (const YAMLSequence* sequence = value->AsSequence()) {
+      WriteSequence(*sequence);
+    } else {
+      WriteMapping(*value->AsMapping());
+    }
+  }
+
+  const std::string& GetText() const { return text_; }
+
+ private:
+  void WriteSequence(const YAMLSequence& sequence) {
+    text_ += '[';
+    std::string_view separator;
+    for (const YAMLNode* item : sequence.GetItems()) {
+      if (item == nullptr) continue;
+      text_ += separator;
+      Write(item);
+      separator = ", ";
+      if (text_.size() > most_) return;
+    }
+    text_ += ']';
+  }
+
+  void WriteMapping(const YAMLMapping& mapping) {
+    text_ += '{';
+    std::string_view separator;
+    const auto write = [&](const YAMLMapping::Slot& slot) {
+      if (text_.size() > most_) return;
+      text_ += separator;
+      text_ += slot.key->GetText();
+      text_ += ": ";
+      Write(slot.value);
+      separator = ", ";
+    };
+    if (mapping.HasDuplicateKeys()) {
+      for (const YAMLMapping::Slot& slot : mapping.GetDuplicatePairs()) write(slot);
+    } else {
+      for (const YAMLMapping::Slot& slot : mapping) write(slot);
+    }
+    text_ += '}';
+    const YAMLScalar* target = LocalReference(&mapping);
+    const std::string name = target == nullptr ? std::string() : names_.Describe(target);
+    if (!name.empty()) text_ += " " + name;
+  }
+
+  ObjectNames& names_;
+  size_t most_;
+  std::string text_;
+};
+
+}  // namespace
+
+std::string Shortened(std::string_view text, size_t most) {
+  if (text.size() <= most) return std::string(text);
+  size_t end = most - kEllipsis.size();
+  while (end > 0 && IsContinuation(text[end])) --end;
+  return std::string(text.substr(0, end)) + std::string(kEllipsis);
+}
+
+std::string OnOneLine(std::string_view text) {
+  std::string line = Decoded(text, [](std::string_view, std::string& result) { result += ' '; });
+  const auto repeated = [](char a, char b) { return a == ' ' && b == ' '; };
+  line.erase(std::unique(line.begin(), line.end(), repeated), line.end());
+  if (line.starts_with(' ')) line.erase(0, 1);
+  if (line.ends_with(' ')) line.pop_back();
+  return line;
+}
+
+std::string Cleaned(std::string_view text) {
+  return Decoded(text, [](std::string_view character, std::string& result) {
+    if (character == "\t" || character == "\n") {
+      result += character;
+    } else if (character != "\r") {
+      result += "\uFFFD";
+    }
+  });
+}
+
+std::string ValueText(const YAMLNode* value, ObjectNames& names, size_t most) {
+  ValueWriter writer(names, most);
+  writer.Write(value);
+  return Shortened(writer.GetText(), most);
+}
+
+std::string OperationText(const Operation& operation) {
+  std::ostringstream text;
+  YAMLDiffOutput out(text, 1);
+  operation.Output(out);
+  return Shortened(OnOneLine(text.view()), kMostOfOperation);
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,31 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+
+#include "diff/operation.h"
+#include "report/object_names.h"
+
+namespace vexel_yaml {
+
+/// What a shortened text ends with.
+inline constexpr std::string_view kEllipsis = "...";
+
+/// The text, cut between two characters and ended with kEllipsis where it is longer than `most` bytes.
+std::string Shortened(std::string_view text, size_t most);
+
+/// The text with blanks for control characters and line breaks, U+FFFD for what is not UTF-8. Several blanks
+/// in a row become one.
+std::string OnOneLine(std::string_view text);
+
+/// The text with U+FFFD for what is not UTF-8 and for control characters other than tabs and line breaks.
+std::string Cleaned(std::string_view text);
+
+/// A value as it could stand in a file, on one line; the name of the object stands beside a reference to it.
+/// Shortened as by Shortened. A null pointer is nothing.
+std::string ValueText(const YAMLNode* value, ObjectNames& names, size_t most);
+
+/// What an operation does, on one line of about 60 bytes at most.
+std::string OperationText(const Operation& operation);
+
+}  // namespace vexel_yaml

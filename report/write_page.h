@@ -1,0 +1,23 @@
+#pragma once
+
+#include <ostream>
+
+#include "report/report_model.h"
+
+namespace vexel_yaml {
+
+/// What stands above the objects.
+struct PageHead {
+  std::string title;
+  std::string base_path;
+  std::string left_path;
+  std::string right_path;
+  /// Why the merge failed; empty where it didn't.
+  std::string error;
+};
+
+/// Writes one HTML page that needs no other file and no network. Texts may come from strangers: none of them
+/// can become markup, style or script.
+void WritePage(std::ostream& out, const PageHead& head, const std::vector<ReportObject>& objects);
+
+}  // namespace vexel_yaml
