@@ -1,111 +1,138 @@
 #!/usr/bin/env bash
-# Runs the program as git and Subversion run it, with the set-up that README.md tells its readers to make:
+# Runs the programs as git runs them, set up by vexel-merge-git, in a repository of its own:
 #   git_end_to_end.sh PROGRAM
 set -euo pipefail
+# shellcheck source=tests/support/end_to_end.sh
+source "$(dirname "${BASH_SOURCE[0]}")/support/end_to_end.sh"
 
-program="$(cd "$(dirname "$1")" && pwd)/$(basename "$1")"
-project="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-work="$(mktemp -d)"
-trap 'rm -rf "$work"' EXIT
+file="Assets/Küche/Main Scene.vexel"
+record="$file.vexel-conflicts"
 
-# Nothing of the user's own set-up may decide here, least of all a merge tool that opens a window.
-for name in $(compgen -e GIT_ || true) SVN_MERGE; do unset "$name"; done
-export HOME="$work/home" GIT_CONFIG_NOSYSTEM=1 PATH="${program%/*}:$PATH"
-export GIT_AUTHOR_NAME=Test GIT_AUTHOR_EMAIL=test@localhost GIT_COMMITTER_NAME=Test GIT_COMMITTER_EMAIL=test@localhost
-mkdir "$HOME"
-
-failures=0
-check() { # check WHAT COMMAND...
-  if ! "${@:2}"; then
-    echo "FAILED: $1" >&2
-    failures=$((failures + 1))
-  fi
-}
-refuses() { ! "$@"; }
-has_line() { grep -qFx "  $2" "$1"; }
-
-# scene INTENSITY RANGE: the two values stand on neighbouring lines, where a textual merge gives up.
-scene() {
-  cat <<SCENE
-%YAML 1.1
-%TAG !v! tag:vexel.com,2011:
---- !v!1 &10
-GameObject:
-  m_Component:
-  - component: {fileID: 11}
-  m_Name: Lamp
---- !v!108 &11
-Light:
-  m_GameObject: {fileID: 10}
-  m_Intensity: $1
-  m_Range: $2
-SCENE
-}
-
-# A blank in the path, because the driver's command line passes through a shell.
-file="Assets/Main Scene.vexel"
-record=".git/vexel-conflicts/$file"
-
-commit() { # commit BRANCH INTENSITY RANGE, on top of "start" unless the branch exists
-  git checkout -q "$1" 2>/dev/null || git checkout -q -b "$1" start
+commit() { # commit BRANCH INTENSITY RANGE, on top of "start"
+  git checkout -q -b "$1" start
   scene "$2" "$3" >"$file"
   git commit -q -a -m "$1"
 }
+# merge_darker: into "brighter", which has changed the same value, so that one conflict is left.
+merge_darker() { git checkout -q brighter && refuses git merge -q --no-edit darker >"$work/out" 2>"$work/err"; }
+is_unmerged() { [ "$(git status --porcelain | cut -c 1-2)" = UU ]; }
+# Nothing is left of us but what the repository had before.
+has_no_record() { [ ! -e "$record" ] && [ ! -e .git/vexel-merge-records ] && [ ! -e .git/hooks/post-index-change ]; }
+value_is() { grep -qFx "  m_Intensity: $1" "$file"; }
 
 mkdir "$work/repository" && cd "$work/repository"
-git init -q
-# The lines as they stand in the README.
-grep '^git config merge\.vexel\.' "$project/README.md" >"$work/setup"
-check "the README configures a name and a driver" test "$(wc -l <"$work/setup")" -eq 2
-source "$work/setup"
-check "integrations/git/gitconfig and the README have the same driver" test \
-  "$(git config merge.vexel.driver)" = "$(git config -f "$project/integrations/git/gitconfig" merge.vexel.driver)"
-grep ' merge=vexel$' "$project/README.md" >.gitattributes
-mkdir Assets
+git init -q -b main
+# Not ours, and not to be touched: a driver of that name, an attribute line without an end.
+git config merge.vexel.driver "something else"
+printf '*.png binary' >.gitattributes
+cp .git/config "$work/config"
+cp .gitattributes "$work/attributes"
+cp .git/info/exclude "$work/exclude"
+
+check "without a set-up the status is 1" refuses vexel-merge-git status >/dev/null
+vexel-merge-git enable --patterns '*.vexel' >/dev/null
+cp .git/config "$work/enabled"
+cp .gitattributes "$work/enabled-attributes"
+check "the set-up is complete" vexel-merge-git status >"$work/status"
+check "the status names the version" grep -q '^program  *VexelYAMLMerge [0-9.]* (' "$work/status"
+vexel-merge-git enable >/dev/null
+check "a second time changes no setting" cmp -s .git/config "$work/enabled"
+check "a second time changes no attribute" cmp -s .gitattributes "$work/enabled-attributes"
+check "foreign attributes stay" test "$(git check-attr binary x.png)" = "x.png: binary: set"
+vexel-merge-git disable >/dev/null
+check "the configuration is restored" diff <(git config -f "$work/config" -l | sort) <(git config --local -l | sort)
+check "the attributes are restored" cmp .gitattributes "$work/attributes"
+check "the excluded files are restored" cmp .git/info/exclude "$work/exclude"
+check "no state is left" test ! -e .git/vexel-merge
+
+git config --unset merge.vexel.driver
+# For all repositories: the only set-up that writes outside of this one.
+vexel-merge-git enable --global >/dev/null
+check "a global set-up is found" vexel-merge-git status >/dev/null
+check "it gives us the three kinds of files" test "$(git check-attr merge x.prefab)" = "x.prefab: merge: vexel"
+vexel-merge-git disable --global >/dev/null
+check "nothing of it is left" test -z "$(find "$HOME" -type f -size +0)"
+
+vexel-merge-git enable >/dev/null
+mkdir -p "${file%/*}"
 scene 2 10 >"$file"
 git add -A && git commit -q -m base && git branch start
-
 commit brighter 5 10
 commit wider 2 40
 commit darker 1 10
 
+check "git log shows whose value was changed" grep -qx '@@.*@@ GameObject &10 "Lamp"' <(git log -p -1 brighter)
+check "git diff names the object in its lines" grep -qx ' --- Light &11 of "Lamp"' <(git diff start brighter)
+
 git checkout -q -b merged brighter
 check "a merge without conflict succeeds" git merge -q --no-edit wider
-check "it has ours" has_line "$file" "m_Intensity: 5"
-check "it has theirs" has_line "$file" "m_Range: 40"
+check "it has both values" cmp "$file" <(scene 5 40)
 check "it leaves a clean work tree" test -z "$(git status --porcelain)"
-
-git checkout -q -b conflicting brighter
-check "a merge with a conflict fails" refuses git merge -q --no-edit darker >/dev/null
-check "the file is unmerged" test "$(git status --porcelain)" = "UU \"$file\""
-check "its three versions are in the index" test "$(git ls-files -u | wc -l)" -eq 3
-check "the file can still be opened by the engine" refuses grep -q '^<<<<<<<' "$file"
-check "the record names the place" grep -qF "Left  11.Light.m_Intensity" "$record"
-git merge --abort
-
 git checkout -q -b rebased wider
 check "a rebase succeeds" git rebase -q brighter
-check "the rebased file is the merged one" cmp -s "$file" <(git show "merged:$file")
-
+check "the rebased file is the merged one" cmp -s "$file" <(scene 5 40)
 git checkout -q -b picked brighter
 check "a cherry-pick succeeds" git cherry-pick wider >/dev/null
-check "the file is the merged one after it" cmp -s "$file" <(git show "merged:$file")
+check "the file is the merged one after it" cmp -s "$file" <(scene 5 40)
 
-# Subversion: an update meets a textual conflict and starts the tool with its five paths.
-mkdir -p "$HOME/.subversion" && cp "$project/integrations/subversion/config" "$HOME/.subversion/config"
-svn_file="Main Scene.vexel"
-svnadmin create "$work/svn"
-svn checkout -q "file://$work/svn" "$work/mine"
-scene 2 10 >"$work/mine/$svn_file"
-svn add -q "$work/mine/$svn_file" && svn commit -q -m base "$work/mine"
-svn checkout -q "file://$work/svn" "$work/theirs"
-scene 2 40 >"$work/theirs/$svn_file" && svn commit -q -m wider "$work/theirs"
-scene 5 10 >"$work/mine/$svn_file"
-check "svn update starts the merge" svn update --force-interactive --accept=launch "$work/mine" \
-  </dev/null >"$work/svn.log" 2>&1
-check "Subversion sees a modified file and no conflict" test "$(svn status "$work/mine")" = "M       $work/mine/$svn_file"
-check "the file has mine" has_line "$work/mine/$svn_file" "m_Intensity: 5"
-check "the file has theirs" has_line "$work/mine/$svn_file" "m_Range: 40"
+check "a conflict stops the merge" merge_darker
+check "the file is unmerged, and the record isn't seen" is_unmerged
+check "it can still be opened by the engine" cmp "$file" <(scene 2 10)
+check "git's messages name the place" grep -qF "$file: 11.Light.m_Intensity: left change to 1, right change to 5" "$work/err"
+check "the record names it, too" grep -qF "Left  11.Light.m_Intensity change to 1" "$record"
+git merge --abort
+check "an aborted merge leaves no record" has_no_record
 
-[[ "$failures" -eq 0 ]] || cat "$work/svn.log" >&2
-[[ "$failures" -eq 0 ]] && echo "git and Subversion merge through the driver"
+check "the conflict comes again" merge_darker
+check "an editor that changes nothing settles nothing" refuses env GIT_EDITOR=true vexel-merge-git resolve "$file" 2>/dev/null
+check "the file is still unmerged" is_unmerged
+check "a mistake is named with its line" refuses env GIT_EDITOR="sed -i 's/^# left.right.base/up/'" \
+  vexel-merge-git resolve "$file" 2>"$work/err"
+check "in the record's own name" grep -q "$file.*'up'.* on line " "$work/err"
+cd Assets
+check "the editor's choice is merged" env GIT_EDITOR="sed -i 's/^up/right/'" vexel-merge-git resolve . >/dev/null
+cd ..
+check "it is right's value" value_is 5
+check "and staged" test -z "$(git ls-files -u)"
+check "the record is gone" has_no_record
+check "there is nothing to resolve again" refuses vexel-merge-git resolve "$file" 2>/dev/null
+git reset -q --hard
+
+merge_darker
+check "a pattern that fits nothing is an error" refuses vexel-merge-git resolve --left --path '*.Light.m_Range' "$file" 2>/dev/null
+check "a pattern settles what it fits" vexel-merge-git resolve --left --path '*.Light.m_Intensity' "$file" >/dev/null
+check "it is left's value" value_is 1
+git reset -q --hard
+
+# Edited by hand since the merge: not to be lost, but to be added as it is.
+merge_darker
+scene 3 10 >"$file"
+check "edits since the merge are not overwritten" refuses vexel-merge-git resolve --left "$file" 2>/dev/null
+check "they are still there" value_is 3
+git add "$file"
+check "adding the file removes the record" has_no_record
+git reset -q --hard
+
+merge_darker
+check "the page of a conflict is made" vexel-merge-git report >"$work/pages"
+check "it shows the conflict" grep -q 'data-kinds="[a-z ]*conflict' "$(cat "$work/pages")"
+check "git mergetool merges with the record" env GIT_EDITOR="sed -i 's/^# left.right.base/base/'" \
+  git -c mergetool.keepBackup=false mergetool -y -t vexel >/dev/null 2>&1
+check "it is base's value" value_is 2
+check "nothing is left of it" has_no_record
+git commit -q -m "Merge darker"
+check "the page of a merge commit is made" vexel-merge-git report -o "$work/page.html" HEAD -- "$file" >/dev/null
+check "it names the file" grep -qF "Main Scene.vexel" "$work/page.html"
+check "a commit with one parent has no page" refuses vexel-merge-git report HEAD~ 2>/dev/null
+
+# A file that nobody can read stays as ours has it, and in conflict.
+git checkout -q -b broken start
+printf '%%YAML 1.1\n--- !v!1 &1\nA: [\n' >"$file" && git commit -q -a -m broken
+git checkout -q wider
+check "what can't be read can't be merged" refuses git merge -q --no-edit broken >"$work/out" 2>"$work/err"
+check "the error names the file" grep -qF "Cannot merge file '$file'" "$work/err"
+check "ours is untouched" cmp -s "$file" <(scene 2 40)
+check "there is no record of it" has_no_record
+check "and its diff can be shown" grep -qF 'A: [' <(git diff start broken)
+
+end_of_checks "git merges through vexel-merge-git"

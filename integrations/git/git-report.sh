@@ -1,0 +1,106 @@
+# The pages that vexel-merge-git report makes with vexel-merge-report.
+
+report() {
+  page='' page_shown='' commit=''
+  while [ $# -gt 0 ]; do
+    case $1 in
+      -o)
+        [ $# -gt 1 ] || wrong_usage "-o needs a value"
+        page=$2
+        shift
+        ;;
+      --) break ;;
+      -*) wrong_usage "unknown option '$1'" ;;
+      *)
+        [ -z "$commit" ] || wrong_usage "paths stand behind --"
+        commit=$1
+        ;;
+    esac
+    shift
+  done
+  if [ "${1-}" = -- ]; then shift; fi
+  # Before the folder changes, from which the user's paths count.
+  page_shown=$page
+  case $page in
+    '' | /*) ;;
+    *) page=$(pwd)/$page ;;
+  esac
+  make_scratch
+  if [ -n "$commit" ]; then
+    list_merged "$commit" "$@"
+    write_versions=write_merged_versions
+  else
+    list_unmerged "$@"
+    write_versions=write_stages
+  fi
+  report_listed
+}
+
+list_unmerged() {
+  unmerged_assets "$@" >"$scratch/all"
+  nothing="no file of ours is in conflict; name a merge commit"
+  go_to_top
+}
+
+# list_merged COMMIT PATH...: the files that both parents have changed, or those that are named.
+list_merged() {
+  set -- "$@"
+  commit=$(git rev-parse --verify --quiet "$1^{commit}") || die "'$1' is not a commit"
+  nothing="no file of ours was changed on both sides of $1"
+  parents=$(git rev-list --parents -n 1 "$commit")
+  shift
+  ours=$(printf '%s\n' "$parents" | cut -d ' ' -f 2)
+  theirs=$(printf '%s\n' "$parents" | cut -s -d ' ' -f 3)
+  if [ -z "$theirs" ] || [ -n "$(printf '%s\n' "$parents" | cut -s -d ' ' -f 4)" ]; then
+    die "$commit is not a merge of two commits"
+  fi
+  base=$(git merge-base "$ours" "$theirs") || die "the parents of $commit have no common ancestor"
+  changed_since_base "$ours" "$@" >"$scratch/in-ours"
+  changed_since_base "$theirs" "$@" >"$scratch/in-theirs"
+  LC_ALL=C comm -12 "$scratch/in-ours" "$scratch/in-theirs" >"$scratch/all"
+  go_to_top
+}
+
+# changed_since_base COMMIT PATH...
+changed_since_base() {
+  side_commit=$1
+  shift
+  GIT_LITERAL_PATHSPECS=1 git diff --name-only --no-renames -z "$base" "$side_commit" -- "$@" | tr '\0' '\n' | LC_ALL=C sort
+}
+
+write_merged_versions() {
+  for version in "base $base" "left $theirs" "right $ours"; do
+    git cat-file --filters "${version#* }:$1" >"$scratch/${version%% *}" 2>/dev/null ||
+      { echo "$1: not in all three versions, so there is nothing to compare" >&2; return 1; }
+  done
+}
+
+report_listed() {
+  while read -r path; do
+    if is_ours "$path"; then printf '%s\n' "$path"; fi
+  done <"$scratch/all" >"$scratch/assets"
+  if [ ! -s "$scratch/assets" ]; then die "$nothing"; fi
+  if [ -n "$page" ] && [ "$(wc -l <"$scratch/assets")" -gt 1 ]; then die "-o takes one file's page; name its path behind --"; fi
+  outcome=0
+  while read -r asset; do
+    report_asset || outcome=1
+  done <"$scratch/assets"
+  return "$outcome"
+}
+
+# Prints where the page of $asset is.
+report_asset() {
+  "$write_versions" "$asset" || return 1
+  target=${page:-$(git_path vexel-merge-report)/$asset.html}
+  mkdir -p "$(dirname "$target")" || return 1
+  case $target in
+    /*) ;;
+    *) target=$(pwd)/$target ;;
+  esac
+  set -- -o "$target" --title "$asset${commit:+, merged in $(git rev-parse --short "$commit")}"
+  # What is settled in the record of the conflict at hand shows as settled.
+  if [ -z "$commit" ] && [ -f "$(record_of "$asset")" ]; then set -- "$@" -i "$(pwd)/$(record_of "$asset")"; fi
+  # From their folder, since the page shows the paths that were given.
+  (cd "$scratch" && "$reporter" "$@" base left right) || return 1
+  printf '%s\n' "${page_shown:-$target}"
+}
