@@ -23,7 +23,7 @@ value_is() { grep -qFx "  m_Intensity: $1" "$file"; }
 mkdir "$work/repository" && cd "$work/repository"
 git init -q -b main
 # Not ours, and not to be touched: a driver of that name, an attribute line without an end.
-git config merge.vexel.driver "something else"
+printf '[merge "vexel"]\n\tdriver = something else  # and why\n' >>.git/config
 printf '*.png binary' >.gitattributes
 cp .git/config "$work/config"
 cp .gitattributes "$work/attributes"
@@ -40,7 +40,7 @@ check "a second time changes no setting" cmp -s .git/config "$work/enabled"
 check "a second time changes no attribute" cmp -s .gitattributes "$work/enabled-attributes"
 check "foreign attributes stay" test "$(git check-attr binary x.png)" = "x.png: binary: set"
 vexel-merge-git disable >/dev/null
-check "the configuration is restored" diff <(git config -f "$work/config" -l | sort) <(git config --local -l | sort)
+check "the configuration is restored" cmp .git/config "$work/config"
 check "the attributes are restored" cmp .gitattributes "$work/attributes"
 check "the excluded files are restored" cmp .git/info/exclude "$work/exclude"
 check "no state is left" test ! -e .git/vexel-merge
@@ -51,7 +51,7 @@ vexel-merge-git enable --global >/dev/null
 check "a global set-up is found" vexel-merge-git status >/dev/null
 check "it gives us the three kinds of files" test "$(git check-attr merge x.prefab)" = "x.prefab: merge: vexel"
 vexel-merge-git disable --global >/dev/null
-check "nothing of it is left" test -z "$(find "$HOME" -type f -size +0)"
+check "nothing of it is left" test -z "$(find "$HOME" -type f)"
 
 vexel-merge-git enable >/dev/null
 mkdir -p "${file%/*}"
@@ -80,6 +80,10 @@ check "the file is unmerged, and the record isn't seen" is_unmerged
 check "it can still be opened by the engine" cmp "$file" <(scene 2 10)
 check "git's messages name the place" grep -qF "$file: 11.Light.m_Intensity: left change to 1, right change to 5" "$work/err"
 check "the record names it, too" grep -qF "Left  11.Light.m_Intensity change to 1" "$record"
+cp "$record" "$work/record"
+git merge-tree --write-tree brighter wider >/dev/null
+GIT_INDEX_FILE="$work/index" git read-tree HEAD
+check "a merge that only looks, or another index, leaves the record alone" cmp "$record" "$work/record"
 git merge --abort
 check "an aborted merge leaves no record" has_no_record
 
@@ -109,6 +113,10 @@ merge_darker
 scene 3 10 >"$file"
 check "edits since the merge are not overwritten" refuses vexel-merge-git resolve --left "$file" 2>/dev/null
 check "they are still there" value_is 3
+git checkout -q -m -- "$file"
+check "nor those made while the editor is open" refuses env GIT_EDITOR="sed -i s/2/3/ '$file' && sed -i 's/^# left.right.base/left/'" \
+  vexel-merge-git resolve "$file" 2>/dev/null
+check "they are there, too" value_is 3
 git add "$file"
 check "adding the file removes the record" has_no_record
 git reset -q --hard
@@ -134,5 +142,30 @@ check "the error names the file" grep -qF "Cannot merge file '$file'" "$work/err
 check "ours is untouched" cmp -s "$file" <(scene 2 40)
 check "there is no record of it" has_no_record
 check "and its diff can be shown" grep -qF 'A: [' <(git diff start broken)
+git reset -q --hard
+
+# The repository's own rules: a light as one unit makes a conflict of the edits that have merged above.
+printf '[exclusions]\nexclude *.Light\n' >"$work/rules" && git config vexel.rules "$work/rules"
+git checkout -q ":/^brighter"
+check "the repository's own rules count" refuses git merge -q --no-edit wider >/dev/null 2>&1
+check "and show in the page" grep -q 'data-kinds="[a-z ]*conflict' "$(vexel-merge-git report)"
+git merge --abort && git config --unset vexel.rules
+
+# What bears our names but isn't in the engine's format is merged as git would do it.
+git checkout -q -b plain wider
+printf '%s\n' guid: 1 2 3 4 5 >A.meta && git add A.meta && git commit -q -m meta && git branch other
+sed -i s/1/6/ A.meta && git commit -q -a -m first
+git checkout -q other && sed -i s/5/7/ A.meta && git commit -q -a -m last
+check "a file that is none of ours is merged as text" git merge -q --no-edit plain
+check "with both edits" test "$(xargs <A.meta)" = "guid: 6 2 3 4 7"
+
+# Two merges of the same branches that decided differently: their common ancestor can't be made, and no side may win.
+for side in one two; do git checkout -q -b "$side" start && scene "${#side}" "$side" >New.vexel && git add . && git commit -q -m "$side"; done
+for side in one two; do
+  git checkout -q -b "kept-$side" "$side"
+  git merge -q --no-edit "$([ "$side" = one ] && echo two || echo one)" >/dev/null 2>&1 || git checkout -q --ours New.vexel
+  git add . && git commit -q -m "kept $side"
+done
+check "two merges that differ don't merge silently" refuses git merge -q --no-edit kept-one >/dev/null 2>&1
 
 end_of_checks "git merges through vexel-merge-git"

@@ -1,15 +1,22 @@
 # The merges that vexel-merge-git makes: the merge driver, the merge tool, and resolve. Functions in round
 # brackets run in a process of their own, so that their variables are theirs.
 
-# merge_into RESULT BASE LEFT RIGHT [OPTIONS...]: leaves the record in $scratch/record, the messages, with the
-# asset's own name for the temporary ones, on standard error. $asset names the asset. Returns the program's status.
-merge_into() (
-  result=$1 base=$2 left=$3 right=$4
-  shift 4
-  status=0
-  "$program" merge -h --force --fallback none -o "$scratch/record" "$@" "$base" "$left" "$right" "$result" \
-    2>"$scratch/messages" || status=$?
-  BASE=$base LEFT=$left RIGHT=$right RECORD=${2-} ASSET=$asset awk '
+# rule_options: --rules and --typeInfo as this repository's configuration has them, quoted. Their paths start from the
+# top folder.
+rule_options() {
+  for option in rules typeInfo; do
+    value=$(git config --type=path --get "vexel.$option") || continue
+    case $value in
+      /*) ;;
+      *) value=$(pwd)/$value ;;
+    esac
+    printf -- '--%s %s ' "$option" "$(quoted "$value")"
+  done
+}
+
+# say_messages BASE LEFT RIGHT [OPTIONS...]: $scratch/messages, with the asset's own name for the temporary ones.
+say_messages() {
+  BASE=$1 LEFT=$2 RIGHT=$3 OPTIONS=$* ASSET=$asset SUFFIX=$record_suffix awk '
     function named(name, as,   at, out) {
       out = ""
       while (name != "" && (at = index($0, name)) > 0) {
@@ -18,21 +25,42 @@ merge_into() (
       }
       $0 = out $0
     }
+    # Of a mistake in the record, whose line is named.
+    index(ENVIRON["OPTIONS"], " -i ") && / specified on line [0-9]+$/ {
+      sub(/^.*Cannot merge file .*\047: /, ENVIRON["ASSET"] ENVIRON["SUFFIX"] ": ")
+    }
     {
-      named(ENVIRON["BASE"], ENVIRON["ASSET"])
-      named(ENVIRON["LEFT"], ENVIRON["ASSET"] " (theirs)")
-      named(ENVIRON["RIGHT"], ENVIRON["ASSET"] " (ours)")
-      named(ENVIRON["RECORD"], ENVIRON["ASSET"] "'"$record_suffix"'")
+      named("\047" ENVIRON["BASE"] "\047", "\047" ENVIRON["ASSET"] "\047")
+      named("\047" ENVIRON["LEFT"] "\047", "\047" ENVIRON["ASSET"] "\047 (theirs)")
+      named("\047" ENVIRON["RIGHT"] "\047", "\047" ENVIRON["ASSET"] "\047 (ours)")
       print
     }' "$scratch/messages" >&2
+}
+
+# merge_into RESULT BASE LEFT RIGHT [-i RECORD]: leaves the record in $scratch/record. Returns the program's status.
+merge_into() (
+  result=$1 base=$2 left=$3 right=$4
+  shift 4
+  if [ ! -s "$base" ]; then
+    complain "both sides have added $asset, so there is no base to merge it with"
+    return 1
+  fi
+  status=0
+  eval "set -- $(rule_options) \"\$@\""
+  "$program" merge -h --force --fallback none -o "$scratch/record" "$@" "$base" "$left" "$right" "$result" \
+    2>"$scratch/messages" || status=$?
+  say_messages "$base" "$left" "$right" "$@"
   return "$status"
 )
 
 # Lists what is pending, a line each, in $scratch/conflicts: path, what left did, what right did.
-list_conflicts() ( # BASE LEFT RIGHT [OPTIONS...]
+list_conflicts() ( # BASE LEFT RIGHT [-i RECORD]
   base=$1 left=$2 right=$3
   shift 3
-  "$reporter" --conflicts "$@" "$base" "$left" "$right" >"$scratch/conflicts"
+  eval "set -- $(rule_options) \"\$@\""
+  if "$reporter" --conflicts "$@" "$base" "$left" "$right" >"$scratch/conflicts" 2>"$scratch/messages"; then return 0; fi
+  say_messages "$base" "$left" "$right" "$@"
+  return 1
 )
 
 count_conflicts() {
@@ -45,6 +73,21 @@ say_conflicts() {
     "$scratch/conflicts" >&2
 }
 
+# is_asset FILE: whether it is in the engine's text format, and not one of its plain .meta files, binary, or a pointer
+# to a file elsewhere.
+is_asset() { [ "$(head -c 5 "$1" | tr -d '\0')" = %YAML ]; }
+
+# Git does what it does without us to files that are none of ours, but bear their names.
+merge_as_text() { # OURS BASE THEIRS MARKER_SIZE
+  git merge-file --marker-size="$4" -L ours -L base -L theirs "$1" "$2" "$3"
+}
+
+# Whether git is about to change the work tree and the index: it has locked that. A merge that only looks, such as
+# those of git merge-tree or git show --remerge-diff, has no use for a record, and must not touch one that is there.
+is_real_merge() {
+  [ "$(git rev-parse --is-inside-work-tree)" = true ] && [ -e "$(git_path index.lock)" ]
+}
+
 # Called by git with three temporary files in the top folder; the second one takes the result.
 merge_driver() {
   is_ancestor=false
@@ -52,41 +95,47 @@ merge_driver() {
     is_ancestor=true
     shift
   fi
-  [ $# -eq 4 ] || wrong_usage "merge-driver is called by git"
-  base=$1 ours=$2 theirs=$3 asset=$4
+  [ $# -eq 5 ] || wrong_usage "merge-driver is called by git"
+  base=$1 ours=$2 theirs=$3 marker_size=$4 asset=$5
+  keeps_records=false
+  if [ "$is_ancestor" = false ] && is_real_merge; then keeps_records=true; fi
+  if ! is_asset "$ours" && ! is_asset "$theirs" && ! is_asset "$base"; then
+    [ "$keeps_records" = false ] || remove_record "$asset"
+    merge_as_text "$ours" "$base" "$theirs" "$marker_size"
+    return
+  fi
   make_scratch
   status=0
-  if [ -s "$base" ]; then
-    merge_into "$scratch/merged" "$base" "$theirs" "$ours" || status=$?
-  else
-    echo "error: both sides have added $asset, so there is no base to merge it with" >&2
-    status=1
-  fi
-  # Without a work tree nobody looks for a record, and an ancestor that git makes up is nobody's file.
-  keeps_records=true
-  if [ "$is_ancestor" = true ] || [ "$(git rev-parse --is-inside-work-tree)" != true ]; then keeps_records=false; fi
+  merge_into "$scratch/merged" "$base" "$theirs" "$ours" || status=$?
   case $status in
     0) [ "$keeps_records" = false ] || remove_record "$asset" ;;
-    2 | 3)
-      if [ "$is_ancestor" = false ]; then
-        # The record has them, too: no reason to lose the merge.
-        list_conflicts "$base" "$theirs" "$ours" || :
-        say_conflicts
-      fi
-      if [ "$keeps_records" = true ]; then
-        leave_record "$asset" "$(hash_of "$asset" "$scratch/merged")"
-        echo "$(count_conflicts), listed in $asset$record_suffix; to settle: vexel-merge-git resolve $(quoted "$asset")" >&2
-      fi
-      ;;
+    2 | 3) [ "$is_ancestor" = true ] || tell_conflicts "$base" "$theirs" "$ours" ;;
     *)
       [ "$keeps_records" = false ] || remove_record "$asset"
-      echo "$asset is not merged: it is left as ours has it" >&2
+      # Ours as the ancestor of both sides would make what theirs did look undone, and drop it.
+      if [ "$is_ancestor" = true ]; then
+        cat "$base" >"$ours"
+      else
+        say "$asset is not merged, but left as ours has it; take it so with 'git add', or theirs with 'git checkout --theirs'"
+      fi
       return "$status"
       ;;
   esac
   # In one step: git takes what stands there, also after a failure.
   mv -f "$scratch/merged" "$ours"
   return "$status"
+}
+
+# tell_conflicts BASE LEFT RIGHT: what the driver says and leaves of them. The merge goes on whatever fails here.
+tell_conflicts() {
+  list_conflicts "$@" || :
+  say_conflicts
+  [ "$keeps_records" = true ] || return 0
+  if leave_record "$asset" "$(hash_of "$asset" "$scratch/merged")"; then
+    say "$(count_conflicts), listed in $asset$record_suffix; to settle: vexel-merge-git resolve $(quoted "$asset")"
+  else
+    complain "cannot write $asset$record_suffix"
+  fi
 }
 
 # make_record BASE LEFT RIGHT: where the asset has none (any more), with nothing settled.
@@ -115,10 +164,20 @@ choose_side() (
       return 1
     }
     fits($1, ENVIRON["PATTERN"]) {print ENVIRON["SIDE"], $1}' "$scratch/conflicts" >"$scratch/chosen"
-  [ -s "$scratch/chosen" ] || { echo "error: no conflict in $asset fits '$2'" >&2; return 1; }
+  [ -s "$scratch/chosen" ] || { complain "no conflict in $asset fits '$2'"; return 1; }
   if lacks_final_newline "$record"; then echo >>"$record"; fi
   cat "$scratch/chosen" >>"$record"
 )
+
+# refuse_edited RECORD: whether somebody has changed the asset since it was merged, with a word about it.
+refuse_edited() {
+  if [ "$force" = true ] || [ ! -e "./$asset" ] || [ "$(hash_of "$asset")" = "$(recorded_hash "$1")" ]; then return 1; fi
+  if grep -q '^<<<<<<< ' "./$asset"; then
+    complain "$asset was merged as text; merge it anew with 'git checkout -m -- $(quoted "$asset")'"
+  else
+    complain "$asset was edited after the merge; 'git add' it as it is, or say --force to lose the edits"
+  fi
+}
 
 # settle RESULT BASE LEFT RIGHT: merges once more, with what the user decides now. Returns 0 where nothing is
 # pending, and then RESULT holds the merge; 2 where something is; 1 after an error.
@@ -126,15 +185,16 @@ settle() (
   result=$1 base=$2 left=$3 right=$4
   record=$(record_of "$asset")
   make_record "$base" "$left" "$right" || return 1
-  if [ "$force" = false ] && [ -e "./$asset" ] && [ "$(hash_of "$asset")" != "$(recorded_hash "$record")" ]; then
-    echo "error: $asset was edited after the merge; 'git add' it as it is, or say --force to lose the edits" >&2
-    return 1
-  fi
+  ! refuse_edited "$record" || return 1
   if [ -n "$side" ]; then
     list_conflicts "$base" "$left" "$right" -i "$record" || return 1
     choose_side "$side" "$conflict_pattern" || return 1
   else
-    edit "$record" || { echo "error: the editor failed; nothing is merged" >&2; return 1; }
+    merged_hash=$(recorded_hash "$record")
+    edit "$record" || { complain "the editor failed; nothing is merged"; return 1; }
+    # Who looks at the scene in the engine while deciding may save it there.
+    [ -n "$(recorded_hash "$record")" ] || echo "# merged: $merged_hash" >>"$record"
+    ! refuse_edited "$record" || return 1
   fi
   status=0
   merge_into "$scratch/merged" "$base" "$left" "$right" -i "$record" || status=$?
@@ -142,6 +202,9 @@ settle() (
     0) replace_file "$result" <"$scratch/merged" ;;
     2 | 3)
       list_conflicts "$base" "$left" "$right" -i "$record" || return 1
+      if [ -n "$side" ] && cut -f 1 "$scratch/conflicts" | sed "s/^/$side /" | grep -qxFf "$scratch/chosen"; then
+        complain "a key with a blank or a dot can't be named in a record: settle that place in the file itself"
+      fi
       return 2
       ;;
     *) return 1 ;;
@@ -161,16 +224,28 @@ mergetool() {
   make_scratch
   status=0
   settle "$4" "$1" "$3" "$2" || status=$?
-  if [ "$status" -eq 2 ]; then
-    leave_record "$asset" "$(recorded_hash "$(record_of "$asset")")"
-    echo "$(count_conflicts) left in $asset" >&2
-  fi
+  case $status in
+    0) remove_record "$asset" ;;
+    2)
+      leave_record "$asset" "$(recorded_hash "$(record_of "$asset")")"
+      say "$(count_conflicts) left in $asset"
+      ;;
+  esac
   return "$status"
 }
 
-# unmerged_assets PATH...: those of our files below the paths that are unmerged, from the top folder, one a line.
-unmerged_assets() {
-  GIT_LITERAL_PATHSPECS=1 git ls-files --unmerged --full-name -z -- "$@" | tr '\0' '\n' | cut -f 2- | LC_ALL=C sort -u
+# unmerged_below PATH...: from the top folder, one a line.
+unmerged_below() {
+  git ls-files --unmerged --full-name -z -- "$@" | tr '\0' '\n' | cut -f 2- | LC_ALL=C sort -u
+}
+
+# named_conflicts PATH: those of ours that somebody means who names a path, from here or, as git prints it, from the top.
+named_conflicts() {
+  for magic in literal 'top,literal'; do
+    named=$(unmerged_below ":($magic)$1" | (go_to_top && ours_among))
+    [ -z "$named" ] || break
+  done
+  [ -z "$named" ] || printf '%s\n' "$named"
 }
 
 # write_stages PATH: as files of the work tree, in which line ends are what the user has set.
@@ -186,11 +261,11 @@ write_stages() {
     git cat-file --filters --path="$1" "$blob" >"$scratch/$version" || return 1
   done <"$scratch/stages"
   if [ ! -f "$scratch/left" ] || [ ! -f "$scratch/right" ]; then
-    echo "error: $1 was removed on one side: 'git add' or 'git rm' it" >&2
+    complain "$1 was removed or renamed on one side: 'git add' or 'git rm' it"
     return 1
   fi
   if [ ! -f "$scratch/base" ]; then
-    echo "error: both sides have added $1: take one with 'git checkout --ours' or '--theirs', then 'git add' it" >&2
+    complain "both sides have added $1: take one with 'git checkout --ours' or '--theirs', then 'git add' it"
     return 1
   fi
 }
@@ -218,41 +293,48 @@ resolve() {
   done
   [ $# -gt 0 ] || wrong_usage "resolve needs a file"
   [ -z "$conflict_pattern" ] || [ -n "$side" ] || wrong_usage "--path goes with --left, --right or --base"
-  for file in "$@"; do
-    [ -n "$(unmerged_assets "$file")" ] || die "$file is not in conflict"
-  done
+  git rev-parse --show-toplevel >/dev/null || exit 128
   make_scratch
-  unmerged_assets "$@" >"$scratch/assets"
-  go_to_top
   outcome=0
+  for file in "$@"; do
+    named_conflicts "$file" >"$scratch/found"
+    [ -s "$scratch/found" ] || { complain "$file is not in conflict, or has no attribute merge=vexel"; outcome=1; }
+    cat "$scratch/found" >>"$scratch/assets"
+  done
+  go_to_top
   # Not on standard input, which is the editor's.
-  while read -r asset <&3; do
+  while IFS= read -r asset <&3; do
     resolve_asset || outcome=1
   done 3<"$scratch/assets"
+  sweep
   return "$outcome"
 }
 
 # Resolves $asset, and stages it if nothing is left.
 resolve_asset() {
-  is_ours "$asset" || { echo "error: $asset is not ours: it has no attribute merge=vexel" >&2; return 1; }
   write_stages "$asset" || return 1
   status=0
   settle "./$asset" "$scratch/base" "$scratch/left" "$scratch/right" || status=$?
   case $status in
     0)
-      GIT_LITERAL_PATHSPECS=1 git add -- "$asset" || return 1
+      stage "$asset" || return 1
       remove_record "$asset"
-      sweep
-      echo "Resolved $asset"
+      printf 'Resolved %s\n' "$asset"
       ;;
     2)
       # What is settled already counts when the rest is settled in the engine.
       replace_file "./$asset" <"$scratch/merged"
-      leave_record "$asset" "$(hash_of "$asset")"
-      echo "$(count_conflicts) left in $asset:" >&2
+      leave_record "$asset" "$(hash_of "$asset")" || complain "cannot write $asset$record_suffix"
+      say "$(count_conflicts) left in $asset:"
       say_conflicts
       return 1
       ;;
     *) return 1 ;;
   esac
+}
+
+# stage PATH: adds it, and gives it the line ends that the user has set for files of the work tree.
+stage() {
+  GIT_LITERAL_PATHSPECS=1 git add -- "$1" || return 1
+  git cat-file --filters ":0:$1" | cmp -s - "./$1" || git checkout-index -f -u -- "$1"
 }

@@ -19,6 +19,7 @@ report() {
     shift
   done
   if [ "${1-}" = -- ]; then shift; fi
+  git rev-parse --show-toplevel >/dev/null || exit 128
   # Before the folder changes, from which the user's paths count.
   page_shown=$page
   case $page in
@@ -31,20 +32,20 @@ report() {
     write_versions=write_merged_versions
   else
     list_unmerged "$@"
-    write_versions=write_stages
+    write_versions=write_unmerged_versions
   fi
   report_listed
 }
 
 list_unmerged() {
-  unmerged_assets "$@" >"$scratch/all"
   nothing="no file of ours is in conflict; name a merge commit"
+  if [ $# -eq 0 ]; then go_to_top; fi
+  unmerged_below "$@" >"$scratch/all"
   go_to_top
 }
 
 # list_merged COMMIT PATH...: the files that both parents have changed, or those that are named.
 list_merged() {
-  set -- "$@"
   commit=$(git rev-parse --verify --quiet "$1^{commit}") || die "'$1' is not a commit"
   nothing="no file of ours was changed on both sides of $1"
   parents=$(git rev-list --parents -n 1 "$commit")
@@ -69,20 +70,30 @@ changed_since_base() {
 }
 
 write_merged_versions() {
-  for version in "base $base" "left $theirs" "right $ours"; do
-    git cat-file --filters "${version#* }:$1" >"$scratch/${version%% *}" 2>/dev/null ||
-      { echo "$1: not in all three versions, so there is nothing to compare" >&2; return 1; }
-  done
+  base_file="base $(git rev-parse --short "$base")"
+  left_file="left $(git rev-parse --short "$theirs")"
+  right_file="right $(git rev-parse --short "$ours")"
+  if version "$base:$1" "$base_file" && version "$theirs:$1" "$left_file" && version "$ours:$1" "$right_file"; then
+    return 0
+  fi
+  say "$1: not in all three versions, so there is nothing to compare"
+  return 1
+}
+version() { git cat-file --filters "$1" >"$scratch/$2" 2>/dev/null; }
+
+write_unmerged_versions() {
+  base_file=base left_file=left right_file=right
+  write_stages "$1"
 }
 
 report_listed() {
-  while read -r path; do
-    if is_ours "$path"; then printf '%s\n' "$path"; fi
-  done <"$scratch/all" >"$scratch/assets"
+  ours_among <"$scratch/all" >"$scratch/assets"
   if [ ! -s "$scratch/assets" ]; then die "$nothing"; fi
-  if [ -n "$page" ] && [ "$(wc -l <"$scratch/assets")" -gt 1 ]; then die "-o takes one file's page; name its path behind --"; fi
+  if [ -n "$page" ] && [ "$(wc -l <"$scratch/assets")" -gt 1 ]; then
+    die "-o takes one file's page; name its path behind --"
+  fi
   outcome=0
-  while read -r asset; do
+  while IFS= read -r asset; do
     report_asset || outcome=1
   done <"$scratch/assets"
   return "$outcome"
@@ -91,16 +102,25 @@ report_listed() {
 # Prints where the page of $asset is.
 report_asset() {
   "$write_versions" "$asset" || return 1
-  target=${page:-$(git_path vexel-merge-report)/$asset.html}
-  mkdir -p "$(dirname "$target")" || return 1
+  target=$page
+  if [ -z "$target" ]; then
+    target=$(git_path vexel-merge-report)/$asset.html
+    mkdir -p "$(dirname "$target")" || return 1
+  fi
   case $target in
     /*) ;;
     *) target=$(pwd)/$target ;;
   esac
-  set -- -o "$target" --title "$asset${commit:+, merged in $(git rev-parse --short "$commit")}"
+  title=$asset
+  [ -z "$commit" ] || title="$asset, the parents of $(git rev-parse --short "$commit") merged anew"
+  eval "set -- $(rule_options)"
   # What is settled in the record of the conflict at hand shows as settled.
   if [ -z "$commit" ] && [ -f "$(record_of "$asset")" ]; then set -- "$@" -i "$(pwd)/$(record_of "$asset")"; fi
   # From their folder, since the page shows the paths that were given.
-  (cd "$scratch" && "$reporter" "$@" base left right) || return 1
+  if ! (cd "$scratch" && "$reporter" "$@" -o "$target" --title "$title" "$base_file" "$left_file" "$right_file") \
+    2>"$scratch/messages"; then
+    say_messages "$base_file" "$left_file" "$right_file" "$@"
+    return 1
+  fi
   printf '%s\n' "${page_shown:-$target}"
 }

@@ -17,10 +17,12 @@ export GIT_AUTHOR_NAME=Test GIT_AUTHOR_EMAIL=test@localhost GIT_COMMITTER_NAME=T
 unset XDG_CONFIG_HOME
 mkdir "$HOME"
 
+# To the standard error of the test itself: what is sent elsewhere is the checked command's.
+exec 3>&2
 failures=0
 check() { # check WHAT COMMAND...
   if ! "${@:2}"; then
-    echo "FAILED: $1" >&2
+    echo "FAILED: $1" >&3
     failures=$((failures + 1))
   fi
 }
