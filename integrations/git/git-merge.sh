@@ -1,16 +1,20 @@
 # The merges that vexel-merge-git makes: the merge driver, the merge tool, and resolve. Functions in round
 # brackets run in a process of their own, so that their variables are theirs.
 
-# rule_options: --rules and --typeInfo as this repository's configuration has them, quoted. Their paths start from the
-# top folder.
-rule_options() {
+# Sets $options to --rules and --typeInfo as this repository's configuration has them, quoted. Their paths start from
+# the top folder. What can't be understood must not count as not set: other rules make another merge.
+read_rule_options() {
+  options=
   for option in rules typeInfo; do
-    value=$(git config --type=path --get "vexel.$option") || continue
+    status=0
+    value=$(git config --type=path --get "vexel.$option") || status=$?
+    [ "$status" -ne 1 ] || continue
+    if [ "$status" -ne 0 ] || [ -z "$value" ]; then die "vexel.$option in git's configuration must be a path"; fi
     case $value in
       /*) ;;
       *) value=$(pwd)/$value ;;
     esac
-    printf -- '--%s %s ' "$option" "$(quoted "$value")"
+    options="$options --$option $(quoted "$value")"
   done
 }
 
@@ -46,7 +50,7 @@ merge_into() (
     return 1
   fi
   status=0
-  eval "set -- $(rule_options) \"\$@\""
+  eval "set -- $options \"\$@\""
   "$program" merge -h --force --fallback none -o "$scratch/record" "$@" "$base" "$left" "$right" "$result" \
     2>"$scratch/messages" || status=$?
   say_messages "$base" "$left" "$right" "$@"
@@ -57,7 +61,7 @@ merge_into() (
 list_conflicts() ( # BASE LEFT RIGHT [-i RECORD]
   base=$1 left=$2 right=$3
   shift 3
-  eval "set -- $(rule_options) \"\$@\""
+  eval "set -- $options \"\$@\""
   if "$reporter" --conflicts "$@" "$base" "$left" "$right" >"$scratch/conflicts" 2>"$scratch/messages"; then return 0; fi
   say_messages "$base" "$left" "$right" "$@"
   return 1
@@ -77,9 +81,20 @@ say_conflicts() {
 # to a file elsewhere.
 is_asset() { [ "$(head -c 5 "$1" | tr -d '\0')" = %YAML ]; }
 
+are_assets() {
+  for version in "$@"; do
+    if is_asset "$version"; then return 0; fi
+  done
+  return 1
+}
+
 # Git does what it does without us to files that are none of ours, but bear their names.
 merge_as_text() { # OURS BASE THEIRS MARKER_SIZE
-  git merge-file --marker-size="$4" -L ours -L base -L theirs "$1" "$2" "$3"
+  status=0
+  git merge-file -q --marker-size="$4" -L ours -L base -L theirs "$1" "$2" "$3" 2>/dev/null || status=$?
+  # Git would take a status above 128 for a driver that was killed, and give up.
+  [ "$status" -le 127 ] || complain "$asset can't be merged, not even as text"
+  [ "$status" -eq 0 ]
 }
 
 # Whether git is about to change the work tree and the index: it has locked that. A merge that only looks, such as
@@ -97,9 +112,12 @@ merge_driver() {
   fi
   [ $# -eq 5 ] || wrong_usage "merge-driver is called by git"
   base=$1 ours=$2 theirs=$3 marker_size=$4 asset=$5
+  # What can't be done with an ancestor is for the merge itself to tell.
+  if [ "$is_ancestor" = true ]; then exec 2>/dev/null; fi
+  read_rule_options
   keeps_records=false
   if [ "$is_ancestor" = false ] && is_real_merge; then keeps_records=true; fi
-  if ! is_asset "$ours" && ! is_asset "$theirs" && ! is_asset "$base"; then
+  if ! are_assets "$ours" "$theirs" "$base"; then
     [ "$keeps_records" = false ] || remove_record "$asset"
     merge_as_text "$ours" "$base" "$theirs" "$marker_size"
     return
@@ -165,7 +183,7 @@ choose_side() (
     }
     fits($1, ENVIRON["PATTERN"]) {print ENVIRON["SIDE"], $1}' "$scratch/conflicts" >"$scratch/chosen"
   [ -s "$scratch/chosen" ] || { complain "no conflict in $asset fits '$2'"; return 1; }
-  if lacks_final_newline "$record"; then echo >>"$record"; fi
+  end_line "$record"
   cat "$scratch/chosen" >>"$record"
 )
 
@@ -173,7 +191,7 @@ choose_side() (
 refuse_edited() {
   if [ "$force" = true ] || [ ! -e "./$asset" ] || [ "$(hash_of "$asset")" = "$(recorded_hash "$1")" ]; then return 1; fi
   if grep -q '^<<<<<<< ' "./$asset"; then
-    complain "$asset was merged as text; merge it anew with 'git checkout -m -- $(quoted "$asset")'"
+    complain "$asset was merged as text; say --force to merge it anew, and lose what was edited since"
   else
     complain "$asset was edited after the merge; 'git add' it as it is, or say --force to lose the edits"
   fi
@@ -193,7 +211,13 @@ settle() (
     merged_hash=$(recorded_hash "$record")
     edit "$record" || { complain "the editor failed; nothing is merged"; return 1; }
     # Who looks at the scene in the engine while deciding may save it there.
+    end_line "$record"
     [ -n "$(recorded_hash "$record")" ] || echo "# merged: $merged_hash" >>"$record"
+    if [ -f "$scratch/stages" ] && ! stages_of "$asset" | cmp -s - "$scratch/stages"; then
+      remove_record "$asset"
+      complain "$asset is no longer in the conflict that it was in when the editor was opened"
+      return 1
+    fi
     ! refuse_edited "$record" || return 1
   fi
   status=0
@@ -211,6 +235,11 @@ settle() (
   esac
 )
 
+# end_line FILE: the user's editor may not have.
+end_line() {
+  if [ -f "$1" ] && lacks_final_newline "$1"; then echo >>"$1"; fi
+}
+
 # Also of a name with blanks, while the editor may be a command with arguments.
 edit() {
   editor=$(git var GIT_EDITOR) || return 1
@@ -222,8 +251,14 @@ mergetool() {
   [ $# -eq 4 ] || wrong_usage "mergetool is called by git"
   asset=$4 side='' force=false
   make_scratch
+  read_rule_options
+  cp "./$asset" "$scratch/start" 2>/dev/null || :
   status=0
   settle "$4" "$1" "$3" "$2" || status=$?
+  # Git puts the old file back where we fail.
+  if [ "$status" -ne 0 ] && [ -f "./$asset" ] && ! cmp -s "./$asset" "$scratch/start"; then
+    cp "./$asset" "./$asset.vexel-edited" && say "The edited file is kept as $asset.vexel-edited"
+  fi
   case $status in
     0) remove_record "$asset" ;;
     2)
@@ -248,9 +283,11 @@ named_conflicts() {
   [ -z "$named" ] || printf '%s\n' "$named"
 }
 
+stages_of() { git ls-files --unmerged -- ":(literal)$1"; }
+
 # write_stages PATH: as files of the work tree, in which line ends are what the user has set.
 write_stages() {
-  GIT_LITERAL_PATHSPECS=1 git ls-files --unmerged -- "$1" >"$scratch/stages"
+  stages_of "$1" >"$scratch/stages"
   rm -f "$scratch/base" "$scratch/left" "$scratch/right"
   while read -r _ blob stage _; do
     case $stage in
@@ -302,10 +339,12 @@ resolve() {
     cat "$scratch/found" >>"$scratch/assets"
   done
   go_to_top
+  read_rule_options
+  LC_ALL=C sort -u "$scratch/assets" >"$scratch/sorted"
   # Not on standard input, which is the editor's.
   while IFS= read -r asset <&3; do
     resolve_asset || outcome=1
-  done 3<"$scratch/assets"
+  done 3<"$scratch/sorted"
   sweep
   return "$outcome"
 }
@@ -313,6 +352,10 @@ resolve() {
 # Resolves $asset, and stages it if nothing is left.
 resolve_asset() {
   write_stages "$asset" || return 1
+  if ! are_assets "$scratch/base" "$scratch/left" "$scratch/right"; then
+    complain "$asset was merged as text: edit it, and 'git add' it"
+    return 1
+  fi
   status=0
   settle "./$asset" "$scratch/base" "$scratch/left" "$scratch/right" || status=$?
   case $status in
@@ -335,6 +378,9 @@ resolve_asset() {
 
 # stage PATH: adds it, and gives it the line ends that the user has set for files of the work tree.
 stage() {
-  GIT_LITERAL_PATHSPECS=1 git add -- "$1" || return 1
-  git cat-file --filters ":0:$1" | cmp -s - "./$1" || git checkout-index -f -u -- "$1"
+  git add -- ":(literal)$1" || return 1
+  git cat-file --filters ":0:$1" >"$scratch/checked-out" || return 1
+  if cmp -s "$scratch/checked-out" "./$1"; then return 0; fi
+  replace_file "./$1" <"$scratch/checked-out"
+  git add -- ":(literal)$1"
 }

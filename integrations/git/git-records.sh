@@ -28,7 +28,9 @@ TEXT
     cut -f 1 "$scratch/conflicts" | sed 's/^/# left|right|base /'
   } >"$scratch/new-record"
   mkdir -p "$(dirname "$record")" && cp "$scratch/new-record" "$record.new" && mv -f "$record.new" "$record" &&
-    exclude_records && watch_record "$1"
+    watch_record "$1" || return 1
+  # The record is there all the same; what is wrong with the other file has been said.
+  exclude_records || :
 )
 
 # Records are for one person on one machine: git must not offer to add them. What lies behind a symbolic link
@@ -60,7 +62,7 @@ watch_record() (
   cat >"$hook" <<TEXT
 #!/bin/sh
 # vexel-merge-git sweep: removes the records of conflicts that are gone, and with the last one this hook.
-exec $(quoted "$self") sweep
+if [ -x $(quoted "$self") ]; then exec $(quoted "$self") sweep; fi
 TEXT
   chmod +x "$hook"
 )
@@ -83,11 +85,16 @@ sweep() (
   mv -f "$list.new" "$list"
   [ ! -s "$list" ] || return 0
   rm -f "$list"
-  # Other work trees of this repository have lists of their own.
-  common=$(git rev-parse --git-common-dir)
-  for other in "$common/vexel-merge-records" "$common"/worktrees/*/vexel-merge-records; do
-    [ ! -f "$other" ] || return 0
-  done
+  if has_records; then return 0; fi
   hook=$(hook_path)
   if [ -n "$hook" ] && is_our_hook "$hook"; then rm -f "$hook"; fi
+)
+
+# Whether any work tree of this repository has a record; each has a list of its own.
+has_records() (
+  common=$(git rev-parse --git-common-dir)
+  for list in "$common/vexel-merge-records" "$common"/worktrees/*/vexel-merge-records; do
+    if [ -f "$list" ]; then return 0; fi
+  done
+  return 1
 )

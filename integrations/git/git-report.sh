@@ -66,7 +66,7 @@ list_merged() {
 changed_since_base() {
   side_commit=$1
   shift
-  GIT_LITERAL_PATHSPECS=1 git diff --name-only --no-renames -z "$base" "$side_commit" -- "$@" | tr '\0' '\n' | LC_ALL=C sort
+  GIT_LITERAL_PATHSPECS=1 git diff --name-only --no-relative --no-renames -z "$base" "$side_commit" -- "$@" | tr '\0' '\n' | LC_ALL=C sort
 }
 
 write_merged_versions() {
@@ -83,10 +83,12 @@ version() { git cat-file --filters "$1" >"$scratch/$2" 2>/dev/null; }
 
 write_unmerged_versions() {
   base_file=base left_file=left right_file=right
-  write_stages "$1"
+  write_stages "$1" || return 1
+  are_assets "$scratch/base" "$scratch/left" "$scratch/right" || { say "$1 was merged as text"; return 1; }
 }
 
 report_listed() {
+  read_rule_options
   ours_among <"$scratch/all" >"$scratch/assets"
   if [ ! -s "$scratch/assets" ]; then die "$nothing"; fi
   if [ -n "$page" ] && [ "$(wc -l <"$scratch/assets")" -gt 1 ]; then
@@ -113,7 +115,7 @@ report_asset() {
   esac
   title=$asset
   [ -z "$commit" ] || title="$asset, the parents of $(git rev-parse --short "$commit") merged anew"
-  eval "set -- $(rule_options)"
+  eval "set -- $options"
   # What is settled in the record of the conflict at hand shows as settled.
   if [ -z "$commit" ] && [ -f "$(record_of "$asset")" ]; then set -- "$@" -i "$(pwd)/$(record_of "$asset")"; fi
   # From their folder, since the page shows the paths that were given.

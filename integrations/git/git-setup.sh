@@ -101,21 +101,26 @@ restore_key() {
   fi
 }
 
-settings_in() { git config -f "$1" -l | LC_ALL=C sort; }
+has_set_keys() { [ -f "$state" ] && git config -f "$state" --get-regexp '^key\..*\.added$' >/dev/null; }
 
-# Comments and blanks of a value that we have replaced are only in the copy of the whole file. It is put back
-# where no other setting has changed since.
-restore_configuration() {
-  keys=$(git config -f "$state" --name-only --get-regexp '^key\..*\.added$' | sed 's/^key\.//; s/\.added$//') || keys=
-  for key in $keys; do restore_key "$key"; done
-  if [ -f "$state.config" ] && [ "$(settings_in "$config")" = "$(settings_in "$state.config")" ]; then
-    replace_file "$config" <"$state.config"
+# Comments, order and blanks are only in a copy of the whole file. It is good as long as the file stays as enable left
+# it; after that, one key after the other is restored.
+keep_configuration() {
+  if ! has_set_keys; then
+    if [ -f "$config" ]; then cp "$config" "$state.before"; else remember config.absent true; fi
+  elif ! cmp -s "$config" "$state.after"; then
+    rm -f "$state.before" "$state.after"
   fi
-  if recall config.absent >/dev/null && [ -f "$config" ] && [ ! -s "$config" ]; then rm -f "$config"; fi
 }
 
-keep_configuration() {
-  if [ -f "$config" ]; then cp "$config" "$state.config"; else remember config.absent true; fi
+restore_configuration() {
+  if [ -f "$state.before" ] && cmp -s "$config" "$state.after"; then
+    replace_file "$config" <"$state.before"
+    return 0
+  fi
+  keys=$(git config -f "$state" --name-only --get-regexp '^key\..*\.added$' | sed 's/^key\.//; s/\.added$//') || keys=
+  for key in $keys; do restore_key "$key"; done
+  if recall config.absent >/dev/null && [ -f "$config" ] && [ ! -s "$config" ]; then rm -f "$config"; fi
 }
 
 where() { if [ "$scope" = global ]; then echo "all your repositories"; else echo "this repository"; fi; }
@@ -139,8 +144,9 @@ enable() {
   for_wanted_keys check_key
   block_part "$attributes" inside >/dev/null
   mkdir -p "$(dirname "$state")"
-  [ -f "$state" ] || keep_configuration
+  keep_configuration
   for_wanted_keys set_key
+  [ ! -f "$state.before" ] || cp "$config" "$state.after"
   # A block that is there already may be a colleague's, or edited: it counts unless others are asked for.
   if [ "$patterns_given" = true ] || ! has_block "$attributes"; then
     set_block "$attributes" attributes "$(attribute_lines "${patterns:-$default_patterns}")"
@@ -170,7 +176,7 @@ disable() {
   [ "$patterns_given" = false ] || wrong_usage "--patterns is only for enable"
   if [ "$scope" = local ]; then
     sweep
-    [ ! -f "$(record_list)" ] || die "conflicts are left: settle them or abort the merge first"
+    if has_records; then die "conflicts are left: settle them or abort the merge first"; fi
   fi
   if [ ! -f "$state" ]; then
     echo "Nothing to undo in $(where)."
@@ -179,7 +185,7 @@ disable() {
   restore_block "$attributes" attributes
   [ "$scope" = global ] || restore_block "$(git_path info/exclude)" exclude
   restore_configuration
-  rm -f "$state" "$state.config"
+  rm -f "$state" "$state.before" "$state.after"
   echo "Undone in $(where)."
   case $(git config --get merge.vexel.driver) in
     *vexel-merge-git*) echo "It is still set for all your repositories: see 'vexel-merge-git disable --global'." ;;
