@@ -11,12 +11,6 @@ Operation* MergeTreeCloneVisitor::Clone(const Operation* operation) {
   return visitor.operation_;
 }
 
-YAMLSequenceDiff* MergeTreeCloneVisitor::Clone(const YAMLSequenceDiff* diff) {
-  MergeTreeCloneVisitor visitor;
-  diff->Accept(visitor);
-  return visitor.sequence_diff_;
-}
-
 void MergeTreeCloneVisitor::Visit(const RemoveOperation* operation) {
   operation_ = YAMLAlloc<RemoveOperation>::create(operation->IsMergeable());
 }

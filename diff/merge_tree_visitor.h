@@ -35,7 +35,6 @@ class MergeTreeCloneVisitor final : public MergeTreeVisitor {
 
   /// A deep copy of the operation and everything below it, from the pools.
   static Operation* Clone(const Operation* operation);
-  static YAMLSequenceDiff* Clone(const YAMLSequenceDiff* diff);
 
   void Visit(const RemoveOperation* operation) override;
   void Visit(const ChangeOperation* operation) override;

@@ -1,6 +1,6 @@
 #include <unordered_set>
 
-#include "diff/merge_tree_visitor.h"
+#include "diff/yaml_sequence_diff.h"
 #include "merge/conflict_resolver.h"
 #include "yaml/yaml_alloc.h"
 
@@ -33,6 +33,13 @@ class AddedValues {
   YAMLSequence values_{false};
 };
 
+// A diff of its own with the same operations: whoever gets to see them in a conflict finds those of the side.
+YAMLSequenceDiff* Copy(const YAMLSequenceDiff& diff) {
+  auto* copy = YAMLAlloc<YAMLSequenceDiff>::create();
+  for (const auto& [index, operation] : diff.GetEntries()) copy->Add(index, operation);
+  return copy;
+}
+
 // Both sides of a list, aligned step by step. What has to be modified is copied first.
 class SequenceMerge {
  public:
@@ -56,7 +63,7 @@ class SequenceMerge {
     for (size_t i = 0; i < partners->GetMapping().size(); ++i) {
       const uint32_t partner = partners->GetMapping()[i];
       if (partner == YAMLSequenceRemapper::kDropped) continue;
-      if (paired == nullptr) paired = MergeTreeCloneVisitor::Clone(left_diff_);
+      if (paired == nullptr) paired = Copy(*left_diff_);
       const int left_index = left.GetIndex(i);
       const int right_index = right.GetIndex(partner);
       const ResolverPathStep step(resolver_, IndexScalar(left_index));
@@ -102,7 +109,7 @@ class SequenceMerge {
 
  private:
   void RemoveFromRight(const std::set<int>& indices) {
-    YAMLSequenceDiff* diff = MergeTreeCloneVisitor::Clone(right_diff_);
+    YAMLSequenceDiff* diff = Copy(*right_diff_);
     diff->RemoveAndShiftMany(indices);
     right_diff_ = diff;
     auto* remapper = YAMLAlloc<YAMLSequenceRemapper>::create(*right_remapper_);

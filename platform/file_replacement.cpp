@@ -58,13 +58,15 @@ void CopyContent(std::ifstream& from, std::ostream& to) {
 FileError::FileError(const std::string& path, int error_number)
     : std::runtime_error("Cannot write '" + path + "': " + std::strerror(error_number)) {}
 
-FileReplacement::FileReplacement(const std::string& path) : path_(path), target_(FollowLinks(path)) {
+FileReplacement::FileReplacement(const std::string& path) : path_(path), target_(path) {
   struct stat status = {};
-  const bool exists = stat(target_.c_str(), &status) == 0;
+  const bool exists = stat(path.c_str(), &status) == 0;
+  // Before links are followed: what /dev/stdout leads to may be a pipe, which has no path.
   if (exists && !S_ISREG(status.st_mode)) {
     OpenInPlace();
     return;
   }
+  target_ = FollowLinks(path);
   if (exists && access(target_.c_str(), W_OK) != 0) throw FileError(path_, errno);
   beside_ = CreateBeside(target_);
   if (beside_.empty()) {

@@ -1,6 +1,7 @@
 #include <algorithm>
-#include <array>
+#include <map>
 
+#include "report/report_rows.h"
 #include "report/side_walk.h"
 
 namespace vexel_yaml {
@@ -16,7 +17,10 @@ ObjectNames NamesFor(const MergedFiles& files) {
   return ObjectNames(std::move(versions));
 }
 
-// What stands at `path` below `node`; the path leads through mappings and lists.
+// What the index of an element that base lacks begins with, so that no element of base has the same path.
+constexpr char kNewElement = '+';
+
+// What stands at `path` below `node`; the path leads through mappings and lists. Null for a new element.
 const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path) {
   for (const YAMLScalar* step : path) {
     if (node == nullptr) return nullptr;
@@ -24,7 +28,8 @@ const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path) {
       node = mapping->HasDuplicateKeys() ? nullptr : mapping->Get(step);
     } else if (const YAMLSequence* sequence = node->AsSequence()) {
       const auto index = static_cast<size_t>(step->GetIntValue());
-      node = index < sequence->Size() ? sequence->GetItems()[index] : nullptr;
+      const bool is_new = step->GetText().starts_with(kNewElement);
+      node = !is_new && index < sequence->Size() ? sequence->GetItems()[index] : nullptr;
     } else {
       return nullptr;
     }
@@ -63,38 +68,33 @@ class Collector {
     }
     AddRenumbered();
     for (const Record& record : files_.resolver.GetRecords()) AddRecord(record);
-    for (ReportObject& object : objects_) Finish(object);
-    std::ranges::stable_sort(objects_, [](const ReportObject& a, const ReportObject& b) {
+    for (ReportObject& object : rows_.Objects()) Finish(object);
+    std::ranges::stable_sort(rows_.Objects(), [](const ReportObject& a, const ReportObject& b) {
       if (a.pending != b.pending) return a.pending;
       if (a.path.empty() != b.path.empty()) return b.path.empty();
       return a.path < b.path;
     });
-    return std::move(objects_);
+    return std::move(rows_.Objects());
   }
 
  private:
-  struct Place {
-    size_t object;
-    size_t row;
-  };
-
   void AddSide(ReportCell ReportRow::*cell, bool ReportObject::*side, const YAMLMappingDiff& diff,
                const VexelObjects& to) {
     const auto found = [&](const FieldPath& path, ReportCell change, const YAMLNode* from) {
-      ReportObject& object = objects_[ObjectAt(path.front())];
+      ReportObject& object = rows_.ObjectAt(path.front());
       object.*side = true;
       const bool whole = path.size() == 1;
       object.added |= whole && change.kind == Kind::kAdded;
       object.removed |= whole && change.kind == Kind::kRemoved;
       object.changed |= !whole || change.kind == Kind::kChanged;
       SetCell(path, cell, std::move(change), from);
-      if (path.back() == YAMLScalar::mFather) RowAt(path).note = "Moved to another parent";
+      if (path.back() == YAMLScalar::mFather) rows_.RowAt(path).note = "Moved to another parent";
     };
     SideWalk(names_, found, GoneIn(cell), &places_).Walk(diff, files_.read.base, to);
   }
 
   SideWalk::Gone GoneIn(ReportCell ReportRow::*cell) {
-    return [this, cell](const FieldPath& path) { gone_[PathToString(path)].push_back(cell); };
+    return [this, cell](const FieldPath& path) { gone_[path].push_back(cell); };
   }
 
   void AddResult() {
@@ -108,7 +108,7 @@ class Collector {
 
   void AddRepairs() {
     const auto found = [&](const FieldPath& path, const ReportCell& change, const YAMLNode* from) {
-      ReportRow& row = RowAt(path);
+      ReportRow& row = rows_.RowAt(path);
       row.repaired = true;
       if (path.size() == 1 || from == nullptr) {
         row.note = change.kind == Kind::kRemoved ? "Removed by the repairs" : "Added by the repairs";
@@ -124,7 +124,7 @@ class Collector {
 
   void AddRenumbered() {
     for (const RenumberedObject& renumbered : files_.renumbered) {
-      ReportRow& row = RowAt({renumbered.new_id});
+      ReportRow& row = rows_.RowAt({renumbered.new_id});
       row.repaired = true;
       row.note = "Both sides added another object as " + renumbered.old_id->GetText() +
                  "; right's was given a file ID of its own";
@@ -136,9 +136,17 @@ class Collector {
     if (!pending && record.resolution == MergeResolve::kAutomatic) return;
     // The order of the keys has records, too.
     if (!pending && record.path.front() == YAMLScalar::underscore) return;
-    ReportRow& row = RowAt(PlaceOf(record));
+    const FieldPath* const known = KnownPlace(record);
+    const FieldPath place = known != nullptr ? *known : PlaceOfPart(record.path);
+    ReportRow& row = rows_.RowAt(place);
     AddOperation(record.left, row, row.left);
     AddOperation(record.right, row, row.right);
+    if (known == nullptr && place != record.path) {
+      row.note = "Part of what both sides added to the list";
+      // No walk over the result comes by here.
+      if (record.resolution == MergeResolve::kLeft) row.result = row.left;
+      if (record.resolution == MergeResolve::kRight) row.result = row.right;
+    }
     row.pending |= pending;
     row.state = pending ? "conflict" : SettledState(record.resolution);
     row.record_path = PathToString(record.path);
@@ -147,17 +155,28 @@ class Collector {
     } else if (const std::string_view dependency = DependencyText(record); !dependency.empty()) {
       const bool from_left = IsLeftType(record.type);
       row.note = std::string(from_left ? "Left " : "Right ") + std::string(dependency);
-      ReportObject& object = objects_[ObjectAt(row.path.front())];
+      ReportObject& object = rows_.ObjectAt(row.path.front());
       (from_left ? object.left : object.right) = true;
     }
   }
 
-  const FieldPath& PlaceOf(const Record& record) const {
+  const FieldPath* KnownPlace(const Record& record) const {
     for (const Operation* operation : {record.left, record.right}) {
       const auto found = places_.find(operation);
-      if (found != places_.end()) return found->second;
+      if (found != places_.end()) return &found->second;
     }
-    return record.path;
+    return nullptr;
+  }
+
+  // What two additions are merged from is in neither side's diff. Its record counts the elements of the
+  // merged list, where another one stands at the index than in base.
+  FieldPath PlaceOfPart(FieldPath path) const {
+    for (size_t i = 1; i < path.size(); ++i) {
+      const YAMLNode* parent = NodeAt(&files_.read.base, {path.begin(), path.begin() + static_cast<long>(i)});
+      if (parent == nullptr) break;
+      if (parent->AsSequence() != nullptr) path[i] = YAMLScalar::Lookup(kNewElement + path[i]->GetText());
+    }
+    return path;
   }
 
   // A record may be about a place that no walk has shown: an object as a whole, or a part of one that both
@@ -176,7 +195,7 @@ class Collector {
       }
       case Operation::Kind::kChangeMapping:
       case Operation::Kind::kChangeSequence:
-        cell = {Kind::kEdited, "changed inside", {}};
+        cell = ChangedInside();
         if (!row.base.text.empty()) return;
         row.base = ValueCell(row.path, NodeAt(&files_.read.base, row.path), Kind::kUnchanged, names_);
         return;
@@ -184,7 +203,7 @@ class Collector {
   }
 
   void SetCell(const FieldPath& path, ReportCell ReportRow::*cell, ReportCell change, const YAMLNode* from) {
-    ReportRow& row = RowAt(path);
+    ReportRow& row = rows_.RowAt(path);
     row.*cell = std::move(change);
     if (!row.base.text.empty() || from == nullptr) return;
     row.base = ValueCell(path, from, Kind::kUnchanged, names_);
@@ -194,26 +213,13 @@ class Collector {
     if (!property.empty()) row.note = "Overrides " + property;
   }
 
-  size_t ObjectAt(const YAMLScalar* file_id) {
-    const auto [entry, is_new] = object_places_.try_emplace(file_id, objects_.size());
-    if (is_new) {
-      ReportObject& object = objects_.emplace_back();
-      object.file_id = file_id;
-      object.class_name = names_.GetClass(file_id);
-      object.path = names_.GetPath(file_id);
-    }
-    return entry->second;
-  }
-
-  ReportRow& RowAt(const FieldPath& path) {
-    const size_t object = ObjectAt(path.front());
-    std::vector<ReportRow>& rows = objects_[object].rows;
-    const auto [entry, is_new] = row_places_.try_emplace(PathToString(path), Place{object, rows.size()});
-    if (is_new) rows.emplace_back().path = path;
-    return rows[entry->second.row];
-  }
-
   void Finish(ReportObject& object) {
+    for (ReportRow& row : object.rows) {
+      Inherit(row, &ReportRow::left, &files_.read.left);
+      Inherit(row, &ReportRow::right, &files_.read.right);
+      Inherit(row, &ReportRow::result, files_.merged.get());
+    }
+    for (const ReportRow& row : object.rows) rows_.MarkAbove(row);
     for (ReportRow& row : object.rows) FinishRow(row);
     for (const ReportRow& row : object.rows) {
       object.pending |= row.pending;
@@ -226,9 +232,6 @@ class Collector {
   }
 
   void FinishRow(ReportRow& row) {
-    Inherit(row, &ReportRow::left, &files_.read.left);
-    Inherit(row, &ReportRow::right, &files_.read.right);
-    Inherit(row, &ReportRow::result, files_.merged.get());
     if (files_.merged == nullptr) {
       row.result.text = "no result";
       return;
@@ -236,7 +239,9 @@ class Collector {
     if (row.result.kind == Kind::kUnchanged) row.result.text = row.base.text;
     if (row.result.kind == Kind::kUnchanged) row.result.full = row.base.full;
     if (row.repaired && row.state.empty()) row.state = "repaired";
-    if (row.state.empty()) row.state = StateOf(row);
+    if (!row.state.empty()) return;
+    JudgeRow(row);
+    if (row.state == "not taken" && rows_.IsInConflict(row.path)) row.state = "in conflict";
   }
 
   // What happened to the whole happened to the part.
@@ -244,15 +249,14 @@ class Collector {
     FieldPath path = row.path;
     while ((row.*cell).kind == Kind::kUnchanged && path.size() > 1) {
       path.pop_back();
-      const auto gone = gone_.find(PathToString(path));
+      const auto gone = gone_.find(path);
       if (gone != gone_.end() && std::ranges::count(gone->second, cell) > 0) {
         (row.*cell).kind = Kind::kRemoved;
         return;
       }
-      const auto found = row_places_.find(PathToString(path));
-      if (found == row_places_.end()) continue;
-      const ReportRow& whole = objects_[found->second.object].rows[found->second.row];
-      const Kind kind = (whole.*cell).kind;
+      const ReportRow* const whole = rows_.Find(path);
+      if (whole == nullptr) continue;
+      const Kind kind = (whole->*cell).kind;
       if (kind == Kind::kUnchanged || kind == Kind::kEdited) continue;
       const YAMLNode* node = kind == Kind::kRemoved ? nullptr : NodeAt(version, row.path);
       if (node != nullptr) {
@@ -264,26 +268,12 @@ class Collector {
     }
   }
 
-  static std::string_view StateOf(const ReportRow& row) {
-    const bool left = row.left.kind != Kind::kUnchanged;
-    const bool right = row.right.kind != Kind::kUnchanged;
-    const bool is_left = left && row.result == row.left;
-    const bool is_right = right && row.result == row.right;
-    if (is_left && is_right) return "same on both";
-    if (left && right && row.result.kind == Kind::kEdited) return "merged";
-    if (is_left) return "from left";
-    if (is_right) return "from right";
-    return (left || right) && row.result.kind == Kind::kUnchanged ? "not taken" : "merged";
-  }
-
   const MergedFiles& files_;
   ObjectNames names_;
-  std::vector<ReportObject> objects_;
-  std::unordered_map<const YAMLScalar*, size_t> object_places_;
-  std::unordered_map<std::string, Place> row_places_;
+  ReportRows rows_{names_};
   SideWalk::Places places_;
   // Elements of lists, and the versions that they went out of.
-  std::unordered_map<std::string, std::vector<ReportCell ReportRow::*>> gone_;
+  std::map<FieldPath, std::vector<ReportCell ReportRow::*>> gone_;
 };
 
 }  // namespace

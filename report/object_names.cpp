@@ -4,6 +4,7 @@
 #include <unordered_set>
 
 #include "fixups/engine_keys.h"
+#include "report/value_text.h"
 #include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
@@ -12,6 +13,7 @@ namespace {
 
 // Longer paths would tell nobody anything, and cost much where thousands of objects have one.
 constexpr size_t kMostNames = 50;
+constexpr size_t kMostOfName = 100;
 
 const YAMLScalar* NameKey() {
   static const YAMLScalar* const key = YAMLScalar::Lookup("m_Name");
@@ -124,10 +126,10 @@ std::string ObjectNames::TransformPath(const YAMLScalar* transform) const {
     if (name.empty()) name = GetOwnerName(transform);
     if (name.empty()) break;
     if (names.size() == kMostNames) {
-      names.emplace_back("...");
+      names.emplace_back(kEllipsis);
       break;
     }
-    names.push_back(std::move(name));
+    names.push_back(Shortened(name, kMostOfName));
   }
   std::ranges::reverse(names);
   std::string path;
@@ -145,7 +147,7 @@ std::string ObjectNames::FindPath(const YAMLScalar* file_id) const {
   const YAMLScalar* transform = game_object == nullptr ? file_id : TransformOf(game_object);
   std::string path = transform == nullptr ? std::string() : TransformPath(transform);
   if (!path.empty()) return path;
-  return GetOwnName(game_object == nullptr ? file_id : game_object);
+  return Shortened(GetOwnName(game_object == nullptr ? file_id : game_object), kMostOfName);
 }
 
 const std::string& ObjectNames::GetPath(const YAMLScalar* file_id) {

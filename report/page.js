@@ -2,9 +2,9 @@
 
 // Everything is readable without this script; it only adds the filters.
 
-// What can be searched: names, file IDs, fields and values, but not the words that every object has.
+// What can be searched: names, file IDs, fields, values and notes, but not the words that every object has.
 function searchedText(element) {
-  const parts = Array.from(element.querySelectorAll("h2 > :not(.badge), .value, pre"), (part) => part.textContent);
+  const parts = Array.from(element.querySelectorAll("h2 > :not(.badge), .value, pre, small"), (part) => part.textContent);
   const paths = Array.from(element.querySelectorAll("tr[data-path]"), (row) => row.dataset.path);
   return [...parts, ...paths].join("\n").toLowerCase();
 }

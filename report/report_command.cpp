@@ -29,7 +29,7 @@ constexpr std::string_view kUsage =
     "       vexel-merge-report --text <file>\n"
     "           prints a scene or prefab with the names of its objects in their header lines\n"
     "\n"
-    "options: -o FILE         where the page goes (report.html)\n"
+    "options: -o FILE         where the page goes (report.html); - for standard output\n"
     "         --title TEXT    the page's title\n"
     "         -i FILE         settle conflicts as FILE says\n"
     "         --rules FILE    other merge rules than the default ones\n"
@@ -64,10 +64,15 @@ std::string* ValueTarget(std::string_view option, Arguments& parsed) {
 // Throws std::runtime_error for arguments that make no sense.
 Arguments Parse(const std::vector<std::string>& arguments) {
   Arguments parsed;
-  size_t index = 0;
-  for (; index < arguments.size(); ++index) {
+  std::vector<std::string> given;
+  bool only_paths = false;
+  for (size_t index = 0; index < arguments.size(); ++index) {
     const std::string& argument = arguments[index];
-    if (argument == "--conflicts") {
+    if (only_paths || !argument.starts_with('-')) {
+      given.push_back(argument);
+    } else if (argument == "--") {
+      only_paths = true;
+    } else if (argument == "--conflicts") {
       parsed.mode = Mode::kConflicts;
     } else if (argument == "--text") {
       parsed.mode = Mode::kText;
@@ -75,22 +80,18 @@ Arguments Parse(const std::vector<std::string>& arguments) {
       if (++index == arguments.size()) throw std::runtime_error("option " + argument + " needs a value");
       *target = arguments[index];
     } else {
-      break;
+      throw std::runtime_error("unknown option " + argument + "; see vexel-merge-report --help");
     }
   }
   ReportConfig& config = parsed.config;
   std::vector<std::string*> paths = {&config.base_path, &config.left_path, &config.right_path};
   if (parsed.mode == Mode::kText) paths = {&parsed.text_file};
-  const size_t given = arguments.size() - index;
-  if (given != paths.size()) {
-    if (given > 0 && arguments[index].starts_with('-')) {
-      throw std::runtime_error("unknown option " + arguments[index] + "; see vexel-merge-report --help");
-    }
+  if (given.size() != paths.size()) {
     throw std::runtime_error("needs " + std::to_string(paths.size()) +
-                             (paths.size() == 1 ? " path" : " paths") + ", not " + std::to_string(given) +
-                             "; see vexel-merge-report --help");
+                             (paths.size() == 1 ? " path" : " paths") + ", not " +
+                             std::to_string(given.size()) + "; see vexel-merge-report --help");
   }
-  for (std::string* path : paths) *path = arguments[index++];
+  for (size_t i = 0; i < paths.size(); ++i) *paths[i] = given[i];
   return parsed;
 }
 
@@ -122,10 +123,14 @@ void PrintConflicts(const RecordingConflictResolver& resolver) {
 void WritePageFile(const Arguments& arguments, const MergedFiles& files) {
   const ReportConfig& config = arguments.config;
   const std::string title = arguments.title.empty() ? "Merge report" : arguments.title;
+  const PageHead head = {title, config.base_path, config.left_path, config.right_path, files.error};
+  if (arguments.output == "-") {
+    WritePage(std::cout, head, CollectReport(files));
+    return;
+  }
   const TempFilesGuard guard;
   FileReplacement file(VexelToNativePath(arguments.output));
-  WritePage(file.Stream(), {title, config.base_path, config.left_path, config.right_path, files.error},
-            CollectReport(files));
+  WritePage(file.Stream(), head, CollectReport(files));
   file.Commit();
 }
 

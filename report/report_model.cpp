@@ -1,6 +1,71 @@
 #include "report/report_model.h"
 
+#include <algorithm>
+#include <set>
+#include <unordered_map>
+
 namespace vexel_yaml {
+
+namespace {
+
+using Kind = ReportCell::Kind;
+
+// The edits of a list but its order, which shows elements that others may have changed.
+std::set<std::string_view> Edits(const ReportCell& cell) {
+  std::set<std::string_view> edits;
+  std::string_view rest = cell.full.empty() ? cell.text : cell.full;
+  while (!rest.empty()) {
+    const std::string_view line = rest.substr(0, rest.find('\n'));
+    rest.remove_prefix(std::min(line.size() + 1, rest.size()));
+    if (!line.starts_with(kNewOrder)) edits.insert(line);
+  }
+  return edits;
+}
+
+// Whether the elements that `side` moved stand in its order in the result, as far as they are there.
+bool HoldsOrder(const ReportCell& result, const ReportCell& side) {
+  if (std::ranges::is_sorted(side.order)) return true;
+  std::unordered_map<uint32_t, size_t> places;
+  for (const uint32_t element : result.order) places.emplace(element, places.size());
+  std::vector<size_t> order;
+  for (const uint32_t element : side.order) {
+    const auto found = places.find(element);
+    if (found != places.end()) order.push_back(found->second);
+  }
+  return std::ranges::is_sorted(order);
+}
+
+bool Holds(const ReportCell& result, const ReportCell& side) {
+  return std::ranges::includes(Edits(result), Edits(side)) && HoldsOrder(result, side);
+}
+
+std::string_view StateOf(const ReportRow& row) {
+  const bool left = row.left.kind != Kind::kUnchanged;
+  const bool right = row.right.kind != Kind::kUnchanged;
+  if ((left || right) && row.result.kind == Kind::kUnchanged) return "not taken";
+  if (left != right) return left ? "from left" : "from right";
+  bool is_left = row.result == row.left;
+  bool is_right = row.result == row.right;
+  if (is_left && is_right) return "same on both";
+  if (row.result.kind == Kind::kEdited) {
+    is_left = Holds(row.result, row.left);
+    is_right = Holds(row.result, row.right);
+  }
+  if (is_left == is_right) return "merged";
+  return is_left ? "from left" : "from right";
+}
+
+}  // namespace
+
+void JudgeRow(ReportRow& row) {
+  row.state = StateOf(row);
+  const bool lost_left = !HoldsOrder(row.result, row.left);
+  const bool lost_right = !HoldsOrder(row.result, row.right);
+  if (!lost_left && !lost_right) return;
+  row.note = !lost_right  ? "Left's new order was not taken"
+             : !lost_left ? "Right's new order was not taken"
+                          : "Neither side's new order was taken";
+}
 
 std::string_view DependencyText(const RecordingConflictResolver::Record& record) {
   if (record.path.size() != 1 || record.resolution != MergeResolve::kConflict) return {};

@@ -19,12 +19,18 @@ struct ReportCell {
   /// The whole text where `text` is only the start of it, else empty.
   std::string full;
 
-  bool operator==(const ReportCell&) const = default;
+  /// Of a list whose elements came, went or moved: those of base that are still there, in their order now.
+  std::vector<uint32_t> order = {};
+
+  bool operator==(const ReportCell& other) const {
+    return kind == other.kind && text == other.text && full == other.full;
+  }
 };
 
 /// One place in an object.
 struct ReportRow {
-  /// From the file ID on; elements of lists go by their index in base. The file ID alone is the whole object.
+  /// From the file ID on; elements of lists go by their index in base, new ones by a "+" and the index in
+  /// their record. The file ID alone is the whole object.
   FieldPath path;
   ReportCell base;
   ReportCell left;
@@ -56,6 +62,13 @@ struct ReportObject {
 
 /// Everything a merge did, object by object: those with conflicts first, then by their names.
 std::vector<ReportObject> CollectReport(const MergedFiles& files);
+
+/// How the line of a list's edits begins that shows its new order.
+inline constexpr std::string_view kNewOrder = "new order: ";
+
+/// Tells what became of a place that no record settles, from what its cells say, and notes it where an order
+/// got lost.
+void JudgeRow(ReportRow& row);
 
 /// Why a record is about components that need or exclude one another, from its side's point of view; empty
 /// for other records.

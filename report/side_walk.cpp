@@ -43,12 +43,6 @@ std::vector<uint32_t> Origins(const YAMLSequenceRemapper* remapper, size_t from_
   return origins;
 }
 
-bool KeepsOrder(const std::vector<uint32_t>& mapping) {
-  std::vector<uint32_t> kept = mapping;
-  std::erase(kept, YAMLSequenceRemapper::kDropped);
-  return std::ranges::is_sorted(kept);
-}
-
 bool IsUnit(const YAMLNode* from, const YAMLNode* to) {
   const auto in_braces = [](const YAMLNode* node) {
     return node != nullptr && node->AsMapping() != nullptr && node->AsMapping()->IsFlow();
@@ -81,7 +75,10 @@ ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Ki
     return cell;
   }
   cell.text = ValueText(node, names, kMostOfValue);
-  if (node != nullptr && cell.text.ends_with(kEllipsis)) cell.full = FullText(*node);
+  if (node == nullptr || !cell.text.ends_with(kEllipsis)) return cell;
+  cell.full = FullText(*node);
+  // The value's own dots.
+  if (cell.full == cell.text) cell.full.clear();
   return cell;
 }
 
@@ -166,7 +163,9 @@ void SideWalk::WalkSequence(const ChangeSequenceOperation& operation, const YAML
     if (places_ != nullptr) places_->emplace(element, path_);
   }
   in_list_ = was_in_list;
-  if (remapper != nullptr && !KeepsOrder(remapper->GetMapping())) add_edit("new order", nullptr);
+  edits.order = origins;
+  std::erase(edits.order, YAMLSequenceRemapper::kDropped);
+  if (!std::ranges::is_sorted(edits.order)) add_edit(kNewOrder, &to);
   if (edits.text.empty()) return;
   if (!shortened) edits.full.clear();
   found_(path_, std::move(edits), &from);
@@ -179,7 +178,15 @@ void SideWalk::MarkGone(size_t index) {
 }
 
 void SideWalk::RememberInner(const Operation& operation) {
-  if (places_ == nullptr || operation.GetKind() != Operation::Kind::kChangeMapping) return;
+  if (places_ == nullptr) return;
+  if (operation.GetKind() == Operation::Kind::kChangeSequence) {
+    const auto& elements = static_cast<const ChangeSequenceOperation&>(operation).GetDiff()->GetEntries();
+    for (const auto& [index, element] : elements) {
+      places_->emplace(element, path_);
+      RememberInner(*element);
+    }
+  }
+  if (operation.GetKind() != Operation::Kind::kChangeMapping) return;
   const auto& entries = static_cast<const ChangeMappingOperation&>(operation).GetDiff()->GetEntries();
   for (const YAMLMappingDiff::Entry& entry : entries) {
     places_->emplace(entry.operation, path_);

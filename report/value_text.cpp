@@ -15,8 +15,16 @@ bool IsContinuation(char byte) { return (static_cast<unsigned char>(byte) & 0xC0
 
 bool IsControl(std::string_view character) {
   const auto byte = static_cast<unsigned char>(character.front());
+  if (byte < 0x80) return byte < 0x20 || byte == 0x7F;
   // U+0080 to U+009F are control characters, too.
-  return byte < 0x20 || byte == 0x7F || (byte == 0xC2 && static_cast<unsigned char>(character[1]) < 0xA0);
+  if (byte == 0xC2) return static_cast<unsigned char>(character[1]) < 0xA0;
+  // What cannot be seen, breaks lines or turns the direction of what follows lets a text look like another
+  // one. Joiners (U+200C, U+200D) are no such thing: scripts and emoji need them.
+  const auto within = [&](std::string_view first, std::string_view last) {
+    return character >= first && character <= last;
+  };
+  return character == "\u200B" || within("\u200E", "\u200F") || within("\u2028", "\u202E") ||
+         within("\u2066", "\u2069") || character == "\uFEFF";
 }
 
 // The number of bytes of the UTF-8 character that `text` starts with, 0 where it starts with none.
@@ -90,7 +98,7 @@ class ValueWriter {
     text_ += '{';
     std::string_view separator;
     const auto write = [&](const YAMLMapping::Slot& slot) {
-      if (text_.size() > most_) return;
+      if (text_.size() > most_ || slot.key->IsPseudoKey()) return;
       text_ += separator;
       text_ += slot.key->GetText();
       text_ += ": ";

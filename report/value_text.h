@@ -14,11 +14,12 @@ inline constexpr std::string_view kEllipsis = "...";
 /// The text, cut between two characters and ended with kEllipsis where it is longer than `most` bytes.
 std::string Shortened(std::string_view text, size_t most);
 
-/// The text with blanks for control characters and line breaks, U+FFFD for what is not UTF-8. Several blanks
-/// in a row become one.
+/// The text with blanks for line breaks, control characters and those that make a text look like another one
+/// (such as a change of direction), U+FFFD for what is not UTF-8. Several blanks in a row become one.
 std::string OnOneLine(std::string_view text);
 
-/// The text with U+FFFD for what is not UTF-8 and for control characters other than tabs and line breaks.
+/// The text with U+FFFD for what is not UTF-8 and for what OnOneLine takes out, other than tabs and line
+/// breaks.
 std::string Cleaned(std::string_view text);
 
 /// A value as it could stand in a file, on one line; the name of the object stands beside a reference to it.

@@ -11,6 +11,7 @@ namespace vexel_yaml {
 namespace {
 
 constexpr size_t kMostLines = 6;
+constexpr size_t kMostOfLabel = 200;
 
 struct Escaped {
   std::string_view text;
@@ -95,7 +96,8 @@ std::string FieldLabel(const ReportRow& row) {
   if (row.path.back() == YAMLScalar::classIDPlaceHolderName) return "class ID";
   if (row.path.back() == YAMLScalar::fileIDPlaceHolderName) return "file ID";
   if (row.path.back() == YAMLScalar::strippedPrefabPlaceHolderName) return "stripped mark";
-  return PathToString({row.path.begin() + (row.path.size() == 2 ? 1 : 2), row.path.end()});
+  return Shortened(PathToString({row.path.begin() + (row.path.size() == 2 ? 1 : 2), row.path.end()}),
+                   kMostOfLabel);
 }
 
 std::string_view RowClass(const ReportRow& row) {

@@ -37,18 +37,18 @@ TEST(ObjectNames, PathsFollowTheHierarchyThroughGapsAndLoops) {
                                       "[{propertyPath: m_Layer, value: 1},"
                                       " {propertyPath: m_Name, value: Boat}]}") +
                                "--- !v!4 &94 stripped\nTransform: {m_PrefabInstance: {fileID: 90}}\n";
-  const auto scene =
-      ObjectsFromText(Lamp(10, "Harbour", 0) + Lamp(20, "Pier", 14) + Lamp(30, "A", 44) + Lamp(40, "B", 34) +
-                      Lamp(50, "Lost", 999) + instance + Object(1, 60, "GameObject", "m_Name: Bare"));
+  const auto scene = ObjectsFromText(Lamp(10, "Harbour", 0) + Lamp(20, "Pier", 14) + Lamp(30, "A", 44) +
+                                     Lamp(40, "B", 34) + Lamp(50, std::string(999, 'x'), 999) + instance +
+                                     Object(1, 60, "GameObject", "m_Name: Bare"));
   ObjectNames names({scene.get()});
   const auto path = [&](int id) { return names.GetPath(YAMLScalar::Lookup(std::to_string(id))); };
-  EXPECT_EQ(path(28) + " " + path(34) + " " + path(58), "Harbour/Pier B/A Lost");
+  EXPECT_EQ(path(28) + " " + path(34) + " " + path(58), "Harbour/Pier B/A " + std::string(97, 'x') + "...");
   EXPECT_EQ(path(94) + " " + path(60) + path(999), "Harbour/Pier/Boat Bare");
   EXPECT_EQ(names.Describe(YAMLScalar::Lookup("28")), "Light of Harbour/Pier");
 }
 
 TEST(ValueText, KeepsTextsOnOneLineAndInUtf8) {
-  EXPECT_EQ(OnOneLine("\n a\t\x01 b\xC2\x85\xFF\xED\xA0\x80 "), "a b \uFFFD\uFFFD\uFFFD\uFFFD");
+  EXPECT_EQ(OnOneLine("\n a\t b\u202E\uFEFF\u200D\xC2\x85\xED\xA0\x80 "), "a b \u200D \uFFFD\uFFFD\uFFFD");
   EXPECT_EQ(Shortened("ab\u00E9cde", 6), "ab...");
 }
 
@@ -66,38 +66,71 @@ TEST(ReadableHeaders, OnlyHeaderLinesOfReadableFilesChange) {
   EXPECT_EQ(readable("--- !v!1 &5\n<<<<<<<\n{"), "--- !v!1 &5\n<<<<<<<\n{");
 }
 
-// Left takes the lamp to the pier, right the pier to the lamp; both make the lamp brighter.
-TEST(Report, ShowsWhatEachSideDidAndNothingOfAFileAsMarkup) {
-  const std::string folder = ::testing::TempDir() + "report/";
+std::string PageOf(const std::string& base, const std::string& left, const std::string& right) {
+  // A folder for each test, since CTest runs them side by side.
+  const std::string test = ::testing::UnitTest::GetInstance()->current_test_info()->name();
+  const std::string folder = ::testing::TempDir() + test + "/";
   std::filesystem::create_directory(folder);
-  const std::string pier = kHeader + Lamp(10, "Pier", 0);
-  const std::string evil = "m_Intensity: 2\n  <i>: \"<script>alert('1')</script>\\x01&\"";
-  std::ofstream(folder + "base") << pier << Lamp(20, "Lamp", 0, "m_Intensity: 1\n  <i>: 1");
-  std::ofstream(folder + "left") << pier << Lamp(20, "Lamp", 14, evil);
-  std::ofstream(folder + "right") << kHeader << Lamp(10, "Pier", 24)
-                                  << Lamp(20, "Lamp", 0, "m_Intensity: 3\n  <i>: 1");
-  EXPECT_EQ(RunReport({"-o", folder + "page", "--title", "</title>\xFF", "--rules", "/dev/null",
-                       folder + "base", folder + "left", folder + "right"}),
-            0);
+  std::ofstream(folder + "base") << kHeader << base;
+  std::ofstream(folder + "left") << kHeader << left;
+  std::ofstream(folder + "right") << kHeader << right;
+  const int status = RunReport({folder + "base", folder + "left", "-o", folder + "page", "--rules",
+                                "/dev/null", "--title", "</title>\xFF", "--", folder + "right"});
   const ScopedRules emptied("");
   std::ifstream file(folder + "page");
-  const std::string page{std::istreambuf_iterator<char>(file), {}};
+  std::string page{std::istreambuf_iterator<char>(file), {}};
   std::filesystem::remove_all(folder);
-  const auto row = [&](const std::string& id, const std::string& path) {
-    const size_t start = page.find("data-path=\"" + path + "\"", page.find("data-file-id=\"" + id + "\""));
-    return page.substr(start, page.find("</tr>", start) - start);
-  };
-  EXPECT_THAT(
-      page,
-      AllOf(Not(HasSubstr("<script>alert")), Not(HasSubstr("<i>")), HasSubstr("&lt;/title&gt;\uFFFD"),
-            HasSubstr("data-file-id=\"28\" data-sides=\"left right\" data-kinds=\"conflict changed\"")));
-  EXPECT_THAT(row("28", "Light.&lt;i&gt;"),
-              AllOf(HasSubstr("&lt;script&gt;alert(&#39;1&#39;)&lt;/script&gt;\uFFFD&amp;<"),
-                    HasSubstr("from left")));
-  EXPECT_THAT(row("28", "Light.m_Intensity"),
-              AllOf(HasSubstr(">2<"), HasSubstr(">3<"), HasSubstr(">conflict<")));
-  EXPECT_THAT(row("14", "Transform.m_Father"), AllOf(HasSubstr(">conflict<"), HasSubstr(">repaired<")));
-  EXPECT_THAT(row("24", "Transform.m_Father"), AllOf(HasSubstr("{fileID: 14} Pier"), HasSubstr("from left")));
+  EXPECT_EQ(status, 0);
+  return page;
+}
+
+// The first row of that path in an object: field and note, base, left, right, result and state.
+std::string Row(const std::string& page, int id, std::string path) {
+  path = "data-path=\"" + path + "\"";
+  const size_t start = page.find('>', page.find(path, page.find("id=\"" + std::to_string(id) + "\""))) + 1;
+  std::string row = page.substr(start, page.find("</tr>", start) - start);
+  for (size_t tag = row.find('<'); tag != std::string::npos; tag = row.find('<')) {
+    row.replace(tag, row.find('>', tag) + 1 - tag, row.compare(tag, 3, "</t") == 0 ? "|" : "");
+  }
+  return row;
+}
+
+// Left takes the lamp to the pier, right the pier to the lamp; both make the lamp brighter.
+TEST(Report, ShowsWhatEachSideDidAndNothingOfAFileAsMarkup) {
+  const std::string pier = Lamp(10, "Pier", 0);
+  const std::string evil = "m_Intensity: 2\n  <i>: \"<script>'</script>\\x01&\"";
+  const std::string page =
+      PageOf(pier + Lamp(20, "Lamp", 0, "m_Intensity: 1\n  <i>: 1"), pier + Lamp(20, "Lamp", 14, evil),
+             Lamp(10, "Pier", 24) + Lamp(20, "Lamp", 0, "m_Intensity: 3\n  <i>: 1"));
+  EXPECT_THAT(page, AllOf(Not(HasSubstr("<script>'")), Not(HasSubstr("<i>")), HasSubstr("/title&gt;\uFFFD")));
+  EXPECT_THAT(page, HasSubstr("\"28\" data-sides=\"left right\" data-kinds=\"conflict changed\""));
+  EXPECT_THAT(Row(page, 28, "Light.&lt;i&gt;"), HasSubstr("|&lt;script&gt;&#39;&lt;/script&gt;\uFFFD&amp;|"));
+  EXPECT_EQ(Row(page, 28, "Light.m_Intensity"), "m_Intensity|1|2|3|1|conflict28.Light.m_Intensity|");
+  EXPECT_THAT(Row(page, 14, "Transform.m_Father"), HasSubstr("|conflict repaired14.Transform.m_Father|"));
+  EXPECT_THAT(Row(page, 24, "Transform.m_Father"), HasSubstr("{fileID: 14} Pier|from left|"));
+}
+
+TEST(Report, ShowsEveryChangeAtItsOwnPlace) {
+  const auto body = [](const std::string& fields) { return Object(114, 1, "MonoBehaviour", fields); };
+  const auto list = [&](const std::string& text) { return body("m_Things: [{fileID: 2}, " + text + "]"); };
+  std::string page = PageOf(list("{fileID: 5, n: 0}"), list("{fileID: 3, n: 1}, {fileID: 5, n: 9}"),
+                            list("{fileID: 3, n: 7}, {fileID: 5, n: 0}"));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.m_Things.1"), HasSubstr("n: 9}|unchanged|{fileID: 5, n: 9}|from"));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.m_Things.+1.n"), HasSubstr("||added 1|added 7|not there|"));
+  page = PageOf(body("t: [a, c]\n  x.b: 1\n  x:\n    b: 1"), body("t: [c, a]\n  x.b: 2\n  x:\n    b: 1"),
+                body("t: [a, c, d]\n  x.b: 1\n  x:\n    b: 3"));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.t"), HasSubstr("|new order: [c, a]|+ d|+ d|from right|"));
+  EXPECT_EQ(Row(page, 1, "MonoBehaviour.x.b"), "x.b|1|2|unchanged|2|from left|");
+}
+
+// Left removes the lamp that right renames, and adds another one to the pier that right removes.
+TEST(Report, TellsTheWholeFromItsParts) {
+  const std::string pier = Lamp(10, "Pier", 0);
+  const std::string page = PageOf(pier + Object(1, 5, "GameObject", "m_Name: Lamp"),
+                                  pier + Lamp(20, "New", 14), Object(1, 5, "GameObject", "m_Name: Bulb"));
+  EXPECT_THAT(Row(page, 5, ""), HasSubstr("|removed |changed inside|1 fieldm_Name: Lamp|conflict5|"));
+  EXPECT_EQ(Row(page, 5, "GameObject.m_Name"), "m_Name|Lamp|removed |Bulb|Lamp|in conflict|");
+  EXPECT_THAT(Row(page, 24, ""), HasSubstr("|from left|"));
 }
 
 }  // namespace
