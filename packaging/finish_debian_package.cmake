@@ -17,7 +17,6 @@ Files: *
 Copyright: ${holder}
 License: Expat
  ${license}")
-file(REMOVE ${folder}/LICENSE)
 
 file(STRINGS ${folder}/CHANGELOG.md heading REGEX "^## ${CPACK_PACKAGE_VERSION} - ")
 if(NOT heading)
@@ -34,6 +33,9 @@ file(WRITE ${folder}/changelog
  -- ${CPACK_PACKAGE_CONTACT}  ${date}
 ")
 execute_process(COMMAND gzip -9n ${folder}/changelog COMMAND_ERROR_IS_FATAL ANY)
+
+# Debian's zsh looks for the completions of packages there.
+file(RENAME ${root}/share/zsh/site-functions ${root}/share/zsh/vendor-completions)
 
 # Whatever the umask of who makes the package.
 file(CHMOD_RECURSE ${folder} FILE_PERMISSIONS OWNER_READ OWNER_WRITE GROUP_READ WORLD_READ)

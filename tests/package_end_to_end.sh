@@ -66,7 +66,7 @@ doc=root/usr/share/doc/vexel-yaml-merge
 check "the copyright can be read by machines" grep -qx 'License: Expat' "$doc/copyright"
 check "the changelog is Debian's" grep -q "^vexel-yaml-merge ($version)" <(zcat "$doc/changelog.gz")
 check "the completions are where the shells look" test -f root/usr/share/bash-completion/completions/vexel-merge-git \
-  -a -f root/usr/share/zsh/site-functions/_VexelYAMLMerge \
+  -a -f "$(printf 'root%s/_VexelYAMLMerge\n' $(zsh -f -c 'print -l $fpath') | xargs -d '\n' ls 2>/dev/null)" \
   -a -f root/usr/share/fish/vendor_completions.d/vexel-merge-git.fish
 
 for page in VexelYAMLMerge.1 vexel-merge-git.1 vexel-merge-report.1 mergerules.txt.5 mergespecfile.txt.5; do
