@@ -74,6 +74,10 @@ check "the rebased file is the merged one" cmp -s "$file" <(scene 5 40)
 git checkout -q -b picked brighter
 check "a cherry-pick succeeds" git cherry-pick wider >/dev/null
 check "the file is the merged one after it" cmp -s "$file" <(scene 5 40)
+git checkout -q -b popped start && scene 5 10 >"$file" && git stash -q && git merge -q --ff-only wider
+check "so does git stash pop" git stash pop -q
+check "the file is the merged one then, too" cmp -s "$file" <(scene 5 40)
+git reset -q --hard
 
 check "a conflict stops the merge" merge_darker
 check "the file is unmerged, and the record isn't seen" is_unmerged
@@ -145,11 +149,15 @@ check "and its diff can be shown" grep -qF 'A: [' <(git diff start broken)
 git reset -q --hard
 
 # The repository's own rules: a light as one unit makes a conflict of the edits that have merged above.
-printf '[exclusions]\nexclude *.Light\n' >"$work/rules" && git config vexel.rules "$work/rules"
+printf '[exclusions]\nexclude *.Light\n' >"$work/rules" && cp "$work/rules" rules.txt && git config vexel.rules rules.txt
 git checkout -q ":/^brighter"
 check "the repository's own rules count" refuses git merge -q --no-edit wider >/dev/null 2>&1
 check "and show in the page" grep -q 'data-kinds="[a-z ]*conflict' "$(vexel-merge-git report)"
-git merge --abort && git config --unset vexel.rules
+git merge --abort && git config --unset vexel.rules && rm rules.txt
+git config vexel.typeInfo "$work/none.yaml"
+check "a setting that can't be followed stops the merge" refuses git merge -q --no-edit wider >/dev/null 2>"$work/err"
+check "its file is named" grep -qF none.yaml "$work/err"
+git merge --abort && git config --unset vexel.typeInfo
 
 # What bears our names but isn't in the engine's format is merged as git would do it.
 git checkout -q -b plain wider

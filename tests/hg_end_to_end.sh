@@ -61,6 +61,12 @@ scene 3 40 >"$file" && hg resolve -q --mark "$file" 2>/dev/null
 check "an edited file can be marked, and the graft go on" quietly hg graft -q --continue
 check "it has what was edited" has_values 3 40
 
+hg update -q -C brighter && printf '[exclusions]\nexclude *.Light\n' >rules.txt
+tool=$(hg config merge-tools.vexel.args)
+check "with rules of the repository, two edits of one light are a conflict" refuses quietly hg merge wider \
+  --config merge-tools.vexel.args="${tool/--force/--force --rules rules.txt}" --config ui.origbackuppath=.hg/origbackups
+check "the backup goes where it is told to" test -f ".hg/origbackups/$file"
+
 hg update -q -C noted
 check "other files conflict as ever" refuses quietly hg merge other-notes
 check "with Mercurial's own markers" grep -q '^<<<<<<<' notes.txt

@@ -59,6 +59,8 @@ def shown(output):
 def check(programs, document):
     text = document.read_text()
     wanted = list(steps(text)) or sys.exit(f"{document}: nothing to run")
+    if len(re.findall(r"<!-- (?:file|copy|run|table): |^```console$", text, re.MULTILINE)) != len(ITEM.findall(text)):
+        sys.exit(f"{document}: not all that is marked to be run can be read")
     # One shell for all, so that what one command sets is there for the next one, "$?" too.
     script = "".join(f"eval {shlex.quote(command)}\n{{ s=$?; printf '\\0'; (exit $s); }}\n"
                      for command, _, _ in wanted)

@@ -67,4 +67,15 @@ check "it has mine where that was chosen, and theirs elsewhere" has 7 60 23 21 2
 svn resolve -q --accept=working "$file"
 check "it can be committed" svn commit -q -m settled
 
+# The script of the manual, for rules of one's own: here with one that makes a light one unit.
+sed -n '/^```sh$/,/^```$/p' "$project/docs/subversion.md" | sed -n '/^#!/,/^```$/{/^```$/!p;}' >"$HOME/merge-with-rules"
+chmod +x "$HOME/merge-with-rules"
+printf '[exclusions]\nexclude *.Light\n' >"$HOME/our_rules.txt"
+svn update -q "$work/theirs" && save theirs 7 80 23 21 22 24
+lamp 8 60 23 21 22 25 >"$file"
+check "a script can pass rules" launch update --config-option "config:helpers:merge-tool-cmd=$HOME/merge-with-rules"
+check "they count" grep -q "^Left  11.Light *$" "$work/log"
+check "Subversion keeps the conflict then, too" test "$(state)" = "C       $work/mine/$file"
+check "and the file can be opened" has 7 60 23 21 22 24 25
+
 end_of_checks "Subversion merges through the program"

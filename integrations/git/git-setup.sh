@@ -252,6 +252,11 @@ status() {
   echo "merge tool     $text"
   text=$(attribute_sources) || complete=false
   echo "attributes     ${text:-no pattern with merge=vexel}"
+  for option in rules typeInfo; do
+    value=$(git config --type=path --get "vexel.$option") || continue
+    printf '%-14s %s\n' "$option" "$value"
+    [ -f "$value" ] || { echo "  but that file is missing"; complete=false; }
+  done
   # Where somebody's own hook has kept ours away, records may have outlived their conflicts.
   sweep
   unmerged_paths | ours_among | sed 's/^/in conflict    /'
