@@ -17,7 +17,7 @@ std::set<std::string_view> Edits(const ReportCell& cell) {
   while (!rest.empty()) {
     const std::string_view line = rest.substr(0, rest.find('\n'));
     rest.remove_prefix(std::min(line.size() + 1, rest.size()));
-    if (!line.starts_with(kNewOrder)) edits.insert(line);
+    if (line != kChangedInside && !line.starts_with(kNewOrder)) edits.insert(line);
   }
   return edits;
 }
@@ -25,6 +25,8 @@ std::set<std::string_view> Edits(const ReportCell& cell) {
 // Whether the elements that `side` moved stand in its order in the result, as far as they are there.
 bool HoldsOrder(const ReportCell& result, const ReportCell& side) {
   if (std::ranges::is_sorted(side.order)) return true;
+  const bool is_list = result.kind == Kind::kUnchanged || result.kind == Kind::kEdited;
+  if (is_list && result.order.empty()) return false;
   std::unordered_map<uint32_t, size_t> places;
   for (const uint32_t element : result.order) places.emplace(element, places.size());
   std::vector<size_t> order;
@@ -36,7 +38,8 @@ bool HoldsOrder(const ReportCell& result, const ReportCell& side) {
 }
 
 bool Holds(const ReportCell& result, const ReportCell& side) {
-  return std::ranges::includes(Edits(result), Edits(side)) && HoldsOrder(result, side);
+  return std::ranges::includes(Edits(result), Edits(side)) && HoldsOrder(result, side) &&
+         (result.parts_changed || !side.parts_changed);
 }
 
 std::string_view StateOf(const ReportRow& row) {
@@ -46,7 +49,7 @@ std::string_view StateOf(const ReportRow& row) {
   if (left != right) return left ? "from left" : "from right";
   bool is_left = row.result == row.left;
   bool is_right = row.result == row.right;
-  if (is_left && is_right) return "same on both";
+  if (is_left && is_right && !row.result.parts_changed) return "same on both";
   if (row.result.kind == Kind::kEdited) {
     is_left = Holds(row.result, row.left);
     is_right = Holds(row.result, row.right);

@@ -21,6 +21,8 @@ struct ReportCell {
 
   /// Of a list whose elements came, went or moved: those of base that are still there, in their order now.
   std::vector<uint32_t> order = {};
+  /// Whether other rows show changes of parts of it.
+  bool parts_changed = false;
 
   bool operator==(const ReportCell& other) const {
     return kind == other.kind && text == other.text && full == other.full;
@@ -65,6 +67,8 @@ std::vector<ReportObject> CollectReport(const MergedFiles& files);
 
 /// How the line of a list's edits begins that shows its new order.
 inline constexpr std::string_view kNewOrder = "new order: ";
+/// The text of a place of which only parts changed, which have rows of their own.
+inline constexpr std::string_view kChangedInside = "changed inside";
 
 /// Tells what became of a place that no record settles, from what its cells say, and notes it where an order
 /// got lost.

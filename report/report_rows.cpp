@@ -2,7 +2,7 @@
 
 namespace vexel_yaml {
 
-ReportCell ChangedInside() { return {ReportCell::Kind::kEdited, "changed inside", {}}; }
+ReportCell ChangedInside() { return {ReportCell::Kind::kEdited, std::string(kChangedInside), {}}; }
 
 ReportObject& ReportRows::ObjectAt(const YAMLScalar* file_id) { return objects_[IndexOf(file_id)]; }
 
@@ -25,8 +25,9 @@ void ReportRows::MarkAbove(const ReportRow& row) {
     ReportRow* const whole = Find(path);
     if (whole == nullptr) continue;
     for (const auto cell : {&ReportRow::left, &ReportRow::right, &ReportRow::result}) {
-      const bool changed = (row.*cell).kind != ReportCell::Kind::kUnchanged;
-      if (changed && (whole->*cell).kind == ReportCell::Kind::kUnchanged) whole->*cell = ChangedInside();
+      if ((row.*cell).kind == ReportCell::Kind::kUnchanged) continue;
+      if ((whole->*cell).kind == ReportCell::Kind::kUnchanged) whole->*cell = ChangedInside();
+      (whole->*cell).parts_changed = true;
     }
   }
 }

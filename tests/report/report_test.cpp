@@ -117,6 +117,8 @@ TEST(Report, ShowsEveryChangeAtItsOwnPlace) {
                             list("{fileID: 3, n: 7}, {fileID: 5, n: 0}"));
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.m_Things.1"), HasSubstr("n: 9}|unchanged|{fileID: 5, n: 9}|from"));
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.m_Things.+1.n"), HasSubstr("||added 1|added 7|not there|"));
+  page = PageOf(list("{fileID: 5, n: 0}"), list("{fileID: 5, n: 0}, {fileID: 9}"), list("{fileID: 5, n: 8}"));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.m_Things"), HasSubstr("|changed inside|+ {fileID: 9}|merged|"));
   page = PageOf(body("t: [a, c]\n  x.b: 1\n  x:\n    b: 1"), body("t: [c, a]\n  x.b: 2\n  x:\n    b: 1"),
                 body("t: [a, c, d]\n  x.b: 1\n  x:\n    b: 3"));
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.t"), HasSubstr("|new order: [c, a]|+ d|+ d|from right|"));
