@@ -164,8 +164,10 @@ int Report(const Arguments& arguments) {
 
 }  // namespace
 
-int RunReport(const std::vector<std::string>& arguments) {
+int RunReport(const std::vector<std::string>& command_line) {
   initialize();
+  const int skipped = command_line.empty() ? 0 : 1;
+  const std::vector<std::string> arguments(command_line.begin() + skipped, command_line.end());
   if (arguments.size() == 1 && arguments.front() == "--version") {
     std::cout << "vexel-merge-report " VEXEL_VERSION "\n";
     return 0;

@@ -74,8 +74,8 @@ std::string PageOf(const std::string& base, const std::string& left, const std::
   std::ofstream(folder + "base") << kHeader << base;
   std::ofstream(folder + "left") << kHeader << left;
   std::ofstream(folder + "right") << kHeader << right;
-  const int status = RunReport({folder + "base", folder + "left", "-o", folder + "page", "--rules",
-                                "/dev/null", "--title", "</title>\xFF", "--", folder + "right"});
+  const int status = RunReport({"vexel-merge-report", folder + "base", folder + "left", "-o", folder + "page",
+                                "--rules", "/dev/null", "--title", "</title>\xFF", "--", folder + "right"});
   const ScopedRules emptied("");
   std::ifstream file(folder + "page");
   std::string page{std::istreambuf_iterator<char>(file), {}};
