@@ -147,11 +147,10 @@ int Report(const Arguments& arguments) {
     MergeForReport(arguments.config, files);
     if (arguments.mode == Mode::kPage) {
       WritePageFile(arguments, files);
-    } else if (!files.error.empty()) {
-      throw YAMLError(files.error);
-    } else {
-      PrintConflicts(files.resolver);
+      return 0;
     }
+    if (!files.error.empty()) return Fail(prefix + files.error);
+    PrintConflicts(files.resolver);
   } catch (const FileError& error) {
     return Fail(error.what());
   } catch (const YAMLError& error) {

@@ -79,7 +79,8 @@ sweep() (
   list=$(record_list)
   [ -f "$list" ] || return 0
   unmerged_paths >"$list.unmerged"
-  LC_ALL=C sort -u "$list" | LC_ALL=C comm -23 - "$list.unmerged" | while IFS= read -r path; do remove_record "$path"; done
+  LC_ALL=C sort -u "$list" | LC_ALL=C comm -23 - "$list.unmerged" |
+    while IFS= read -r path; do remove_record "$path"; done
   LC_ALL=C sort -u "$list" | LC_ALL=C comm -12 - "$list.unmerged" >"$list.new"
   rm -f "$list.unmerged"
   mv -f "$list.new" "$list"

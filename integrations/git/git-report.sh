@@ -66,7 +66,8 @@ list_merged() {
 changed_since_base() {
   side_commit=$1
   shift
-  GIT_LITERAL_PATHSPECS=1 git diff --name-only --no-relative --no-renames -z "$base" "$side_commit" -- "$@" | tr '\0' '\n' | LC_ALL=C sort
+  GIT_LITERAL_PATHSPECS=1 git diff --name-only --no-relative --no-renames -z "$base" "$side_commit" -- "$@" |
+    tr '\0' '\n' | LC_ALL=C sort
 }
 
 write_merged_versions() {
