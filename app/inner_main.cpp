@@ -22,6 +22,7 @@ int Run(int (*handle)(const Argument&), const Argument& argument) {
   } catch (const YAMLError& error) {
     errs << error.what() << "\n";
     ErrMsg(errs);
+    WriteHint(error.GetHint());
     return 1;
   }
 }

@@ -97,7 +97,9 @@ int ProcessMergeCommand(const MergeConfig& config) {
   try {
     return MergeIntoTemporaryFile(config);
   } catch (const YAMLError& error) {
-    return Report("Cannot merge file '" + config.base_path + "': " + error.what() + "\n");
+    Report("Cannot merge file '" + config.base_path + "': " + error.what() + "\n");
+    WriteHint(error.GetHint());
+    return 1;
   } catch (const FileError& error) {
     return Report(std::string(error.what()) + "\n");
   }

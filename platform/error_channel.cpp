@@ -29,4 +29,8 @@ void WriteErrorLine(std::string_view line) {
   std::cerr << line << '\n' << std::flush;
 }
 
+void WriteHint(std::string_view text) {
+  if (!text.empty() && isatty(STDERR_FILENO) != 0) WriteErrorLine("hint: " + std::string(text));
+}
+
 }  // namespace vexel_yaml

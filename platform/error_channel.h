@@ -24,4 +24,9 @@ void ErrMsg(std::stringstream& stream);
 /// Writes one line to standard error, from any thread, without a dialog and without touching `errs`.
 void WriteErrorLine(std::string_view line);
 
+/// Writes "hint: " and `text` as a line behind a message, from any thread, where a person reads standard
+/// error on a terminal. Elsewhere, and for an empty text, it writes nothing: scripts compare the messages,
+/// and neither the dialog nor `errs` gets to see a hint.
+void WriteHint(std::string_view text);
+
 }  // namespace vexel_yaml

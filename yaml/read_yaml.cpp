@@ -56,7 +56,7 @@ void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache*
   try {
     if (!ParseYAMLFile(VexelToNativePath(path), objects, cache)) throw YAMLError("Cannot read file");
   } catch (const YAMLError& error) {
-    throw YAMLError(prefix + ": " + error.what());
+    throw YAMLError(prefix + ": " + error.what(), error.GetHint());
   } catch (const std::exception& error) {
     throw YAMLError(prefix + " caught unknown exception: " + error.what());
   }
