@@ -40,7 +40,7 @@ enum class Mode { kPage, kConflicts, kText };
 
 struct Arguments {
   Mode mode = Mode::kPage;
-  std::string output = "report.html";
+  std::string output;
   std::string title;
   ReportConfig config;
   std::string text_file;
@@ -59,6 +59,14 @@ std::string* ValueTarget(std::string_view option, Arguments& parsed) {
   if (option == "--rules") return &parsed.config.rules_file;
   if (option == "--typeInfo") return &parsed.config.type_info_file;
   return nullptr;
+}
+
+// Nobody has chosen this name, so a repository could have a link there that leads to a file of the user's.
+std::string DefaultPage() {
+  const std::string page = "report.html";
+  std::error_code error;
+  if (!std::filesystem::is_symlink(page, error)) return page;
+  throw std::runtime_error(page + " is a symbolic link; say -o " + page + " to write where it leads to");
 }
 
 // Throws std::runtime_error for arguments that make no sense.
@@ -92,6 +100,7 @@ Arguments Parse(const std::vector<std::string>& arguments) {
                              std::to_string(given.size()) + "; see vexel-merge-report --help");
   }
   for (size_t i = 0; i < paths.size(); ++i) *paths[i] = given[i];
+  if (parsed.mode == Mode::kPage && parsed.output.empty()) parsed.output = DefaultPage();
   return parsed;
 }
 
