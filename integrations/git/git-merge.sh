@@ -20,7 +20,7 @@ read_rule_options() {
 
 # say_messages BASE LEFT RIGHT [OPTIONS...]: $scratch/messages, with the asset's own name for the temporary ones.
 say_messages() {
-  BASE=$1 LEFT=$2 RIGHT=$3 OPTIONS=$* ASSET=$asset SUFFIX=$record_suffix awk '
+  BASE=$1 LEFT=$2 RIGHT=$3 OPTIONS=$* ASSET=$(shown "$asset") RECORD=${record-} awk '
     function named(name, as,   at, out) {
       out = ""
       while (name != "" && (at = index($0, name)) > 0) {
@@ -31,14 +31,14 @@ say_messages() {
     }
     # Of a mistake in the record, whose line is named.
     index(ENVIRON["OPTIONS"], " -i ") && / specified on line [0-9]+$/ {
-      sub(/^.*Cannot merge file .*\047: /, ENVIRON["ASSET"] ENVIRON["SUFFIX"] ": ")
+      if (match($0, /^.*Cannot merge file .*\047: /)) $0 = ENVIRON["RECORD"] ": " substr($0, RLENGTH + 1)
     }
     {
       named("\047" ENVIRON["BASE"] "\047", "\047" ENVIRON["ASSET"] "\047")
       named("\047" ENVIRON["LEFT"] "\047", "\047" ENVIRON["ASSET"] "\047 (theirs)")
       named("\047" ENVIRON["RIGHT"] "\047", "\047" ENVIRON["ASSET"] "\047 (ours)")
       print
-    }' "$scratch/messages" >&2
+    }' "$scratch/messages" | say_lines
 }
 
 # merge_into RESULT BASE LEFT RIGHT [-i RECORD]: leaves the record in $scratch/record. Returns the program's status.
@@ -73,8 +73,8 @@ count_conflicts() {
 }
 
 say_conflicts() {
-  ASSET=$asset awk -F '\t' '{printf "CONFLICT %s: %s: left %s, right %s\n", ENVIRON["ASSET"], $1, $2, $3}' \
-    "$scratch/conflicts" >&2
+  ASSET=$(shown "$asset") awk -F '\t' '{printf "CONFLICT %s: %s: left %s, right %s\n", ENVIRON["ASSET"], $1, $2, $3}' \
+    "$scratch/conflicts" | say_lines
 }
 
 # is_asset FILE: whether it is in the engine's text format, and not one of its plain .meta files, binary, or a pointer
@@ -150,8 +150,8 @@ tell_conflicts() {
   say_conflicts
   [ "$keeps_records" = true ] || return 0
   if leave_record "$asset" "$(hash_of "$asset" "$scratch/merged")"; then
-    say "$(count_conflicts), listed in $asset$record_suffix; to settle: vexel-merge-git resolve $(quoted "$asset")"
+    say "$(count_conflicts), listed in ${record#./}; to settle: $(resolve_call "$asset")"
   else
-    complain "cannot write $asset$record_suffix"
+    complain "cannot write the record of $asset"
   fi
 }

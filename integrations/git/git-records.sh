@@ -3,46 +3,107 @@
 
 record_suffix=.vexel-conflicts
 
-record_of() { printf './%s%s\n' "$1" "$record_suffix"; }
+# find_record PATH: sets $record to this asset's record, empty where it has none, $beside and $kept to the places for
+# one, and $entry to what we remember of it. Only what is remembered is ours: a file of this name that the repository
+# tracks, or that somebody else has put there, is neither read nor written. Then, and where the name would be too long
+# or lies behind a symbolic link, the record is kept in git's folder.
+find_record() {
+  records=$(git_path vexel-merge-records)
+  record_id=$(printf '%s' "$1" | git hash-object --stdin)
+  beside=./$1$record_suffix
+  kept=$records/$record_id$record_suffix
+  entry=$records/$record_id.path
+  record=
+  if [ -f "$kept" ]; then
+    record=$kept
+  elif [ -f "$entry" ] && [ -f "$beside" ] && is_for_us "$1$record_suffix"; then
+    record=$beside
+  fi
+}
 
-# The paths that have a record, one a line.
-record_list() { git_path vexel-merge-records; }
+# is_for_us PATH: a command of the user may be at work on another index.
+is_for_us() (
+  unset GIT_INDEX_FILE
+  is_plain "$1" && [ -z "$(git ls-files -- ":(literal)$1")" ]
+)
 
 # hash_of PATH [FILE]: the blob that git would make of FILE, the work tree's file if not given, under this path.
 hash_of() { git hash-object --path="$1" -- "${2-./$1}" 2>/dev/null; }
 
-# recorded_hash RECORD: of the asset as the merge left it, to see whether somebody has edited it since.
-recorded_hash() { [ ! -f "$1" ] || sed -n 's/^# merged: //p' "$1" | head -n 1; }
+# recorded_hash PATH: of the asset as the merge left it, to see whether somebody has edited it since.
+recorded_hash() (
+  find_record "$1"
+  [ ! -f "$entry" ] || sed -n 2p "$entry"
+)
 
-# leave_record PATH HASH: makes a record from $scratch/record and $scratch/conflicts. False where it can't.
-leave_record() (
-  record=$(record_of "$1")
+# leave_record PATH HASH: makes a record from $scratch/record and $scratch/conflicts, and sets $record. False where it
+# can't.
+leave_record() {
   {
     cat <<TEXT
-# What is in conflict in $1. Left is "theirs", right is "ours".
+# What is in conflict in $(printf '%s' "$1" | escaped '\n'). Left is "theirs", right is "ours".
 # To settle a conflict, take the "#" off its line at the end, and leave one of the three words. Then:
-#   vexel-merge-git resolve $(quoted "$1")
-# merged: $2
+#   $(resolve_call "$1" | escaped '\n')
 TEXT
     cat "$scratch/record"
     cut -f 1 "$scratch/conflicts" | sed 's/^/# left|right|base /'
   } >"$scratch/new-record"
-  mkdir -p "$(dirname "$record")" && cp "$scratch/new-record" "$record.new" && mv -f "$record.new" "$record" &&
-    watch_record "$1" || return 1
+  locked place_record "$1" "$2" || return 1
+  find_record "$1"
   # The record is there all the same; what is wrong with the other file has been said.
   exclude_records || :
+}
+
+# place_record PATH HASH: remembered first, so that no record is there that nobody removes.
+place_record() {
+  find_record "$1"
+  place=$kept
+  if [ "$record" = "$beside" ] || { [ ! -e "$beside" ] && is_for_us "$1$record_suffix"; }; then place=$beside; fi
+  # The first version had a list of this name.
+  [ ! -f "$records" ] || rm -f "$records"
+  mkdir -p "$records" || return 1
+  printf '%s\n%s\n' "$(line_of "$1")" "$2" | put_file "$entry" || return 1
+  place_hook || :
+  if [ "$place" = "$beside" ] && mkdir -p "${beside%/*}" 2>/dev/null && put_file "$beside" <"$scratch/new-record"; then
+    rm -f "$kept"
+  else
+    put_file "$kept" <"$scratch/new-record"
+  fi
+}
+
+# resolve_call PATH: the command that settles the conflicts in this file.
+resolve_call() (
+  case $1 in
+    -*) printf 'vexel-merge-git resolve -- %s\n' "$(quoted "$1")" ;;
+    *) printf 'vexel-merge-git resolve %s\n' "$(quoted "$1")" ;;
+  esac
 )
+
+# decided_in RECORD: what the last section says, which is the one that people edit. What stands above comes from the
+# sides of the merge, and whatever it looks like, it decides nothing. Lines keep their numbers.
+decided_in() {
+  awk 'NR == FNR {if (/^Conflict handling:\r?$/) last = FNR; next}
+    {print (last && FNR >= last ? $0 : "")}' "$1" "$1"
+}
 
 # Records are for one person on one machine: git must not offer to add them. What lies behind a symbolic link
 # isn't the repository's.
 exclude_records() (
-  exclude=$(git_path info/exclude)
-  if [ -h "$exclude" ] || [ -h "$(dirname "$exclude")" ]; then return 0; fi
+  exclude=$(exclude_file)
+  [ -n "$exclude" ] || return 0
   state=$(git rev-parse --git-common-dir)/vexel-merge
   set_block "$exclude" exclude "*$record_suffix"
 )
+exclude_file() {
+  exclude=$(git_path info/exclude)
+  if [ ! -h "$exclude" ] && [ ! -h "$(dirname "$exclude")" ]; then printf '%s\n' "$exclude"; fi
+}
 
-remove_record() { rm -f "$(record_of "$1")"; }
+remove_record() (
+  find_record "$1"
+  if [ "$record" = "$beside" ]; then rm -f "$beside"; fi
+  rm -f "$kept" "$entry"
+)
 
 # Git tells nobody that a merge was aborted, or a file added by hand, but it has a hook for every change of the
 # index. Ours is there only as long as a record is, and never in place of another one.
@@ -51,51 +112,58 @@ hook_path() {
   if [ -h "$hooks" ] || git config --get core.hooksPath >/dev/null; then return 0; fi
   printf '%s/post-index-change\n' "$hooks"
 }
-is_our_hook() { [ -f "$1" ] && grep -qF 'vexel-merge-git sweep' "$1"; }
+is_our_hook() { [ ! -h "$1" ] && [ -f "$1" ] && grep -qF 'vexel-merge-git sweep' "$1"; }
 
-watch_record() (
-  list=$(record_list)
-  if ! { [ -f "$list" ] && grep -qxF -e "$1" "$list"; }; then printf '%s\n' "$1" >>"$list"; fi
+place_hook() (
   hook=$(hook_path)
-  if [ -z "$hook" ] || { [ -e "$hook" ] && ! is_our_hook "$hook"; }; then return 0; fi
-  mkdir -p "$(dirname "$hook")"
-  cat >"$hook" <<TEXT
-#!/bin/sh
+  [ -n "$hook" ] || return 0
+  text="#!/bin/sh
 # vexel-merge-git sweep: removes the records of conflicts that are gone, and with the last one this hook.
-if [ -x $(quoted "$self") ]; then exec $(quoted "$self") sweep; fi
-TEXT
-  chmod +x "$hook"
+if [ -x $(quoted "$self") ]; then exec $(quoted "$self") sweep; fi"
+  if [ -e "$hook" ]; then
+    if ! is_our_hook "$hook" || [ "$(cat "$hook")" = "$text" ]; then return 0; fi
+  fi
+  mkdir -p "$(dirname "$hook")" && printf '%s\n' "$text" | put_file "$hook" =rwx
 )
 
-# The paths that are unmerged, one a line. A command of the user may be at work on another index.
+# With the last record of this work tree: the hook goes, unless another one has a record. What a killed process has
+# left is no record.
+remove_hook() {
+  rm -f "$records"/.vexel-*
+  rmdir "$records" 2>/dev/null || return 0
+  if has_records; then return 0; fi
+  hook=$(hook_path)
+  if [ -n "$hook" ] && is_our_hook "$hook"; then rm -f "$hook"; fi
+}
+
+# The paths that are unmerged, as a list. A command of the user may be at work on another index.
 unmerged_paths() (
   unset GIT_INDEX_FILE
-  git ls-files --unmerged -z | tr '\0' '\n' | cut -f 2- | LC_ALL=C sort -u
+  unmerged_below
 )
 
 # Removes the records whose files are no longer unmerged.
 sweep() (
   go_to_top
-  list=$(record_list)
-  [ -f "$list" ] || return 0
-  unmerged_paths >"$list.unmerged"
-  LC_ALL=C sort -u "$list" | LC_ALL=C comm -23 - "$list.unmerged" |
-    while IFS= read -r path; do remove_record "$path"; done
-  LC_ALL=C sort -u "$list" | LC_ALL=C comm -12 - "$list.unmerged" >"$list.new"
-  rm -f "$list.unmerged"
-  mv -f "$list.new" "$list"
-  [ ! -s "$list" ] || return 0
-  rm -f "$list"
-  if has_records; then return 0; fi
-  hook=$(hook_path)
-  if [ -n "$hook" ] && is_our_hook "$hook"; then rm -f "$hook"; fi
+  records=$(git_path vexel-merge-records)
+  [ -d "$records" ] || return 0
+  unmerged=$(unmerged_paths)
+  {
+    printf '%s\n\n' "$unmerged"
+    find "$records" -name '*.path' -exec awk 'FNR == 1' {} +
+  } | awk '$0 == "" {behind = 1; next} !behind {unmerged[$0]; next} !($0 in unmerged)' |
+    while IFS= read -r line; do
+      path_of "$line"
+      remove_record "$path"
+    done
+  locked remove_hook
 )
 
-# Whether any work tree of this repository has a record; each has a list of its own.
+# Whether any work tree of this repository has a record.
 has_records() (
   common=$(git rev-parse --git-common-dir)
-  for list in "$common/vexel-merge-records" "$common"/worktrees/*/vexel-merge-records; do
-    if [ -f "$list" ]; then return 0; fi
+  for folder in "$common/vexel-merge-records" "$common"/worktrees/*/vexel-merge-records; do
+    if [ -d "$folder" ]; then return 0; fi
   done
   return 1
 )

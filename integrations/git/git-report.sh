@@ -66,8 +66,8 @@ list_merged() {
 changed_since_base() {
   side_commit=$1
   shift
-  GIT_LITERAL_PATHSPECS=1 git diff --name-only --no-relative --no-renames -z "$base" "$side_commit" -- "$@" |
-    tr '\0' '\n' | LC_ALL=C sort
+  GIT_LITERAL_PATHSPECS=1 git_names diff --name-only --no-relative --no-renames "$base" "$side_commit" -- "$@" |
+    LC_ALL=C sort
 }
 
 write_merged_versions() {
@@ -96,7 +96,9 @@ report_listed() {
     die "-o takes one file's page; name its path behind --"
   fi
   outcome=0
-  while IFS= read -r asset; do
+  while IFS= read -r line; do
+    path_of "$line"
+    asset=$path
     report_asset || outcome=1
   done <"$scratch/assets"
   return "$outcome"
@@ -108,7 +110,12 @@ report_asset() {
   target=$page
   if [ -z "$target" ]; then
     target=$(git_path vexel-merge-report)/$asset.html
-    mkdir -p "$(dirname "$target")" || return 1
+    # Not all that an asset may be called has room for a suffix.
+    name=${asset##*/}
+    if [ "$(printf '%s' "$name" | wc -c)" -gt 200 ]; then
+      target=${target%"$name.html"}$(printf '%s' "$name" | git hash-object --stdin).html
+    fi
+    mkdir -p "${target%/*}" || return 1
   fi
   case $target in
     /*) ;;
@@ -118,12 +125,16 @@ report_asset() {
   [ -z "$commit" ] || title="$asset, the parents of $(git rev-parse --short "$commit") merged anew"
   eval "set -- $options"
   # What is settled in the record of the conflict at hand shows as settled.
-  if [ -z "$commit" ] && [ -f "$(record_of "$asset")" ]; then set -- "$@" -i "$(pwd)/$(record_of "$asset")"; fi
+  find_record "$asset"
+  if [ -z "$commit" ] && [ -n "$record" ]; then
+    decided_in "$record" >"$scratch/decided"
+    set -- "$@" -i decided
+  fi
   # From their folder, since the page shows the paths that were given.
   if ! (cd "$scratch" && "$reporter" "$@" -o "$target" --title "$title" "$base_file" "$left_file" "$right_file") \
     2>"$scratch/messages"; then
     say_messages "$base_file" "$left_file" "$right_file" "$@"
     return 1
   fi
-  printf '%s\n' "${page_shown:-$target}"
+  tell "${page_shown:-$target}"
 }

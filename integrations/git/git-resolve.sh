@@ -1,19 +1,20 @@
 # Settling conflicts: resolve and the merge tool of vexel-merge-git, which sources this file.
 
-# make_record BASE LEFT RIGHT: where the asset has none (any more), with nothing settled.
-make_record() (
-  if [ -f "$(record_of "$asset")" ]; then return 0; fi
+# make_record BASE LEFT RIGHT: where the asset has none (any more), with nothing settled. Sets $record.
+make_record() {
+  find_record "$asset"
+  [ -z "$record" ] || return 0
   status=0
   merge_into "$scratch/merged" "$1" "$2" "$3" || status=$?
   case $status in
     0 | 2 | 3) ;;
     *) return "$status" ;;
   esac
-  list_conflicts "$1" "$2" "$3"
+  list_conflicts "$1" "$2" "$3" || return 1
   leave_record "$asset" "$(hash_of "$asset" "$scratch/merged")"
-)
+}
 
-# choose_side SIDE PATTERN: a resolution for each pending conflict whose path fits the pattern, since a pattern in
+# choose_side SIDE PATTERN: adds to $scratch/decided a resolution for each pending conflict whose path fits the pattern, since a pattern in
 # the record itself would also decide about places that only one side has changed.
 choose_side() (
   [ -s "$scratch/conflicts" ] || return 0
@@ -27,13 +28,12 @@ choose_side() (
     }
     fits($1, ENVIRON["PATTERN"]) {print ENVIRON["SIDE"], $1}' "$scratch/conflicts" >"$scratch/chosen"
   [ -s "$scratch/chosen" ] || { complain "no conflict in $asset fits '$2'"; return 1; }
-  end_line "$record"
-  cat "$scratch/chosen" >>"$record"
+  cat "$scratch/chosen" >>"$scratch/decided"
 )
 
-# refuse_edited RECORD: whether somebody has changed the asset since it was merged, with a word about it.
+# refuse_edited: whether somebody has changed the asset since it was merged, with a word about it.
 refuse_edited() {
-  if [ "$force" = true ] || [ ! -e "./$asset" ] || [ "$(hash_of "$asset")" = "$(recorded_hash "$1")" ]; then return 1; fi
+  if [ "$force" = true ] || [ ! -e "./$asset" ] || [ "$(hash_of "$asset")" = "$(recorded_hash "$asset")" ]; then return 1; fi
   if grep -q '^<<<<<<< ' "./$asset"; then
     complain "$asset was merged as text; say --force to merge it anew, and lose what was edited since"
   else
@@ -41,35 +41,44 @@ refuse_edited() {
   fi
 }
 
-# settle RESULT BASE LEFT RIGHT: merges once more, with what the user decides now. Returns 0 where nothing is
-# pending, and then RESULT holds the merge; 2 where something is; 1 after an error.
+# put_asset: standard input as the work tree's $asset.
+put_asset() {
+  if is_plain "$asset" && put_file "./$asset"; then return 0; fi
+  complain "cannot write $asset"
+  return 1
+}
+
+# settle BASE LEFT RIGHT: merges once more, with what the user decides now. Returns 0 where nothing is pending, and
+# then the work tree has the merge; 2 where something is; 1 after an error.
 settle() (
-  result=$1 base=$2 left=$3 right=$4
-  record=$(record_of "$asset")
+  base=$1 left=$2 right=$3
+  if ! is_plain "$asset"; then
+    complain "$asset lies behind a symbolic link, or is one or a folder, in the work tree"
+    return 1
+  fi
   make_record "$base" "$left" "$right" || return 1
-  ! refuse_edited "$record" || return 1
+  ! refuse_edited || return 1
   if [ -n "$side" ]; then
-    list_conflicts "$base" "$left" "$right" -i "$record" || return 1
+    decided_in "$record" >"$scratch/decided"
+    list_conflicts "$base" "$left" "$right" -i "$scratch/decided" || return 1
     choose_side "$side" "$conflict_pattern" || return 1
   else
-    merged_hash=$(recorded_hash "$record")
     edit "$record" || { complain "the editor failed; nothing is merged"; return 1; }
+    decided_in "$record" >"$scratch/decided"
     # Who looks at the scene in the engine while deciding may save it there.
-    end_line "$record"
-    [ -n "$(recorded_hash "$record")" ] || echo "# merged: $merged_hash" >>"$record"
     if [ -f "$scratch/stages" ] && ! stages_of "$asset" | cmp -s - "$scratch/stages"; then
       remove_record "$asset"
       complain "$asset is no longer in the conflict that it was in when the editor was opened"
       return 1
     fi
-    ! refuse_edited "$record" || return 1
+    ! refuse_edited || return 1
   fi
   status=0
-  merge_into "$scratch/merged" "$base" "$left" "$right" -i "$record" || status=$?
+  merge_into "$scratch/merged" "$base" "$left" "$right" -i "$scratch/decided" || status=$?
   case $status in
-    0) replace_file "$result" <"$scratch/merged" ;;
+    0) put_asset <"$scratch/merged" || return 1 ;;
     2 | 3)
-      list_conflicts "$base" "$left" "$right" -i "$record" || return 1
+      list_conflicts "$base" "$left" "$right" -i "$scratch/decided" || return 1
       if [ -n "$side" ] && cut -f 1 "$scratch/conflicts" | sed "s/^/$side /" | grep -qxFf "$scratch/chosen"; then
         complain "a key with a blank or a dot can't be named in a record: settle that place in the file itself"
       fi
@@ -78,11 +87,6 @@ settle() (
     *) return 1 ;;
   esac
 )
-
-# end_line FILE: the user's editor may not have.
-end_line() {
-  if [ -f "$1" ] && lacks_final_newline "$1"; then echo >>"$1"; fi
-}
 
 # Also of a name with blanks, while the editor may be a command with arguments.
 edit() {
@@ -98,27 +102,28 @@ mergetool() {
   read_rule_options
   cp "./$asset" "$scratch/start" 2>/dev/null || :
   status=0
-  settle "$4" "$1" "$3" "$2" || status=$?
+  settle "$1" "$3" "$2" || status=$?
   # Git puts the old file back where we fail.
-  if [ "$status" -ne 0 ] && [ -f "./$asset" ] && ! cmp -s "./$asset" "$scratch/start"; then
-    cp "./$asset" "./$asset.vexel-edited" && say "The edited file is kept as $asset.vexel-edited"
-  fi
+  if [ "$status" -ne 0 ] && [ -f "./$asset" ] && ! cmp -s "./$asset" "$scratch/start"; then keep_edited; fi
   case $status in
     0) remove_record "$asset" ;;
     2)
-      leave_record "$asset" "$(recorded_hash "$(record_of "$asset")")"
+      leave_record "$asset" "$(recorded_hash "$asset")" || complain "cannot write the record of $asset"
       say "$(count_conflicts) left in $asset"
       ;;
   esac
   return "$status"
 }
 
-# unmerged_below PATH...: from the top folder, one a line.
-unmerged_below() {
-  git ls-files --unmerged --full-name -z -- "$@" | tr '\0' '\n' | cut -f 2- | LC_ALL=C sort -u
+# keep_edited: a copy of the work tree's $asset, beside it where that can be.
+keep_edited() {
+  copy=$(is_plain "$asset" && mktemp "./$asset.vexel-edited.XXXXXX" 2>/dev/null) ||
+    copy=$(mktemp "$(git_path vexel-edited.XXXXXX)")
+  if cat "./$asset" >"$copy"; then say "The edited file is kept as ${copy#./}"; fi
 }
 
-# named_conflicts PATH: those of ours that somebody means who names a path, from here or, as git prints it, from the top.
+# named_conflicts PATH: those of ours that somebody means who names a path, from here or, as git prints it, from the
+# top, as a list.
 named_conflicts() {
   for magic in literal 'top,literal'; do
     named=$(unmerged_below ":($magic)$1" | (go_to_top && ours_among))
@@ -127,13 +132,21 @@ named_conflicts() {
   [ -z "$named" ] || printf '%s\n' "$named"
 }
 
-stages_of() { git ls-files --unmerged -- ":(literal)$1"; }
+# stages_of PATH: not of what lies below a folder of this name.
+stages_of() {
+  git_names ls-files --unmerged -- ":(literal)$1" |
+    LINE=$(line_of "$1") awk 'substr($0, index($0, "\t") + 1) == ENVIRON["LINE"]'
+}
 
 # write_stages PATH: as files of the work tree, in which line ends are what the user has set.
 write_stages() {
   stages_of "$1" >"$scratch/stages"
   rm -f "$scratch/base" "$scratch/left" "$scratch/right"
-  while read -r _ blob stage _; do
+  while read -r mode blob stage _; do
+    case $mode in
+      100*) ;;
+      *) complain "$1 is no file on every side: 'git add' or 'git rm' it"; return 1 ;;
+    esac
     case $stage in
       1) version=base ;;
       2) version=right ;;
@@ -186,7 +199,9 @@ resolve() {
   read_rule_options
   LC_ALL=C sort -u "$scratch/assets" >"$scratch/sorted"
   # Not on standard input, which is the editor's.
-  while IFS= read -r asset <&3; do
+  while IFS= read -r line <&3; do
+    path_of "$line"
+    asset=$path
     resolve_asset || outcome=1
   done 3<"$scratch/sorted"
   sweep
@@ -201,17 +216,17 @@ resolve_asset() {
     return 1
   fi
   status=0
-  settle "./$asset" "$scratch/base" "$scratch/left" "$scratch/right" || status=$?
+  settle "$scratch/base" "$scratch/left" "$scratch/right" || status=$?
   case $status in
     0)
-      stage "$asset" || return 1
+      stage || return 1
       remove_record "$asset"
-      printf 'Resolved %s\n' "$asset"
+      tell "Resolved $asset"
       ;;
     2)
       # What is settled already counts when the rest is settled in the engine.
-      replace_file "./$asset" <"$scratch/merged"
-      leave_record "$asset" "$(hash_of "$asset")" || complain "cannot write $asset$record_suffix"
+      put_asset <"$scratch/merged" || return 1
+      leave_record "$asset" "$(hash_of "$asset")" || complain "cannot write the record of $asset"
       say "$(count_conflicts) left in $asset:"
       say_conflicts
       return 1
@@ -220,11 +235,11 @@ resolve_asset() {
   esac
 }
 
-# stage PATH: adds it, and gives it the line ends that the user has set for files of the work tree.
+# stage: adds $asset, and gives it the line ends that the user has set for files of the work tree.
 stage() {
-  git add -- ":(literal)$1" || return 1
-  git cat-file --filters ":0:$1" >"$scratch/checked-out" || return 1
-  if cmp -s "$scratch/checked-out" "./$1"; then return 0; fi
-  replace_file "./$1" <"$scratch/checked-out"
-  git add -- ":(literal)$1"
+  git add -- ":(literal)$asset" || return 1
+  git cat-file --filters ":0:$asset" >"$scratch/checked-out" || return 1
+  if cmp -s "$scratch/checked-out" "./$asset"; then return 0; fi
+  put_asset <"$scratch/checked-out" || return 1
+  git add -- ":(literal)$asset"
 }

@@ -140,7 +140,7 @@ enable() {
   parse_setup_options "$@"
   changed=false
   [ -x "$program" ] || die "VexelYAMLMerge is not beside vexel-merge-git, in $here"
-  if [ "$scope" = local ] && [ -h "$attributes" ]; then die "git doesn't follow a symbolic link at $attributes"; fi
+  if [ "$scope" = local ]; then is_plain "$attributes" || die "git follows no symbolic link or folder at $attributes"; fi
   for_wanted_keys check_key
   block_part "$attributes" inside >/dev/null
   mkdir -p "$(dirname "$state")"
@@ -154,9 +154,9 @@ enable() {
   if [ "$scope" = global ]; then remember attributes.path "$attributes"; else exclude_records; fi
   patterns=$(given_patterns "$attributes")
   if [ "$changed" = false ]; then
-    echo "Nothing to change: $patterns are merged structurally in $(where)."
+    tell "Nothing to change: $patterns are merged structurally in $(where)."
   else
-    echo "From now on, $patterns are merged structurally in $(where)."
+    tell "From now on, $patterns are merged structurally in $(where)."
     if [ "$scope" = local ] && [ -n "$(git status --porcelain -- .gitattributes)" ]; then
       echo ".gitattributes has changed: commit it, and only 'vexel-merge-git enable' is left to your colleagues."
     fi
@@ -182,8 +182,14 @@ disable() {
     echo "Nothing to undo in $(where)."
     return 0
   fi
-  restore_block "$attributes" attributes
-  [ "$scope" = global ] || restore_block "$(git_path info/exclude)" exclude
+  if [ "$scope" = global ]; then
+    restore_block "$attributes" attributes
+  else
+    # A symbolic link that has taken the file's place since then leads to somebody else's file.
+    if is_plain "$attributes"; then restore_block "$attributes" attributes; fi
+    exclude=$(exclude_file)
+    [ -z "$exclude" ] || restore_block "$exclude" exclude
+  fi
   restore_configuration
   rm -f "$state" "$state.before" "$state.after"
   echo "Undone in $(where)."
@@ -197,7 +203,7 @@ setting() {
   value=$(git config --get "$1") || { echo "not set"; return 1; }
   case $value in
     *vexel-merge-git*) ;;
-    *) echo "set to something else: $value"; return 1 ;;
+    *) printf 'set to something else: %s\n' "$value"; return 1 ;;
   esac
   # As git starts it: with another PATH, or after a move, the command may be gone.
   call=$(printf '%s\n' "$value" | sed -e 's/^f() { //' -e 's/ textconv .*//' -e 's/ mergetool .*//' \
@@ -223,8 +229,8 @@ attribute_sources() {
     for pattern in $given; do
       case $pattern in
         '*'.*)
-          [ -n "$(echo "x${pattern#?}" | ours_among)" ] && continue
-          echo "  but not $pattern: another line takes it away"
+          [ -n "$(line_of "x${pattern#?}" | ours_among)" ] && continue
+          printf '  but not %s: another line takes it away\n' "$pattern"
           found=false
           ;;
       esac
@@ -239,26 +245,31 @@ status() {
   go_to_top
   complete=true
   if version=$("$reporter" --version 2>/dev/null) && [ -x "$program" ]; then
-    echo "program        VexelYAMLMerge ${version##* } ($program)"
+    tell "program        VexelYAMLMerge ${version##* } ($program)"
   else
-    echo "program        not found in $here"
+    tell "program        not found in $here"
     complete=false
   fi
   text=$(setting merge.vexel.driver) || complete=false
-  echo "merge driver   $text"
+  tell "merge driver   $text"
   text=$(setting diff.vexel.textconv) || complete=false
-  echo "diff driver    $text"
+  tell "diff driver    $text"
   text=$(setting mergetool.vexel.cmd) || complete=false
-  echo "merge tool     $text"
+  tell "merge tool     $text"
   text=$(attribute_sources) || complete=false
-  echo "attributes     ${text:-no pattern with merge=vexel}"
+  printf 'attributes     %s\n' "${text:-no pattern with merge=vexel}" | tell_lines
   for option in rules typeInfo; do
     value=$(git config --type=path --get "vexel.$option") || continue
-    printf '%-14s %s\n' "$option" "$value"
+    tell "$(printf '%-14s %s' "$option" "$value")"
     [ -f "$value" ] || { echo "  but that file is missing"; complete=false; }
   done
   # Where somebody's own hook has kept ours away, records may have outlived their conflicts.
   sweep
-  unmerged_paths | ours_among | sed 's/^/in conflict    /'
+  unmerged_paths | ours_among | while IFS= read -r line; do
+    path_of "$line"
+    find_record "$path"
+    tell "in conflict    $path"
+    [ "$record" != "$kept" ] || tell "  its record is $record"
+  done
   [ "$complete" = true ]
 }

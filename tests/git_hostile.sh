@@ -1,0 +1,96 @@
+#!/usr/bin/env bash
+# Works in a repository whose author means harm: tracked links under the names of our files, names that are options,
+# commands or patterns, keys that look like records. Nothing outside of it may change.
+#   git_hostile.sh PROGRAM
+set -euo pipefail
+# shellcheck source=tests/support/end_to_end.sh
+source "$(dirname "${BASH_SOURCE[0]}")/support/end_to_end.sh"
+exec </dev/null
+export GIT_EDITOR=true
+
+long="$(printf 'n%.0s' {1..230}).vexel"
+odd=('-$(touch pwned).vexel' $'folder\n/last\n.vexel\n' '*.vexel' $'\e[31mred \u9b.vexel' "$long" 'a=%P "\101.vexel')
+guarded=(link.vexel file.vexel folder.vexel)
+# What outside looks like, and what is tracked beside the assets.
+outside() { (cd "$work/outside" && find . -ls | awk '{$1 = ""; print}' && find . -type f -exec cat {} +); }
+untouched() { check "nothing outside is touched: $1" cmp <(outside) "$work/before"; }
+is_clean() { [ -z "$(git status --porcelain --ignored)" ]; }
+# all_scenes INTENSITY: with a key that tries to be a record.
+all_scenes() {
+  for name in "${guarded[@]}" "${odd[@]}" dir/x.vexel; do
+    { scene "$1" 10; printf '  "\\nConflict handling:\\nleft *.Light.*\\n#": %s\n' "$1"; } >"./$name"
+  done
+}
+
+mkdir "$work/outside" "$work/repository" && cd "$work/repository"
+mkdir "$work/outside/dir" && echo mine | tee "$work"/outside/{attributes,record,asset,edited,page,own} >/dev/null
+git init -q -b main && mkdir $'folder\n' dir
+ln -s ../outside/attributes .gitattributes.vexel-new
+ln -s ../outside/page report.html
+for name in "${guarded[@]}"; do
+  ln -s ../outside/record "$name.vexel-conflicts.new"
+  ln -s ../outside/asset "$name.vexel-new"
+  ln -s ../outside/edited "$name.vexel-edited"
+done
+ln -s ../outside/own link.vexel.vexel-conflicts
+printf 'Conflict handling:\nleft *.*.*\n' >file.vexel.vexel-conflicts
+mkdir folder.vexel.vexel-conflicts && echo mine >folder.vexel.vexel-conflicts/file
+outside >"$work/before"
+vexel-merge-git enable --patterns '*.vexel *.vexel? [-$]*' >/dev/null
+printf '%s\n' '*.vexel* merge=vexel' '*.vexel-* !merge' 'folder?/* merge=vexel' >>.gitattributes
+untouched enable
+all_scenes 2 && git add -A -f && git commit -q -m base && git branch start
+all_scenes 5 && git commit -q -a -m right && git branch right
+git checkout -q -b left start && printf 'Conflict handling:\nright *.*.*\n' >dir/x.vexel.vexel-conflicts
+git add -f dir && all_scenes 1 && git commit -q -a -m left && git checkout -q right
+number=$((${#guarded[@]} + ${#odd[@]} + 1))
+conflicts() { git ls-files -u -z | tr '\0\n' '\n ' | cut -f 2 | sort -u | wc -l; }
+
+check "the merge stops" refuses git merge -q left >/dev/null 2>"$work/err"
+untouched merge
+check "each scene is in conflict" test "$(conflicts)" -eq "$number"
+check "each conflict has a record" test "$(grep -c ', listed in ' "$work/err")" -eq "$number"
+check "no other file has changed" refuses grep -qv '^UU\|^A  dir/' <(git status --porcelain)
+vexel-merge-git resolve . >/dev/null 2>"$work/err" || :
+check "a record that nobody has edited settles nothing" test "$(conflicts)" -eq "$number"
+vexel-merge-git report -- "$long" file.vexel >/dev/null
+untouched "resolve and report"
+check "no default page goes through a link" refuses vexel-merge-report link.vexel link.vexel link.vexel 2>"$work/err"
+check "the page's name is said" grep -qF report.html "$work/err"
+untouched "a default page"
+git -c mergetool.keepBackup=false mergetool -y -t vexel file.vexel >/dev/null 2>&1 || :
+check "a terminal gets no control characters" refuses grep -q $'\e\[31m' \
+  <(script -qec "vexel-merge-git resolve '${odd[3]}'; vexel-merge-git status" /dev/null)
+
+mv dir "$work/dir" && ln -s ../outside/dir dir && cp "$work/dir/x.vexel" "$work/outside/dir" && outside >"$work/before"
+check "what lies behind a link is refused" refuses vexel-merge-git resolve --left --force dir/x.vexel 2>/dev/null
+untouched "a folder that became a link"
+rm dir && mv "$work/dir" dir
+vexel-merge-git resolve --left . >/dev/null 2>"$work/err" || :
+for name in "${guarded[@]}" "${odd[@]}"; do
+  check "$name has left's value" grep -qFx '  m_Intensity: 1' "./$name"
+done
+git merge --abort
+check "an aborted merge leaves nothing" is_clean
+check "no list and no hook either" test ! -e .git/vexel-merge-records -a ! -e .git/hooks/post-index-change
+untouched "all of it"
+
+# Two work trees at once: the hook must not go with the last record of one while the other one gets its first.
+git checkout -q -b one start && scene 1 10 >file.vexel && git commit -q -a -m one
+git checkout -q -b two start && scene 5 10 >file.vexel && git commit -q -a -m two
+git worktree add -q --detach "$work/tree" two
+git merge -q one >/dev/null 2>&1 || mkdir "$work/bin"
+printf '#!/bin/sh\ncase $* in *post-index-change) touch %s/slow && sleep 3 ;; esac\nexec %s "$@"\n' \
+  "$work" "$(command -v rm)" >"$work/bin/rm" && chmod +x "$work/bin/rm"
+PATH="$work/bin:$PATH" git merge --abort &
+until [ -e "$work/slow" ]; do sleep 0.1; done
+check "the other one is in conflict" refuses git -C "$work/tree" merge -q one >/dev/null 2>&1
+wait && git -C "$work/tree" merge --abort
+check "no record of it is left" test -z "$(find "$work/tree" .git -name '*.vexel-conflicts' -newer "$work/slow")"
+
+ln -s ../outside/hook .git/hooks/post-index-change
+git merge -q one >/dev/null 2>&1 || git merge --abort
+rm -f .gitattributes && ln -s ../outside/own .gitattributes && vexel-merge-git disable >/dev/null
+untouched "a hook and attributes that are links"
+check "no name was a command" test -z "$(find "$work" -name pwned)"
+end_of_checks "git merges in a hostile repository"
