@@ -13,6 +13,10 @@ void DiffingThreadFunction(DiffingInfo& info, TimerStat& timer, const char* labe
   info.diff = YAMLMappingDiff::Diff(info.from, info.to);
 }
 
+void SpawnDiffingThread(Thread& thread, DiffingInfo& info, TimerStat& timer, const char* label) {
+  thread.Start([&info, &timer, label] { DiffingThreadFunction(info, timer, label); });
+}
+
 }  // namespace
 
 DiffPair CreateDiffPair(DiffingInfo left, DiffingInfo right, bool threads, TimerStat& timer) {
@@ -22,7 +26,7 @@ DiffPair CreateDiffPair(DiffingInfo left, DiffingInfo right, bool threads, Timer
     return {left.diff, right.diff};
   }
   Thread left_thread;
-  left_thread.Start([&] { DiffingThreadFunction(left, timer, "Creating left diff"); });
+  SpawnDiffingThread(left_thread, left, timer, "Creating left diff");
   std::exception_ptr right_exception;
   try {
     DiffingThreadFunction(right, timer, "Creating right diff");

@@ -1,19 +1,24 @@
 #include "platform/thread.h"
 
+#include <system_error>
 #include <utility>
 
 namespace vexel_yaml {
 
-Thread::~Thread() {
-  if (handle_.joinable()) handle_.join();
-}
+Thread::~Thread() { Join(); }
 
 void Thread::Start(std::function<void()> function) {
   function_ = std::move(function);
-  handle_ = std::thread(Thread_Helper, this);
+  try {
+    handle_ = std::thread(Thread_Helper, this);
+  } catch (const std::system_error&) {
+    Thread_Helper(this);
+  }
 }
 
-void Thread::Join() { handle_.join(); }
+void Thread::Join() {
+  if (handle_.joinable()) handle_.join();
+}
 
 void Thread::CheckForExceptions() {
   if (exception_) std::rethrow_exception(exception_);

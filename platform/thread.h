@@ -16,10 +16,11 @@ class Thread {
   /// Joins a thread that is still running, so that an exception between start and join ends no process.
   ~Thread();
 
-  /// Starts `function`. One function a `Thread`. Throws std::system_error when there can be no more threads.
+  /// Starts `function`. One function a `Thread`. Where the system has no thread left, the function runs at
+  /// once on the calling one: a machine that is short of threads still merges.
   void Start(std::function<void()> function);
 
-  /// Waits for the function, which must have been started, to return. Throws nothing that it threw.
+  /// Waits for the function to return. Throws nothing that it threw.
   void Join();
 
   /// After `Join`: throws again what the function threw, if it did.
