@@ -2,12 +2,17 @@
 
 #include <algorithm>
 #include <array>
-#include <fstream>
+#include <cerrno>
+#include <optional>
+#include <sstream>
 #include <string_view>
+#include <system_error>
 
 #include "app/command_line.h"
 #include "platform/error_channel.h"
+#include "platform/file_error.h"
 #include "platform/files.h"
+#include "platform/read_whole_file.h"
 
 namespace vexel_yaml {
 
@@ -70,18 +75,16 @@ bool AddLine(std::string_view line, int line_number, FallbackCommandMap& map) {
   return true;
 }
 
-bool AddLines(const std::string& path, FallbackCommandMap& map) {
-  std::ifstream file(path);
-  if (!file) return false;
+bool AddLines(const std::string& text, FallbackCommandMap& map) {
+  std::istringstream stream(text);
   std::string line;
-  for (int line_number = 1; std::getline(file, line); ++line_number) {
+  for (int line_number = 1; std::getline(stream, line); ++line_number) {
     // From a file that was written on Windows; the shell would take it for a part of the last argument.
     if (line.ends_with('\r')) line.pop_back();
     if (line.empty() || line.front() == '#') continue;
     if (!AddLine(line, line_number, map)) return false;
   }
-  // A folder can be opened, but not read.
-  return !file.bad();
+  return true;
 }
 
 const FallbackCommandEntry* FindExistingTool(const FallbackCommandMap& map, const std::string& extension) {
@@ -100,9 +103,17 @@ std::string GetSpecFilename(const std::string& spec) {
 }
 
 bool PopulateFallbacks(FallbackCommandMap& map, const std::string& path) {
-  if (AddLines(path, map)) return true;
+  std::string reason;
+  try {
+    const std::optional<std::string> text = ReadWholeFile(path);
+    if (text && AddLines(*text, map)) return true;
+    if (!text) reason = std::generic_category().message(errno);
+  } catch (const FileError& error) {
+    reason = error.what();
+  }
   errs << "Couldn't load spec file '" << path << "'\n";
   ErrMsg(errs);
+  WriteHint(reason);
   return false;
 }
 

@@ -1,12 +1,15 @@
 #include "app/file_pair_commands.h"
 
-#include <fstream>
 #include <iostream>
 #include <memory>
+#include <sstream>
+#include <string_view>
 
 #include "diff/strip_unchanged.h"
 #include "diff/yaml_diff_output.h"
 #include "fixups/state_machine_transitions.h"
+#include "platform/error_channel.h"
+#include "platform/file_replacement.h"
 #include "platform/files.h"
 #include "rules/setup.h"
 #include "yaml/read_files.h"
@@ -20,19 +23,20 @@ struct FilePair {
   VexelObjects second;
 };
 
-// Where a result goes: the named file, or standard output.
-class Output {
- public:
-  explicit Output(const std::string& path) {
-    if (!path.empty()) file_.open(VexelToNativePath(path), std::ios::binary | std::ios::trunc);
-    stream_ = path.empty() ? &std::cout : &file_;
+// Nobody but a person at a terminal is told of a file that can't be opened or closed; one that can't be
+// written is an error, since its text exists and would be lost.
+void WriteResult(const std::string& path, std::string_view text) {
+  if (path.empty()) {
+    std::cout << text;
+    return;
   }
-  std::ostream& Stream() { return *stream_; }
-
- private:
-  std::ofstream file_;
-  std::ostream* stream_;
-};
+  try {
+    ReplaceFile(VexelToNativePath(path), text);
+  } catch (const FileError& error) {
+    if (error.GetStep() == FileError::Step::kWriting || error.GetStep() == FileError::Step::kReading) throw;
+    WriteHint(error.what());
+  }
+}
 
 // The diff from the first file to the second; the files are read into `files`.
 const YAMLMappingDiff* PrepareDiff(const FilePairConfig& config, FilePair& files, TimerStat& timer) {
@@ -68,7 +72,10 @@ int HandleStripCommand(const StripConfig& config) {
   TransitionsToMappings(files.second);
 
   TimerStat step(timer, "Output result");
-  files.second.Output(Output(config.output_path).Stream());
+  // All of it first: an object that can't be written must be found before the output is touched.
+  std::ostringstream text;
+  files.second.Output(text);
+  WriteResult(config.output_path, text.view());
   return 0;
 }
 
@@ -77,10 +84,11 @@ int HandleDiffCommand(const DiffConfig& config) {
   const YAMLMappingDiff* diff = PrepareDiff(config, NewFilePair(), timer);
 
   TimerStat step(timer, "Output diff");
-  Output output(config.output_path);
-  YAMLDiffOutput text(output.Stream(), 2);
-  output.Stream() << "Diff '" << config.first_path << "' vs. '" << config.second_path << "':\n";
-  diff->Output(text);
+  std::ostringstream text;
+  YAMLDiffOutput output(text, 2);
+  text << "Diff '" << config.first_path << "' vs. '" << config.second_path << "':\n";
+  diff->Output(output);
+  WriteResult(config.output_path, text.view());
   return 0;
 }
 

@@ -5,6 +5,7 @@
 #include "app/self_check.h"
 #include "app/usage.h"
 #include "platform/error_channel.h"
+#include "platform/file_error.h"
 #include "yaml/yaml_error.h"
 #include "yaml/yaml_scalar.h"
 
@@ -14,7 +15,7 @@ namespace {
 
 constexpr int kFirstOption = 2;
 
-// Runs a command whose library errors are reported as they are.
+// Runs a command whose errors with files and of the library are reported as they are.
 template <typename Argument>
 int Run(int (*handle)(const Argument&), const Argument& argument) {
   try {
@@ -23,6 +24,10 @@ int Run(int (*handle)(const Argument&), const Argument& argument) {
     errs << error.what() << "\n";
     ErrMsg(errs);
     WriteHint(error.GetHint());
+    return 1;
+  } catch (const FileError& error) {
+    errs << error.what() << "\n";
+    ErrMsg(errs);
     return 1;
   }
 }

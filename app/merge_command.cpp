@@ -2,20 +2,26 @@
 
 #include <algorithm>
 #include <array>
+#include <cerrno>
+#include <optional>
 #include <string>
 #include <string_view>
+#include <system_error>
 
 #include "app/fallback_tools.h"
 #include "app/merge_pipeline.h"
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 
 namespace {
+
+constexpr char kNoOutputFile[] = "Couldn't create temporary output file for merge result";
 
 int Report(const std::string& message) {
   errs << message;
@@ -30,43 +36,57 @@ bool IsMergedStructurally(const std::string& extension) {
   return std::find(kExtensions.begin(), kExtensions.end(), extension) != kExtensions.end();
 }
 
-// Fills `path` with a temporary file where the user named none.
-bool SetupPremergePath(std::string& path) {
+// A message whose text is compared by scripts, with what the system said as the hint.
+int ReportTemporaryFile(const std::string& message) {
+  const std::string reason = std::generic_category().message(errno);
+  Report(message);
+  WriteHint(reason);
+  return 1;
+}
+
+// Fills `path` with a temporary file where the user named none. Returns 0, else 1.
+int SetupPremergePath(std::string& path) {
   if (path.empty()) path = CreateTempFile();
-  return !path.empty();
+  return path.empty() ? 1 : 0;
 }
 
-// Without a destination the merge was only a check.
-void OutputResultToDestination(const std::string& source, const std::string& destination) {
-  if (!destination.empty()) CopyFileContent(source, destination);
-}
-
-// A tool that ends well but writes nothing has not merged: the user must know that nothing changed.
-int FinishWithTool(int tool_result, const std::string& tool_output, const std::string& destination) {
-  if (tool_result != 0) return ExitStatusOfTool(tool_result);
-  if (IsFileEmpty(tool_output)) {
-    if (!destination.empty())
-      WriteErrorLine("The merge tool left its result empty: '" + destination + "' is unchanged");
-    return 0;
+// Copies what a merge tool wrote. Without a destination the merge was only a check.
+void OutputResultToDestination(const std::string& source, const std::string& destination, bool may_be_empty) {
+  if (destination.empty()) return;
+  const std::optional<std::string> text = ReadWholeFile(source);
+  if (!text) throw FileError(FileError::Step::kReading, source, errno);
+  if (text->empty() && !may_be_empty) {
+    // A tool that ends well but writes nothing has not merged: the user must know that nothing changed.
+    WriteErrorLine("The merge tool left its result empty: '" + destination + "' is unchanged");
+    return;
   }
-  OutputResultToDestination(tool_output, destination);
-  return 0;
+  ReplaceFile(destination, *text);
+}
+
+int FinishWithTool(int tool_result, const std::string& tool_output, const std::string& destination,
+                   bool may_be_empty) {
+  const int status = ExitStatusOfTool(tool_result);
+  if (tool_result == 0) {
+    OutputResultToDestination(tool_output, destination, may_be_empty);
+  } else if (!destination.empty()) {
+    WriteHint("no merge tool has settled it (status " + std::to_string(status) + "): '" + destination +
+              "' is unchanged");
+  }
+  return status;
 }
 
 int MergeStructurally(const MergeConfig& config, const std::string& merged) {
   const int result = HandleMergeCommand(config, merged);
   const bool conflicts = result == 2 || result == 3;
-  if (result != 0 && !conflicts) return result;
-  if (!conflicts || config.fallback_spec_file == kNoSpecFile) {
-    OutputResultToDestination(merged, config.destination_path);
-    return result;
-  }
+  if (!conflicts || config.fallback_spec_file == kNoSpecFile) return result;
   const std::string tool_output = CreateTempFile();
-  if (tool_output.empty()) return Report("Couldn't create temporary output2 file for merge result");
+  if (tool_output.empty()) {
+    return ReportTemporaryFile("Couldn't create temporary output2 file for merge result");
+  }
   const std::string& base = config.premerge ? config.premerge_base_destination : config.base_path;
   const std::string& right = config.premerge ? config.premerge_right_destination : config.right_path;
   const int tool_result = FallbackMergeTool(base, merged, right, tool_output, config.fallback_spec_file);
-  return FinishWithTool(tool_result, tool_output, config.destination_path);
+  return FinishWithTool(tool_result, tool_output, config.destination_path, false);
 }
 
 int MergeWithTool(const MergeConfig& config, const std::string& extension, const std::string& merged) {
@@ -75,15 +95,18 @@ int MergeWithTool(const MergeConfig& config, const std::string& extension, const
   }
   const int tool_result = FallbackMergeTool(config.base_path, config.left_path, config.right_path, merged,
                                             config.fallback_spec_file);
-  return FinishWithTool(tool_result, merged, config.destination_path);
+  const bool may_be_empty = IsFileEmpty(config.left_path) || IsFileEmpty(config.right_path);
+  return FinishWithTool(tool_result, merged, config.destination_path, may_be_empty);
 }
 
-int MergeIntoTemporaryFile(MergeConfig config) {
-  const std::string merged = CreateTempFile();
-  if (merged.empty()) return Report("Couldn't create temporary output file for merge result");
-  if (config.premerge && (!SetupPremergePath(config.premerge_base_destination) ||
-                          !SetupPremergePath(config.premerge_right_destination))) {
-    return Report("Couldn't create temporary output premerge base file for merge result");
+int MergeWithTemporaryFiles(MergeConfig config) {
+  // Only a tool needs one: what is merged without it is written beside its destination.
+  const bool may_need_tool = config.fallback_spec_file != kNoSpecFile;
+  const std::string merged = may_need_tool ? CreateTempFile() : std::string();
+  if (may_need_tool && merged.empty()) return ReportTemporaryFile(kNoOutputFile);
+  if (config.premerge && (SetupPremergePath(config.premerge_base_destination) != 0 ||
+                          SetupPremergePath(config.premerge_right_destination) != 0)) {
+    return ReportTemporaryFile("Couldn't create temporary output premerge base file for merge result");
   }
   const std::string extension = GetFileExtension(config.base_path);
   if (!config.force && !IsMergedStructurally(extension)) return MergeWithTool(config, extension, merged);
@@ -95,13 +118,18 @@ int MergeIntoTemporaryFile(MergeConfig config) {
 int ProcessMergeCommand(const MergeConfig& config) {
   const TempFilesGuard guard;
   try {
-    return MergeIntoTemporaryFile(config);
+    return MergeWithTemporaryFiles(config);
   } catch (const YAMLError& error) {
     Report("Cannot merge file '" + config.base_path + "': " + error.what() + "\n");
     WriteHint(error.GetHint());
     return 1;
   } catch (const FileError& error) {
-    return Report(std::string(error.what()) + "\n");
+    if (error.GetStep() != FileError::Step::kMakingTemporaryFile) {
+      return Report(std::string(error.what()) + "\n");
+    }
+    Report(kNoOutputFile);
+    WriteHint(error.what());
+    return 1;
   }
 }
 

@@ -1,8 +1,11 @@
 #include "app/merge_pipeline.h"
 
 #include <cerrno>
+#include <deque>
 #include <iostream>
 #include <memory>
+#include <optional>
+#include <system_error>
 #include <vector>
 
 #include "app/premerge.h"
@@ -65,8 +68,10 @@ class MergeRun {
     if (config_.merge_file.empty()) return true;
     TimerStat step(timer_, "Reading resolve file");
     if (InputConflictRecords(config_.merge_file, resolver_)) return true;
+    const std::string reason = std::generic_category().message(errno);
     errs << "Couldn't open merge resolve file '" << config_.merge_file << "'";
     ErrMsg(errs);
+    WriteHint(reason);
     return false;
   }
 
@@ -80,19 +85,27 @@ class MergeRun {
     TimerStat step(timer_, "Output conflicts");
     if (config_.conflict_file.empty()) {
       OutputConflictRecords(std::cout, resolver_, config_.describe);
-      if (!std::cout.flush()) throw FileError("standard output", errno);
+      if (!std::cout.flush()) throw FileError(FileError::Step::kWriting, "standard output", errno);
       return;
     }
-    FileReplacement file(VexelToNativePath(config_.conflict_file));
+    FileReplacement& file = others_.emplace_back(VexelToNativePath(config_.conflict_file));
     OutputConflictRecords(file.Stream(), resolver_, config_.describe);
-    file.Commit();
+    file.Finish();
   }
 
-  void OutputResult(const std::string& path) {
+  void OutputResult(const std::string& path_for_tool) {
     TimerStat step(timer_, "Output result");
-    FileReplacement file(VexelToNativePath(path));
-    WriteObjects(*merged_, file.Stream(), config_.threads);
-    file.Commit();
+    const bool tool_follows = GetResult() != 0 && config_.fallback_spec_file != kNoSpecFile;
+    const std::string& path = tool_follows ? path_for_tool : config_.destination_path;
+    if (path.empty()) {
+      // The merge is only a check, which an object that can't be written fails, too.
+      std::ostream nowhere(nullptr);
+      WriteObjects(*merged_, nowhere, config_.threads);
+      return;
+    }
+    result_.emplace(VexelToNativePath(path));
+    WriteObjects(*merged_, result_->Stream(), config_.threads);
+    result_->Finish();
   }
 
   void OutputPremerge() {
@@ -102,9 +115,17 @@ class MergeRun {
     }
     const MergeResolve base_side =
         YAMLSequenceRemapper::CheckBlankPremergeBaseEnabled() ? MergeResolve::kBlank : MergeResolve::kBase;
-    RunPremerges({{{base_side, config_.premerge_base_destination},
-                   {MergeResolve::kRight, config_.premerge_right_destination}}},
-                 documents_, diffs_, resolver_.GetResolutions(), config_.threads, timer_);
+    FileReplacement& base = others_.emplace_back(VexelToNativePath(config_.premerge_base_destination));
+    FileReplacement& right = others_.emplace_back(VexelToNativePath(config_.premerge_right_destination));
+    RunPremerges({{{base_side, base}, {MergeResolve::kRight, right}}}, documents_, diffs_,
+                 resolver_.GetResolutions(), config_.threads, timer_);
+  }
+
+  // Not before all of them are on the disk: a merge that fails leaves no file of a merge. The result comes
+  // last, since version control goes by it.
+  void CommitFiles() {
+    for (FileReplacement& file : others_) file.Commit();
+    if (result_) result_->Commit();
   }
 
   int GetResult() const {
@@ -120,11 +141,14 @@ class MergeRun {
   DiffPair diffs_;
   RecordingConflictResolver resolver_;
   bool breaks_dependency_ = false;
+  // Finished files that wait to take their places.
+  std::deque<FileReplacement> others_;
+  std::optional<FileReplacement> result_;
 };
 
 }  // namespace
 
-int HandleMergeCommand(const MergeConfig& config, const std::string& output_path) {
+int HandleMergeCommand(const MergeConfig& config, const std::string& path_for_tool) {
   TimerStat timer("Merge Command", config.timing ? &std::cout : nullptr);
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
   MergeRun run(config, NewKeptDocuments(), timer);
@@ -134,8 +158,9 @@ int HandleMergeCommand(const MergeConfig& config, const std::string& output_path
   if (!run.ReadResolutions()) return 1;
   run.Merge();
   run.OutputConflicts();
-  run.OutputResult(output_path);
+  run.OutputResult(path_for_tool);
   run.OutputPremerge();
+  run.CommitFiles();
   return run.GetResult();
 }
 

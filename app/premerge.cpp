@@ -3,8 +3,6 @@
 #include <memory>
 
 #include "fixups/post_process.h"
-#include "platform/file_replacement.h"
-#include "platform/files.h"
 #include "platform/thread.h"
 
 namespace vexel_yaml {
@@ -18,25 +16,39 @@ struct PremergeJob {
   std::unique_ptr<VexelObjects> copy;
 };
 
-void Premerge(PremergeJob& job, const MergeDocuments& documents, const DiffPair& diffs,
-              const std::vector<RecordingConflictResolver::RecordResolve>& resolutions, TimerStat& timer) {
-  RecordingConflictResolver resolver(job.target.side);
+// What both threads share, read only.
+struct PremergeInput {
+  const MergeDocuments& documents;
+  const DiffPair& diffs;
+  const std::vector<RecordingConflictResolver::RecordResolve>& resolutions;
+};
+
+void Premerge(MergeResolve side, FileReplacement& file, VexelObjects& copy, const PremergeInput& input,
+              TimerStat& timer) {
+  RecordingConflictResolver resolver(side);
   // What the user has settled is no conflict in any of the files.
-  resolver.SetResolveMethodForPaths(resolutions);
+  resolver.SetResolveMethodForPaths(input.resolutions);
   const YAMLMappingDiff* diff = nullptr;
   {
     TimerStat step(timer, "Merging premerge");
-    diff = YAMLMappingDiff::Merge(*diffs.left, *diffs.right, resolver);
+    diff = YAMLMappingDiff::Merge(*input.diffs.left, *input.diffs.right, resolver);
   }
   {
     TimerStat step(timer, "Applying premerge merged changes");
-    diff->Apply(*job.copy);
-    PostProcessMergeOnly(*job.copy, documents.left, documents.right, resolver);
+    diff->Apply(copy);
+    PostProcessMergeOnly(copy, input.documents.left, input.documents.right, resolver);
   }
   TimerStat step(timer, "Output premerge result");
-  FileReplacement file(VexelToNativePath(job.target.path));
-  job.copy->Output(file.Stream());
-  file.Commit();
+  copy.Output(file.Stream());
+  file.Finish();
+}
+
+void PremergeThreadFunction(PremergeJob& job, const PremergeInput& input, TimerStat& timer) {
+  Premerge(job.target.side, job.target.file, *job.copy, input, timer);
+}
+
+void SpawnPremergeThread(Thread& thread, PremergeJob& job, const PremergeInput& input, TimerStat& timer) {
+  thread.Start([&] { PremergeThreadFunction(job, input, timer); });
 }
 
 }  // namespace
@@ -52,14 +64,13 @@ void RunPremerges(const std::array<PremergeTarget, 2>& targets, const MergeDocum
       jobs.push_back({target, std::unique_ptr<VexelObjects>(documents.base.Clone())});
     }
   }
+  const PremergeInput input = {documents, diffs, resolutions};
   if (!threads) {
-    for (PremergeJob& job : jobs) Premerge(job, documents, diffs, resolutions, timer);
+    for (PremergeJob& job : jobs) PremergeThreadFunction(job, input, timer);
     return;
   }
   std::array<Thread, 2> workers;
-  for (size_t i = 0; i < jobs.size(); ++i) {
-    workers[i].Start([&, i] { Premerge(jobs[i], documents, diffs, resolutions, timer); });
-  }
+  for (size_t i = 0; i < jobs.size(); ++i) SpawnPremergeThread(workers[i], jobs[i], input, timer);
   for (Thread& worker : workers) worker.Join();
   for (Thread& worker : workers) worker.CheckForExceptions();
 }

@@ -21,7 +21,8 @@ void OutputConflictRecords(std::ostream& out, const RecordingConflictResolver& r
 /// "No property path specified on line ".
 void InputConflictRecords(std::istream& in, RecordingConflictResolver& resolver);
 
-/// The same for the record file at `path`. Returns false where it can't be opened (a folder counts).
+/// The same for the record file at `path`. Returns false where it can't be opened (a folder counts),
+/// with the reason in errno. Throws FileError where it can't be read.
 bool InputConflictRecords(const std::string& path, RecordingConflictResolver& resolver);
 
 }  // namespace vexel_yaml

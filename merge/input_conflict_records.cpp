@@ -1,12 +1,11 @@
 #include <algorithm>
-#include <filesystem>
-#include <fstream>
 #include <optional>
+#include <sstream>
 #include <string>
-#include <system_error>
 
 #include "merge/conflict_record_file.h"
 #include "platform/files.h"
+#include "platform/read_whole_file.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -80,11 +79,14 @@ void InputConflictRecords(std::istream& in, RecordingConflictResolver& resolver)
 }
 
 bool InputConflictRecords(const std::string& path, RecordingConflictResolver& resolver) {
-  const std::string native = VexelToNativePath(path);
-  std::error_code error;
-  std::ifstream file(native);
-  if (!file || std::filesystem::is_directory(native, error)) return false;
-  InputConflictRecords(file, resolver);
+  const std::optional<std::string> text = ReadWholeFile(VexelToNativePath(path));
+  if (!text) return false;
+  std::istringstream stream(*text);
+  try {
+    InputConflictRecords(stream, resolver);
+  } catch (const YAMLError& error) {
+    throw YAMLError(error.what(), "in merge resolve file '" + path + "'");
+  }
   return true;
 }
 

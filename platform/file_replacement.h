@@ -1,48 +1,63 @@
 #pragma once
 
-#include <fstream>
-#include <stdexcept>
+#include <sys/types.h>
+
+#include <optional>
+#include <ostream>
 #include <string>
+#include <string_view>
+
+#include "platform/descriptor_buffer.h"
+#include "platform/file_error.h"
 
 namespace vexel_yaml {
-
-/// A file could not be written; `what()` is "Cannot write '<path>': <the system's reason>".
-class FileError : public std::runtime_error {
- public:
-  FileError(const std::string& path, int error_number);
-};
 
 /// Writes a file that is replaced whole or not at all.
 ///
 /// The text goes to a new file beside the destination, which takes the destination's place (and its
 /// permission bits) on `Commit`. A symbolic link is followed to its target. What is not a regular file (a
-/// device, a pipe) is written in place, and so is a file that can't be replaced or whose folder is not
-/// writable. Without a `Commit` the destination stays as it was, except where it is written in place.
+/// device, a pipe) and a file that can't be replaced or whose folder is not writable get a copy of a
+/// temporary file instead, on `Commit`, too. Without a `Commit` the destination stays as it was.
+///
+/// A temporary file and a renaming beat writing in place: a disk that fills up, a crash or a signal in the
+/// middle would leave half a scene, and version control would take it for the result. Until all of the text
+/// is on the disk the old file is the only whole one, so the new one is flushed there before the renaming.
 class FileReplacement {
  public:
-  /// Throws FileError when nothing can be opened for writing.
+  /// Throws FileError where nothing can be opened for writing. To be called by one thread at a time, so that
+  /// a signal between making a file and remembering it leaves none behind.
   explicit FileReplacement(const std::string& path);
   FileReplacement(const FileReplacement&) = delete;
   FileReplacement& operator=(const FileReplacement&) = delete;
   ~FileReplacement();
 
-  std::ostream& Stream() { return stream_; }
+  std::ostream& Stream() { return *stream_; }
 
-  /// Ends the writing. Throws FileError when anything could not be written.
+  /// Ends the writing and brings the text to the disk, while the destination stays as it was: the step that
+  /// fails on a full disk. Throws FileError.
+  void Finish();
+
+  /// Puts the text in the destination's place; `Finish` must have been called. Throws FileError.
   void Commit();
 
  private:
-  void OpenInPlace();
-  void Close();
-  void RemoveBeside();
+  void MakeTemporaryFile(bool exists);
+  void OpenDestination();
+  void CopyIntoPlace();
+  void CloseAll();
 
   std::string path_;
   std::string target_;
-  std::string beside_;
-  std::ofstream stream_;
+  mode_t mode_ = 0;
+  // What the text is written to first, and what it must be copied to if that can't be renamed; -1 for none.
+  std::string temporary_;
+  int temporary_descriptor_ = -1;
+  int target_descriptor_ = -1;
+  std::optional<DescriptorBuffer> buffer_;
+  std::optional<std::ostream> stream_;
 };
 
-/// Replaces the file `destination` by a copy of the content of `source`. Throws FileError.
-void CopyFileContent(const std::string& source, const std::string& destination);
+/// Replaces the file `path` by one that holds `text`. Throws FileError.
+void ReplaceFile(const std::string& path, std::string_view text);
 
 }  // namespace vexel_yaml

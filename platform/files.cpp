@@ -16,7 +16,8 @@ bool FileExists(const std::string& path) { return access(path.c_str(), F_OK) == 
 
 bool IsFileEmpty(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
-  return file.peek() == std::ifstream::traits_type::eof();
+  // What can't be read may hold something.
+  return file.peek() == std::ifstream::traits_type::eof() && !file.bad();
 }
 
 std::string GetFileExtension(const std::string& path) {

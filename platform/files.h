@@ -10,7 +10,8 @@ std::string VexelToNativePath(const std::string& path);
 /// Whether something stands at `path`.
 bool FileExists(const std::string& path);
 
-/// Whether the file holds no byte. A file that cannot be opened counts as empty.
+/// Whether the file holds no byte. One that cannot be opened counts as empty, one that cannot
+/// be read does not.
 bool IsFileEmpty(const std::string& path);
 
 /// The text after the last "." anywhere in `path` (in a folder's name too), empty where there is none.

@@ -1,10 +1,12 @@
 #include "platform/temporary_files.h"
 
+#include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <cerrno>
 #include <csignal>
 #include <cstdlib>
 
@@ -16,7 +18,7 @@ namespace {
 
 // Fixed storage, so that a signal handler can walk it: a person who interrupts a merge in a hurry would
 // otherwise leave copies of the scene in the temporary folder or, worse, in the working copy. A merge has at
-// most four temporary files and two that wait to take the place of others.
+// most four temporary files and four that wait to take the place of others.
 struct Slot {
   std::array<char, 4096> path;
   std::atomic<bool> used = false;
@@ -25,31 +27,77 @@ struct Slot {
 std::array<Slot, 16> slots;
 Mutex slots_mutex;
 
+// What a person, the system's shutdown or a limit on file size or time ends the process with.
+constexpr std::array kEndingSignals = {SIGHUP, SIGINT, SIGTERM, SIGXFSZ, SIGXCPU};
+
 extern "C" void RemoveTempFilesAndDie(int signal_number) {
-  for (Slot& slot : slots) {
-    if (slot.used) unlink(slot.path.data());
-  }
+  UnlinkTempFiles();
   std::signal(signal_number, SIG_DFL);
   raise(signal_number);
 }
 
-void HandleSignals() {
-  for (const int signal_number : {SIGHUP, SIGINT, SIGTERM}) {
+bool HandleSignals() {
+  for (const int signal_number : kEndingSignals) {
+    struct sigaction action = {};
     // A signal that the caller has switched off (nohup) stays off.
-    if (std::signal(signal_number, RemoveTempFilesAndDie) == SIG_IGN) std::signal(signal_number, SIG_IGN);
+    if (sigaction(signal_number, nullptr, &action) != 0 || action.sa_handler == SIG_IGN) continue;
+    action.sa_handler = RemoveTempFilesAndDie;
+    sigaction(signal_number, &action, nullptr);
   }
+  return true;
+}
+
+// Holds the signals back that would find a file that is not remembered yet.
+class SignalsHeld {
+ public:
+  SignalsHeld() {
+    sigset_t held;
+    sigemptyset(&held);
+    for (const int signal_number : kEndingSignals) sigaddset(&held, signal_number);
+    pthread_sigmask(SIG_BLOCK, &held, &previous_);
+  }
+  SignalsHeld(const SignalsHeld&) = delete;
+  SignalsHeld& operator=(const SignalsHeld&) = delete;
+  ~SignalsHeld() { pthread_sigmask(SIG_SETMASK, &previous_, nullptr); }
+
+ private:
+  sigset_t previous_;
+};
+
+// Returns 0 or an errno.
+int RememberTempFile(const std::string& path) {
+  AutoLock lock(slots_mutex);
+  static const bool handled = HandleSignals();
+  Slot* slot = std::find_if(slots.begin(), slots.end(), [](const Slot& s) { return !s.used; });
+  if (!handled || slot == slots.end()) return EMFILE;
+  if (path.size() >= slot->path.size()) return ENAMETOOLONG;
+  *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';
+  slot->used = true;
+  return 0;
 }
 
 }  // namespace
 
-bool RememberTempFile(const std::string& path) {
-  AutoLock lock(slots_mutex);
-  static const bool handled = (HandleSignals(), true);
-  Slot* slot = std::find_if(slots.begin(), slots.end(), [](const Slot& s) { return !s.used; });
-  if (!handled || slot == slots.end() || path.size() >= slot->path.size()) return false;
-  *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';
-  slot->used = true;
-  return true;
+int OpenTempFile(std::string& pattern) {
+  const SignalsHeld held;
+  const int file = mkstemp(pattern.data());
+  if (file < 0) return -1;
+  // A merge tool that runs meanwhile has no business with it.
+  fcntl(file, F_SETFD, FD_CLOEXEC);
+  const int error_number = RememberTempFile(pattern);
+  if (error_number == 0) return file;
+  close(file);
+  unlink(pattern.c_str());
+  errno = error_number;
+  return -1;
+}
+
+std::string CreateTempFile() {
+  std::string path = kTempFilePattern;
+  const int file = OpenTempFile(path);
+  if (file < 0) return {};
+  close(file);
+  return path;
 }
 
 void ForgetTempFile(const std::string& path) {
@@ -59,21 +107,21 @@ void ForgetTempFile(const std::string& path) {
   }
 }
 
-std::string CreateTempFile() {
-  std::string path = "/tmp/MERGEXXXXXX";
-  const int file = mkstemp(path.data());
-  if (file < 0) return {};
-  close(file);
-  if (RememberTempFile(path)) return path;
+void RemoveTempFile(const std::string& path) {
+  if (path.empty()) return;
   unlink(path.c_str());
-  return {};
+  ForgetTempFile(path);
 }
 
 void RemoveTempFiles() {
   AutoLock lock(slots_mutex);
-  for (Slot& slot : slots) {
+  UnlinkTempFiles();
+  for (Slot& slot : slots) slot.used = false;
+}
+
+void UnlinkTempFiles() {
+  for (const Slot& slot : slots) {
     if (slot.used) unlink(slot.path.data());
-    slot.used = false;
   }
 }
 

@@ -4,20 +4,30 @@
 
 namespace vexel_yaml {
 
-/// Remembers a file that must not outlive the process: `RemoveTempFiles` removes it, and so does a signal
-/// that ends the process. Returns false where it can't: beyond a handful of files at once, and for a path
-/// that is too long. May be called from any thread, as the other functions here.
-bool RememberTempFile(const std::string& path);
+/// Where temporary files stand that are not to take another one's place.
+inline constexpr char kTempFilePattern[] = "/tmp/MERGEXXXXXX";
 
-/// Forgets it again: it has been removed or has become a file of the user's.
+/// Makes a new, empty file that only its owner may read and remembers it: it must not outlive the process, so
+/// `RemoveTempFiles` removes it, and so does a signal that ends the process. `pattern` ends in "XXXXXX",
+/// which becomes a name that was free and that nobody can foresee. Returns a descriptor open for reading and
+/// writing, or -1 with the reason in errno, also beyond a handful of files at once.
+int OpenTempFile(std::string& pattern);
+
+/// Makes a file after `kTempFilePattern` in the same way. Returns its path, empty on failure; errno says why.
+std::string CreateTempFile();
+
+/// Forgets a file again that has become one of the user's. May be called from any thread, as the others here
+/// but `OpenTempFile`: with a signal on another thread, the file it is just making would stay.
 void ForgetTempFile(const std::string& path);
 
-/// Makes a new, empty file in /tmp that only its owner may read (the name starts with "MERGE") and remembers
-/// it. Returns its path, empty on failure.
-std::string CreateTempFile();
+/// Removes a file that may be remembered. Does nothing for an empty path.
+void RemoveTempFile(const std::string& path);
 
 /// Removes every file that is still remembered.
 void RemoveTempFiles();
+
+/// The same for those who may neither wait nor allocate, and end the process afterwards.
+void UnlinkTempFiles();
 
 /// Calls `RemoveTempFiles` at the end of its scope, also when an exception passes.
 class TempFilesGuard {

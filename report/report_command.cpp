@@ -1,13 +1,12 @@
 #include "report/report_command.h"
 
-#include <filesystem>
-#include <fstream>
 #include <iostream>
-#include <sstream>
+#include <optional>
 
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
 #include "report/merged_files.h"
 #include "report/readable_headers.h"
@@ -105,12 +104,13 @@ Arguments Parse(const std::vector<std::string>& arguments) {
 }
 
 int PrintText(const std::string& path) {
-  std::ifstream file(VexelToNativePath(path), std::ios::binary);
-  std::ostringstream text;
-  std::error_code error;
-  if (!file || std::filesystem::is_directory(path, error)) return Fail("Cannot open file '" + path + "'");
-  text << file.rdbuf();
-  WriteWithReadableHeaders(std::cout, text.str());
+  try {
+    const std::optional<std::string> text = ReadWholeFile(VexelToNativePath(path));
+    if (!text) return Fail("Cannot open file '" + path + "'");
+    WriteWithReadableHeaders(std::cout, *text);
+  } catch (const FileError& error) {
+    return Fail(error.what());
+  }
   return 0;
 }
 
@@ -140,6 +140,7 @@ void WritePageFile(const Arguments& arguments, const MergedFiles& files) {
   const TempFilesGuard guard;
   FileReplacement file(VexelToNativePath(arguments.output));
   WritePage(file.Stream(), head, CollectReport(files));
+  file.Finish();
   file.Commit();
 }
 

@@ -1,12 +1,15 @@
 #include <algorithm>
-#include <filesystem>
-#include <fstream>
+#include <cerrno>
 #include <limits>
+#include <optional>
+#include <sstream>
 #include <stdexcept>
 #include <system_error>
 #include <utility>
 
 #include "platform/files.h"
+#include "platform/hinted_error.h"
+#include "platform/read_whole_file.h"
 #include "rules/yaml_sequence_remapper.h"
 #include "yaml/yaml_error.h"
 
@@ -180,14 +183,16 @@ void YAMLSequenceRemapper::AddComparisonFieldPath(FieldPath path, float relative
 
 void SetupRules(const std::string& path) {
   const std::string file = path == "auto" ? GetDataFilePath("mergerules.txt") : path;
-  const std::string native = VexelToNativePath(file);
-  std::error_code error;
-  std::ifstream stream(native);
-  // A folder opens like a file, but reads as one without rules.
-  if (!stream || std::filesystem::is_directory(native, error)) {
-    throw YAMLError("Cannot open rules file for reading:" + file);
+  const std::optional<std::string> text = ReadWholeFile(VexelToNativePath(file));
+  if (!text) {
+    throw YAMLError("Cannot open rules file for reading:" + file, std::generic_category().message(errno));
   }
-  YAMLSequenceRemapper::LoadSequenceUniqueKeys(stream);
+  std::istringstream stream(*text);
+  try {
+    YAMLSequenceRemapper::LoadSequenceUniqueKeys(stream);
+  } catch (const std::runtime_error& error) {
+    throw HintedError(error.what(), "in rules file '" + file + "'");
+  }
 }
 
 }  // namespace vexel_yaml

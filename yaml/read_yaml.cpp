@@ -1,12 +1,15 @@
 #include "yaml/read_yaml.h"
 
-#include <filesystem>
-#include <iterator>
+#include <cerrno>
+#include <new>
+#include <optional>
 #include <system_error>
 #include <utility>
 
 #include "platform/error_channel.h"
+#include "platform/file_error.h"
 #include "platform/files.h"
+#include "platform/read_whole_file.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -21,34 +24,13 @@ void CheckHeader(const std::string& text) {
       "text' in Editor Settings.");
 }
 
-std::string ReadWhole(std::ifstream& stream) {
-  stream.seekg(0, std::ios::end);
-  const std::streamoff size = stream.tellg();
-  if (size < 0) {
-    // A pipe has no size.
-    stream.clear();
-    return {std::istreambuf_iterator<char>(stream), std::istreambuf_iterator<char>()};
-  }
-  stream.seekg(0);
-  std::string text(static_cast<size_t>(size), '\0');
-  stream.read(text.data(), size);
-  return text;
-}
-
 }  // namespace
 
-bool ParseYAMLFile(std::ifstream& stream, VexelObjects& objects, DocumentCache* cache) {
-  std::string text = ReadWhole(stream);
-  if (stream.fail()) return false;
-  CheckHeader(text);
-  return ParseYAMLString(std::move(text), objects, cache);
-}
-
 bool ParseYAMLFile(const std::string& path, VexelObjects& objects, DocumentCache* cache) {
-  std::error_code error;
-  std::ifstream stream(path, std::ios::binary);
-  if (!stream || std::filesystem::is_directory(path, error)) throw YAMLError("Cannot open file");
-  return ParseYAMLFile(stream, objects, cache);
+  std::optional<std::string> text = ReadWholeFile(path);
+  if (!text) throw YAMLError("Cannot open file", std::generic_category().message(errno));
+  CheckHeader(*text);
+  return ParseYAMLString(std::move(*text), objects, cache);
 }
 
 void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache* cache) {
@@ -57,6 +39,11 @@ void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache*
     if (!ParseYAMLFile(VexelToNativePath(path), objects, cache)) throw YAMLError("Cannot read file");
   } catch (const YAMLError& error) {
     throw YAMLError(prefix + ": " + error.what(), error.GetHint());
+  } catch (const FileError& error) {
+    throw YAMLError(prefix + ": Cannot read file", error.what());
+  } catch (const std::bad_alloc&) {
+    // No matter of this file.
+    throw;
   } catch (const std::exception& error) {
     throw YAMLError(prefix + " caught unknown exception: " + error.what());
   }

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <fstream>
 #include <string>
 
 #include "yaml/document_cache.h"
@@ -9,12 +8,11 @@
 namespace vexel_yaml {
 
 /// Reads an asset file into `objects`, which should be empty and stays so after a failure.
-/// Returns false only when libyaml can't start (or the stream can't be read to its end). Throws YAMLError:
-/// "Cannot open file" (a folder counts), the 'Force text' message for a file that isn't one,
-/// "Error locating end of document sequence", or what libyaml finds wrong, with the 1-based line.
+/// Returns false only when libyaml can't start. Throws FileError where the file can't be read to its end, and
+/// YAMLError: "Cannot open file" (a folder counts), the 'Force text' message for a file that isn't one,
+/// "Error locating end of document sequence", or what libyaml finds wrong.
 /// With a `cache`, documents that another reader of it has read are copied instead of parsed.
 bool ParseYAMLFile(const std::string& path, VexelObjects& objects, DocumentCache* cache = nullptr);
-bool ParseYAMLFile(std::ifstream& stream, VexelObjects& objects, DocumentCache* cache = nullptr);
 
 /// The same for a text without the check of its first line. The text is taken by value, since a cache keeps
 /// it.

@@ -1,0 +1,13 @@
+#pragma once
+
+#include <optional>
+#include <string>
+
+namespace vexel_yaml {
+
+/// The content of the file at `path`, which may be a pipe. Nothing where it can't be opened (a folder
+/// counts); errno says why. Throws FileError where it can't be read to its end: a part must never be taken
+/// for the whole. May be called from any thread.
+std::optional<std::string> ReadWholeFile(const std::string& path);
+
+}  // namespace vexel_yaml
