@@ -1,0 +1,59 @@
+#!/usr/bin/env bash
+# limits.sh PROGRAM: merges where the machine gives too little, and shows hostile names on a terminal.
+set -euo pipefail
+program=$1
+folder=$(mktemp -d)
+trap 'rm -rf "$folder"' EXIT
+cd "$folder"
+chmod 755 .
+
+fail() {
+  printf 'limits: %s\n' "$*" >&2
+  exit 1
+}
+scene() { # scene NAME FIRST LAST: many lights, the first and the last with these ranges
+  { printf '%%YAML 1.1\n%%TAG !v! tag:vexel.com,2011:\n'
+    for id in {1..2000}; do printf -- '--- !v!108 &%d\nLight:\n  m_Range: %d\n' "$id" "$((id == 1 ? $2 : id == 2000 ? $3 : 1))"; done
+  } > "$1.vexel"
+}
+scene base 1 1
+scene left 2 1
+scene right 1 3
+scene wanted 2 3
+merge=("$program" merge -h --fallback none base.vexel left.vexel right.vexel)
+
+# One thread, and one descriptor for all three files.
+(ulimit -n 4 && "${merge[@]}" few.vexel > output) && cmp -s few.vexel wanted.vexel || fail 'few descriptors'
+if [[ $EUID == 0 ]]; then
+  chmod 777 .
+  (setpriv --reuid=65534 --clear-groups bash -c 'ulimit -u 1 && exec "$@"' limits "${merge[@]}" one.vexel > one) &&
+    cmp -s one.vexel wanted.vexel || fail 'no threads'
+fi
+
+echo old > old.vexel
+for megabytes in {5..150..5}; do
+  for threads in -h --nothreads; do
+    status=0
+    (ulimit -v $((megabytes * 1000)) && "$program" merge "$threads" "${merge[@]:2}" old.vexel > output 2> messages) || status=$?
+    if [[ $status == 0 ]]; then
+      cmp -s old.vexel wanted.vexel || fail "$megabytes MB: status 0 without the result"
+      echo old > old.vexel
+    elif [[ $status == 1 ]]; then
+      [[ "$(< messages)" == 'Out of memory' && "$(< old.vexel)" == old ]] || fail "$megabytes MB: $(< messages)"
+    elif [[ $status != 127 ]]; then # Before the program starts, the system says itself that there is no room.
+      fail "$megabytes MB: status $status"
+    fi
+  done
+done
+[[ $status == 0 ]] || fail '150 MB are not enough'
+
+status=0
+(ulimit -f 8 && "${merge[@]}" old.vexel > output) 2> messages || status=$?
+[[ $status -gt 128 && "$(< old.vexel)" == old ]] || fail "file size: status $status"
+status=0
+"${merge[@]}" old.vexel >&- 2> messages || status=$?
+[[ $status == 1 && "$(< old.vexel)" == old ]] || fail "closed output: status $status"
+[[ -z "$(find . -name '.merge*')" ]] || fail 'a temporary file stayed'
+
+shown=$(script -qec "$program strip -h base.vexel $'\e[1m\u9b\u82e9\xff\n.vexel'" /dev/null | tr -d '\r' || true)
+[[ "$shown" == *$'\'\\x1b[1m\\xc2\\x9b\u82e9\\xff\n.vexel\': Cannot open file\nhint: No such file or directory' ]] || fail "$shown"
