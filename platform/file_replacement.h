@@ -42,7 +42,7 @@ class FileReplacement {
 
  private:
   void MakeTemporaryFile(bool exists);
-  void OpenDestination();
+  void OpenDestination(FileError::Step step);
   void CopyIntoPlace();
   void CloseAll();
 
