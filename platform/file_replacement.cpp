@@ -84,7 +84,7 @@ FileReplacement::FileReplacement(const std::string& path) : path_(path), target_
   try {
     // Before links are followed: what /dev/stdout leads to may be a pipe, which has no path.
     if (exists && !S_ISREG(status.st_mode)) {
-      OpenDestination(Step::kOpening);
+      if (!OpenDestination()) throw FileError(Step::kOpening, path_, errno);
     } else {
       target_ = FollowLinks(path);
       if (exists && access(target_.c_str(), W_OK) != 0) throw FileError(Step::kOpening, path_, errno);
@@ -116,7 +116,7 @@ void FileReplacement::MakeTemporaryFile(bool exists) {
     // Any other reason (a full disk, say) must not touch what stands there.
     const bool in_place = errno == EACCES || errno == EPERM || errno == EROFS;
     if (!exists || !in_place) throw FileError(Step::kOpening, path_, errno);
-    OpenDestination(Step::kOpening);
+    if (!OpenDestination()) throw FileError(Step::kOpening, path_, errno);
   }
   temporary_ = kTempFilePattern;
   temporary_descriptor_ = OpenTempFile(temporary_);
@@ -126,9 +126,9 @@ void FileReplacement::MakeTemporaryFile(bool exists) {
 }
 
 // Nothing is cut off yet.
-void FileReplacement::OpenDestination(Step step) {
+bool FileReplacement::OpenDestination() {
   target_descriptor_ = open(target_.c_str(), O_WRONLY | O_CLOEXEC);
-  if (target_descriptor_ < 0) throw FileError(step, path_, errno);
+  return target_descriptor_ >= 0;
 }
 
 void FileReplacement::Finish() {
@@ -150,6 +150,7 @@ void FileReplacement::Finish() {
 }
 
 void FileReplacement::Commit() {
+  if (temporary_descriptor_ >= 0) Finish();
   if (target_descriptor_ < 0) {
     if (std::rename(temporary_.c_str(), target_.c_str()) == 0) {
       ForgetTempFile(std::exchange(temporary_, {}));
@@ -157,7 +158,8 @@ void FileReplacement::Commit() {
     }
     // Somebody else's file in a shared folder, or a mount point, may be written but not replaced.
     if (errno != EPERM && errno != EACCES && errno != EBUSY) throw FileError(Step::kWriting, path_, errno);
-    OpenDestination(Step::kWriting);
+    const int error_number = errno;
+    if (!OpenDestination()) throw FileError(Step::kWriting, path_, error_number);
   }
   CopyIntoPlace();
 }
@@ -185,7 +187,6 @@ void FileReplacement::CopyIntoPlace() {
 void ReplaceFile(const std::string& path, std::string_view text) {
   FileReplacement file(path);
   file.Stream() << text;
-  file.Finish();
   file.Commit();
 }
 

@@ -37,12 +37,12 @@ class FileReplacement {
   /// fails on a full disk. Throws FileError.
   void Finish();
 
-  /// Puts the text in the destination's place; `Finish` must have been called. Throws FileError.
+  /// Puts the text in the destination's place, after `Finish` if that was not called. Throws FileError.
   void Commit();
 
  private:
   void MakeTemporaryFile(bool exists);
-  void OpenDestination(FileError::Step step);
+  bool OpenDestination();
   void CopyIntoPlace();
   void CloseAll();
 

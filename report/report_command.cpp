@@ -1,5 +1,6 @@
 #include "report/report_command.h"
 
+#include <filesystem>
 #include <iostream>
 #include <optional>
 
@@ -140,7 +141,6 @@ void WritePageFile(const Arguments& arguments, const MergedFiles& files) {
   const TempFilesGuard guard;
   FileReplacement file(VexelToNativePath(arguments.output));
   WritePage(file.Stream(), head, CollectReport(files));
-  file.Finish();
   file.Commit();
 }
 

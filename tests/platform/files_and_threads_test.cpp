@@ -21,7 +21,6 @@ const std::string kFile = kFolder + "file";
 std::string Replace(const std::string& path, std::string_view text) try {
   FileReplacement file(path);
   file.Stream() << text;
-  file.Finish();
   file.Commit();
   return {};
 } catch (const FileError& error) {
