@@ -2,7 +2,10 @@
 # Lists have one path a line, as git quotes it where it has to, so that a line break in a name is none in the list.
 
 # quoted TEXT: as one word of a shell command.
-quoted() { printf "'%s'\n" "$(printf '%s' "$1" | sed "s/'/'\\\\''/g")"; }
+quoted() (
+  text=$(printf '%s.' "$1" | sed "s/'/'\\\\''/g")
+  printf "'%s'\n" "${text%.}"
+)
 
 # Git's commands with the quoting of our lists, whatever the user has set.
 git_names() { git -c core.quotePath=true "$@"; }

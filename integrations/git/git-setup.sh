@@ -61,7 +61,7 @@ merge.vexel.driver $driver merge-driver %O %A %B %L %P
 merge.vexel.recursive vexel-ancestor
 merge.vexel-ancestor.name structural merge of common ancestors
 merge.vexel-ancestor.driver $driver merge-driver --ancestor %O %A %B %L %P
-diff.vexel.textconv f() { $call textconv "\$1" 2>/dev/null || cat "\$1"; }; f
+diff.vexel.textconv f() { $call textconv "\$1" 2>/dev/null || cat -- "\$1"; }; f
 diff.vexel.xfuncname ^--- (.*)\$
 mergetool.vexel.cmd $call mergetool "\$BASE" "\$LOCAL" "\$REMOTE" "\$MERGED"
 mergetool.vexel.trustExitCode true
