@@ -20,7 +20,7 @@ read_rule_options() {
 
 # say_messages BASE LEFT RIGHT [OPTIONS...]: $scratch/messages, with the asset's own name for the temporary ones.
 say_messages() {
-  BASE=$1 LEFT=$2 RIGHT=$3 OPTIONS=$* ASSET=$(shown "$asset") RECORD=${record-} awk '
+  BASE=$1 LEFT=$2 RIGHT=$3 OPTIONS=$* ASSET=$(shown "$asset") RECORD=$(shown "${record#./}") awk '
     function named(name, as,   at, out) {
       out = ""
       while (name != "" && (at = index($0, name)) > 0) {

@@ -2,6 +2,7 @@
 # as soon as their conflict is gone. vexel-merge-git sources this file. All paths are from the top folder.
 
 record_suffix=.vexel-conflicts
+record=
 
 # find_record PATH: sets $record to this asset's record, empty where it has none, $beside and $kept to the places for
 # one, and $entry to what we remember of it. Only what is remembered is ours: a file of this name that the repository
