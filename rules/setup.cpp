@@ -1,5 +1,8 @@
 #include "rules/setup.h"
 
+#include <stdexcept>
+
+#include "platform/hinted_error.h"
 #include "rules/yaml_sequence_remapper.h"
 #include "yaml/type_info.h"
 
@@ -12,7 +15,11 @@ void SetupRulesAndTypes(const std::string& rules_file, const std::string& type_i
   }
   if (type_info_file.empty()) return;
   TimerStat step(timer, "Read type info");
-  SetupTypeInfo(type_info_file);
+  try {
+    SetupTypeInfo(type_info_file);
+  } catch (const std::runtime_error& error) {
+    throw HintedError(error.what(), "in type information file '" + type_info_file + "'");
+  }
 }
 
 }  // namespace vexel_yaml
