@@ -61,15 +61,15 @@ int Close(int& descriptor) {
 }
 
 // Overwriting needs no new room up to the old size; beyond it a full disk must be noticed before a byte of
-// the old content is gone.
+// the old content is gone. The size stays, so that whoever looks meanwhile sees the old file.
 int ReserveRoom([[maybe_unused]] int descriptor, [[maybe_unused]] size_t size) {
 #ifdef __linux__
   struct stat status = {};
   if (fstat(descriptor, &status) != 0) return errno;
-  if (size == 0 || fallocate(descriptor, 0, 0, static_cast<off_t>(size)) == 0) return 0;
+  if (size == 0 || fallocate(descriptor, FALLOC_FL_KEEP_SIZE, 0, static_cast<off_t>(size)) == 0) return 0;
   const int error_number = errno;
   if (error_number == EOPNOTSUPP || error_number == ENOSYS) return 0;
-  // A part of the room may have been added.
+  // Gives back what room was found.
   return ftruncate(descriptor, status.st_size) == 0 ? error_number : errno;
 #else
   return 0;
@@ -166,8 +166,9 @@ void FileReplacement::Commit() {
 
 void FileReplacement::CopyIntoPlace() {
   const std::optional<std::string> text = ReadWholeFile(temporary_);
-  if (!text || text->size() != buffer_->GetCount())
+  if (!text || text->size() != buffer_->GetCount()) {
     throw FileError(Step::kWriting, path_, text ? EIO : errno);
+  }
   const bool regular = IsRegular(target_descriptor_);
   int error_number = regular ? ReserveRoom(target_descriptor_, text->size()) : 0;
   if (error_number != 0) throw FileError(Step::kWriting, path_, error_number);
