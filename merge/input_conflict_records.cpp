@@ -47,6 +47,29 @@ std::optional<RecordingConflictResolver::RecordResolve> ParseHandling(std::strin
   return RecordingConflictResolver::RecordResolve{StringToPath(path), *handling};
 }
 
+enum class Section { kNone, kConflicts, kHandling, kNonConflicts };
+
+// Whether the program itself writes lines that begin so in a section that holds what came out of a merge.
+// Keys and values stand there, and one that holds the text of a header must not begin a section: whoever
+// edits a scene would decide conflicts in other people's merges.
+bool IsRecordLine(std::string_view line, Section section) {
+  constexpr std::string_view kOfConflicts[] = {" ", "Left ", "Right ", "BreakCycle "};
+  constexpr std::string_view kOfNonConflicts[] = {"Both ", "none ", "Transform cycle ", "<unknown "};
+  const auto begins = [&](std::string_view start) { return line.starts_with(start); };
+  if (section != Section::kConflicts && section != Section::kNonConflicts) return false;
+  return std::ranges::any_of(kOfConflicts, begins) ||
+         (section == Section::kNonConflicts && std::ranges::any_of(kOfNonConflicts, begins));
+}
+
+// The section that a line of `section` begins, if it is a header.
+std::optional<Section> SectionBegunBy(std::string_view line, Section section) {
+  if (IsRecordLine(line, section)) return std::nullopt;
+  if (Contains(line, "Conflicts:")) return Section::kConflicts;
+  if (Contains(line, "Conflict handling:")) return Section::kHandling;
+  if (Contains(line, "Non-conflicts:")) return Section::kNonConflicts;
+  return std::nullopt;
+}
+
 }  // namespace
 
 FieldPath StringToPath(std::string_view text) {
@@ -61,17 +84,15 @@ FieldPath StringToPath(std::string_view text) {
 
 void InputConflictRecords(std::istream& in, RecordingConflictResolver& resolver) {
   std::vector<RecordingConflictResolver::RecordResolve> resolutions;
-  bool handling = false;
+  Section section = Section::kNone;
   std::string line;
   for (int number = 1; std::getline(in, line); ++number) {
     // An editor may have given the file other line ends.
     if (!line.empty() && line.back() == '\r') line.pop_back();
     if (line.empty() || line.front() == '#') continue;
-    if (Contains(line, "Conflicts:") || Contains(line, "Non-conflicts:")) {
-      handling = false;
-    } else if (Contains(line, "Conflict handling:")) {
-      handling = true;
-    } else if (handling) {
+    if (const std::optional<Section> begun = SectionBegunBy(line, section)) {
+      section = *begun;
+    } else if (section == Section::kHandling) {
       if (auto resolution = ParseHandling(line, number)) resolutions.push_back(std::move(*resolution));
     }
   }

@@ -14,8 +14,14 @@ void EndLine(YAMLDiffOutput& out) {
   if (out.GetColumn() != 0) out << endl;
 }
 
+// No line behind the first may begin like one of the file's own: a value may hold the text of a header.
 void OutputOperation(YAMLDiffOutput& out, const Operation* operation) {
-  if (operation != nullptr) operation->Output(out);
+  if (operation != nullptr) {
+    const bool aligns_its_lines = operation->GetKind() != Operation::Kind::kChange;
+    if (!aligns_its_lines) out.PushLevel();
+    operation->Output(out);
+    if (!aligns_its_lines) out.PopLevel();
+  }
   EndLine(out);
 }
 

@@ -1,6 +1,7 @@
 #include "merge/recording_conflict_resolver.h"
 
 #include <algorithm>
+#include <iterator>
 
 #include "diff/merge_tree_visitor.h"
 #include "merge/merge_additions.h"
@@ -18,6 +19,9 @@ const Operation* Blanked(const Operation* operation) {
   return blank;
 }
 
+// Null for the path of a whole file.
+const YAMLScalar* FirstOf(const FieldPath& path) { return path.empty() ? nullptr : path.front(); }
+
 }  // namespace
 
 bool RecordingConflictResolver::HasPendingConflicts() const {
@@ -27,23 +31,38 @@ bool RecordingConflictResolver::HasPendingConflicts() const {
 
 void RecordingConflictResolver::SetResolveMethodForPaths(std::vector<RecordResolve> resolutions) {
   resolutions_ = std::move(resolutions);
+  resolved_patterns_.clear();
   resolutions_by_first_.clear();
   for (size_t i = 0; i < resolutions_.size(); ++i) {
-    resolutions_by_first_[resolutions_[i].pattern.front()].push_back(i);
+    const FieldPath& pattern = resolutions_[i].pattern;
+    FieldPath& resolved = resolved_patterns_.emplace_back();
+    std::ranges::transform(pattern, std::back_inserter(resolved), ResolveEscapes);
+    resolutions_by_first_[FirstOf(pattern)].push_back(i);
+    if (FirstOf(resolved) != FirstOf(pattern)) resolutions_by_first_[FirstOf(resolved)].push_back(i);
   }
+}
+
+bool RecordingConflictResolver::Matches(size_t place, const FieldPath& path) const {
+  const FieldPath& pattern = resolutions_[place].pattern;
+  if (pattern.size() != path.size()) return false;
+  for (size_t i = 0; i < path.size(); ++i) {
+    if (pattern[i] != YAMLScalar::star && pattern[i] != path[i] && resolved_patterns_[place][i] != path[i]) {
+      return false;
+    }
+  }
+  return true;
 }
 
 size_t RecordingConflictResolver::FindResolution(const YAMLScalar* first, const FieldPath& path) const {
   const auto found = resolutions_by_first_.find(first);
   if (found == resolutions_by_first_.end()) return resolutions_.size();
-  const auto match = std::ranges::find_if(
-      found->second, [&](size_t i) { return MatchesPattern(resolutions_[i].pattern, path); });
+  const auto match = std::ranges::find_if(found->second, [&](size_t place) { return Matches(place, path); });
   return match == found->second.end() ? resolutions_.size() : *match;
 }
 
 MergeResolve RecordingConflictResolver::FindResolution(const FieldPath& path) const {
   if (resolutions_.empty()) return MergeResolve::kAutomatic;
-  const size_t first = std::min(FindResolution(path.front(), path), FindResolution(YAMLScalar::star, path));
+  const size_t first = std::min(FindResolution(FirstOf(path), path), FindResolution(YAMLScalar::star, path));
   return first == resolutions_.size() ? MergeResolve::kAutomatic : resolutions_[first].resolution;
 }
 
@@ -112,7 +131,7 @@ const Operation* RecordingConflictResolver::ProvisionalResult(const Operation* l
     case MergeResolve::kRight:
       return right;
     case MergeResolve::kBlank:
-      return GetPath().back()->IsPseudoKey() ? blank_source : Blanked(blank_source);
+      return !GetPath().empty() && GetPath().back()->IsPseudoKey() ? blank_source : Blanked(blank_source);
     case MergeResolve::kBase:
     case MergeResolve::kAutomatic:
     case MergeResolve::kConflict:

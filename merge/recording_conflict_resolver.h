@@ -22,7 +22,8 @@ class RecordingConflictResolver final : public ConflictResolver {
   };
 
   struct RecordResolve {
-    /// "*" stands for any one component.
+    /// "*" stands for any one component. Any other matches as it stands, or with its escapes resolved: what
+    /// PathToString wrote is a pattern for that path.
     FieldPath pattern;
     MergeResolve resolution;
   };
@@ -59,6 +60,7 @@ class RecordingConflictResolver final : public ConflictResolver {
 
  private:
   MergeResolve FindResolution(const FieldPath& path) const;
+  bool Matches(size_t place, const FieldPath& path) const;
   /// The place of the first resolution that begins with `first` and matches `path`.
   size_t FindResolution(const YAMLScalar* first, const FieldPath& path) const;
 
@@ -80,6 +82,8 @@ class RecordingConflictResolver final : public ConflictResolver {
   MergeResolve default_side_;
   std::vector<Record> records_;
   std::vector<RecordResolve> resolutions_;
+  // The patterns of resolutions_, with their escapes resolved.
+  std::vector<FieldPath> resolved_patterns_;
   // The places in resolutions_ of the patterns that begin with a component, "*" being one: a user may have
   // settled thousands of conflicts one by one.
   std::unordered_map<const YAMLScalar*, std::vector<size_t>> resolutions_by_first_;

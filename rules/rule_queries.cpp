@@ -22,15 +22,6 @@ bool MatchesPattern(const FieldPath& pattern, const FieldPath& path) {
   });
 }
 
-std::string PathToString(const FieldPath& path) {
-  std::string text;
-  for (size_t i = 0; i < path.size(); ++i) {
-    if (i > 0) text += '.';
-    text += path[i]->GetText();
-  }
-  return text;
-}
-
 const std::vector<FieldPath>& YAMLSequenceRemapper::ChooseKeyPaths(const FieldPath& path) {
   if (path.size() == 1 && path[0] == YAMLScalar::underscore) return defaultDirectPath;
   const SequenceInfo* rule = FindRule(s_ArrayUniqueKeyMap, path);

@@ -170,8 +170,13 @@ class YAMLSequenceRemapper {
 /// Whether `path` has as many components as `pattern`, each equal to the pattern's or met by its "*".
 bool MatchesPattern(const FieldPath& pattern, const FieldPath& path);
 
-/// The components joined by ".".
+/// The components joined by ".", on one line: control characters and line breaks are written as in C, "\n" or
+/// "\x1b", a character of several bytes as one "\x" for each. Nothing else is escaped, not even a dot.
 std::string PathToString(const FieldPath& path);
+
+/// The component that such a text stands for: `component` itself where it holds no escape. "\x" takes exactly
+/// two digits, so that every byte can be written, a dot or a blank too.
+const YAMLScalar* ResolveEscapes(const YAMLScalar* component);
 
 /// Reads the rules file: `path` is the value of "--rules", "auto" for the default file beside the executable.
 /// Throws YAMLError "Cannot open rules file for reading:" + the file's path (a folder counts), and what
