@@ -93,17 +93,14 @@ class SequenceMerge {
     return merged;
   }
 
+  // What a pair of additions was settled to stays: asked again, as an addition of left's alone, the user's
+  // choice of right's would refuse it, and the element would be gone from both sides.
   YAMLSequenceDiff* MergeDiffs(std::set<int>& dropped) {
-    if (settled_.empty()) return YAMLSequenceDiff::Merge(*left_diff_, *right_diff_, dropped, resolver_);
-    // What a pair was settled to is decided. Asked again, as an addition of left's alone, the user's choice
-    // of right's would refuse it, and the element would be gone from both sides.
-    YAMLSequenceDiff open;
-    YAMLSequenceDiff decided;
+    YAMLSequenceDiff* merged = YAMLSequenceDiff::Merge(*left_diff_, *right_diff_, dropped, resolver_);
+    if (settled_.empty()) return merged;
     for (const auto& [index, operation] : left_diff_->GetEntries()) {
-      (settled_.contains(operation) ? decided : open).Add(index, operation);
+      if (settled_.contains(operation) && dropped.erase(index) != 0) merged->Add(index, operation);
     }
-    YAMLSequenceDiff* merged = YAMLSequenceDiff::Merge(open, *right_diff_, dropped, resolver_);
-    for (const auto& [index, operation] : decided.GetEntries()) merged->Add(index, operation);
     return merged;
   }
 
@@ -138,13 +135,13 @@ class SequenceMerge {
   std::unordered_set<const Operation*> settled_;
 };
 
-// Whether both sides made the same edit of a list. Elements that were added and are told apart by keys of a
-// rule's own are paired instead, one by one, so that each gets its record.
+// Whether both sides made the same edit of a list. Under a rule of the list's own the elements are gone
+// through one by one, so that each gets its record; where nothing but the layout changed, the layouts are
+// merged.
 bool IsSameEdit(const ChangeSequenceOperation& left, const ChangeSequenceOperation& right,
                 const std::vector<FieldPath>& key_paths) {
-  const bool by_rule = left.GetRemapper()->IsSetRemapper() && right.GetRemapper()->IsSetRemapper() &&
-                       key_paths != YAMLSequenceRemapper::defaultPath;
-  return (!by_rule || left.GetDiff()->GetEntries().empty()) && OperationEquals(left, right);
+  return !left.GetDiff()->GetEntries().empty() && !right.GetDiff()->GetEntries().empty() &&
+         key_paths == YAMLSequenceRemapper::defaultPath && OperationEquals(left, right);
 }
 
 // "No operation" leaves a place as it is in base: a base element stays, but the slot of an addition that was

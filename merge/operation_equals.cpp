@@ -1,66 +1,100 @@
 #include <algorithm>
 
-#include "diff/yaml_mapping_diff.h"
-#include "diff/yaml_sequence_diff.h"
+#include "diff/merge_tree_visitor.h"
 
 namespace vexel_yaml {
 
 namespace {
 
-bool ValuesEqual(const Operation& a, const Operation& b) {
-  return static_cast<const ValuedOperation&>(a).GetValue()->Equals(
-      static_cast<const ValuedOperation&>(b).GetValue());
+// Two values with one hash are probably equal. Whoever drops one of two edits must know it.
+bool ValuesEqual(const ValuedOperation& a, const ValuedOperation& b) {
+  return a.GetValue()->Equals(b.GetValue()) && a.GetValue()->HasSameContent(*b.GetValue());
 }
 
-bool SequenceDiffsEqual(const YAMLSequenceDiff& a, const YAMLSequenceDiff& b) {
-  return std::equal(a.GetEntries().begin(), a.GetEntries().end(), b.GetEntries().begin(),
-                    b.GetEntries().end(), [](const auto& x, const auto& y) {
-                      return x.first == y.first && OperationEquals(*x.second, *y.second);
-                    });
-}
+bool AreEqual(const RemoveOperation& /*a*/, const RemoveOperation& /*b*/) { return true; }
+bool AreEqual(const ChangeOperation& a, const ChangeOperation& b) { return ValuesEqual(a, b); }
+bool AreEqual(const AddOperation& a, const AddOperation& b) { return ValuesEqual(a, b); }
 
-// Two removals or two moves have nothing but the layout to tell them apart.
-bool LayoutsEqual(const YAMLSequenceRemapper* a, const YAMLSequenceRemapper* b) {
-  if (a == nullptr || b == nullptr) return a == b;
-  return a->GetDestinationCount() == b->GetDestinationCount() && a->GetMapping() == b->GetMapping();
-}
-
-bool ChangeSequencesEqual(const ChangeSequenceOperation& a, const ChangeSequenceOperation& b) {
-  return LayoutsEqual(a.GetRemapper(), b.GetRemapper()) && SequenceDiffsEqual(*a.GetDiff(), *b.GetDiff());
-}
-
-bool MappingDiffsEqual(const YAMLMappingDiff& a, const YAMLMappingDiff& b) {
+bool AreEqual(const ChangeMappingOperation& a, const ChangeMappingOperation& b) {
   const auto entries_equal = [](const YAMLMappingDiff::Entry& x, const YAMLMappingDiff::Entry& y) {
     return x.key == y.key && x.index == y.index && OperationEquals(*x.operation, *y.operation);
   };
-  if (!std::equal(a.GetEntries().begin(), a.GetEntries().end(), b.GetEntries().begin(), b.GetEntries().end(),
-                  entries_equal)) {
-    return false;
-  }
-  const ChangeSequenceOperation* a_order = a.GetKeyOrder();
-  const ChangeSequenceOperation* b_order = b.GetKeyOrder();
+  if (!std::ranges::equal(a.GetDiff()->GetEntries(), b.GetDiff()->GetEntries(), entries_equal)) return false;
+  const ChangeSequenceOperation* a_order = a.GetDiff()->GetKeyOrder();
+  const ChangeSequenceOperation* b_order = b.GetDiff()->GetKeyOrder();
   if (a_order == b_order) return true;
   return a_order != nullptr && b_order != nullptr && OperationEquals(*a_order, *b_order);
 }
 
+// The layouts don't count: what a side only moves or drops is no difference here.
+bool AreEqual(const ChangeSequenceOperation& a, const ChangeSequenceOperation& b) {
+  return std::ranges::equal(a.GetDiff()->GetEntries(), b.GetDiff()->GetEntries(),
+                            [](const auto& x, const auto& y) {
+                              return x.first == y.first && OperationEquals(*x.second, *y.second);
+                            });
+}
+
+// Visits the second operation, once the first one's kind is known.
+template <typename First>
+class OperationComparer2nd final : public MergeTreeVisitor {
+ public:
+  explicit OperationComparer2nd(const First& first) : first_(first) {}
+
+  using MergeTreeVisitor::Visit;
+  void Visit(const RemoveOperation* second) override { Compare(*second); }
+  void Visit(const ChangeOperation* second) override { Compare(*second); }
+  void Visit(const AddOperation* second) override { Compare(*second); }
+  void Visit(const ChangeMappingOperation* second) override { Compare(*second); }
+  void Visit(const ChangeSequenceOperation* second) override { Compare(*second); }
+
+  bool AreEqual() const { return equal_; }
+
+ private:
+  template <typename Second>
+  void Compare(const Second& second) {
+    if constexpr (std::is_same_v<First, Second>) {
+      equal_ = vexel_yaml::AreEqual(first_, second);
+    } else {
+      equal_ = false;
+    }
+  }
+
+  const First& first_;
+  bool equal_ = true;
+};
+
+// Visits the first operation.
+class OperationComparer final : public MergeTreeVisitor {
+ public:
+  explicit OperationComparer(const Operation& second) : second_(second) {}
+
+  using MergeTreeVisitor::Visit;
+  void Visit(const RemoveOperation* first) override { Compare(*first); }
+  void Visit(const ChangeOperation* first) override { Compare(*first); }
+  void Visit(const AddOperation* first) override { Compare(*first); }
+  void Visit(const ChangeMappingOperation* first) override { Compare(*first); }
+  void Visit(const ChangeSequenceOperation* first) override { Compare(*first); }
+
+  bool AreEqual() const { return equal_; }
+
+ private:
+  template <typename First>
+  void Compare(const First& first) {
+    OperationComparer2nd<First> comparer(first);
+    second_.Accept(comparer);
+    equal_ = comparer.AreEqual();
+  }
+
+  const Operation& second_;
+  bool equal_ = true;
+};
+
 }  // namespace
 
 bool OperationEquals(const Operation& a, const Operation& b) {
-  if (a.GetKind() != b.GetKind()) return false;
-  switch (a.GetKind()) {
-    case Operation::Kind::kRemove:
-      return true;
-    case Operation::Kind::kChange:
-    case Operation::Kind::kAdd:
-      return ValuesEqual(a, b);
-    case Operation::Kind::kChangeMapping:
-      return MappingDiffsEqual(*static_cast<const ChangeMappingOperation&>(a).GetDiff(),
-                               *static_cast<const ChangeMappingOperation&>(b).GetDiff());
-    case Operation::Kind::kChangeSequence:
-      return ChangeSequencesEqual(static_cast<const ChangeSequenceOperation&>(a),
-                                  static_cast<const ChangeSequenceOperation&>(b));
-  }
-  return false;
+  OperationComparer comparer(b);
+  a.Accept(comparer);
+  return comparer.AreEqual();
 }
 
 }  // namespace vexel_yaml

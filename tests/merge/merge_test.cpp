@@ -6,6 +6,8 @@
 #include "diff/yaml_mapping_diff.h"
 #include "diff/yaml_sequence_diff.h"
 #include "merge/conflict_record_file.h"
+#include "merge/exception_conflict_resolver.h"
+#include "merge/side_picking_conflict_resolver.h"
 #include "tests/support/yaml_text.h"
 #include "yaml/yaml_error.h"
 
@@ -181,6 +183,84 @@ TEST(RecordingResolver, ADependencyConflictMarksTheObjectsRecord) {
   std::ostringstream text;
   OutputConflictRecords(text, resolver, false);
   EXPECT_EQ(text.str(), "Conflicts:\nLeft  1 delete\nRight 1 delete\nConflict handling:\nBase 3\n");
+}
+
+TEST(RecordingResolver, AnEmptyPathIsMetByAnEmptyPatternOnly) {
+  const AddOperation add(YAMLScalar::one, true);
+  const ChangeOperation one(YAMLScalar::one), zero(YAMLScalar::zero);
+  Recording resolver(MergeResolve::kBlank);
+  resolver.SetResolveMethodForPaths({{PathFromText("*"), MergeResolve::kBase}});
+  EXPECT_EQ(resolver.OnValueAdded(&add, ConflictType::kRightAdds), &add);
+  const auto* blank = static_cast<const ChangeOperation*>(resolver.OnSameValueChanged(&one, &zero));
+  EXPECT_EQ(blank->GetValue(), YAMLScalar::empty);
+  resolver.SetResolveMethodForPaths({{{}, MergeResolve::kLeft}});
+  EXPECT_EQ(resolver.OnValueAdded(&add, ConflictType::kRightAdds), nullptr);
+  resolver.PushPath(YAMLScalar::one);
+  EXPECT_EQ(resolver.OnValueAdded(&add, ConflictType::kRightAdds), &add);
+}
+
+TEST(OperationEquals, EqualHashesAreConfirmedByContent) {
+  const OwnedNode a = ValueFromText("{x: 1}"), b = ValueFromText("{x: 2}"), c = ValueFromText("{x: 1}");
+  for (const OwnedNode* node : {&a, &b, &c}) (*node)->SetHash(7);
+  EXPECT_FALSE(OperationEquals(AddOperation(a.get(), true), AddOperation(b.get(), true)));
+  EXPECT_TRUE(OperationEquals(AddOperation(a.get(), true), AddOperation(c.get(), true)));
+  EXPECT_FALSE(OperationEquals(AddOperation(a.get(), true), ChangeOperation(c.get())));
+}
+
+// What both sides did at one place, pair by pair, with a resolver's answer.
+template <typename Answer>
+void ForEachTwoSidedPair(ConflictResolver& resolver, Answer answer) {
+  YAMLMappingDiff no_entries;
+  YAMLSequenceDiff no_elements;
+  const RemoveOperation remove(true);
+  const ChangeOperation change(YAMLScalar::one), change_too(YAMLScalar::zero);
+  const AddOperation add(YAMLScalar::one, true), add_too(YAMLScalar::zero, true);
+  const ChangeMappingOperation mapping(&no_entries, true), mapping_too(&no_entries, true);
+  const ChangeSequenceOperation sequence(&no_elements, nullptr, true),
+      sequence_too(&no_elements, nullptr, true);
+  const std::pair<const Operation*, const Operation*> pairs[] = {
+      {&change, &change_too}, {&remove, &change},       {&remove, &mapping},
+      {&add, &add_too},       {&mapping, &mapping_too}, {&sequence, &sequence_too}};
+  for (const auto& [left, right] : pairs) {
+    answer(left, right, [&, l = left, r = right] { return Operation::Merge(l, r, resolver); });
+  }
+}
+
+TEST(SidePickingResolver, TakesItsSideAndNoOther) {
+  for (const MergeResolve side : {MergeResolve::kLeft, MergeResolve::kRight}) {
+    SidePickingConflictResolver resolver(side);
+    ForEachTwoSidedPair(resolver, [&](const Operation* left, const Operation* right, const auto& merge) {
+      EXPECT_EQ(merge(), side == MergeResolve::kLeft ? left : right);
+    });
+    const std::string refused =
+        "OnComponentDependencyConflict not implemented in SidePickingConflictResolver";
+    EXPECT_THAT([&] { resolver.OnComponentDependencyConflict({}); },
+                testing::Throws<YAMLError>(testing::Property(&YAMLError::what, refused)));
+  }
+  EXPECT_THROW(SidePickingConflictResolver(MergeResolve::kBase), YAMLError);
+}
+
+TEST(ExceptionResolver, NamesThePlaceOfEveryConflict) {
+  ExceptionConflictResolver resolver;
+  resolver.PushPath(YAMLScalar::Lookup("1"));
+  resolver.PushPath(YAMLScalar::Lookup("a\n"));
+  std::vector<std::string> messages;
+  ForEachTwoSidedPair(resolver, [&](const Operation*, const Operation*, const auto& merge) {
+    try {
+      merge();
+    } catch (const YAMLError& error) {
+      messages.push_back(error.what());
+    }
+  });
+  const std::string path = "1.a\\n";
+  EXPECT_THAT(messages,
+              testing::ElementsAre(
+                  "Conflict for same value changed " + path, "Conflict for removed value changed " + path,
+                  "Conflict for removed value changed " + path,
+                  testing::StartsWith("Conflict for same value added " + path + " at line "),
+                  "Conflict for same mapping changed " + path, "Conflict for same sequence changed " + path));
+  const RemoveOperation remove(true);
+  EXPECT_EQ(Operation::Merge(&remove, &remove, resolver), &remove);
 }
 
 }  // namespace

@@ -104,15 +104,16 @@ TEST_F(SequenceMerging, WhatBothAddedIsOneElementAtLeftsPlace) {
   EXPECT_EQ(Merged("keyed", base, "[{id: 1}, {id: 7}, {id: 8}, {id: 2}]",
                    "[{id: 8}, {id: 9}, {id: 1, v: 3}, {id: 7}, {id: 2, v: 4}]"),
             "[{id: 9}, {id: 1, v: 3}, {id: 7}, {id: 8}, {id: 2, v: 4}]");
-  EXPECT_THAT(records_, ElementsAre("Both adds 1.id", "Both adds 1", "Both adds 2.id", "Both adds 2",
-                                    "Right adds 0", "Right changes 1", "Right changes 4"));
+  EXPECT_THAT(records_,
+              ElementsAre("Both adds 1.id", "Both adds 1", "Both adds 2.id", "Both adds 2", "Right adds 0",
+                          "Right changes 1", "Left adds 2", "Left adds 3", "Right changes 4"));
   // Beside an element without a key all are matched by equality, and none is paired.
   EXPECT_EQ(
       Merged("list", "[{fileID: 1}, x]", "[{fileID: 1}, x, {fileID: 3}]", "[{fileID: 3}, {fileID: 1}, x]"),
       "[{fileID: 3}, {fileID: 1}, x, {fileID: 3}]");
 }
 
-TEST_F(SequenceMerging, APairThatIsSettledIsNotAskedAbout) {
+TEST_F(SequenceMerging, APairThatIsSettledStaysWhateverIsSaidOfLeftsAddition) {
   const std::string base = "[{fileID: 1}, {fileID: 2}]";
   const std::string left = "[{fileID: 1}, {fileID: 7, whole: l}, {fileID: 2}, {fileID: 8}]";
   const std::string right = "[{fileID: 7, whole: r}, {fileID: 1}, {fileID: 2, v: 5}]";
@@ -121,7 +122,7 @@ TEST_F(SequenceMerging, APairThatIsSettledIsNotAskedAbout) {
   };
   EXPECT_EQ(merged("right 1.C.list.1"),
             "[{fileID: 1}, {fileID: 7, whole: r}, {fileID: 2, v: 5}, {fileID: 8}]");
-  EXPECT_THAT(records_, ElementsAre("Both adds 1", "Right changes 2", "Left adds 3"));
+  EXPECT_THAT(records_, ElementsAre("Both adds 1", "Left adds 1", "Right changes 2", "Left adds 3"));
   EXPECT_EQ(merged("right 1.C.list.*"), "[{fileID: 1}, {fileID: 7, whole: r}, {fileID: 2, v: 5}]");
 }
 
@@ -147,7 +148,16 @@ TEST_F(SequenceMerging, TheSameEditOfBothSidesIsMadeOnce) {
   // Elements with keys of their own get their records one by one.
   EXPECT_EQ(Merged("keyed", "[{id: 1}]", "[{id: 1}, {id: 2}]", "[{id: 1}, {id: 2}]"), "[{id: 1}, {id: 2}]");
   EXPECT_FALSE(is_lefts_);
-  EXPECT_THAT(records_, ElementsAre("Both adds 1.id", "Both adds 1"));
+  EXPECT_THAT(records_, ElementsAre("Both adds 1.id", "Both adds 1", "Left adds 1"));
+}
+
+TEST_F(SequenceMerging, WithoutKeysOrAdditionsTheSameEditIsMergedLikeAnyOther) {
+  EXPECT_EQ(Merged("plain", "[a]", "[a, x]", "[a, x]"), "[a, x, x]");
+  EXPECT_EQ(Merged("list", "[{fileID: 1}, {fileID: 2}]", "[{fileID: 2}, {fileID: 1}]",
+                   "[{fileID: 2}, {fileID: 1}]"),
+            "[{fileID: 1}, {fileID: 2}]");
+  EXPECT_FALSE(is_lefts_);
+  EXPECT_EQ(Merged("list", "[a, b, c]", "[a, c]", "[a, c]"), "[a, c]");
 }
 
 TEST_F(SequenceMerging, WhereASideMovesNothingTheOthersLayoutCounts) {
