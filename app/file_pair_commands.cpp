@@ -7,6 +7,7 @@
 
 #include "diff/strip_unchanged.h"
 #include "diff/yaml_diff_output.h"
+#include "fixups/file_id_collisions.h"
 #include "fixups/state_machine_transitions.h"
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
@@ -48,8 +49,8 @@ const YAMLMappingDiff* PrepareDiff(const FilePairConfig& config, FilePair& files
   {
     TimerStat step(timer, "Creating mappings");
     TimerStat preprocessing(step, "Preprocess mappings");
-    TransitionsToSequences(files.first);
-    TransitionsToSequences(files.second);
+    PreProcess(files.first);
+    PreProcess(files.second);
   }
   TimerStat step(timer, "Creating diff");
   TimerStat inner(step, "Creating left diff");

@@ -221,8 +221,9 @@ SceneTriple RandomTriple(uint32_t seed) {
   triple.right.reset(common->Clone());
   editor.Edit(*triple.left, editor.Below(5));
   editor.Edit(*triple.right, editor.Below(5));
-  RemapCollidingAddFileIDs(FindCollidingAdditions(*triple.base, *triple.left, *triple.right), *triple.base,
-                           *triple.left, *triple.right);
+  ConflictingFileIDs ids = CreateConflictingFileIDsRemapper(FileIDSet(*triple.base), FileIDSet(*triple.left),
+                                                            FileIDSet(*triple.right));
+  RemapCollidingAddFileIDs(ids, *triple.left, *triple.right);
   triple.moved = editor.HasMoved();
   return triple;
 }

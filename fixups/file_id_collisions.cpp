@@ -1,9 +1,10 @@
 #include "fixups/file_id_collisions.h"
 
+#include <algorithm>
 #include <string>
 #include <unordered_map>
-#include <vector>
 
+#include "fixups/state_machine_transitions.h"
 #include "yaml/yaml_error.h"
 #include "yaml/yaml_sequence.h"
 
@@ -62,61 +63,68 @@ const YAMLScalar* ClassName(const YAMLMapping& root, const YAMLScalar* file_id) 
   return object->FirstKey();
 }
 
-}  // namespace
-
-FileIDSet FindCollidingAdditions(const YAMLMapping& base, const YAMLMapping& left, const YAMLMapping& right) {
-  FileIDSet colliding;
-  for (const auto& [file_id, object] : left) {
-    if (!base.HasKey(file_id) && right.HasKey(file_id)) colliding.insert(file_id);
+// The first of the file IDs behind `file_id` that nothing uses.
+const YAMLScalar* FindFree(const YAMLScalar* file_id, const AllFileIDs& all) {
+  const auto value = static_cast<uint32_t>(file_id->GetIntValue());
+  for (uint32_t i = 1; i <= kCandidates; ++i) {
+    const auto candidate = static_cast<int32_t>(value + i);
+    const YAMLScalar* text = YAMLScalar::Lookup(std::to_string(candidate));
+    if (all.Contains(text)) continue;
+    if (candidate == -1) break;
+    return text;
   }
-  return colliding;
+  throw YAMLError("Cannot create new fileID for conflicting fileID: " + file_id->GetText());
 }
 
-std::vector<RenumberedObject> RemapCollidingAddFileIDs(const FileIDSet& conflicting, const YAMLMapping& base,
-                                                       const YAMLMapping& left, YAMLMapping& right) {
+// The diff compares by hash, so an edited object's must be up to date.
+void Renumber(const std::vector<RenumberedObject>& renumbered, YAMLMapping& root) {
   Renumbering renumbering;
-  FileIDSet taken;
-  // 0 is the null reference.
-  const auto in_use = [&](const YAMLScalar* file_id) {
-    return file_id == YAMLScalar::zero || base.HasKey(file_id) || left.HasKey(file_id) ||
-           right.HasKey(file_id) || taken.contains(file_id);
-  };
-  const auto find_free = [&](const YAMLScalar* file_id) {
-    const auto value = static_cast<uint32_t>(file_id->GetIntValue());
-    for (uint32_t i = 1; i <= kCandidates; ++i) {
-      const auto candidate = static_cast<int32_t>(value + i);
-      const YAMLScalar* text = YAMLScalar::Lookup(std::to_string(candidate));
-      if (in_use(text)) continue;
-      if (candidate == -1) break;
-      return text;
-    }
-    throw YAMLError("Cannot create new fileID for conflicting fileID: " + file_id->GetText());
-  };
-
-  std::vector<RenumberedObject> renumbered;
-  for (const YAMLScalar* file_id : conflicting) {
-    // Of one class, the two are taken for the same object and merged into one.
-    if (ClassName(left, file_id) == ClassName(right, file_id)) continue;
-    const YAMLScalar* new_id = find_free(file_id);
-    taken.insert(new_id);
-    renumbering.emplace(file_id, new_id);
-    renumbered.push_back({file_id, new_id});
-  }
-  if (renumbered.empty()) return renumbered;
-
   for (const auto& [old_id, new_id] : renumbered) {
-    right.ChangeKey(old_id, new_id);
-    YAMLMapping* object = right.Get(new_id)->AsMapping();
+    renumbering.emplace(old_id, new_id);
+    root.ChangeKey(old_id, new_id);
+    YAMLMapping* object = root.Get(new_id)->AsMapping();
     object->Change(YAMLScalar::fileIDPlaceHolderName, new_id->AsValue());
     object->RebuildHash(false);
   }
-  // The diff compares by hash, so an edited object's must be up to date.
   PreProcessRemapAddCollisionsVisitor visitor(renumbering);
-  for (const auto& [file_id, object] : right) {
+  for (const auto& [file_id, object] : root) {
     object->Accept(visitor);
     if (visitor.TakeChanged()) object->RebuildHash(false);
   }
-  right.RebuildHash(true);
+  root.RebuildHash(true);
+}
+
+}  // namespace
+
+bool AllFileIDs::Contains(const YAMLScalar* file_id) const {
+  // 0 is the null reference.
+  return file_id == YAMLScalar::zero || given_out_.contains(file_id) ||
+         std::ranges::any_of(files_, [&](const FileIDSet& file) { return file.Contains(file_id); });
+}
+
+FileIDSet PreProcess(YAMLMapping& root) {
+  TransitionsToSequences(root);
+  return FileIDSet(root);
+}
+
+ConflictingFileIDs CreateConflictingFileIDsRemapper(FileIDSet base, FileIDSet left, FileIDSet right) {
+  ConflictingFileIDs ids = {{}, AllFileIDs(base, left, right)};
+  for (const auto& [file_id, object] : left) {
+    if (!base.Contains(file_id) && right.Contains(file_id)) ids.conflicting.insert(file_id);
+  }
+  return ids;
+}
+
+std::vector<RenumberedObject> RemapCollidingAddFileIDs(ConflictingFileIDs& ids, const YAMLMapping& left_root,
+                                                       YAMLMapping& right_root) {
+  std::vector<RenumberedObject> renumbered;
+  for (const YAMLScalar* file_id : ids.conflicting) {
+    // Of one class, the two are taken for the same object and merged into one.
+    if (ClassName(left_root, file_id) == ClassName(right_root, file_id)) continue;
+    renumbered.push_back({file_id, FindFree(file_id, ids.all)});
+    ids.all.Insert(renumbered.back().new_id);
+  }
+  if (!renumbered.empty()) Renumber(renumbered, right_root);
   return renumbered;
 }
 

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <array>
 #include <set>
+#include <unordered_set>
 #include <vector>
 
 #include "yaml/yaml_mapping.h"
@@ -9,7 +11,45 @@ namespace vexel_yaml {
 
 /// Orders file IDs by their texts, byte by byte: "10" comes before "9".
 using FileIDCompare = ScalarTextLess;
-using FileIDSet = std::set<const YAMLScalar*, FileIDCompare>;
+
+/// The file IDs of one file's objects.
+///
+/// They are the keys of the file's root, which finds one in constant time, so nothing is copied. Three ordered
+/// sets and their differences took 20 ms of processor time for scenes of 30,000 objects whose file IDs ascend,
+/// and 90 ms where they don't, to find that nothing collides; the order is made for those that do.
+class FileIDSet {
+ public:
+  /// `root` must outlive the set.
+  explicit FileIDSet(const YAMLMapping& root) : root_(&root) {}
+
+  bool Contains(const YAMLScalar* file_id) const { return root_->HasKey(file_id); }
+
+  /// In file order.
+  auto begin() const { return root_->begin(); }
+  auto end() const { return root_->end(); }
+
+ private:
+  const YAMLMapping* root_;
+};
+
+/// The file IDs that are in use in any of three files, or have been given out since.
+class AllFileIDs {
+ public:
+  AllFileIDs(FileIDSet base, FileIDSet left, FileIDSet right) : files_{base, left, right} {}
+
+  bool Contains(const YAMLScalar* file_id) const;
+  void Insert(const YAMLScalar* file_id) { given_out_.insert(file_id); }
+
+ private:
+  std::array<FileIDSet, 3> files_;
+  std::unordered_set<const YAMLScalar*> given_out_;
+};
+
+struct ConflictingFileIDs {
+  /// Those of objects that both sides added.
+  std::set<const YAMLScalar*, FileIDCompare> conflicting;
+  AllFileIDs all;
+};
 
 /// An object that got another file ID.
 struct RenumberedObject {
@@ -17,13 +57,17 @@ struct RenumberedObject {
   const YAMLScalar* new_id;
 };
 
-/// The file IDs of objects that both sides added to base.
-FileIDSet FindCollidingAdditions(const YAMLMapping& base, const YAMLMapping& left, const YAMLMapping& right);
+/// Makes the file at `root` comparable: the transitions of its state machines become lists. Returns the file
+/// IDs of its objects. Throws what TransitionsToSequences throws.
+FileIDSet PreProcess(YAMLMapping& root);
 
-/// Gives every colliding object of `right` that is of another class than left's a file ID of its own, and
-/// rewrites the references to it within the file. Hashes of edited objects are rebuilt. Returns these
-/// objects. Throws YAMLError "Cannot create new fileID for conflicting fileID: " + ID.
-std::vector<RenumberedObject> RemapCollidingAddFileIDs(const FileIDSet& conflicting, const YAMLMapping& base,
-                                                       const YAMLMapping& left, YAMLMapping& right);
+ConflictingFileIDs CreateConflictingFileIDsRemapper(FileIDSet base, FileIDSet left, FileIDSet right);
+
+/// Gives every conflicting object of `right_root` that is of another class than left's a file ID of its own,
+/// which is in `ids.all` afterwards, and rewrites the references to it within the file. Hashes of edited
+/// objects are rebuilt. Returns these objects. Throws YAMLError "Cannot create new fileID for conflicting
+/// fileID: " + ID.
+std::vector<RenumberedObject> RemapCollidingAddFileIDs(ConflictingFileIDs& ids, const YAMLMapping& left_root,
+                                                       YAMLMapping& right_root);
 
 }  // namespace vexel_yaml

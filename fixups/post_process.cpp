@@ -11,8 +11,10 @@ namespace vexel_yaml {
 
 void PostProcessMergeOnly(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right,
                           ConflictResolver& resolver) {
-  RepairOrphanedPrefabTransforms(merged, left, right);
-  TransformParents parents = RepairTransformParents(merged, left, right);
+  const FileIDMap in_left = CollectFileIDMap(left);
+  const FileIDMap in_right = CollectFileIDMap(right);
+  RepairOrphanedPrefabTransforms(merged, in_left, in_right);
+  TransformParents parents = RepairTransformParents(merged, in_left, in_right);
   BreakTransformCycles(merged, parents, resolver);
   ClearDanglingPrefabReferences(merged);
   TransitionsToMappings(merged);

@@ -16,7 +16,7 @@ void RemoveObjects(YAMLMapping& root, const std::vector<const YAMLScalar*>& file
 // Walks a file and sanitizes its prefab-internal references.
 class PostProcessVisitor final : public YAMLNodeVisitor {
  public:
-  explicit PostProcessVisitor(const YAMLMapping& root) : root_(root) {}
+  explicit PostProcessVisitor(const FileIDMap& objects) : objects_(objects) {}
 
   void Visit(const YAMLScalar& /*scalar*/) override {}
 
@@ -50,12 +50,12 @@ class PostProcessVisitor final : public YAMLNodeVisitor {
   }
 
   void SanitizePrefabInteralReferences(YAMLMapping& reference, const YAMLScalar* file_id) {
-    if (IsNullReference(file_id) || root_.HasKey(file_id)) return;
+    if (IsNullReference(file_id) || objects_.Contains(file_id)) return;
     reference.Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
     cleared_ = true;
   }
 
-  const YAMLMapping& root_;
+  const FileIDMap objects_;
   // The key under which the node being visited stands.
   const YAMLScalar* key_ = nullptr;
   bool cleared_ = false;
@@ -63,16 +63,17 @@ class PostProcessVisitor final : public YAMLNodeVisitor {
 
 }  // namespace
 
-void RepairOrphanedPrefabTransforms(YAMLMapping& merged, const YAMLMapping& left, const YAMLMapping& right) {
+void RepairOrphanedPrefabTransforms(YAMLMapping& merged, const FileIDMap& left, const FileIDMap& right) {
+  const FileIDMap objects = CollectFileIDMap(merged);
   std::vector<const YAMLScalar*> orphans;
   for (const auto& [file_id, value] : merged) {
     YAMLMapping* body = value->AsMapping() == nullptr ? nullptr : GetTransformBody(*value->AsMapping());
     if (body == nullptr) continue;
     const YAMLScalar* prefab = GetMappingPath(*body, YAMLScalar::mPrefabInternal, YAMLScalar::fileID);
-    if (IsNullReference(prefab) || merged.HasKey(prefab)) continue;
-    if (!left.HasKey(prefab) && !right.HasKey(prefab)) continue;
+    if (IsNullReference(prefab) || objects.Contains(prefab)) continue;
+    if (!left.Contains(prefab) && !right.Contains(prefab)) continue;
     const YAMLScalar* game_object = GetMappingPath(*body, YAMLScalar::mGameObject, YAMLScalar::fileID);
-    if (!IsNullReference(game_object) && merged.HasKey(game_object)) {
+    if (!IsNullReference(game_object) && objects.Contains(game_object)) {
       GetSubmapping(*body, YAMLScalar::mPrefabInternal)
           ->Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
     } else {
@@ -84,7 +85,7 @@ void RepairOrphanedPrefabTransforms(YAMLMapping& merged, const YAMLMapping& left
 
 void ClearDanglingPrefabReferences(YAMLMapping& merged) {
   std::vector<const YAMLScalar*> removed;
-  PostProcessVisitor visitor(merged);
+  PostProcessVisitor visitor(CollectFileIDMap(merged));
   for (const auto& [file_id, value] : merged) {
     visitor.VisitObject(*value);
     if (!visitor.TakeCleared()) continue;

@@ -1,5 +1,7 @@
 #include "fixups/state_machine_transitions.h"
 
+#include <vector>
+
 #include "fixups/engine_keys.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_error.h"
@@ -9,54 +11,101 @@ namespace vexel_yaml {
 
 namespace {
 
-// Calls `convert` with the body of every state machine and its object's document.
-template <typename Convert>
-void ForEachStateMachine(YAMLMapping& root, Convert convert) {
-  for (const auto& [file_id, value] : root) {
-    YAMLMapping* object = value->AsMapping();
-    if (object == nullptr) continue;
-    if (YAMLMapping* body = GetSubmapping(*object, AnimatorStateMachineKey())) convert(*object, *body);
-  }
-}
+// Walks down to the bodies of state machines, which stand right below their objects, and to nothing else.
+class StateMachineVisitor : public YAMLNodeVisitor {
+ public:
+  void Visit(const YAMLScalar& /*scalar*/) override {}
+  void Visit(YAMLSequence& /*sequence*/) override {}
 
-YAMLMapping* ToMapping(YAMLSequence& transitions) {
-  // Merging has edited the elements; a stale hash could make two different pairs look equal.
-  transitions.RebuildHash(false);
-  auto* mapping = YAMLAlloc<YAMLMapping>::create(transitions.IsFlow());
-  for (const YAMLNode* item : transitions.GetItems()) {
-    if (item == nullptr) continue;
-    const YAMLMapping* pair = item->AsMapping();
-    if (pair == nullptr || pair->Size() != 1) {
-      throw YAMLError("Expected size of one for key: " + StateMachineTransitionsKey()->GetText());
+  void Visit(YAMLMapping& mapping) override {
+    switch (path_.size()) {
+      case 0:
+        for (const auto& [file_id, object] : mapping) VisitObject(file_id, *object);
+        return;
+      case 1:
+        if (YAMLMapping* body = GetSubmapping(mapping, AnimatorStateMachineKey())) {
+          VisitAt(AnimatorStateMachineKey(), *body);
+        }
+        return;
+      default:
+        Convert(mapping);
     }
-    mapping->Append(pair->FirstKey(), pair->First()->Clone());
   }
-  return mapping;
-}
 
-}  // namespace
+ protected:
+  ~StateMachineVisitor() = default;
 
-void TransitionsToSequences(YAMLMapping& root) {
-  const YAMLScalar* key = StateMachineTransitionsKey();
-  ForEachStateMachine(root, [&](YAMLMapping& object, YAMLMapping& body) {
-    const YAMLNode* value = body.Get(key);
+  virtual void VisitObject(const YAMLScalar* file_id, YAMLNode& object) { VisitAt(file_id, object); }
+  virtual void Convert(YAMLMapping& state_machine) = 0;
+
+  void VisitAt(const YAMLScalar* key, YAMLNode& value) {
+    path_.push_back(key);
+    value.Accept(*this);
+    path_.pop_back();
+  }
+
+ private:
+  std::vector<const YAMLScalar*> path_;
+};
+
+class PreProcessInvalidMappingsVisitor final : public StateMachineVisitor {
+ private:
+  void VisitObject(const YAMLScalar* file_id, YAMLNode& object) override {
+    changed_ = false;
+    VisitAt(file_id, object);
+    if (changed_) object.RebuildHash(false);
+  }
+
+  void Convert(YAMLMapping& state_machine) override {
+    const YAMLScalar* key = StateMachineTransitionsKey();
+    const YAMLNode* value = state_machine.Get(key);
     const YAMLMapping* transitions = value == nullptr ? nullptr : value->AsMapping();
     if (transitions == nullptr) throw YAMLError("Expected key to point to yaml mapping: " + key->GetText());
-    body.Change(key, transitions->ToSequence())->Free();
-    object.RebuildHash(false);
-  });
-}
+    state_machine.Change(key, transitions->ToSequence())->Free();
+    changed_ = true;
+  }
 
-void TransitionsToMappings(YAMLMapping& root) {
-  const YAMLScalar* key = StateMachineTransitionsKey();
-  ForEachStateMachine(root, [&](YAMLMapping& /*object*/, YAMLMapping& body) {
-    YAMLNode* value = body.Get(key);
+  bool changed_ = false;
+};
+
+class PostProcessInvalidMappingsVisitor final : public StateMachineVisitor {
+ private:
+  void Convert(YAMLMapping& state_machine) override {
+    const YAMLScalar* key = StateMachineTransitionsKey();
+    YAMLNode* value = state_machine.Get(key);
     // Stripping may have left nothing of them.
     if (value == nullptr) return;
     YAMLSequence* transitions = value->AsSequence();
     if (transitions == nullptr) throw YAMLError("Expected key to point to yaml sequence: " + key->GetText());
-    body.Change(key, ToMapping(*transitions))->Free();
-  });
+    state_machine.Change(key, ToMapping(*transitions))->Free();
+  }
+
+  static YAMLMapping* ToMapping(YAMLSequence& transitions) {
+    // Merging has edited the elements; a stale hash could make two different pairs look equal.
+    transitions.RebuildHash(false);
+    auto* mapping = YAMLAlloc<YAMLMapping>::create(transitions.IsFlow());
+    for (const YAMLNode* item : transitions.GetItems()) {
+      if (item == nullptr) continue;
+      const YAMLMapping* pair = item->AsMapping();
+      if (pair == nullptr || pair->Size() != 1) {
+        throw YAMLError("Expected size of one for key: " + StateMachineTransitionsKey()->GetText());
+      }
+      mapping->Append(pair->FirstKey(), pair->First()->Clone());
+    }
+    return mapping;
+  }
+};
+
+}  // namespace
+
+void TransitionsToSequences(YAMLMapping& root) {
+  PreProcessInvalidMappingsVisitor visitor;
+  root.Accept(visitor);
+}
+
+void TransitionsToMappings(YAMLMapping& root) {
+  PostProcessInvalidMappingsVisitor visitor;
+  root.Accept(visitor);
 }
 
 }  // namespace vexel_yaml

@@ -1,7 +1,6 @@
 #include "fixups/three_way_merge.h"
 
 #include "fixups/duplicate_keys.h"
-#include "fixups/state_machine_transitions.h"
 #include "yaml/read_files.h"
 
 namespace vexel_yaml {
@@ -17,8 +16,11 @@ void ReadMergeDocuments(const std::string& base_path, const std::string& left_pa
 }
 
 std::vector<RenumberedObject> PrepareForDiff(VexelObjects& base, VexelObjects& left, VexelObjects& right) {
-  for (VexelObjects* objects : {&base, &left, &right}) TransitionsToSequences(*objects);
-  return RemapCollidingAddFileIDs(FindCollidingAdditions(base, left, right), base, left, right);
+  const FileIDSet in_base = PreProcess(base);
+  const FileIDSet in_left = PreProcess(left);
+  const FileIDSet in_right = PreProcess(right);
+  ConflictingFileIDs ids = CreateConflictingFileIDsRemapper(in_base, in_left, in_right);
+  return RemapCollidingAddFileIDs(ids, left, right);
 }
 
 std::unique_ptr<VexelObjects> MergeIntoCopy(const VexelObjects& base, const DiffPair& diffs,

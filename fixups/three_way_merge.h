@@ -27,7 +27,7 @@ void ReadMergeDocuments(const std::string& base_path, const std::string& left_pa
 
 /// Makes three versions comparable: lists that stand as mappings with repeated keys become lists, and objects
 /// of different classes that both sides added under one file ID get different ones; those renumbered on the
-/// right are returned. Throws what TransitionsToSequences and RemapCollidingAddFileIDs throw.
+/// right are returned. Throws what PreProcess and RemapCollidingAddFileIDs throw.
 std::vector<RenumberedObject> PrepareForDiff(VexelObjects& base, VexelObjects& left, VexelObjects& right);
 
 /// Merges both diffs into a copy of base, which still needs the post-processing. Throws what merging and

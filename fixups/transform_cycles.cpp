@@ -24,13 +24,13 @@ bool IsInCycle(const TransformParents& parents, const YAMLScalar* transform) {
   return true;
 }
 
-void Break(YAMLMapping& merged, TransformParents& parents, ConflictResolver& resolver,
+void Break(const FileIDMap& objects, TransformParents& parents, ConflictResolver& resolver,
            const YAMLScalar* transform) {
-  const YAMLNode* object = merged.Get(transform);
-  if (object == nullptr || object->AsMapping() == nullptr) {
+  const YAMLMapping* object = objects.Find(transform);
+  if (object == nullptr) {
     throw std::runtime_error("Cannot find transform mapping from fileID while breaking cycle.");
   }
-  resolver.OnTransformCycleDetected(transform, object->AsMapping(), transform);
+  resolver.OnTransformCycleDetected(transform, object, transform);
   parents.Detach(transform);
 }
 
@@ -76,17 +76,18 @@ class CycleSearch {
 }  // namespace
 
 void BreakTransformCycles(YAMLMapping& merged, TransformParents& parents, ConflictResolver& resolver) {
+  const FileIDMap objects = CollectFileIDMap(merged);
   for (const YAMLScalar* transform : resolver.GetMergedTransforms()) {
-    if (!merged.HasKey(transform)) {
+    if (!objects.Contains(transform)) {
       throw std::runtime_error("Cannot find transform mapping from fileID while looking for cycles.");
     }
-    if (IsInCycle(parents, transform)) Break(merged, parents, resolver, transform);
+    if (IsInCycle(parents, transform)) Break(objects, parents, resolver, transform);
   }
   CycleSearch search(parents);
   for (const auto& [file_id, object] : merged) {
     if (parents.GetParent(file_id) == nullptr || !search.IsInCycle(file_id)) continue;
     search.MarkBroken(file_id);
-    Break(merged, parents, resolver, file_id);
+    Break(objects, parents, resolver, file_id);
   }
 }
 

@@ -53,8 +53,7 @@ const YAMLScalar* FileIDOf(const YAMLMapping* reference) {
 
 }  // namespace
 
-TransformParents RepairTransformParents(YAMLMapping& merged, const YAMLMapping& left,
-                                        const YAMLMapping& right) {
+TransformParents RepairTransformParents(YAMLMapping& merged, const FileIDMap& left, const FileIDMap& right) {
   TransformParents parents;
   for (const auto& [transform, value] : merged) {
     YAMLMapping* body = value->AsMapping() == nullptr ? nullptr : GetTransformBody(*value->AsMapping());
@@ -70,7 +69,7 @@ TransformParents RepairTransformParents(YAMLMapping& merged, const YAMLMapping& 
     }
     const YAMLScalar* parent = FileIDOf(reference);
     if (parent == nullptr) continue;
-    if (has_father && !merged.HasKey(parent) && (left.HasKey(parent) || right.HasKey(parent))) {
+    if (has_father && !merged.HasKey(parent) && (left.Contains(parent) || right.Contains(parent))) {
       reference->Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
     }
     // The parent as read, even where it has just been cleared: whoever walks up from here meets the gap.

@@ -3,7 +3,7 @@
 #include <unordered_map>
 #include <unordered_set>
 
-#include "yaml/yaml_mapping.h"
+#include "fixups/file_id_map.h"
 
 namespace vexel_yaml {
 
@@ -32,7 +32,6 @@ class TransformParents {
 
 /// Sets the parents that the merge removed to "0" and collects the parent links as they were before. Throws
 /// YAMLError "Could not determine the transform parent of " + ID.
-TransformParents RepairTransformParents(YAMLMapping& merged, const YAMLMapping& left,
-                                        const YAMLMapping& right);
+TransformParents RepairTransformParents(YAMLMapping& merged, const FileIDMap& left, const FileIDMap& right);
 
 }  // namespace vexel_yaml

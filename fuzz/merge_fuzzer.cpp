@@ -7,7 +7,6 @@
 #include "fixups/duplicate_keys.h"
 #include "fixups/file_id_collisions.h"
 #include "fixups/post_process.h"
-#include "fixups/state_machine_transitions.h"
 #include "merge/recording_conflict_resolver.h"
 #include "yaml/read_yaml.h"
 #include "yaml/yaml_error.h"
@@ -29,10 +28,11 @@ void Merge(std::string input) {
   for (VexelObjects& version : versions) {
     ParseYAMLString(TakeVersion(input), version, &cache);
     RefuseDuplicateKeys(version, "input");
-    TransitionsToSequences(version);
   }
   auto& [base, left, right] = versions;
-  RemapCollidingAddFileIDs(FindCollidingAdditions(base, left, right), base, left, right);
+  ConflictingFileIDs ids =
+      CreateConflictingFileIDsRemapper(PreProcess(base), PreProcess(left), PreProcess(right));
+  RemapCollidingAddFileIDs(ids, left, right);
   RecordingConflictResolver resolver(MergeResolve::kBase);
   const YAMLMappingDiff* merged = YAMLMappingDiff::Merge(*YAMLMappingDiff::Diff(base, left),
                                                          *YAMLMappingDiff::Diff(base, right), resolver);

@@ -36,7 +36,9 @@ std::string Renumbered(const std::string& base_text, const std::string& left_tex
                        const std::string& right_text) {
   const auto base = ObjectsFromText(base_text), left = ObjectsFromText(left_text);
   const auto right = ObjectsFromText(right_text);
-  RemapCollidingAddFileIDs(FindCollidingAdditions(*base, *left, *right), *base, *left, *right);
+  ConflictingFileIDs ids =
+      CreateConflictingFileIDsRemapper(PreProcess(*base), PreProcess(*left), PreProcess(*right));
+  RemapCollidingAddFileIDs(ids, *left, *right);
   const std::string text = Written(*right);
   EXPECT_EQ(right->GetHash(), ObjectsFromText(text)->GetHash());
   return text;
