@@ -4,11 +4,12 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "app/lost_edits.h"
 #include "diff/strip_unchanged.h"
 #include "diff/yaml_diff_output.h"
 #include "diff/yaml_mapping_diff.h"
+#include "diff/yaml_sequence_diff.h"
 #include "merge/recording_conflict_resolver.h"
-#include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
 
@@ -33,44 +34,50 @@ std::string Written(VexelObjects& scene) {
   return out.str().substr(std::min(out.str().find("---"), out.str().size()));
 }
 
-// What a node holds, without the order of keys, elements and objects.
-std::string Content(const YAMLNode* node) {
-  if (node == nullptr) return "";
-  if (const YAMLScalar* scalar = node->AsScalar()) return "'" + scalar->GetText() + "'";
-  std::vector<std::string> parts;
-  if (const YAMLMapping* mapping = node->AsMapping()) {
-    for (const auto& [key, value] : *mapping) parts.push_back(key->GetText() + ": " + Content(value));
-  } else {
-    for (const YAMLNode* item : node->AsSequence()->GetItems()) parts.push_back(Content(item));
-  }
-  std::ranges::sort(parts);
-  std::string text = node->AsMapping() != nullptr ? "{" : "[";
-  for (const std::string& part : parts) text += part + ",\n";
-  return text;
-}
-
 // A move survives only where the other side leaves the list, or the order of objects and fields, alone.
 // Styles don't count: a list that was empty keeps its brackets.
 bool AreSame(const VexelObjects& a, const VexelObjects& b, bool moved) {
   return moved ? Content(&a) == Content(&b) : a.HasSameContent(b);
 }
 
-// Whether both sides edited a list whose elements only one of them tells apart. Additions to it are paired
-// when that one is left.
-bool IsPairedOnOneSide(const Operation* left, const Operation* right) {
+// Whether some place in which both sides did something to a list is as `judge` says, given left's and right's
+// edit and the list's path.
+template <typename Judge>
+bool AnyListOfBoth(FieldPath& path, const Operation* left, const Operation* right, const Judge& judge) {
   if (left == nullptr || right == nullptr || left->GetKind() != right->GetKind()) return false;
   if (left->GetKind() == Operation::Kind::kChangeMapping) {
     const YAMLMappingDiff* other = static_cast<const ChangeMappingOperation*>(right)->GetDiff();
     return std::ranges::any_of(
-        static_cast<const ChangeMappingOperation*>(left)->GetDiff()->GetEntries(),
-        [&](const auto& entry) { return IsPairedOnOneSide(entry.operation, other->Get(entry.key)); });
+        static_cast<const ChangeMappingOperation*>(left)->GetDiff()->GetEntries(), [&](const auto& entry) {
+          path.push_back(entry.key);
+          const bool found = AnyListOfBoth(path, entry.operation, other->Get(entry.key), judge);
+          path.pop_back();
+          return found;
+        });
   }
-  if (left->GetKind() != Operation::Kind::kChangeSequence) return false;
-  const auto is_set = [](const Operation* operation) {
-    const auto* remapper = static_cast<const ChangeSequenceOperation*>(operation)->GetRemapper();
-    return remapper != nullptr && remapper->IsSetRemapper();
-  };
-  return is_set(left) != is_set(right);
+  return left->GetKind() == Operation::Kind::kChangeSequence &&
+         judge(static_cast<const ChangeSequenceOperation&>(*left),
+               static_cast<const ChangeSequenceOperation&>(*right), path);
+}
+
+bool IsSet(const ChangeSequenceOperation& edit) {
+  return edit.GetRemapper() != nullptr && edit.GetRemapper()->IsSetRemapper();
+}
+
+// Additions are paired where left's elements have keys; of two edits that count as equal left's is taken.
+bool DependsOnSide(const ChangeSequenceOperation& left, const ChangeSequenceOperation& right,
+                   const FieldPath& /*path*/) {
+  return IsSet(left) != IsSet(right) || OperationEquals(left, right);
+}
+
+// What both add to a list without keys is there twice, unless the list is left to the default keys.
+bool AddsTwice(const ChangeSequenceOperation& left, const ChangeSequenceOperation& /*right*/,
+               const FieldPath& path) {
+  const bool adds = std::ranges::any_of(left.GetDiff()->GetEntries(), [](const auto& entry) {
+    return entry.second->GetKind() == Operation::Kind::kAdd;
+  });
+  return adds && !IsSet(left) &&
+         YAMLSequenceRemapper::ChooseKeyPaths(path) != YAMLSequenceRemapper::defaultPath;
 }
 
 struct Merged {
@@ -80,44 +87,9 @@ struct Merged {
     YAMLMappingDiff::Merge(*left_diff, *YAMLMappingDiff::Diff(base, right), resolver)->Apply(*scene);
   }
 
-  // Whether a conflict is recorded at the path or above it.
-  bool IsPendingAt(const FieldPath& path) const {
-    return std::ranges::any_of(resolver.GetRecords(), [&](const auto& record) {
-      return record.resolution == MergeResolve::kConflict && record.path.size() <= path.size() &&
-             std::equal(record.path.begin(), record.path.end(), path.begin());
-    });
-  }
-
   RecordingConflictResolver resolver{MergeResolve::kBase};
   std::unique_ptr<VexelObjects> scene;
 };
-
-const YAMLNode* Child(const YAMLNode* node, const YAMLScalar* key) {
-  return node == nullptr || node->AsMapping() == nullptr ? nullptr : node->AsMapping()->Get(key);
-}
-
-// Whether at some place below `path` only `side` differs from base, but the merged scene differs from `side`,
-// without a conflict. Lists that both sides edited are not looked into.
-bool IsAnythingLost(FieldPath& path, const YAMLNode* base, const YAMLNode* side, const YAMLNode* other,
-                    const YAMLNode* found, const Merged& merged) {
-  if (base == other || (base != nullptr && other != nullptr && base->HasSameContent(*other))) {
-    return Content(side) != Content(found) && !merged.IsPendingAt(path);
-  }
-  if (side == nullptr || side->AsMapping() == nullptr || other == nullptr || other->AsMapping() == nullptr) {
-    return false;
-  }
-  for (const YAMLNode* holder : {side, base}) {
-    if (holder == nullptr || holder->AsMapping() == nullptr) continue;
-    for (const auto& [key, value] : *holder->AsMapping()) {
-      path.push_back(key);
-      const bool lost = IsAnythingLost(path, Child(base, key), Child(side, key), Child(other, key),
-                                       Child(found, key), merged);
-      path.pop_back();
-      if (lost) return true;
-    }
-  }
-  return false;
-}
 
 std::string DiffText(const VexelObjects& from, const VexelObjects& to) {
   std::ostringstream out;
@@ -174,7 +146,9 @@ void Laws::CheckSide(const SceneTriple& triple, VexelObjects& side) {
   };
   expect_side(kUnchangedRight, Merged(*triple.base, side, *triple.base));
   expect_side(kUnchangedLeft, Merged(*triple.base, *triple.base, side));
-  expect_side(kEqualSides, Merged(*triple.base, side, side));
+  FieldPath path;
+  const Operation* edit = CreateDiffOperation(path, triple.base.get(), &side);
+  if (!AnyListOfBoth(path, edit, edit, AddsTwice)) expect_side(kEqualSides, Merged(*triple.base, side, side));
 
   // An order of keys is no change in the text, an order of elements is.
   const bool is_silent = DiffText(*triple.base, side).empty();
@@ -194,17 +168,16 @@ void Laws::CheckBothSides(const SceneTriple& triple) {
          read->GetHash() == merged.scene->GetHash() && Content(read.get()) == Content(merged.scene.get()),
          triple);
 
-  FieldPath path;
-  const YAMLNode* base = triple.base.get();
-  const YAMLNode* left = triple.left.get();
-  const YAMLNode* right = triple.right.get();
   Expect(kNothingLost,
-         !IsAnythingLost(path, base, left, right, merged.scene.get(), merged) &&
-             !IsAnythingLost(path, base, right, left, merged.scene.get(), merged),
+         !IsAnythingLost(*triple.base, *triple.left, *triple.right, *merged.scene, merged.resolver) &&
+             !IsAnythingLost(*triple.base, *triple.right, *triple.left, *merged.scene, merged.resolver),
          triple);
+  FieldPath path;
+  const Operation* left = CreateDiffOperation(path, triple.base.get(), triple.left.get());
+  const Operation* right = CreateDiffOperation(path, triple.base.get(), triple.right.get());
   // A removal on the right wins over an edit on the left, but the other way round they are a conflict.
   if (merged.resolver.HasPendingConflicts() || swapped.resolver.HasPendingConflicts() ||
-      IsPairedOnOneSide(CreateDiffOperation(path, base, left), CreateDiffOperation(path, base, right))) {
+      AnyListOfBoth(path, left, right, DependsOnSide)) {
     return;
   }
   Expect(kSwapped, Content(merged.scene.get()) == Content(swapped.scene.get()), triple);
