@@ -1,10 +1,15 @@
 #include "app/command_line.h"
 
 #include <algorithm>
+#include <array>
+#include <cctype>
+#include <numeric>
 #include <span>
+#include <utility>
 
 #include "app/usage.h"
 #include "platform/error_channel.h"
+#include "platform/files.h"
 
 namespace vexel_yaml {
 
@@ -42,6 +47,31 @@ bool TakeOptions(const CommandLineArguments& arguments, size_t& index, std::span
     option->target = arguments[index];
   }
   return true;
+}
+
+// The options that `merge` takes, for whoever mistypes one.
+constexpr std::array kMergeOptions = {
+    kOptionUseLeft,         kOptionUseRight, kOptionUsePremerge, kOptionHeadless, kOptionUseMergeFile,
+    kOptionUseConflictFile, kOptionRules,    kOptionTypeInfo,    kOptionFallback, kOptionDescribe,
+    kOptionForce,           kOptionTiming,   kOptionNoThreads};
+
+// How many characters have to be changed, added or left out to make one text of the other; case is for free.
+size_t EditDistance(std::string_view a, std::string_view b) {
+  const auto same = [](char x, char y) {
+    return std::tolower(static_cast<unsigned char>(x)) == std::tolower(static_cast<unsigned char>(y));
+  };
+  // distances[j]: from the part of `a` gone through so far to the first j characters of `b`.
+  std::vector<size_t> distances(b.size() + 1);
+  std::iota(distances.begin(), distances.end(), size_t{0});
+  for (size_t i = 0; i < a.size(); ++i) {
+    size_t diagonal = std::exchange(distances[0], i + 1);
+    for (size_t j = 0; j < b.size(); ++j) {
+      const size_t replaced = diagonal + (same(a[i], b[j]) ? 0 : 1);
+      diagonal = distances[j + 1];
+      distances[j + 1] = std::min({replaced, diagonal + 1, distances[j] + 1});
+    }
+  }
+  return distances[b.size()];
 }
 
 bool IsSideOption(std::string_view argument) {
@@ -129,6 +159,19 @@ bool ParseMergeArgs(const CommandLineArguments& arguments, int first, MergeConfi
                                 &config.premerge_base_destination,
                                 &config.premerge_right_destination};
   TakePaths(arguments, index, paths);
+  return true;
+}
+
+bool ReportMistypedOption(const MergeConfig& config) {
+  const std::string& given = config.base_path;
+  if (!given.starts_with('-') || FileExists(given)) return false;
+  const auto distance = [&](std::string_view option) { return EditDistance(given, option); };
+  const std::string_view meant = std::ranges::min(kMergeOptions, {}, distance);
+  errs << "Error: '" << given << "' is no file and no option of merge";
+  // Of other words no option is nearer than the rest.
+  if (distance(meant) * 2 < given.size()) errs << "; did you mean " << meant << "?";
+  errs << '\n';
+  ErrMsg(errs);
   return true;
 }
 

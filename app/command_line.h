@@ -81,6 +81,11 @@ bool ParseStripArgs(const CommandLineArguments& arguments, int first, StripConfi
 bool ParseDiffArgs(const CommandLineArguments& arguments, int first, DiffConfig& config);
 bool ParseMergeArgs(const CommandLineArguments& arguments, int first, MergeConfig& config);
 
+/// Whether the base path is rather a mistyped option, which has been reported: it begins with "-" and names
+/// no file. Such a word becomes the base path and shifts the others, so that a tool would be told to write
+/// its result over an input.
+bool ReportMistypedOption(const MergeConfig& config);
+
 /// Whether Subversion called: it passes base, theirs, mine, destination and the path in the working copy,
 /// without a command.
 bool IsSubversionCall(const CommandLineArguments& arguments);

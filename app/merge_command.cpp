@@ -8,6 +8,7 @@
 #include <string_view>
 #include <system_error>
 
+#include "app/command_line.h"
 #include "app/fallback_tools.h"
 #include "app/merge_pipeline.h"
 #include "platform/error_channel.h"
@@ -93,6 +94,7 @@ int MergeWithTool(const MergeConfig& config, const std::string& extension, const
   if (config.fallback_spec_file == kNoSpecFile) {
     return Report("Don't know how to merge " + extension + " files. Consider specifying a specFile argument");
   }
+  if (ReportMistypedOption(config)) return 1;
   const int tool_result = FallbackMergeTool(config.base_path, config.left_path, config.right_path, merged,
                                             config.fallback_spec_file);
   const bool may_be_empty = IsFileEmpty(config.left_path) || IsFileEmpty(config.right_path);
