@@ -9,6 +9,14 @@ _vexel_offer() {
   done
 }
 
+# _vexel_offer_quoted CANDIDATE...: the same for what strangers have named, which must not become a command.
+_vexel_offer_quoted() {
+  local candidate
+  for candidate in "$@"; do
+    [[ "$candidate" != "$cur"* ]] || COMPREPLY+=("$(printf '%q' "$candidate")")
+  done
+}
+
 # _vexel_files [EXTENSION...]: files with one of the extensions, or any, and folders.
 _vexel_files() {
   local file extension
@@ -123,7 +131,7 @@ _vexel_merge_git() {
         [[ ! -f "$word.vexel-conflicts" ]] ||
           mapfile -t -O "${#items[@]}" items < <(sed -n 's/^Left  \([^ ]*\).*/\1/p' "$word.vexel-conflicts")
       done < <(_vexel_unmerged)
-      _vexel_offer "${items[@]}"
+      _vexel_offer_quoted "${items[@]}"
       ;;
     "resolve "*)
       if [[ "$cur" == -* && " ${COMP_WORDS[*]:0:COMP_CWORD} " != *" -- "* ]]; then
@@ -142,7 +150,7 @@ _vexel_merge_git() {
         _vexel_offer -o --
       else
         mapfile -t items < <(git for-each-ref --format='%(refname:short)' refs/heads refs/tags refs/remotes 2>/dev/null)
-        _vexel_offer HEAD "${items[@]}"
+        _vexel_offer_quoted HEAD "${items[@]}"
       fi
       ;;
   esac

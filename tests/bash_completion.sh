@@ -23,15 +23,20 @@ mkdir Assets Code && touch "Assets/Main Scene.vexel" Assets/Other.prefab Assets/
 git add Assets/Other.prefab
 blob="$(git hash-object -w --stdin </dev/null)"
 printf "100644 $blob %d\tAssets/Main Scene.vexel\n" 1 2 3 | git update-index --index-info
-printf 'Left  11.Light.m_Range change to 4\nRight 11.Light.m_Range delete\n' >"Assets/Main Scene.vexel.vexel-conflicts"
+printf 'Left  %s change to 4\nRight 11.Light.m_Range delete\n' 11.Light.m_Range '12.$(touch${IFS}$HOME/called)' \
+  >"Assets/Main Scene.vexel.vexel-conflicts"
+git tag 'first;touch${IFS}$HOME/called' "$blob"
 
 printf '%b\n' "source $completions/VexelYAMLMerge.bash" 'vexel-merge-git res\t\t' \
+  'vexel-merge-git resolve --path 12\t' 'vexel-merge-git report fir\t' \
   'vexel-merge-git resolve --le\t--pa\t11\tAssets/Main\\ S\t' 'vexel-merge-git enable --pat\t\t' \
   'VexelYAMLMerge me\t--fallb\tno\t--nothr\tAssets/O\t"Assets/Mai\t' 'cd Code' \
   'vexel-merge-git resolve -- \t' 'vexel-merge-report --conf\t../Assets/O\t' exit |
   python3 -c 'import pty; pty.spawn(["bash", "--norc", "--noprofile", "-i"])' >"$work/terminal" 2>&1
 diff - "$work/calls" <<'CALLS' || { cat "$work/terminal" >&2; exit 1; }
 vexel-merge-git<resolve><Assets/Main Scene.vexel>
+vexel-merge-git<resolve><--path><12.$(touch${IFS}$HOME/called)>
+vexel-merge-git<report><first;touch${IFS}$HOME/called>
 vexel-merge-git<resolve><--left><--path><11.Light.m_Range><Assets/Main Scene.vexel>
 vexel-merge-git<enable><--patterns><*.vexel *.prefab *.meta>
 VexelYAMLMerge<merge><--fallback><none><--nothreads><Assets/Other.prefab><Assets/Main Scene.vexel>
