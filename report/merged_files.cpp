@@ -3,12 +3,16 @@
 #include "fixups/post_process.h"
 #include "fixups/state_machine_transitions.h"
 #include "merge/conflict_record_file.h"
+#include "platform/hinted_error.h"
 #include "rules/setup.h"
-#include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 
 namespace {
+
+std::string WithHint(const std::string& message, const std::string& hint) {
+  return hint.empty() ? message : message + " (" + hint + ")";
+}
 
 void Merge(MergedFiles& files, TimerStat& timer) {
   auto merged = MergeIntoCopy(files.read.base, files.diffs, files.resolver, timer);
@@ -38,10 +42,17 @@ void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   try {
     Merge(files, silent);
   } catch (const YAMLError& error) {
-    files.error = error.what();
+    files.error = Explained(error);
   } catch (const std::exception& error) {
-    files.error = error.what();
+    files.error = Explained(error);
   }
+}
+
+std::string Explained(const YAMLError& error) { return WithHint(error.what(), error.GetHint()); }
+
+std::string Explained(const std::exception& error) {
+  const auto* hinted = dynamic_cast<const HintedError*>(&error);
+  return WithHint(error.what(), hinted == nullptr ? "" : hinted->GetHint());
 }
 
 }  // namespace vexel_yaml

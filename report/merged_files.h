@@ -6,6 +6,7 @@
 
 #include "fixups/three_way_merge.h"
 #include "merge/recording_conflict_resolver.h"
+#include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 
@@ -36,5 +37,9 @@ struct MergedFiles {
 /// Merges the three files as the merge command does, conflicts to base. Throws what reading and diffing
 /// throw, and YAMLError where the resolutions can't be read.
 void MergeForReport(const ReportConfig& config, MergedFiles& files);
+
+/// What went wrong and, in brackets behind it, where: a report is for people.
+std::string Explained(const YAMLError& error);
+std::string Explained(const std::exception& error);
 
 }  // namespace vexel_yaml

@@ -164,9 +164,9 @@ int Report(const Arguments& arguments) {
   } catch (const FileError& error) {
     return Fail(error.what());
   } catch (const YAMLError& error) {
-    return Fail(prefix + error.what());
+    return Fail(prefix + Explained(error));
   } catch (const std::exception& error) {
-    return Fail(prefix + error.what());
+    return Fail(prefix + Explained(error));
   }
   return 0;
 }

@@ -153,6 +153,9 @@ printf '[exclusions]\nexclude *.Light\n' >"$work/rules" && cp "$work/rules" rule
 git checkout -q ":/^brighter"
 check "the repository's own rules count" refuses git merge -q --no-edit wider >/dev/null 2>&1
 check "and show in the page" grep -q 'data-kinds="[a-z ]*conflict' "$(vexel-merge-git report)"
+git merge --abort && echo exclude >rules.txt
+check "a mistake in them stops the merge" refuses git merge -q --no-edit wider >/dev/null 2>"$work/err"
+check "its file is named" grep -q "line 1 .*rules.txt" "$work/err"
 git merge --abort && git config --unset vexel.rules && rm rules.txt
 git config vexel.typeInfo "$work/none.yaml"
 check "a setting that can't be followed stops the merge" refuses git merge -q --no-edit wider >/dev/null 2>"$work/err"

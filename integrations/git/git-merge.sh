@@ -30,7 +30,7 @@ say_messages() {
       $0 = out $0
     }
     # Of a mistake in the record, whose line is named.
-    index(ENVIRON["OPTIONS"], " -i ") && / specified on line [0-9]+$/ {
+    index(ENVIRON["OPTIONS"], " -i ") && / specified on line [0-9]+/ {
       if (match($0, /^.*Cannot merge file .*\047: /)) $0 = ENVIRON["RECORD"] ": " substr($0, RLENGTH + 1)
     }
     {
@@ -53,6 +53,12 @@ merge_into() (
   eval "set -- $options \"\$@\""
   "$program" merge -h --force --fallback none -o "$scratch/record" "$@" "$base" "$left" "$right" "$result" \
     2>"$scratch/messages" || status=$?
+  # The program's messages are for scripts. The reporter's also name the line and the object.
+  if [ "$status" -eq 1 ] &&
+    ! "$reporter" --conflicts "$@" "$base" "$left" "$right" >/dev/null 2>"$scratch/explained" &&
+    [ -s "$scratch/explained" ]; then
+    sed 's/^vexel-merge-report: //' "$scratch/explained" >"$scratch/messages"
+  fi
   say_messages "$base" "$left" "$right" "$@"
   return "$status"
 )
