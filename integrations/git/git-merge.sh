@@ -32,6 +32,8 @@ say_messages() {
     # Of a mistake in the record, whose line is named.
     index(ENVIRON["OPTIONS"], " -i ") && / specified on line [0-9]+/ {
       if (match($0, /^.*Cannot merge file .*\047: /)) $0 = ENVIRON["RECORD"] ": " substr($0, RLENGTH + 1)
+      # It is read from a copy.
+      sub(/ \(in merge resolve file .*$/, "")
     }
     {
       named("\047" ENVIRON["BASE"] "\047", "\047" ENVIRON["ASSET"] "\047")
