@@ -154,7 +154,12 @@ merge_driver() {
 
 # tell_conflicts BASE LEFT RIGHT: what the driver says and leaves of them. The merge goes on whatever fails here.
 tell_conflicts() {
-  list_conflicts "$@" || :
+  # A record without the lines to choose from would say that there is no conflict; resolve makes a whole one.
+  if ! list_conflicts "$@"; then
+    [ "$keeps_records" = false ] || remove_record "$asset"
+    complain "cannot list the conflicts in $asset; to settle: $(resolve_call "$asset")"
+    return 0
+  fi
   say_conflicts
   [ "$keeps_records" = true ] || return 0
   if leave_record "$asset" "$(hash_of "$asset" "$scratch/merged")"; then
