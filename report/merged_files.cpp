@@ -1,5 +1,7 @@
 #include "report/merged_files.h"
 
+#include <new>
+
 #include "fixups/post_process.h"
 #include "fixups/state_machine_transitions.h"
 #include "merge/conflict_record_file.h"
@@ -41,6 +43,8 @@ void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   // What both sides did is worth a look all the same where the merge fails.
   try {
     Merge(files, silent);
+  } catch (const std::bad_alloc&) {
+    throw;
   } catch (const YAMLError& error) {
     files.error = Explained(error);
   } catch (const std::exception& error) {

@@ -1,5 +1,6 @@
 #include "report/readable_headers.h"
 
+#include <new>
 #include <optional>
 
 #include "report/object_names.h"
@@ -37,7 +38,8 @@ std::string ReadableHeader(std::string_view line, const ObjectNames& names) {
 std::optional<std::string> WithReadableHeaders(const std::string& text) {
   try {
     VexelObjects objects;
-    if (!ParseYAMLString(text, objects)) return std::nullopt;
+    // The parser could not even start.
+    if (!ParseYAMLString(text, objects)) throw std::bad_alloc();
     const ObjectNames names({&objects});
     const AssetText asset(text);
     std::string result(asset.GetHeader());

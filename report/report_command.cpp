@@ -2,6 +2,7 @@
 
 #include <filesystem>
 #include <iostream>
+#include <new>
 #include <optional>
 
 #include "platform/error_channel.h"
@@ -161,6 +162,9 @@ int Report(const Arguments& arguments) {
     }
     if (!files.error.empty()) return Fail(prefix + files.error);
     PrintConflicts(files.resolver);
+  } catch (const std::bad_alloc&) {
+    // No matter of these files.
+    throw;
   } catch (const FileError& error) {
     return Fail(error.what());
   } catch (const YAMLError& error) {

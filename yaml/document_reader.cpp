@@ -3,6 +3,7 @@
 #include <yaml.h>
 
 #include <algorithm>
+#include <new>
 
 #include "yaml/convert_document.h"
 #include "yaml/document_limits.h"
@@ -67,6 +68,8 @@ class LoadedDocument {
 
  private:
   void Fail() {
+    // Its loader gives no reason where it could not copy a tag.
+    if (parser_.error == YAML_MEMORY_ERROR || parser_.error == YAML_NO_ERROR) throw std::bad_alloc();
     // A byte that is no text is found before lines are counted.
     problem_line_ =
         parser_.error == YAML_READER_ERROR

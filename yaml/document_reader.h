@@ -26,7 +26,8 @@ class DocumentReader {
   explicit DocumentReader(std::string_view header) : header_(header), chunk_(header) {}
 
   /// Reads one document. `last`: no other follows in the file. Returns false when libyaml can't start.
-  /// Throws YAMLError, for what libyaml or the limits on hostile input find with the 1-based line.
+  /// Throws std::bad_alloc, and YAMLError, for what libyaml or the limits on hostile input find with the
+  /// 1-based line.
   bool Read(const AssetText::Document& document, bool last, ReadObject& result);
 
  private:
