@@ -39,7 +39,7 @@ void Premerge(MergeResolve side, FileReplacement& file, VexelObjects& copy, cons
     PostProcessMergeOnly(copy, input.documents.left, input.documents.right, resolver);
   }
   TimerStat step(timer, "Output premerge result");
-  copy.Output(file.Stream());
+  copy.Output(file.Stream(), VexelObjects::Headers::kAsTheyAre);
   file.Finish();
 }
 

@@ -6,7 +6,6 @@ void YAMLNodeClearVisitor::Visit(const YAMLScalar& /*scalar*/) {}
 
 void YAMLNodeClearVisitor::Visit(YAMLMapping& mapping) {
   for (const auto& [key, value] : mapping) {
-    if (key->IsPseudoKey()) continue;
     if (value->AsScalar() != nullptr) {
       mapping.Change(key, YAMLScalar::empty->AsValue());
     } else {
@@ -36,9 +35,7 @@ void MergeTreeClearVisitor::Visit(ChangeMappingOperation* operation) { operation
 void MergeTreeClearVisitor::Visit(ChangeSequenceOperation* operation) { operation->GetDiff()->Accept(*this); }
 
 void MergeTreeClearVisitor::Visit(YAMLMappingDiff* diff) {
-  for (const YAMLMappingDiff::Entry& entry : diff->GetEntries()) {
-    if (!entry.key->IsPseudoKey()) ClearOperation(entry.operation);
-  }
+  for (const YAMLMappingDiff::Entry& entry : diff->GetEntries()) ClearOperation(entry.operation);
 }
 
 void MergeTreeClearVisitor::Visit(YAMLSequenceDiff* diff) {

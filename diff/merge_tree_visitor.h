@@ -50,8 +50,8 @@ class MergeTreeCloneVisitor final : public MergeTreeVisitor {
   YAMLSequenceDiff* sequence_diff_ = nullptr;
 };
 
-/// Empties every scalar value below a node; keys stay, and so do the values of pseudo keys, without which an
-/// object could not be written.
+/// Empties every scalar value below a node, those of pseudo keys too: a text merge tool is to see that both
+/// sides have another header. Keys stay.
 class YAMLNodeClearVisitor final : public YAMLNodeVisitor {
  public:
   void Visit(const YAMLScalar& scalar) override;
@@ -59,7 +59,7 @@ class YAMLNodeClearVisitor final : public YAMLNodeVisitor {
   void Visit(YAMLSequence& sequence) override;
 };
 
-/// Empties the values of a diff tree in place, which must be a clone. Key orders and pseudo keys stay.
+/// Empties the values of a diff tree in place, which must be a clone. Key orders stay.
 class MergeTreeClearVisitor final : public MergeTreeVisitor {
  public:
   using MergeTreeVisitor::Visit;

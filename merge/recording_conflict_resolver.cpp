@@ -131,7 +131,7 @@ const Operation* RecordingConflictResolver::ProvisionalResult(const Operation* l
     case MergeResolve::kRight:
       return right;
     case MergeResolve::kBlank:
-      return !GetPath().empty() && GetPath().back()->IsPseudoKey() ? blank_source : Blanked(blank_source);
+      return Blanked(blank_source);
     case MergeResolve::kBase:
     case MergeResolve::kAutomatic:
     case MergeResolve::kConflict:

@@ -17,13 +17,13 @@ std::string_view TextOf(const YAMLNode* value) {
 
 }  // namespace
 
-void VexelObjects::OutputObject(std::ostream& out, const Slot& slot) {
+void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) {
   YAMLMapping* object = slot.value->AsMapping();
   if (object == nullptr)
     throw YAMLError("Cannot write an object that is not a mapping: " + slot.key->GetText());
   // Its header line could not be read again.
-  if (TextOf(object->Get(YAMLScalar::fileIDPlaceHolderName)).empty() ||
-      TextOf(object->Get(YAMLScalar::classIDPlaceHolderName)).empty()) {
+  if (headers == Headers::kComplete && (TextOf(object->Get(YAMLScalar::fileIDPlaceHolderName)).empty() ||
+                                        TextOf(object->Get(YAMLScalar::classIDPlaceHolderName)).empty())) {
     throw YAMLError("Cannot write an object without class ID or file ID: '" + slot.key->GetText() + "'");
   }
   YAMLNode* file_id = object->Steal(YAMLScalar::fileIDPlaceHolderName);
@@ -41,9 +41,9 @@ void VexelObjects::OutputHeader(std::ostream& out) const {
   out << "%YAML 1.1\n%TAG !v! " << tag_prefix_ << '\n';
 }
 
-void VexelObjects::Output(std::ostream& out) {
+void VexelObjects::Output(std::ostream& out, Headers headers) {
   OutputHeader(out);
-  for (const Slot& slot : *this) OutputObject(out, slot);
+  for (const Slot& slot : *this) OutputObject(out, slot, headers);
   out.flush();
 }
 

@@ -43,14 +43,18 @@ class VexelObjects final : public YAMLMapping {
     objects_with_duplicate_keys_.push_back(file_id);
   }
 
+  /// Whether an object's header line must be one that can be read again. Where both sides changed it, a
+  /// version for a text merge tool has it blanked.
+  enum class Headers : uint8_t { kComplete, kAsTheyAre };
+
   /// Writes the file: the two directives, then a document for each object. Throws what OutputObject throws.
-  void Output(std::ostream& out);
+  void Output(std::ostream& out, Headers headers = Headers::kComplete);
 
   /// The two parts of it, for callers that write objects on several threads.
   void OutputHeader(std::ostream& out) const;
   /// Throws YAMLError when the object is no mapping, repeats its own keys, has no class ID or file ID, or
   /// libyaml refuses it. The pseudo keys are at its end afterwards.
-  static void OutputObject(std::ostream& out, const Slot& slot);
+  static void OutputObject(std::ostream& out, const Slot& slot, Headers headers = Headers::kComplete);
 
   /// A deep copy of all objects, owned by the caller.
   VexelObjects* Clone() const override;
