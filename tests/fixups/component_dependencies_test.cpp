@@ -3,6 +3,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
+
 #include "fixups/post_process.h"
 #include "merge/recording_conflict_resolver.h"
 #include "tests/support/yaml_text.h"
@@ -147,6 +149,21 @@ TEST_F(ComponentDependencies, EachConflictIsFoundOnce) {
   EXPECT_THAT(Found(Object({{2, kBox}, {5, kScript}, {3, kCrate}, {4, kCloth}}),
                     Object({{2, kBox}, {3, kCrate}}), Object({{4, kCloth}})),
               ElementsAre("Right adds 4"));
+}
+
+TEST_F(ComponentDependencies, ManyComponentsOfOneObjectStayAffordable) {
+  std::vector<std::pair<int, Class>> lights, cloths;
+  for (int i = 0; i < 10'000; ++i) {
+    lights.emplace_back(10 + 2 * i, i % 2 == 0 ? kLight : kSensor);
+    cloths.emplace_back(11 + 2 * i, kCloth);
+  }
+  auto both = lights;
+  both.insert(both.end(), cloths.begin(), cloths.end());
+  both.emplace_back(5, kBox);
+  const auto merged = ObjectsFromText(Object(both)), left = ObjectsFromText(Object(lights));
+  const auto start = std::chrono::steady_clock::now();
+  EXPECT_EQ(FindComponentDependencyConflicts(*merged, *left, *ObjectsFromText("")).size(), 1);
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
 }
 
 TEST_F(ComponentDependencies, OneConflictLeftOpenMakesTheMergePending) {
