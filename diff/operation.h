@@ -46,6 +46,9 @@ class Operation {
   /// Whether the change may be merged part by part with one of the other side's.
   bool IsMergeable() const { return mergeable_; }
 
+  /// Gives back what the operation owns, for the pool: nothing, but for the changes of a mapping or sequence.
+  void ResetForAlloc() {}
+
  protected:
   Operation(Kind kind, bool mergeable) : kind_(kind), mergeable_(mergeable) {}
   ~Operation() = default;
@@ -104,8 +107,11 @@ class AddOperation final : public ValuedOperation {
 
 class ChangeMappingOperation final : public Operation {
  public:
+  /// Owns `diff`.
   ChangeMappingOperation(YAMLMappingDiff* diff, bool mergeable)
       : Operation(Kind::kChangeMapping, mergeable), diff_(diff) {}
+  ~ChangeMappingOperation() { ResetForAlloc(); }
+  void ResetForAlloc();
   void Output(YAMLDiffOutput& out) const override;
   void Apply(YAMLMapping& mapping, const YAMLScalar* key) const override;
   void Apply(YAMLSequence& sequence, int index) const override;
@@ -125,9 +131,11 @@ class ChangeMappingOperation final : public Operation {
 
 class ChangeSequenceOperation final : public Operation {
  public:
-  /// `remapper` may be null: nothing moves.
+  /// Owns `diff` and `remapper`, which may be null: nothing moves.
   ChangeSequenceOperation(YAMLSequenceDiff* diff, YAMLSequenceRemapper* remapper, bool mergeable)
       : Operation(Kind::kChangeSequence, mergeable), remapper_(remapper), diff_(diff) {}
+  ~ChangeSequenceOperation() { ResetForAlloc(); }
+  void ResetForAlloc();
   void Output(YAMLDiffOutput& out) const override;
   void Apply(YAMLMapping& mapping, const YAMLScalar* key) const override;
   void Apply(YAMLSequence& sequence, int index) const override;

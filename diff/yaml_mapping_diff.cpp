@@ -27,4 +27,11 @@ void YAMLMappingDiff::GetKeys(std::vector<Key>& keys) const {
   }
 }
 
+void YAMLMappingDiff::ResetForAlloc() {
+  next_index_ = 0;
+  entries_.clear();
+  positions_.clear();
+  key_order_ = nullptr;
+}
+
 }  // namespace vexel_yaml

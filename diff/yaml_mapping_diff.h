@@ -64,6 +64,9 @@ class YAMLMappingDiff {
   const ChangeSequenceOperation* GetKeyOrder() const { return key_order_; }
   void SetKeyOrder(const ChangeSequenceOperation* key_order) { key_order_ = key_order; }
 
+  /// Empties the diff, for the pool. The operations are not given back: other diffs may share them.
+  void ResetForAlloc();
+
  private:
   friend class MergeTreeCloneVisitor;
 

@@ -55,6 +55,9 @@ class YAMLSequenceDiff {
 
   void Output(YAMLDiffOutput& out) const;
 
+  /// Empties the diff, for the pool. The operations are not given back: other diffs may share them.
+  void ResetForAlloc() { entries_.clear(); }
+
  private:
   std::map<int, const Operation*> entries_;
 };

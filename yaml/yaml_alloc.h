@@ -1,8 +1,11 @@
 #pragma once
 
+#include <algorithm>
+#include <array>
 #include <atomic>
 #include <cstddef>
 #include <memory>
+#include <new>
 #include <utility>
 #include <vector>
 
@@ -36,11 +39,19 @@ class YAMLAlloc {
  public:
   static constexpr size_t kMostSpares = 301;
 
-  /// Takes storage from the pool and constructs a T in it from `args`.
+  /// Takes storage from the pool and constructs a T in it from `args`. Throws std::bad_alloc, and what the
+  /// constructor throws; the storage is then back in the pool.
   template <typename... Args>
   static T* create(Args&&... args) {
     Count(count);
-    return new (allocate()) T(std::forward<Args>(args)...);
+    void* storage = allocate();
+    try {
+      return new (storage) T(std::forward<Args>(args)...);
+    } catch (...) {
+      AutoLock lock(s_Mutex);
+      LeaveVacant(storage);
+      throw;
+    }
   }
 
   /// Raw storage for one T: the spare given back last, else storage of a destroyed object, else fresh.
@@ -57,27 +68,30 @@ class YAMLAlloc {
     return &block.storage[block.next++];
   }
 
-  /// Gives an object back; null is ignored.
-  static void free(T* object) {
+  /// Gives an object back; null is ignored. Never throws and takes no memory: destructors call it, also while
+  /// an exception looks for its handler.
+  static void free(T* object) noexcept {
     if (object == nullptr) return;
     Count(freed);
     size_t spares = 0;
     {
       AutoLock lock(s_Mutex);
-      spares = s_FreeList.size();
+      spares = s_SpareCount;
     }
-    const bool keep = spares < kMostSpares;
     // Outside the lock: emptying a tree gives its children back, to this pool and to others.
-    if (keep) {
+    if (spares < kMostSpares) {
       object->ResetForAlloc();
-    } else {
-      std::destroy_at(object);
+      AutoLock lock(s_Mutex);
+      if (s_SpareCount < kMostSpares) {
+        // Spares stay open: what their members still own must be seen by a leak check.
+        s_Spares[s_SpareCount++] = object;
+        s_Returned.fetch_add(1, std::memory_order_relaxed);
+        return;
+      }
     }
+    std::destroy_at(object);
     AutoLock lock(s_Mutex);
-    (keep ? s_FreeList : s_Vacant).push_back(object);
-    s_Returned.fetch_add(1, std::memory_order_relaxed);
-    // Spares stay open: what their members still own must be seen by a leak check.
-    if (!keep) VEXEL_POISON(object, sizeof(T));
+    LeaveVacant(object);
   }
 
   /// Statistics. Threads may lose one another's increments.
@@ -88,8 +102,14 @@ class YAMLAlloc {
  private:
   static constexpr size_t kBlockLength = 128;
 
-  struct alignas(T) Slot {
-    std::byte bytes[sizeof(T)];
+  // Storage that nothing lives in, linked through its own bytes.
+  struct Vacancy {
+    Vacancy* next;
+  };
+  static constexpr size_t kSlotSize = std::max(sizeof(T), sizeof(Vacancy));
+
+  struct alignas(T) alignas(Vacancy) Slot {
+    std::byte bytes[kSlotSize];
   };
 
   // A thread's own piece of fresh storage, cut without a lock.
@@ -102,34 +122,41 @@ class YAMLAlloc {
     counter.store(counter.load(std::memory_order_relaxed) + 1, std::memory_order_relaxed);
   }
 
+  static void LeaveVacant(void* storage) {
+    s_Vacant = new (storage) Vacancy{s_Vacant};
+    s_Returned.fetch_add(1, std::memory_order_relaxed);
+    VEXEL_POISON(storage, kSlotSize);
+  }
+
   static void* TakeReturned() {
-    if (!s_FreeList.empty()) {
-      T* spare = s_FreeList.back();
-      s_FreeList.pop_back();
+    if (s_SpareCount != 0) {
+      T* spare = s_Spares[--s_SpareCount];
       std::destroy_at(spare);
       Count(reused);
       s_Returned.fetch_sub(1, std::memory_order_relaxed);
       return spare;
     }
-    if (s_Vacant.empty()) return nullptr;
-    T* storage = s_Vacant.back();
-    s_Vacant.pop_back();
-    VEXEL_UNPOISON(storage, sizeof(T));
+    if (s_Vacant == nullptr) return nullptr;
+    void* storage = s_Vacant;
+    VEXEL_UNPOISON(storage, kSlotSize);
+    s_Vacant = s_Vacant->next;
     s_Returned.fetch_sub(1, std::memory_order_relaxed);
     return storage;
   }
 
   static Slot* NewBlock() {
+    auto block = std::make_unique_for_overwrite<Slot[]>(kBlockLength);
     AutoLock lock(s_Mutex);
-    s_Blocks.push_back(std::make_unique_for_overwrite<Slot[]>(kBlockLength));
+    s_Blocks.push_back(std::move(block));
     return s_Blocks.back().get();
   }
 
   static inline Mutex s_Mutex;
   // Never destroyed: what still lives in the blocks at the end of the process is abandoned with them.
   static inline std::vector<std::unique_ptr<Slot[]>>& s_Blocks = *new std::vector<std::unique_ptr<Slot[]>>;
-  static inline std::vector<T*>& s_FreeList = *new std::vector<T*>;
-  static inline std::vector<T*>& s_Vacant = *new std::vector<T*>;
+  static inline std::array<T*, kMostSpares> s_Spares = {};
+  static inline size_t s_SpareCount = 0;
+  static inline Vacancy* s_Vacant = nullptr;
   static inline std::atomic<size_t> s_Returned = 0;
 };
 
