@@ -4,7 +4,7 @@
 #include <utility>
 
 #include "rules/yaml_sequence_remapper.h"
-#include "yaml/yaml_mapping.h"
+#include "yaml/content_digests.h"
 
 namespace vexel_yaml {
 
@@ -12,15 +12,7 @@ namespace {
 
 bool AreEqual(const YAMLNode* a, const YAMLNode* b) {
   // In two long lists that were edited throughout, many pairs are compared: some have equal hashes by chance.
-  return a == b || (a != nullptr && b != nullptr && a->Equals(b) && a->HasSameContent(*b));
-}
-
-// Whether `node` has content but no hash, so that only a comparison can tell what it equals.
-bool LacksHash(const YAMLNode* node) {
-  if (node == nullptr || node->GetHash() != 0) return false;
-  if (const YAMLSequence* sequence = node->AsSequence()) return sequence->Size() != 0;
-  const YAMLMapping* mapping = node->AsMapping();
-  return mapping != nullptr && (mapping->HasDuplicateKeys() || mapping->Size() != 0);
+  return a == b || (a != nullptr && a->EqualsByContent(b));
 }
 
 // A run of elements of a sequence: those between its common start and its common end.
@@ -28,27 +20,27 @@ struct Range {
   const YAMLNode* const* items;
   uint32_t begin;
   uint32_t end;
-
-  bool HasElementWithoutHash() const { return std::any_of(items + begin, items + end, LacksHash); }
 };
 
 // Takes the first element of a range that equals a given one, and each element only once. A scan of the range
-// would do; it would take minutes for a list of 100,000 elements that were all edited.
+// would do; it would take minutes for a list of 100,000 elements that were all edited. So elements with the
+// same content, and only these, share a bucket. (By their hashes they would share it with whatever was made
+// to collide with them, and a bucket of all elements is no better than the scan.)
 class UnusedElements {
  public:
-  UnusedElements(Range range, bool by_hash) : range_(range), by_hash_(by_hash) {
+  explicit UnusedElements(Range range) : range_(range) {
     const uint32_t count = range.end - range.begin;
     next_.resize(count);
-    first_.reserve(by_hash ? count : 1);
+    first_.reserve(count);
     for (uint32_t i = range.end; i-- > range.begin;) {
-      uint32_t& first = first_.emplace(BucketOf(range.items[i]), kNone).first->second;
+      uint32_t& first = first_.emplace(digests_.Of(range.items[i]), kNone).first->second;
       next_[i - range.begin] = std::exchange(first, i);
     }
   }
 
   // kDropped where no element is left that equals `wanted`.
   uint32_t Take(const YAMLNode* wanted) {
-    const auto bucket = first_.find(BucketOf(wanted));
+    const auto bucket = first_.find(digests_.Of(wanted));
     if (bucket == first_.end()) return kNone;
     uint32_t* link = &bucket->second;
     while (*link != kNone && !AreEqual(wanted, range_.items[*link])) link = &next_[*link - range_.begin];
@@ -61,20 +53,8 @@ class UnusedElements {
  private:
   static constexpr uint32_t kNone = YAMLSequenceRemapper::kDropped;
 
-  // Equal elements are in one bucket: a scalar's is its own, since texts with one hash are easily made.
-  // Without a hash are empty slots, empty mappings and empty sequences: each kind has a bucket, beyond all
-  // hashes.
-  uint64_t BucketOf(const YAMLNode* node) const {
-    if (!by_hash_) return 0;
-    if (node != nullptr && node->AsScalar() != nullptr)
-      return (uint64_t{1} << 63) | reinterpret_cast<uintptr_t>(node);
-    if (node == nullptr) return uint64_t{1} << 32;
-    if (node->GetHash() != 0) return node->GetHash();
-    return (uint64_t{2} << 32) + static_cast<uint64_t>(node->GetKind());
-  }
-
   const Range range_;
-  const bool by_hash_;
+  ContentDigests digests_;
   // The first unused position of each bucket, and behind each position the next one of its bucket.
   std::unordered_map<uint64_t, uint32_t> first_;
   std::vector<uint32_t> next_;
@@ -115,8 +95,7 @@ YAMLSequenceRemapper* YAMLSequenceRemapper::FindGenericMapping(const FieldPath& 
   const Range base_middle = {from, prefix, std::max(prefix, n - suffix)};
   const Range changed_middle = {to, prefix, m - suffix};
   if (base_middle.begin == base_middle.end) return IntoPoolUnlessIdentity(std::move(found));
-  const bool by_hash = !base_middle.HasElementWithoutHash() && !changed_middle.HasElementWithoutHash();
-  UnusedElements unused(changed_middle, by_hash);
+  UnusedElements unused(changed_middle);
   for (uint32_t i = base_middle.begin; i < base_middle.end; ++i) found.mapping_[i] = unused.Take(from[i]);
   return IntoPoolUnlessIdentity(std::move(found));
 }

@@ -58,7 +58,7 @@ void AssetText::CheckOnlyDirectives() const {
     const std::string_view content = header_.substr(begin, end - begin);
     const size_t first = content.find_first_not_of(line == 1 ? " \t\r\xEF\xBB\xBF" : " \t\r");
     if (first != std::string_view::npos && content[first] != '%' && content[first] != '#') {
-      throw YAMLError("did not find expected <document start> at line " + std::to_string(line));
+      throw YAMLError("did not find expected <document start>", "see line " + std::to_string(line));
     }
     begin = end + 1;
   }

@@ -19,11 +19,12 @@ std::string_view ScalarText(const yaml_node_t* node) {
 
 }  // namespace
 
-DocumentConverter::DocumentConverter(yaml_document_t& document)
-    : document_(document), open_(static_cast<size_t>(document.nodes.top - document.nodes.start)) {}
+DocumentConverter::DocumentConverter(yaml_document_t& document, size_t first_line)
+    : document_(document),
+      first_line_(first_line),
+      open_(static_cast<size_t>(document.nodes.top - document.nodes.start)) {}
 
 YAMLNode* DocumentConverter::Convert(yaml_node_t* node) {
-  if (++node_count_ > kMostNodes) throw YAMLError("YAML aliases expand to more than 10000000 nodes");
   if (node->type == YAML_SCALAR_NODE) return YAMLDocNodeToScalar(node);
 
   const auto index = static_cast<size_t>(node - document_.nodes.start);
@@ -35,13 +36,13 @@ YAMLNode* DocumentConverter::Convert(yaml_node_t* node) {
       node->type == YAML_MAPPING_NODE ? YAMLDocNodeToMapping(node) : YAMLDocNodeToSequence(node);
   --depth_;
   open_[index] = false;
-  converted->SetLine(static_cast<uint32_t>(node->start_mark.line));
+  SetLine(*converted, *node);
   return converted;
 }
 
 YAMLNode* DocumentConverter::YAMLDocNodeToScalar(const yaml_node_t* node) {
   const YAMLScalar* scalar = YAMLScalar::Lookup(ScalarText(node));
-  scalar->SetLine(static_cast<uint32_t>(node->start_mark.line));
+  SetLine(*scalar, *node);
   return scalar->AsValue();
 }
 
@@ -58,11 +59,12 @@ YAMLNode* DocumentConverter::YAMLDocNodeToMapping(const yaml_node_t* node) {
       continue;
     }
     const YAMLScalar* key = YAMLDocNodeToScalar(key_node)->AsScalar();
-    YAMLNode* value = ConvertById(pair->value);
+    OwnedNodePtr<YAMLNode> value(ConvertById(pair->value));
     hash = YAMLNode::Combine(hash, key->GetHash());
-    hash = YAMLNode::Combine(hash, value->GetHashInParent());
+    hash = YAMLNode::Combine(hash, value->GetHash());
     hash = YAMLNode::Combine(hash, static_cast<uint32_t>(pair - begin));
-    mapping->Append(key, value);
+    mapping->Append(key, value.get());
+    value.release();
   }
   found_duplicate_keys_ |= mapping->HasDuplicateKeys();
   mapping->SetHash(hash);
@@ -78,7 +80,7 @@ YAMLNode* DocumentConverter::YAMLDocNodeToSequence(const yaml_node_t* node) {
   uint32_t hash = 0;
   for (const yaml_node_item_t* item = begin; item != end; ++item) {
     YAMLNode* value = ConvertById(*item);
-    hash = YAMLNode::Combine(hash, value->GetHashInParent());
+    hash = YAMLNode::Combine(hash, value->GetHash());
     hash = YAMLNode::Combine(hash, static_cast<uint32_t>(item - begin));
     sequence->Append(value);
   }

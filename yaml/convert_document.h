@@ -14,31 +14,35 @@ namespace vexel_yaml {
 class DocumentConverter {
  public:
   static constexpr size_t kDeepest = 1000;
-  static constexpr size_t kMostNodes = 10'000'000;
 
-  explicit DocumentConverter(yaml_document_t& document);
+  /// `first_line`: what to add to libyaml's line numbers.
+  DocumentConverter(yaml_document_t& document, size_t first_line);
 
   /// The tree below `node`, owned by the caller. Repeated keys follow the rules of YAMLMapping; a pair whose
-  /// key is no scalar is left out. Throws YAMLError "YAML alias contains itself",
-  /// "YAML nesting is deeper than 1000 levels" or "YAML aliases expand to more than 10000000 nodes".
+  /// key is no scalar is left out. Throws YAMLError "YAML alias contains itself" or
+  /// "YAML nesting is deeper than 1000 levels". How far aliases may expand is the business of
+  /// CheckDocumentLimits.
   YAMLNode* Convert(yaml_node_t* node);
 
   bool FoundDuplicateKeys() const { return found_duplicate_keys_; }
 
-  /// 0-based lines in the document's text where left-out keys start.
+  /// libyaml's 0-based lines where left-out keys start.
   const std::vector<size_t>& GetSkippedKeyLines() const { return skipped_key_lines_; }
 
  private:
   YAMLNode* YAMLDocNodeToScalar(const yaml_node_t* node);
   YAMLNode* YAMLDocNodeToMapping(const yaml_node_t* node);
   YAMLNode* YAMLDocNodeToSequence(const yaml_node_t* node);
+  void SetLine(const YAMLNode& converted, const yaml_node_t& node) const {
+    converted.SetLine(static_cast<uint32_t>(first_line_ + node.start_mark.line));
+  }
   YAMLNode* ConvertById(int id) { return Convert(yaml_document_get_node(&document_, id)); }
 
   yaml_document_t& document_;
+  const size_t first_line_;
   // By node id: whether the node is being converted, that is, stands above the current one.
   std::vector<bool> open_;
   size_t depth_ = 0;
-  size_t node_count_ = 0;
   bool found_duplicate_keys_ = false;
   std::vector<size_t> skipped_key_lines_;
 };

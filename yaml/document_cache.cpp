@@ -1,5 +1,7 @@
 #include "yaml/document_cache.h"
 
+#include <atomic>
+#include <cstdint>
 #include <utility>
 
 namespace vexel_yaml {
@@ -23,10 +25,13 @@ const YAMLMapping* DocumentCache::Find(std::string_view document) {
   return found == shard.objects.end() ? nullptr : found->second;
 }
 
-void DocumentCache::Publish(std::string_view document, const YAMLMapping* object) {
+void DocumentCache::Publish(std::string_view document, YAMLMapping* object) {
+  // Objects of two caches may be compared, too.
+  static std::atomic<uint32_t> last_number = 0;
   Shard& shard = ShardOf(document);
   AutoLock lock(shard.mutex);
-  shard.objects.emplace(document, object);
+  const auto [published, is_first] = shard.objects.emplace(document, object);
+  object->SetTextNumber(is_first ? ++last_number : published->second->GetTextNumber());
 }
 
 }  // namespace vexel_yaml

@@ -7,6 +7,7 @@
 #include <unordered_map>
 
 #include "platform/mutex.h"
+#include "platform/text_hash.h"
 #include "yaml/yaml_mapping.h"
 
 namespace vexel_yaml {
@@ -26,16 +27,16 @@ class DocumentCache {
   /// The object that was read from this very text, null if none was yet.
   const YAMLMapping* Find(std::string_view document);
 
-  /// `document` must lie in a text that the cache keeps.
-  void Publish(std::string_view document, const YAMLMapping* object);
+  /// `document` must lie in a text that the cache keeps. Gives the object the number of its text.
+  void Publish(std::string_view document, YAMLMapping* object);
 
  private:
   struct Shard {
     Mutex mutex;
-    std::unordered_map<std::string_view, const YAMLMapping*> objects;
+    std::unordered_map<std::string_view, const YAMLMapping*, TextHash> objects;
   };
 
-  Shard& ShardOf(std::string_view document) { return shards_[std::hash<std::string_view>()(document) % 64]; }
+  Shard& ShardOf(std::string_view document) { return shards_[HashText(document) % shards_.size()]; }
 
   Mutex mutex_;
   std::deque<std::string> texts_;

@@ -2,10 +2,12 @@
 
 #include <yaml.h>
 
+#include <functional>
 #include <string>
 #include <unordered_map>
 #include <vector>
 
+#include "platform/text_hash.h"
 #include "yaml/convert_document.h"
 #include "yaml/yaml_error.h"
 
@@ -14,17 +16,21 @@ namespace vexel_yaml {
 namespace {
 
 constexpr size_t kMostAnchors = 10'000;
+constexpr size_t kMostExpandedNodes = 10'000'000;
+// libyaml looks for an alias's anchor from the document's first one on.
+constexpr size_t kMostAnchorsLookedAt = 100'000'000;
 
-// Whether one pass over the bytes shows that nothing is near a limit. Of the nesting depth it makes an upper
-// bound: every flow collection has its opening bracket, and of block collections at most two start at one
-// column, a list level with its key. The one anchor is the object's file ID.
-bool IsSurelyHarmless(std::string_view text) {
+// Whether one pass over a document's bytes shows that nothing is near a limit. Of the nesting depth it makes
+// an upper bound: every flow collection has its opening bracket, and of block collections at most two start
+// at one column, a list level with its key. The one anchor that counts for nothing is the object's file ID.
+bool IsSurelyHarmless(std::string_view document) {
   size_t brackets = 0;
-  size_t anchors = 0;
   size_t widest_indent = 0;
   size_t indent = 0;
   bool at_line_start = true;
-  for (const char c : text) {
+  const size_t file_id = document.substr(0, document.find_first_of("\r\n")).find('&');
+  for (size_t i = 0; i < document.size(); ++i) {
+    const char c = document[i];
     if (c == '\n' || c == '\r') {
       indent = 0;
       at_line_start = true;
@@ -33,62 +39,92 @@ bool IsSurelyHarmless(std::string_view text) {
     } else {
       at_line_start = false;
       brackets += c == '[' || c == '{' ? 1 : 0;
-      anchors += c == '&' ? 1 : 0;
+      if (c == '&' && i != file_id) return false;
     }
   }
-  return anchors <= 1 && brackets + 2 * widest_indent + 2 < DocumentConverter::kDeepest;
+  return brackets + 2 * widest_indent + 2 < DocumentConverter::kDeepest;
 }
 
 // Counts what loading a document would make, without making it.
 class DocumentCount {
  public:
+  explicit DocumentCount(DocumentLimits& limits) : limits_(limits) {}
+
+  void Add(const yaml_event_t& event) {
+    if (event.type == YAML_MAPPING_START_EVENT) {
+      StartCollection(event.data.mapping_start.anchor);
+    } else if (event.type == YAML_SEQUENCE_START_EVENT) {
+      StartCollection(event.data.sequence_start.anchor);
+    } else if (event.type == YAML_MAPPING_END_EVENT || event.type == YAML_SEQUENCE_END_EVENT) {
+      EndCollection();
+    } else if (event.type == YAML_SCALAR_EVENT) {
+      if (Anchor* anchor = TakeAnchor(event.data.scalar.anchor)) anchor->size = 1;
+      AddNodes(1);
+    } else if (event.type == YAML_ALIAS_EVENT) {
+      AddAlias(event.data.alias.anchor);
+    }
+  }
+
+ private:
+  struct Anchor {
+    // How many anchors stand before it in the document.
+    size_t position;
+    // Of the node below it, aliases expanded; 0 while the node is open.
+    size_t size;
+  };
+
+  struct Collection {
+    Anchor* anchor;
+    size_t size;
+  };
+
   void StartCollection(const yaml_char_t* anchor) {
     if (open_.size() == DocumentConverter::kDeepest) {
       throw YAMLError("YAML nesting is deeper than 1000 levels");
     }
-    open_.push_back({TakeAnchor(anchor), 1});
+    // The first anchor of all is the object's file ID.
+    open_.push_back({open_.empty() ? nullptr : TakeAnchor(anchor), 1});
   }
 
   void EndCollection() {
-    const Node node = open_.back();
+    const Collection collection = open_.back();
     open_.pop_back();
-    Add(node);
+    if (collection.anchor != nullptr) collection.anchor->size = collection.size;
+    AddNodes(collection.size);
   }
 
-  void AddScalar(const yaml_char_t* anchor) { Add({TakeAnchor(anchor), 1}); }
-
-  void AddAlias(const yaml_char_t* anchor) {
-    const auto found = sizes_.find(reinterpret_cast<const char*>(anchor));
-    Add({"", found == sizes_.end() ? 1 : found->second});
+  Anchor* TakeAnchor(const yaml_char_t* name) {
+    if (name == nullptr) return nullptr;
+    if (++limits_.anchors > kMostAnchors) throw YAMLError("YAML file holds more than 10000 anchors");
+    return &anchors_.emplace(reinterpret_cast<const char*>(name), Anchor{anchors_.size() + 1, 0})
+                .first->second;
   }
 
- private:
-  struct Node {
-    std::string anchor;
-    size_t size;
-  };
-
-  std::string TakeAnchor(const yaml_char_t* anchor) {
-    if (anchor == nullptr) return {};
-    if (++anchors_ > kMostAnchors) throw YAMLError("YAML document holds more than 10000 anchors");
-    return reinterpret_cast<const char*>(anchor);
-  }
-
-  void Add(const Node& node) {
-    if (!node.anchor.empty()) sizes_[node.anchor] = node.size;
-    if (open_.empty()) return;
-    open_.back().size += node.size;
-    if (open_.back().size > DocumentConverter::kMostNodes) {
+  void AddAlias(const yaml_char_t* name) {
+    const auto found = anchors_.find(std::string_view(reinterpret_cast<const char*>(name)));
+    if (found == anchors_.end()) return;
+    limits_.anchors_looked_at += found->second.position;
+    limits_.expanded_nodes += found->second.size;
+    if (limits_.anchors_looked_at > kMostAnchorsLookedAt) {
+      throw YAMLError("YAML aliases refer to too many anchors");
+    }
+    if (limits_.expanded_nodes > kMostExpandedNodes) {
       throw YAMLError("YAML aliases expand to more than 10000000 nodes");
     }
+    AddNodes(found->second.size);
   }
 
-  std::vector<Node> open_;
-  std::unordered_map<std::string, size_t> sizes_;
-  size_t anchors_ = 0;
+  void AddNodes(size_t count) {
+    if (!open_.empty()) open_.back().size += count;
+  }
+
+  DocumentLimits& limits_;
+  std::vector<Collection> open_;
+  // An address in it stays valid.
+  std::unordered_map<std::string, Anchor, TextHash, std::equal_to<>> anchors_;
 };
 
-// Reads the events of a text; holds libyaml's objects over exceptions.
+// Reads the events of a document; holds libyaml's objects over exceptions.
 class EventReader {
  public:
   explicit EventReader(std::string_view text) {
@@ -119,23 +155,11 @@ class EventReader {
 
 }  // namespace
 
-void CheckDocumentLimits(std::string_view text) {
-  if (IsSurelyHarmless(text)) return;
-  EventReader reader(text);
-  DocumentCount count;
-  while (const yaml_event_t* event = reader.Next()) {
-    if (event->type == YAML_MAPPING_START_EVENT) {
-      count.StartCollection(event->data.mapping_start.anchor);
-    } else if (event->type == YAML_SEQUENCE_START_EVENT) {
-      count.StartCollection(event->data.sequence_start.anchor);
-    } else if (event->type == YAML_MAPPING_END_EVENT || event->type == YAML_SEQUENCE_END_EVENT) {
-      count.EndCollection();
-    } else if (event->type == YAML_SCALAR_EVENT) {
-      count.AddScalar(event->data.scalar.anchor);
-    } else if (event->type == YAML_ALIAS_EVENT) {
-      count.AddAlias(event->data.alias.anchor);
-    }
-  }
+void CheckDocumentLimits(std::string_view chunk, size_t document_start, DocumentLimits& limits) {
+  if (IsSurelyHarmless(chunk.substr(document_start))) return;
+  EventReader reader(chunk);
+  DocumentCount count(limits);
+  while (const yaml_event_t* event = reader.Next()) count.Add(*event);
 }
 
 }  // namespace vexel_yaml

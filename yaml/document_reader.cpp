@@ -4,9 +4,9 @@
 
 #include <algorithm>
 #include <new>
+#include <utility>
 
 #include "yaml/convert_document.h"
-#include "yaml/document_limits.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -15,6 +15,12 @@ namespace {
 
 std::string_view LeadingNumber(std::string_view text) {
   return text.substr(0, std::min(text.find_first_not_of("0123456789-"), text.size()));
+}
+
+// The number behind the line's first "&".
+std::string_view FileIDIn(std::string_view first_line) {
+  const size_t anchor = first_line.find('&');
+  return anchor == std::string_view::npos ? std::string_view() : LeadingNumber(first_line.substr(anchor + 1));
 }
 
 // Loads one document; holds libyaml's objects over exceptions.
@@ -67,7 +73,7 @@ class LoadedDocument {
   size_t GetProblemLine() const { return problem_line_; }
 
  private:
-  void Fail() {
+  [[noreturn]] void Fail() {
     // Its loader gives no reason where it could not copy a tag.
     if (parser_.error == YAML_MEMORY_ERROR || parser_.error == YAML_NO_ERROR) throw std::bad_alloc();
     // A byte that is no text is found before lines are counted.
@@ -105,18 +111,17 @@ void RefusePseudoKeys(const YAMLMapping& object) {
   for (const YAMLMapping::Slot& slot : object) refuse(slot);
 }
 
-void Convert(LoadedDocument& document, std::string_view chunk, bool stripped, ReadObject& result) {
+void Convert(LoadedDocument& document, size_t dropped_lines, std::string_view first_line, bool stripped,
+             ReadObject& result) {
   const yaml_node_t* root = document.GetRoot();
   if (root->type != YAML_MAPPING_NODE) throw YAMLError("The object is not a mapping");
-  DocumentConverter converter(document.Get());
+  DocumentConverter converter(document.Get(), dropped_lines);
   result.object = converter.Convert(document.GetRoot())->AsMapping();
   result.holds_duplicate_keys = converter.FoundDuplicateKeys();
   RefusePseudoKeys(*result.object);
   result.skipped_key_lines = converter.GetSkippedKeyLines();
 
-  const size_t anchor = chunk.find('&');
-  result.file_id = YAMLScalar::Lookup(
-      anchor == std::string_view::npos ? std::string_view() : LeadingNumber(chunk.substr(anchor + 1)));
+  result.file_id = YAMLScalar::Lookup(FileIDIn(first_line));
   auto position = static_cast<uint32_t>(root->data.mapping.pairs.top - root->data.mapping.pairs.start);
   AppendPseudoKey(*result.object, YAMLScalar::fileIDPlaceHolderName, result.file_id, position++);
   AppendPseudoKey(*result.object, YAMLScalar::classIDPlaceHolderName,
@@ -125,12 +130,40 @@ void Convert(LoadedDocument& document, std::string_view chunk, bool stripped, Re
   AppendPseudoKey(*result.object, YAMLScalar::strippedPrefabPlaceHolderName, YAMLScalar::one, position);
 }
 
+// Whether a line of the header says nothing to libyaml.
+bool IsBlankOrComment(std::string_view line) {
+  const size_t first = line.find_first_not_of(" \t\r\n");
+  return first == std::string_view::npos || line[first] == '#';
+}
+
+size_t CountLines(std::string_view text) { return static_cast<size_t>(std::ranges::count(text, '\n')); }
+
 }  // namespace
+
+// Only what libyaml needs, and little of it: it gets the directives again with every document, and a header
+// of some megabytes before a million small ones would take hours.
+DocumentReader::DocumentReader(std::string_view header) {
+  constexpr size_t kMostDirectives = 1024;
+  for (size_t begin = 0; begin < header.size();) {
+    const size_t line_end = header.find('\n', begin);
+    const size_t end = line_end == std::string_view::npos ? header.size() : line_end + 1;
+    const std::string_view line = header.substr(begin, end - begin);
+    // The document starts on the last line if that has no end.
+    if (line_end != std::string_view::npos && IsBlankOrComment(line)) {
+      ++dropped_lines_;
+    } else {
+      directives_ += line;
+    }
+    begin = end;
+  }
+  if (directives_.size() > kMostDirectives) throw YAMLError("YAML directives are longer than 1024 bytes");
+  kept_lines_ = CountLines(directives_);
+}
 
 // Blanks the mark out, which is no YAML.
 bool DocumentReader::TakeStrippedMark() {
   constexpr std::string_view kStripped = "stripped";
-  const size_t line_end = chunk_.find_first_of("\r\n", header_.size());
+  const size_t line_end = chunk_.find_first_of("\r\n", directives_.size());
   if (line_end == std::string::npos) throw YAMLError("Error locating end of document sequence");
   if (line_end < kStripped.size()) return false;
   const size_t mark = line_end - kStripped.size();
@@ -139,29 +172,49 @@ bool DocumentReader::TakeStrippedMark() {
   return true;
 }
 
-bool DocumentReader::Read(const AssetText::Document& document, bool last, ReadObject& result) {
-  chunk_.resize(header_.size());
-  chunk_ += document.text;
-  const bool stripped = TakeStrippedMark();
-  // With the next document's start libyaml sees where this one ends.
-  if (!last) chunk_ += "---";
+// The document's own first line, which names the object.
+std::string_view DocumentReader::FirstLine() const {
+  const std::string_view document = std::string_view(chunk_).substr(directives_.size());
+  return document.substr(0, document.find_first_of("\r\n"));
+}
 
-  // In the chunk the document starts on the line behind the header, in the file on a line of its own. libyaml
-  // counts the end of a text as one line more.
-  const auto header_lines = static_cast<size_t>(std::count(header_.begin(), header_.end(), '\n'));
-  const size_t last_line =
-      static_cast<size_t>(std::count(document.text.begin(), document.text.end() - 1, '\n'));
-  const auto line_in_file = [&](size_t line) {
-    return document.line + 1 + std::min(line > header_lines ? line - header_lines : 0, last_line);
-  };
+bool DocumentReader::ReadChunk(bool last, bool stripped, ReadObject& result, size_t& problem_line) {
+  const size_t anchors = limits_.anchors;
+  CheckDocumentLimits(chunk_, directives_.size(), limits_);
+  result.counts_for_limits = limits_.anchors != anchors;
   LoadedDocument loaded;
   try {
-    CheckDocumentLimits(chunk_);
     if (!loaded.Load(chunk_)) return false;
     loaded.CheckEnd(last);
-    Convert(loaded, chunk_, stripped, result);
+    Convert(loaded, dropped_lines_, FirstLine(), stripped, result);
+  } catch (const YAMLError&) {
+    problem_line = loaded.GetProblemLine();
+    throw;
+  }
+  return true;
+}
+
+bool DocumentReader::Read(const AssetText::Document& document, bool last, ReadObject& result) {
+  chunk_ = directives_;
+  chunk_ += document.text;
+
+  // In the chunk the document starts on the line behind the directives, in the file on a line of its own.
+  // libyaml counts the end of a text as one line more.
+  const size_t last_line = CountLines(document.text.substr(0, document.text.size() - 1));
+  const auto line_in_file = [&](size_t line) {
+    return document.line + 1 + std::min(line > kept_lines_ ? line - kept_lines_ : 0, last_line);
+  };
+  size_t problem_line = 0;
+  try {
+    const bool stripped = TakeStrippedMark();
+    // With the next document's start libyaml sees where this one ends.
+    if (!last) chunk_ += "---";
+    if (!ReadChunk(last, stripped, result, problem_line)) return false;
   } catch (const YAMLError& error) {
-    throw YAMLError(error.what() + (" at line " + std::to_string(line_in_file(loaded.GetProblemLine()))));
+    std::string place = "see line " + std::to_string(line_in_file(problem_line));
+    if (const std::string_view file_id = FileIDIn(FirstLine()); !file_id.empty())
+      place.append(", object ").append(file_id);
+    throw YAMLError(error.what(), std::move(place));
   }
   for (size_t& line : result.skipped_key_lines) line = line_in_file(line);
   return true;

@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "yaml/asset_text.h"
+#include "yaml/document_limits.h"
 #include "yaml/yaml_mapping.h"
 
 namespace vexel_yaml {
@@ -14,6 +15,8 @@ struct ReadObject {
   const YAMLScalar* file_id = nullptr;
   /// Owned by whoever takes it; with its pseudo keys.
   YAMLMapping* object = nullptr;
+  /// Whether it used up some of the file's limits, so that its next reader has to count it, too.
+  bool counts_for_limits = false;
   bool holds_duplicate_keys = false;
   /// 1-based lines in the file.
   std::vector<size_t> skipped_key_lines;
@@ -22,19 +25,25 @@ struct ReadObject {
 /// Reads documents of one asset, one at a time, with libyaml.
 class DocumentReader {
  public:
-  /// `header` stands in front of every document.
-  explicit DocumentReader(std::string_view header) : header_(header), chunk_(header) {}
+  /// The directives of `header` stand in front of every document.
+  /// Throws YAMLError "YAML directives are longer than 1024 bytes".
+  explicit DocumentReader(std::string_view header);
 
   /// Reads one document. `last`: no other follows in the file. Returns false when libyaml can't start.
-  /// Throws std::bad_alloc, and YAMLError, for what libyaml or the limits on hostile input find with the
-  /// 1-based line.
+  /// Throws std::bad_alloc, and YAMLError with the 1-based line and the object in its hint.
   bool Read(const AssetText::Document& document, bool last, ReadObject& result);
 
  private:
   bool TakeStrippedMark();
+  std::string_view FirstLine() const;
+  bool ReadChunk(bool last, bool stripped, ReadObject& result, size_t& problem_line);
 
-  std::string_view header_;
-  // What libyaml gets: the header, the document, the start of the next one.
+  std::string directives_;
+  // Of the header: how many there are in the directives, and how many were left out.
+  size_t kept_lines_ = 0;
+  size_t dropped_lines_ = 0;
+  DocumentLimits limits_;
+  // What libyaml gets: the directives, the document, the start of the next one.
   std::string chunk_;
 };
 

@@ -1,5 +1,6 @@
 #include <yaml.h>
 
+#include <new>
 #include <string>
 
 #include "yaml/yaml_error.h"
@@ -11,14 +12,17 @@ namespace vexel_yaml {
 
 namespace {
 
-int StringOutputHandler(void* data, unsigned char* buffer, size_t size) {
+// No exception may pass libyaml, which would lose its own storage: 0 makes it fail.
+int StringOutputHandler(void* data, unsigned char* buffer, size_t size) try {
   static_cast<std::string*>(data)->append(reinterpret_cast<const char*>(buffer), size);
   return 1;
+} catch (const std::exception&) {
+  return 0;
 }
 
-// libyaml's functions return 0 for a text that is not UTF-8 and for a document with too many nodes.
+// What libyaml is given it can write, so its functions return 0 only where there is no storage.
 int CheckedId(int result) {
-  if (result == 0) throw YAMLError("Cannot write a value that is not UTF-8, or an object that is too large");
+  if (result == 0) throw std::bad_alloc();
   return result;
 }
 
@@ -28,7 +32,7 @@ class Emission {
   Emission() {
     if (yaml_document_initialize(&document_, nullptr, nullptr, nullptr, 1, 1) == 0 ||
         yaml_emitter_initialize(&emitter_) == 0) {
-      throw YAMLError("Cannot initialize the YAML emitter");
+      throw std::bad_alloc();
     }
   }
   Emission(const Emission&) = delete;
@@ -44,6 +48,7 @@ class Emission {
     node.PopulateDocument(&document_);
     dumped_ = true;  // Dumping deletes the document, also when it fails.
     if (yaml_emitter_dump(&emitter_, &document_) == 0 || yaml_emitter_flush(&emitter_) == 0) {
+      if (emitter_.error == YAML_MEMORY_ERROR || emitter_.error == YAML_WRITER_ERROR) throw std::bad_alloc();
       throw YAMLError(emitter_.problem == nullptr ? "unknown problem" : emitter_.problem);
     }
     return text;
@@ -69,6 +74,7 @@ std::string YAMLNode::GetYAMLString() const {
 }
 
 int YAMLScalar::PopulateDocument(yaml_document_s* document) const {
+  CheckWritable();
   const auto* bytes = reinterpret_cast<const yaml_char_t*>(text_.data());
   return CheckedId(yaml_document_add_scalar(document, nullptr, bytes, static_cast<int>(text_.size()),
                                             YAML_ANY_SCALAR_STYLE));

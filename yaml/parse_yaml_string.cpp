@@ -11,14 +11,14 @@ namespace {
 // Reads the documents of one file into slots, in any order.
 class FileReader {
  public:
-  explicit FileReader(std::string_view text)
-      : text_(text), reader_(text_.GetHeader()), objects_(text_.GetDocuments().size()) {}
+  explicit FileReader(std::string_view text) : text_(text), objects_(text_.GetDocuments().size()) {}
 
   const AssetText& GetText() const { return text_; }
 
   bool ReadAll() {
+    DocumentReader documents(text_.GetHeader());
     for (size_t i = 0; i < objects_.size(); ++i) {
-      if (!Read(i)) return false;
+      if (!Read(documents, i)) return false;
     }
     return true;
   }
@@ -26,9 +26,10 @@ class FileReader {
   // Each reader starts at a place of its own, so that each parses a part of what they have in common and
   // finds the rest parsed.
   bool ReadAllSharing(DocumentCache& cache, size_t reader) {
+    DocumentReader documents(text_.GetHeader());
     const size_t count = objects_.size();
     for (size_t i = 0; i < count; ++i) {
-      if (!ReadSharing((i + count * (reader % 3) / 3) % count, cache)) return false;
+      if (!ReadSharing(documents, (i + count * (reader % 3) / 3) % count, cache)) return false;
     }
     return true;
   }
@@ -44,11 +45,11 @@ class FileReader {
   }
 
  private:
-  bool Read(size_t index) {
-    return reader_.Read(text_.GetDocuments()[index], index + 1 == objects_.size(), objects_[index]);
+  bool Read(DocumentReader& documents, size_t index) {
+    return documents.Read(text_.GetDocuments()[index], index + 1 == objects_.size(), objects_[index]);
   }
 
-  bool ReadSharing(size_t index, DocumentCache& cache) {
+  bool ReadSharing(DocumentReader& documents, size_t index, DocumentCache& cache) {
     const std::string_view document = text_.GetDocuments()[index].text;
     ReadObject& read = objects_[index];
     if (const YAMLMapping* shared = cache.Find(document)) {
@@ -56,14 +57,14 @@ class FileReader {
       read.file_id = shared->Get(YAMLScalar::fileIDPlaceHolderName)->AsScalar();
       return true;
     }
-    if (!Read(index)) return false;
+    if (!Read(documents, index)) return false;
     // What a copy can't stand for is read by everyone.
-    if (!read.holds_duplicate_keys && read.skipped_key_lines.empty()) cache.Publish(document, read.object);
+    if (!read.holds_duplicate_keys && read.skipped_key_lines.empty() && !read.counts_for_limits)
+      cache.Publish(document, read.object);
     return true;
   }
 
   AssetText text_;
-  DocumentReader reader_;
   std::vector<ReadObject> objects_;
 };
 

@@ -1,6 +1,7 @@
 #include "yaml/vexel_objects.h"
 
 #include "yaml/yaml_error.h"
+#include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
 
@@ -15,17 +16,52 @@ std::string_view TextOf(const YAMLNode* value) {
   return scalar == nullptr ? std::string_view() : std::string_view(scalar->GetText());
 }
 
-}  // namespace
-
-void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) {
-  YAMLMapping* object = slot.value->AsMapping();
+// Without complete headers the object could not be read again.
+void CheckHeader(const YAMLMapping::Slot& slot, VexelObjects::Headers headers) {
+  const YAMLMapping* object = slot.value->AsMapping();
   if (object == nullptr)
     throw YAMLError("Cannot write an object that is not a mapping: " + slot.key->GetText());
-  // Its header line could not be read again.
-  if (headers == Headers::kComplete && (TextOf(object->Get(YAMLScalar::fileIDPlaceHolderName)).empty() ||
-                                        TextOf(object->Get(YAMLScalar::classIDPlaceHolderName)).empty())) {
+  if (headers == VexelObjects::Headers::kComplete &&
+      (TextOf(object->Get(YAMLScalar::fileIDPlaceHolderName)).empty() ||
+       TextOf(object->Get(YAMLScalar::classIDPlaceHolderName)).empty())) {
     throw YAMLError("Cannot write an object without class ID or file ID: '" + slot.key->GetText() + "'");
   }
+}
+
+void CheckValues(const YAMLNode& node) {
+  const auto check_pair = [](const YAMLMapping::Slot& slot) {
+    slot.key->CheckWritable();
+    CheckValues(*slot.value);
+  };
+  if (const YAMLScalar* scalar = node.AsScalar()) {
+    scalar->CheckWritable();
+  } else if (const YAMLSequence* sequence = node.AsSequence()) {
+    for (const YAMLNode* item : sequence->GetItems()) {
+      if (item != nullptr) CheckValues(*item);
+    }
+  } else if (const YAMLMapping* mapping = node.AsMapping(); mapping->HasDuplicateKeys()) {
+    for (const YAMLMapping::Slot& slot : mapping->GetDuplicatePairs()) check_pair(slot);
+  } else {
+    for (const YAMLMapping::Slot& slot : *mapping) check_pair(slot);
+  }
+}
+
+}  // namespace
+
+void VexelObjects::CheckWritable() const {
+  for (const Slot& slot : *this) {
+    try {
+      CheckHeader(slot, Headers::kComplete);
+      CheckValues(*slot.value);
+    } catch (const YAMLError& error) {
+      throw YAMLError(error.what(), "see object " + slot.key->GetText());
+    }
+  }
+}
+
+void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) {
+  CheckHeader(slot, headers);
+  YAMLMapping* object = slot.value->AsMapping();
   YAMLNode* file_id = object->Steal(YAMLScalar::fileIDPlaceHolderName);
   YAMLNode* class_id = object->Steal(YAMLScalar::classIDPlaceHolderName);
   YAMLNode* stripped = object->Steal(YAMLScalar::strippedPrefabPlaceHolderName);

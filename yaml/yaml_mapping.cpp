@@ -1,6 +1,7 @@
 #include "yaml/yaml_mapping.h"
 
 #include <algorithm>
+#include <new>
 
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_error.h"
@@ -37,19 +38,33 @@ YAMLNode* YAMLMapping::Find(const YAMLScalar* key) const {
   return slot == kNotFound ? nullptr : slots_[slot].value;
 }
 
+// Where memory is short the mapping does without its index: it is searched in place, and what the caller
+// adds or moves is not lost half way.
 void YAMLMapping::BuildIndex() {
   index_.reset();
   if (slots_.size() < kIndexFrom) return;
-  index_ = std::make_unique<Index>(slots_.capacity());
-  for (size_t i = 0; i < slots_.size(); ++i) {
-    if (slots_[i].key != nullptr) index_->emplace(slots_[i].key, i);
+  try {
+    auto index = std::make_unique<Index>(slots_.capacity());
+    for (size_t i = 0; i < slots_.size(); ++i) {
+      if (slots_[i].key != nullptr) index->emplace(slots_[i].key, i);
+    }
+    index_ = std::move(index);
+  } catch (const std::bad_alloc&) {
+  }
+}
+
+void YAMLMapping::IndexSlot(const YAMLScalar* key, size_t slot) {
+  try {
+    index_->insert_or_assign(key, slot);
+  } catch (const std::bad_alloc&) {
+    index_.reset();
   }
 }
 
 void YAMLMapping::AddSlot(const YAMLScalar* key, YAMLNode* value) {
   slots_.push_back({key, value});
   if (index_) {
-    index_->emplace(key, slots_.size() - 1);
+    IndexSlot(key, slots_.size() - 1);
   } else if (slots_.size() >= kIndexFrom) {
     BuildIndex();
   }
@@ -65,10 +80,13 @@ void YAMLMapping::Append(const YAMLScalar* key, YAMLNode* value) {
     AddSlot(key, value);
     return;
   }
-  if (slots_[present].value->Equals(value)) return;
+  if (slots_[present].value->EqualsByContent(value)) return;
   CloseGaps();
-  duplicates_ = std::make_unique<std::vector<Slot>>(std::move(slots_));
-  duplicates_->push_back({key, value});
+  auto duplicates = std::make_unique<std::vector<Slot>>();
+  duplicates->reserve(slots_.size() + 1);
+  duplicates->assign(slots_.begin(), slots_.end());
+  duplicates->push_back({key, value});
+  duplicates_ = std::move(duplicates);
   slots_.clear();
   index_.reset();
 }
@@ -100,7 +118,7 @@ void YAMLMapping::ChangeKey(const YAMLScalar* old_key, const YAMLScalar* new_key
   slots_[slot].key = new_key;
   if (index_) {
     index_->erase(old_key);
-    index_->insert_or_assign(new_key, slot);
+    IndexSlot(new_key, slot);
   }
 }
 
@@ -150,6 +168,7 @@ YAMLMapping::Iterator YAMLMapping::begin() const {
 }
 
 YAMLMapping::Iterator YAMLMapping::end() const {
+  RefuseDuplicates();
   const Slot* end = slots_.data() + slots_.size();
   return {end, end};
 }
@@ -172,18 +191,20 @@ void YAMLMapping::Reorder(const std::vector<const YAMLScalar*>& order) {
 }
 
 YAMLSequence* YAMLMapping::ToSequence() const {
-  auto* sequence = YAMLAlloc<YAMLSequence>::create(flow_);
+  OwnedNodePtr<YAMLSequence> sequence(YAMLAlloc<YAMLSequence>::create(flow_));
   const auto append = [&](const Slot& slot) {
-    auto* pair = YAMLAlloc<YAMLMapping>::create(false);
-    pair->AddSlot(slot.key, slot.value->Clone());
-    sequence->Append(pair);
+    OwnedNodePtr<YAMLMapping> pair(YAMLAlloc<YAMLMapping>::create(false));
+    pair->slots_.reserve(1);
+    pair->slots_.push_back({slot.key, slot.value->Clone()});
+    sequence->Append(pair.get());
+    pair.release();
   };
   if (duplicates_) {
     for (const Slot& slot : *duplicates_) append(slot);
   } else {
     for (const Slot& slot : *this) append(slot);
   }
-  return sequence;
+  return sequence.release();
 }
 
 void YAMLMapping::Clear() {
@@ -202,11 +223,12 @@ void YAMLMapping::CloneInto(YAMLMapping& target) const {
   target.SetFlow(flow_);
   target.SetHash(GetHash());
   target.SetLine(GetLine());
-  target.slots_ = slots_;
-  target.gaps_ = gaps_;
-  for (Slot& slot : target.slots_) {
+  target.text_number_ = text_number_;
+  target.slots_.reserve(slots_.size());
+  for (const Slot& slot : slots_) {
+    if (slot.key == nullptr) continue;
     // Most values are scalars, which are their own copies.
-    if (slot.value != nullptr && slot.value->AsScalar() == nullptr) slot.value = slot.value->Clone();
+    target.slots_.push_back({slot.key, slot.value->AsScalar() ? slot.value : slot.value->Clone()});
   }
   target.BuildIndex();
 }
@@ -226,9 +248,9 @@ const std::vector<YAMLMapping::Slot>& YAMLMapping::GetDuplicatePairs() const {
 void YAMLMapping::Free() { YAMLAlloc<YAMLMapping>::free(this); }
 
 YAMLMapping* YAMLMapping::Clone() const {
-  auto* clone = YAMLAlloc<YAMLMapping>::create(flow_);
+  OwnedNodePtr<YAMLMapping> clone(YAMLAlloc<YAMLMapping>::create(flow_));
   CloneInto(*clone);
-  return clone;
+  return clone.release();
 }
 
 bool YAMLMapping::Equals(const YAMLNode* other) const {
@@ -256,9 +278,10 @@ void YAMLMapping::RebuildHash(bool shallow) {
   uint32_t position = 0;
   for (const Slot& slot : *this) {
     if (!shallow) slot.value->RebuildHash(false);
-    hash = Combine(Combine(Combine(hash, slot.key->GetHash()), slot.value->GetHashInParent()), position++);
+    hash = Combine(Combine(Combine(hash, slot.key->GetHash()), slot.value->GetHash()), position++);
   }
   SetHash(hash);
+  text_number_ = 0;
 }
 
 }  // namespace vexel_yaml

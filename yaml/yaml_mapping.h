@@ -52,8 +52,14 @@ class YAMLMapping : public YAMLNode {
   void SetFlow(bool flow) { flow_ = flow; }
   bool HasDuplicateKeys() const { return duplicates_ != nullptr; }
 
+  /// Two mappings that came from one text have one number, so that they need not be compared; 0 says nothing.
+  /// A copy has its original's. Like the hash it tells of what was read: RebuildHash sets it to 0.
+  uint32_t GetTextNumber() const { return text_number_; }
+  void SetTextNumber(uint32_t number) { text_number_ = number; }
+
   /// Adds a pair at the end; the mapping then owns `value`. A pair whose key is present with an equal value
-  /// is dropped (and not freed); with another value it starts duplicate-key mode. Never throws.
+  /// is dropped (and not freed); with another value it starts duplicate-key mode. Never throws a YAMLError;
+  /// where memory ran out the mapping is as it was.
   void Append(const YAMLScalar* key, YAMLNode* value);
 
   /// Keyed. Adds a pair at the end. Throws "Cannot add existing key in YAMLMapping".
@@ -133,12 +139,14 @@ class YAMLMapping : public YAMLNode {
   void AddSlot(const YAMLScalar* key, YAMLNode* value);
   void CloseGaps();
   void BuildIndex();
+  void IndexSlot(const YAMLScalar* key, size_t slot);
 
   std::vector<Slot> slots_;
   // Only for mappings with many keys: the root of a file has one an object, an object only a few.
   std::unique_ptr<Index> index_;
   std::unique_ptr<std::vector<Slot>> duplicates_;
   size_t gaps_ = 0;
+  uint32_t text_number_ = 0;
   bool flow_;
 };
 

@@ -44,8 +44,14 @@ class YAMLNode {
   virtual bool Equals(const YAMLNode* other) const = 0;
 
   /// Whether both nodes are equal to the last scalar, whatever their hashes say: of many pairs with equal
-  /// hashes some are not equal. Keys and elements must be in the same order; styles don't count.
+  /// hashes some are not equal, and such pairs are easily made on purpose. Keys and elements must be in the
+  /// same order; styles don't count.
   bool HasSameContent(const YAMLNode& other) const;
+
+  /// `Equals`, confirmed by the contents. Whoever drops an edit because two nodes are equal asks this.
+  bool EqualsByContent(const YAMLNode* other) const {
+    return other != nullptr && Equals(other) && HasSameContent(*other);
+  }
 
   /// Equality without hashes. Two mappings count as equal when their ordered key lists are.
   virtual bool EqualsExpensive(const YAMLNode* other) const = 0;
@@ -78,9 +84,6 @@ class YAMLNode {
   /// 32-bit structural hash, 0 while it is not computed. Empty mappings and sequences have 0, too.
   uint32_t GetHash() const { return hash_; }
   void SetHash(uint32_t hash) { hash_ = hash; }
-
-  /// What this node adds to its parent's hash: an empty list must not look like an empty mapping there.
-  uint32_t GetHashInParent() const { return hash_ == 0 && kind_ == Kind::kSequence ? 1 : hash_; }
 
   /// 0-based line, within the text of its own document, at which the reader last saw this node start; 0 for
   /// a node built in memory. A scalar, being shared, knows its latest occurrence only.

@@ -1,14 +1,16 @@
 #include "yaml/yaml_scalar.h"
 
 #include <array>
-#include <functional>
+#include <climits>
 #include <locale>
 #include <sstream>
 #include <unordered_set>
 
 #include "platform/mutex.h"
+#include "platform/text_hash.h"
 #include "yaml/murmur_hash.h"
 #include "yaml/yaml_alloc.h"
+#include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 
@@ -20,13 +22,9 @@ struct Probe {
   uint64_t hash;
 };
 
-// Not a sum with a small factor: texts that collide in one are made by hand, and a file of them would take
-// minutes to read.
-uint64_t RegistryHash(std::string_view text) { return std::hash<std::string_view>()(text); }
-
 struct YAMLScalarPointerCompare {
   using is_transparent = void;
-  size_t operator()(const YAMLScalar* scalar) const { return RegistryHash(scalar->GetText()); }
+  size_t operator()(const YAMLScalar* scalar) const { return HashText(scalar->GetText()); }
   size_t operator()(const Probe& probe) const { return probe.hash; }
   bool operator()(const YAMLScalar* a, const YAMLScalar* b) const { return a->GetText() == b->GetText(); }
   bool operator()(const Probe& a, const YAMLScalar* b) const { return a.text == b->GetText(); }
@@ -50,6 +48,33 @@ const YAMLScalar* LookupInRegistry(const Probe& probe) {
   const YAMLScalar* scalar = YAMLAlloc<YAMLScalar>::create(probe.text);
   shard.s_YAMLScalarSet.insert(scalar);
   return scalar;
+}
+
+// The length of the UTF-8 sequence that `text`, which is not empty, starts with; 0 where it starts with none.
+size_t Utf8SequenceLength(std::string_view text) {
+  const auto byte = [&](size_t i) { return static_cast<unsigned char>(text[i]); };
+  const unsigned char first = byte(0);
+  if (first < 0x80) return 1;
+  const size_t length = first >= 0xF0 ? 4 : first >= 0xE0 ? 3 : 2;
+  if (first < 0xC2 || first > 0xF4 || text.size() < length) return 0;
+  uint32_t value = first & (0x7FU >> length);
+  for (size_t i = 1; i < length; ++i) {
+    if ((byte(i) & 0xC0) != 0x80) return 0;
+    value = value << 6 | (byte(i) & 0x3FU);
+  }
+  // Longer than it needs to be, half of a UTF-16 pair, or beyond the last character.
+  constexpr uint32_t kFirstOfLength[] = {0x80, 0x800, 0x10000};
+  const bool is_surrogate = value >= 0xD800 && value <= 0xDFFF;
+  return value < kFirstOfLength[length - 2] || is_surrogate || value > 0x10FFFF ? 0 : length;
+}
+
+bool IsUtf8(std::string_view text) {
+  while (!text.empty()) {
+    const size_t length = Utf8SequenceLength(text);
+    if (length == 0) return false;
+    text.remove_prefix(length);
+  }
+  return true;
 }
 
 }  // namespace
@@ -87,7 +112,8 @@ const YAMLScalar* YAMLScalar::gameObject;
 const YAMLScalar* YAMLScalar::mComponent;
 const YAMLScalar* YAMLScalar::mGameObject;
 
-YAMLScalar::YAMLScalar(std::string_view text) : YAMLNode(Kind::kScalar), text_(text) {
+YAMLScalar::YAMLScalar(std::string_view text)
+    : YAMLNode(Kind::kScalar), text_(text), is_writable_(text.size() <= INT_MAX && IsUtf8(text)) {
   SetHash(MurmurHash3(text, 42));
 }
 
@@ -95,10 +121,15 @@ const YAMLScalar* YAMLScalar::Lookup(std::string_view text) {
   // Three reader threads ask for the same few thousand texts again and again: most are found here, without
   // the lock.
   thread_local std::array<const YAMLScalar*, 8192> recent = {};
-  const Probe probe = {text, RegistryHash(text)};
+  const Probe probe = {text, HashText(text)};
   const YAMLScalar*& slot = recent[(probe.hash ^ (probe.hash >> 13) ^ (probe.hash >> 29)) % recent.size()];
   if (slot == nullptr || slot->text_ != text) slot = LookupInRegistry(probe);
   return slot;
+}
+
+void YAMLScalar::RefuseToWrite() const {
+  throw YAMLError(text_.size() > INT_MAX ? "Cannot write a value of 2 GiB or more"
+                                         : "Cannot write a value that is not UTF-8");
 }
 
 void YAMLScalar::initializeConstants() {

@@ -30,6 +30,12 @@ class YAMLScalar final : public YAMLNode {
   int32_t GetIntValue() const;
   float GetFloatValue() const;
 
+  /// Throws YAMLError "Cannot write a value that is not UTF-8" or "Cannot write a value of 2 GiB or more": a
+  /// file that holds this text could not be read again, or libyaml can't count its bytes.
+  void CheckWritable() const {
+    if (!is_writable_) RefuseToWrite();
+  }
+
   /// Whether this is a key that stands for a part of an object's header line.
   bool IsPseudoKey() const {
     return this == fileIDPlaceHolderName || this == classIDPlaceHolderName ||
@@ -88,7 +94,11 @@ class YAMLScalar final : public YAMLNode {
 
   explicit YAMLScalar(std::string_view text);
 
+  [[noreturn]] void RefuseToWrite() const;
+
   std::string text_;
+  // Found out once: what is written is asked for it at every occurrence.
+  bool is_writable_;
 };
 
 inline const YAMLScalar* YAMLNode::AsScalar() const {

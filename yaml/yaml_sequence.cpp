@@ -34,12 +34,12 @@ std::vector<YAMLNode*> YAMLSequence::SwapItems(std::vector<YAMLNode*> items) {
 }
 
 YAMLSequence* YAMLSequence::StaticClone() const {
-  auto* clone = YAMLAlloc<YAMLSequence>::create(flow_);
+  OwnedNodePtr<YAMLSequence> clone(YAMLAlloc<YAMLSequence>::create(flow_));
   clone->Reserve(items_.size());
   for (const YAMLNode* item : items_) clone->Append(item == nullptr ? nullptr : item->Clone());
   clone->SetHash(GetHash());
   clone->SetLine(GetLine());
-  return clone;
+  return clone.release();
 }
 
 void YAMLSequence::Free() { YAMLAlloc<YAMLSequence>::free(this); }
@@ -71,7 +71,7 @@ void YAMLSequence::RebuildHash(bool shallow) {
   uint32_t hash = 0;
   for (size_t i = 0; i < items_.size(); ++i) {
     if (!shallow && items_[i] != nullptr) items_[i]->RebuildHash(false);
-    const uint32_t item_hash = items_[i] == nullptr ? 0 : items_[i]->GetHashInParent();
+    const uint32_t item_hash = items_[i] == nullptr ? 0 : items_[i]->GetHash();
     hash = Combine(Combine(hash, item_hash), static_cast<uint32_t>(i));
   }
   SetHash(hash);

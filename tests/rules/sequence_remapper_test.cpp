@@ -1,11 +1,13 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <random>
 #include <stdexcept>
 
 #include "tests/support/yaml_text.h"
 #include "yaml/yaml_alloc.h"
+#include "yaml/yaml_mapping.h"
 
 namespace vexel_yaml {
 namespace {
@@ -125,12 +127,21 @@ TEST(FindGenericMapping, PairsWithTheFirstEqualElementThatIsLeft) {
 TEST(FindGenericMapping, LongListsOfChangedElementsStayAffordable) {
   const OwnedNode base = ValueFromText("[moved]");
   const OwnedNode changed = ValueFromText("[]");
+  // All with one hash, as if made to collide.
+  const auto append = [](const OwnedNode& list, int number) {
+    auto* element = YAMLAlloc<YAMLMapping>::create(true);
+    element->Append(YAMLScalar::fileID, YAMLScalar::LookupValue(IntToString(number)));
+    element->SetHash(7);
+    list->AsSequence()->Append(element);
+  };
+  const auto start = std::chrono::steady_clock::now();
   for (int i = 0; i < 100000; ++i) {
-    base->AsSequence()->Append(YAMLScalar::LookupValue(IntToString(i)));
-    changed->AsSequence()->Append(YAMLScalar::LookupValue(IntToString(i + 200000)));
+    append(base, i);
+    append(changed, i + 200000);
   }
   changed->AsSequence()->Append(YAMLScalar::LookupValue("moved"));
   EXPECT_EQ(MatchByEquality(base, changed)->GetMapping()[0], 100000);
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
 }
 
 TEST(Apply, MovesElementsAndLeavesSlotsForAdditions) {

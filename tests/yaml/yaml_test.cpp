@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <chrono>
+#include <new>
 #include <random>
 #include <sstream>
 #include <thread>
@@ -26,6 +27,28 @@ TEST(YAMLScalar, ThreadsAgreeOnOneScalarAText) {
       });
   }
   for (const auto& scalars : found) EXPECT_TRUE(scalars == found[0]);
+}
+
+uint64_t Invert(uint64_t odd) {
+  uint64_t inverse = odd;
+  for (int i = 0; i < 6; ++i) inverse *= 2 - odd * inverse;
+  return inverse;
+}
+
+// Texts with one hash in the standard library, in which the second block takes back what the first one did.
+TEST(YAMLScalar, TextsMadeToCollideAreInternedQuickly) {
+  constexpr uint64_t kFactor = 0xC6A4A7935BD1E995;
+  const auto mix = [](uint64_t block) { return ((block * kFactor) ^ ((block * kFactor) >> 47)) * kFactor; };
+  const auto unmix = [](uint64_t mixed) {
+    mixed *= Invert(kFactor);
+    return (mixed ^ (mixed >> 47)) * Invert(kFactor);
+  };
+  const auto start = std::chrono::steady_clock::now();
+  for (uint64_t i = 0; i < 60'000; ++i) {
+    const uint64_t blocks[] = {unmix(mix(0) ^ i), unmix(mix(1) ^ (i * kFactor))};
+    YAMLScalar::Lookup({reinterpret_cast<const char*>(blocks), sizeof blocks});
+  }
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
 }
 
 // A mapping and its plainest model go through the same edits, ever more additions among the removals, so that
@@ -68,7 +91,10 @@ TEST(YAMLMapping, BehavesLikeAListOfPairs) {
 
 TEST(YAMLMapping, ARepeatedKeyStartsDuplicateKeyMode) {
   EXPECT_EQ(ValueFromText("{a: [1], b: 2, a: [1]}")->AsMapping()->Size(), 2);
+  // Two values with one hash.
+  EXPECT_TRUE(ValueFromText("{a: [32.870, 0], a: [35.014, 0]}")->AsMapping()->HasDuplicateKeys());
   const OwnedNode node = ValueFromText("{a: 1, b: 2, a: 3, b: 2}");
+  EXPECT_THROW(node->AsMapping()->end(), YAMLError);
   EXPECT_THROW(node->AsMapping()->Size(), YAMLError);
   EXPECT_EQ(node->GetYAMLString(), "{a: 1, b: 2, a: 3, b: 2}");
   EXPECT_EQ(OwnedNode(node->AsMapping()->ToSequence())->GetYAMLString(), "[{a: 1}, {b: 2}, {a: 3}, {b: 2}]");
@@ -80,6 +106,8 @@ TEST(StructuralHash, OfWhatWasReadIsTheOneRebuilt) {
   objects->RebuildHash(false);
   EXPECT_EQ(objects->GetHash(), read);
   EXPECT_NE(ObjectsFromText("--- !v!1 &1\nA: 1\nB: [1, {x: 1}]\n")->GetHash(), read);
+  // Both hash to 0, whatever they stand in.
+  EXPECT_EQ(ValueFromText("{a: [[]]}")->GetHash(), ValueFromText("{a: [{}]}")->GetHash());
 }
 
 TEST(YAMLAlloc, KeepsALimitedNumberOfSpares) {
@@ -87,6 +115,19 @@ TEST(YAMLAlloc, KeepsALimitedNumberOfSpares) {
   for (YAMLMapping*& mapping : mappings) mapping = YAMLAlloc<YAMLMapping>::create(false);
   for (YAMLMapping* mapping : mappings) mapping->Free();
   EXPECT_EQ(YAMLAlloc<YAMLMapping>::create(false), mappings[300]);
+}
+
+struct Fragile {
+  explicit Fragile(bool breaks) {
+    if (breaks) throw std::bad_alloc();
+  }
+  void ResetForAlloc() {}
+};
+
+TEST(YAMLAlloc, AnObjectThatCannotBeMadeLeavesItsStorage) {
+  Fragile* first = YAMLAlloc<Fragile>::create(false);
+  EXPECT_THROW(YAMLAlloc<Fragile>::create(true), std::bad_alloc);
+  EXPECT_EQ(YAMLAlloc<Fragile>::create(false), first + sizeof(void*));
 }
 
 const std::string kHeader = "%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n";
@@ -99,7 +140,7 @@ std::string Read(const std::string& text, DocumentCache* cache = nullptr) try {
   objects.Output(out);
   return out.str();
 } catch (const YAMLError& error) {
-  return error.what();
+  return error.what() + (error.GetHint().empty() ? "" : " | " + error.GetHint());
 }
 
 TEST(ReadAndWrite, KeepsOrderStylesAndFraming) {
@@ -124,11 +165,12 @@ TEST(ReadAndWrite, EmptySlotsAreLeftOutAndPseudoKeysStandLast) {
   EXPECT_EQ(objects->First()->GetYAMLString(), "A: 1\nB: [2]\nMERGE_FileID: 2\nMERGE_ClassID: 1");
 }
 
-TEST(ReadAndWrite, BrokenTextIsRefusedWithItsLine) {
+TEST(ReadAndWrite, BrokenTextIsRefusedWithItsPlace) {
   const std::string first = kHeader + "--- !v!1 &1\nA: 1\n";
-  EXPECT_EQ(Read(kHeader + "--- !v!1 &1"), "Error locating end of document sequence");
-  EXPECT_EQ(Read(first + "--- !v!1 &2\n- 1\n"), "The object is not a mapping at line 5");
-  EXPECT_EQ(Read(first + "...\nB: 2\n"), "did not find expected <document start> at line 6");
+  EXPECT_EQ(Read(kHeader + "--- !v!1 &1"), "Error locating end of document sequence | see line 3, object 1");
+  EXPECT_EQ(Read(first + "--- !v!1 &2\n- 1\n"), "The object is not a mapping | see line 5, object 2");
+  EXPECT_EQ(Read(first + "...\nB: 2\n"), "did not find expected <document start> | see line 6, object 1");
+  EXPECT_EQ(Read("%YAML 1.1\n# A\n\n--- 1\n"), "The object is not a mapping | see line 4");
   EXPECT_EQ(Read(first + "--- !v!1 &1\nA: 1\n"), first);
   EXPECT_EQ(Read(first + "--- !v!1 &1\nA: 2\n"),
             "Cannot perform this operation on a YAML file with duplicate keys");
@@ -136,12 +178,38 @@ TEST(ReadAndWrite, BrokenTextIsRefusedWithItsLine) {
   DocumentCache cache;
   for (int reader = 0; reader < 3; ++reader)
     EXPECT_EQ(Read(first + "--- !v!1 &2\n- 1\n--- !v!1 &3\nA: 1\n--- !v!1 &4\nA: }\n", &cache),
-              "The object is not a mapping at line 5");
+              "The object is not a mapping | see line 5, object 2");
+  // Two contents with one hash are no copies of one object.
+  EXPECT_EQ(Read(first + "--- !v!1 &2\nA: [32.870, 0]\n--- !v!1 &2\nA: [35.014, 0]\n"),
+            "Cannot perform this operation on a YAML file with duplicate keys");
+}
+
+TEST(ReadAndWrite, WhatCannotBeWrittenIsFoundBefore) {
+  const auto refusal = [](VexelObjects& objects) -> std::string {
+    std::ostringstream out;
+    EXPECT_THROW(objects.Output(out), YAMLError);
+    try {
+      objects.CheckWritable();
+    } catch (const YAMLError& error) {
+      return error.what() + (" | " + error.GetHint());
+    }
+    return "";
+  };
+  EXPECT_EQ(refusal(*ObjectsFromText("--- !v!1 &1\nA: 1\n--- &2\nA: 1\n")),
+            "Cannot write an object without class ID or file ID: '2' | see object 2");
+  const auto objects = ObjectsFromText("--- !v!1 &3\nA: {list: []}\n");
+  objects->CheckWritable();
+  YAMLMapping& body = *objects->First()->AsMapping()->First()->AsMapping();
+  for (const char* text : {"\xFF", "\xC0\xAF", "\xED\xA0\x80", "\xF4\x90\x80\x80", "a\xE2\x82"}) {
+    body.First()->AsSequence()->Append(YAMLScalar::LookupValue(text));
+    EXPECT_EQ(refusal(*objects), "Cannot write a value that is not UTF-8 | see object 3");
+    body.First()->AsSequence()->ResetForAlloc();
+  }
 }
 
 TEST(ReadAndWrite, HostileNestingIsRefusedQuickly) {
   const std::string document = kHeader + "--- !v!1 &1\n";
-  const std::string deep = "YAML nesting is deeper than 1000 levels at line 3";
+  const std::string deep = "YAML nesting is deeper than 1000 levels | see line 3, object 1";
   std::string chain = document + "A:\n- &a0 []\n";
   std::string bomb = document + "A:\n- &a0 [x]\n";
   for (int i = 1; i < 1500; ++i) {
@@ -153,7 +221,16 @@ TEST(ReadAndWrite, HostileNestingIsRefusedQuickly) {
   const auto start = std::chrono::steady_clock::now();
   EXPECT_EQ(Read(document + "A: " + std::string(100'000, '[') + "\n"), deep);
   EXPECT_EQ(Read(chain), deep);
-  EXPECT_EQ(Read(bomb), "YAML aliases expand to more than 10000000 nodes at line 3");
+  EXPECT_EQ(Read(bomb), "YAML aliases expand to more than 10000000 nodes | see line 3, object 1");
+  // Spread over the objects of one file, and with every anchor a long way from its aliases.
+  std::string anchors = kHeader, aliases = document + "A:\n";
+  for (int i = 0; i < 10'001; ++i) {
+    anchors += "--- !v!1 &" + std::to_string(i) + "\nA: [&a x, *a]\n";
+    if (i < 10'000) aliases += "- &a" + std::to_string(i) + " x\n";
+  }
+  for (int i = 0; i < 200'000; ++i) aliases += "- *a9999\n";
+  EXPECT_EQ(Read(anchors), "YAML file holds more than 10000 anchors | see line 20003, object 10000");
+  EXPECT_EQ(Read(aliases), "YAML aliases refer to too many anchors | see line 3, object 1");
   EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(30));
   EXPECT_NE(Read(document + "A: " + std::string(999, '[') + std::string(999, ']') + "\n"), deep);
 }
