@@ -7,10 +7,6 @@ namespace vexel_yaml {
 
 namespace {
 
-void AppendPresent(YAMLMapping& object, const YAMLScalar* key, YAMLNode* value) {
-  if (value != nullptr) object.Append(key, value);
-}
-
 std::string_view TextOf(const YAMLNode* value) {
   const YAMLScalar* scalar = value == nullptr ? nullptr : value->AsScalar();
   return scalar == nullptr ? std::string_view() : std::string_view(scalar->GetText());
@@ -46,6 +42,27 @@ void CheckValues(const YAMLNode& node) {
   }
 }
 
+// Takes the pseudo keys out of an object and puts them back at its end, also when it can't be written.
+struct TakenPseudoKeys {
+  explicit TakenPseudoKeys(YAMLMapping& from)
+      : object(from),
+        file_id(object.Steal(YAMLScalar::fileIDPlaceHolderName)),
+        class_id(object.Steal(YAMLScalar::classIDPlaceHolderName)),
+        stripped(object.Steal(YAMLScalar::strippedPrefabPlaceHolderName)) {}
+  TakenPseudoKeys(const TakenPseudoKeys&) = delete;
+  TakenPseudoKeys& operator=(const TakenPseudoKeys&) = delete;
+  ~TakenPseudoKeys() {
+    object.Append(YAMLScalar::fileIDPlaceHolderName, file_id);
+    object.Append(YAMLScalar::classIDPlaceHolderName, class_id);
+    if (stripped != nullptr) object.Append(YAMLScalar::strippedPrefabPlaceHolderName, stripped);
+  }
+
+  YAMLMapping& object;
+  YAMLNode* file_id;
+  YAMLNode* class_id;
+  YAMLNode* stripped;
+};
+
 }  // namespace
 
 void VexelObjects::CheckWritable() const {
@@ -62,15 +79,10 @@ void VexelObjects::CheckWritable() const {
 void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) {
   CheckHeader(slot, headers);
   YAMLMapping* object = slot.value->AsMapping();
-  YAMLNode* file_id = object->Steal(YAMLScalar::fileIDPlaceHolderName);
-  YAMLNode* class_id = object->Steal(YAMLScalar::classIDPlaceHolderName);
-  YAMLNode* stripped = object->Steal(YAMLScalar::strippedPrefabPlaceHolderName);
-  out << "--- !v!" << TextOf(class_id) << " &" << TextOf(file_id);
-  if (stripped != nullptr) out << " stripped";
+  const TakenPseudoKeys taken(*object);
+  out << "--- !v!" << TextOf(taken.class_id) << " &" << TextOf(taken.file_id);
+  if (taken.stripped != nullptr) out << " stripped";
   out << '\n' << object->GetYAMLString() << '\n';
-  AppendPresent(*object, YAMLScalar::fileIDPlaceHolderName, file_id);
-  AppendPresent(*object, YAMLScalar::classIDPlaceHolderName, class_id);
-  AppendPresent(*object, YAMLScalar::strippedPrefabPlaceHolderName, stripped);
 }
 
 void VexelObjects::OutputHeader(std::ostream& out) const {
