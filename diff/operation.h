@@ -107,10 +107,9 @@ class AddOperation final : public ValuedOperation {
 
 class ChangeMappingOperation final : public Operation {
  public:
-  /// Owns `diff`.
+  /// `diff` is given back to its pool together with the operation.
   ChangeMappingOperation(YAMLMappingDiff* diff, bool mergeable)
       : Operation(Kind::kChangeMapping, mergeable), diff_(diff) {}
-  ~ChangeMappingOperation() { ResetForAlloc(); }
   void ResetForAlloc();
   void Output(YAMLDiffOutput& out) const override;
   void Apply(YAMLMapping& mapping, const YAMLScalar* key) const override;
@@ -131,10 +130,10 @@ class ChangeMappingOperation final : public Operation {
 
 class ChangeSequenceOperation final : public Operation {
  public:
-  /// Owns `diff` and `remapper`, which may be null: nothing moves.
+  /// `diff` and `remapper` are given back to their pools together with the operation. `remapper` may be null:
+  /// nothing moves.
   ChangeSequenceOperation(YAMLSequenceDiff* diff, YAMLSequenceRemapper* remapper, bool mergeable)
       : Operation(Kind::kChangeSequence, mergeable), remapper_(remapper), diff_(diff) {}
-  ~ChangeSequenceOperation() { ResetForAlloc(); }
   void ResetForAlloc();
   void Output(YAMLDiffOutput& out) const override;
   void Apply(YAMLMapping& mapping, const YAMLScalar* key) const override;

@@ -73,25 +73,17 @@ class YAMLAlloc {
   static void free(T* object) noexcept {
     if (object == nullptr) return;
     Count(freed);
-    size_t spares = 0;
-    {
-      AutoLock lock(s_Mutex);
-      spares = s_SpareCount;
-    }
     // Outside the lock: emptying a tree gives its children back, to this pool and to others.
-    if (spares < kMostSpares) {
-      object->ResetForAlloc();
-      AutoLock lock(s_Mutex);
-      if (s_SpareCount < kMostSpares) {
-        // Spares stay open: what their members still own must be seen by a leak check.
-        s_Spares[s_SpareCount++] = object;
-        s_Returned.fetch_add(1, std::memory_order_relaxed);
-        return;
-      }
-    }
-    std::destroy_at(object);
+    object->ResetForAlloc();
     AutoLock lock(s_Mutex);
-    LeaveVacant(object);
+    if (s_SpareCount < kMostSpares) {
+      // Spares stay open: what their members still own must be seen by a leak check.
+      s_Spares[s_SpareCount++] = object;
+      s_Returned.fetch_add(1, std::memory_order_relaxed);
+    } else {
+      std::destroy_at(object);
+      LeaveVacant(object);
+    }
   }
 
   /// Statistics. Threads may lose one another's increments.
