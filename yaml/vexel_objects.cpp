@@ -52,9 +52,13 @@ struct TakenPseudoKeys {
   TakenPseudoKeys(const TakenPseudoKeys&) = delete;
   TakenPseudoKeys& operator=(const TakenPseudoKeys&) = delete;
   ~TakenPseudoKeys() {
-    object.Append(YAMLScalar::fileIDPlaceHolderName, file_id);
-    object.Append(YAMLScalar::classIDPlaceHolderName, class_id);
-    if (stripped != nullptr) object.Append(YAMLScalar::strippedPrefabPlaceHolderName, stripped);
+    PutBack(YAMLScalar::fileIDPlaceHolderName, file_id);
+    PutBack(YAMLScalar::classIDPlaceHolderName, class_id);
+    PutBack(YAMLScalar::strippedPrefabPlaceHolderName, stripped);
+  }
+
+  void PutBack(const YAMLScalar* key, YAMLNode* value) {
+    if (value != nullptr) object.Append(key, value);
   }
 
   YAMLMapping& object;
