@@ -18,6 +18,8 @@ namespace vexel_yaml {
 
 namespace {
 
+constexpr const char* kDataFilesVariable = "VEXEL_DATA_FILES";
+
 // Paths come from repositories: a file named "$(...)" must not run anything on the machine that merges it.
 void AppendEscaped(const std::string& path, std::string& text) {
   for (const char c : VexelToNativePath(path)) {
@@ -86,6 +88,8 @@ int FallbackMergeTool(const std::string& base, const std::string& left, const st
   const std::string arguments = SubstituteMergePlaceholderFilePaths(entry.arguments, base, left, right, dest);
   if (!FileExists(dest)) std::ofstream(VexelToNativePath(dest), std::ios::binary);
 
+  // For lists that name a script of the program's, whose folder they can't know.
+  setenv(kDataFilesVariable, GetDataFilesDir().c_str(), 1);
   int error_number = 0;
   const int result = RunInShell('"' + entry.tool + "\" " + arguments, error_number);
   if (result == -1 || (result == 0 && error_number == ENOENT)) {

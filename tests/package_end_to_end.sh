@@ -35,6 +35,8 @@ works() {
     grep -qx -- '--- !v!1 &101500' merged &&
     "$bin/vexel-merge-report" --conflicts "$examples"/{base,left,right}.vexel >conflicts &&
     grep -q '^500302.Light.m_Intensity' conflicts &&
+    fails_with 1 env CI=true "$bin/VexelYAMLMerge" merge -h "$examples"/{base,left,right}.vexel left_out 2>said &&
+    grep -q '^No merge tool was started: ' said &&
     "$bin/vexel-merge-git" --version >printed && grep -qxF "vexel-merge-git $version" printed
 }
 # In the folder's own terms: a link that leaves it would work only on this machine.
