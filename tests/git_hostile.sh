@@ -12,7 +12,7 @@ long="$(printf 'n%.0s' {1..230}).vexel"
 odd=('-$(touch pwned).vexel' $'folder\n/last\n.vexel\n' '*.vexel' $'\e[31mred \u9b.vexel' "$long" 'a=%P "\101.vexel')
 guarded=(link.vexel file.vexel folder.vexel)
 # What outside looks like, and what is tracked beside the assets.
-outside() { (cd "$work/outside" && find . -ls | awk '{$1 = ""; print}' && find . -type f -exec cat {} +); }
+outside() { (cd "$work" && find outside repository -ls | awk '{$1 = ""; print}' && find outside repository -type f -exec cat {} +); }
 untouched() { check "nothing outside is touched: $1" cmp <(outside) "$work/before"; }
 is_clean() { [ -z "$(git status --porcelain --ignored)" ]; }
 # all_scenes INTENSITY: with a key that tries to be a record.
@@ -22,11 +22,12 @@ all_scenes() {
   done
 }
 
-mkdir "$work/outside" "$work/repository" && cd "$work/repository"
+# Another repository is where a command's output, which loses the line breaks at its end, would lead to.
+git init -q "$work/repository" && mkdir "$work/outside" "$work/repository"$'\n' && cd "$work/repository"$'\n'
 mkdir "$work/outside/dir" && echo mine | tee "$work"/outside/{attributes,record,asset,edited,page,own} >/dev/null
 git init -q -b main && mkdir $'folder\n' dir
 ln -s ../outside/attributes .gitattributes.vexel-new
-ln -s ../outside/page report.html
+ln -s ../outside/page report.html && ln -s ../outside folder.link
 for name in "${guarded[@]}"; do
   ln -s ../outside/record "$name.vexel-conflicts.new"
   ln -s ../outside/asset "$name.vexel-new"
@@ -54,6 +55,9 @@ check "no other file has changed" refuses grep -qv '^UU\|^A  dir/' <(git status 
 vexel-merge-git resolve . >/dev/null 2>"$work/err" || :
 check "a record that nobody has edited settles nothing" test "$(conflicts)" -eq "$number"
 vexel-merge-git report -- "$long" file.vexel >/dev/null
+for link in report.html dir/../report.html folder.link/page; do
+  check "no page goes through $link" refuses vexel-merge-git report -o "$link" -- file.vexel 2>/dev/null
+done
 untouched "resolve and report"
 check "no default page goes through a link" refuses vexel-merge-report link.vexel link.vexel link.vexel 2>"$work/err"
 check "the page's name is said" grep -qF report.html "$work/err"

@@ -30,12 +30,34 @@ is_plain() (
   [ ! -e "$way" ] || [ -f "$way" ]
 )
 
+# leaves_top PATH: whether a symbolic link of the work tree, which is at $top, is on the way to this absolute path.
+leaves_top() (
+  way=$1
+  while [ -n "$way" ]; do
+    if [ -h "$way" ] && cd -P "${way%/*}/"; then
+      case $PWD/ in
+        "${top%/}"/*) return 0 ;;
+      esac
+    fi
+    way=${way%/*}
+  done
+  return 1
+)
+
 lacks_final_newline() { [ -s "$1" ] && [ -n "$(tail -c 1 "$1")" ]; }
 
+# A command's output loses the line breaks at its end, which a folder's name can have: another folder may be left.
 go_to_top() {
-  top=$(git rev-parse --show-toplevel) || exit 128
+  top=$(git rev-parse --show-toplevel && echo .) || exit 128
+  top=${top%??}
   cd "$top" || exit 1
 }
+
+# common_path NAME: the same for all work trees of the repository.
+common_path() (
+  common=$(git rev-parse --git-common-dir && echo .) || exit 128
+  printf '%s/%s\n' "${common%??}" "$1"
+)
 
 # git_path NAME: where the repository keeps this file of its own.
 git_path() { git rev-parse --git-path "$1"; }
@@ -43,7 +65,8 @@ git_path() { git rev-parse --git-path "$1"; }
 # Sets $scratch to a new folder, which goes with the process. In the repository, where nobody else looks and
 # where there is as much room as the files themselves take.
 make_scratch() {
-  scratch=$(mktemp -d "$(git rev-parse --absolute-git-dir)/vexel-merge.XXXXXX")
+  scratch=$(git rev-parse --absolute-git-dir && echo .)
+  scratch=$(mktemp -d "${scratch%??}/vexel-merge.XXXXXX")
   trap 'rm -rf "$scratch"' EXIT
   trap 'exit 129' HUP
   trap 'exit 130' INT
@@ -53,7 +76,7 @@ make_scratch() {
 # locked COMMAND...: while no other process of ours is in here, from whichever work tree of the repository. One that was
 # killed may have left the lock: nobody holds it for long, so that after ten seconds it doesn't count any more.
 locked() (
-  lock=$(git rev-parse --git-common-dir)/vexel-merge.lock
+  lock=$(common_path vexel-merge.lock)
   tries=0
   until mkdir "$lock" 2>/dev/null || [ "$tries" -ge 100 ]; do
     tries=$((tries + 1))

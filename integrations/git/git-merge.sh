@@ -12,7 +12,7 @@ read_rule_options() {
     if [ "$status" -ne 0 ] || [ -z "$value" ]; then die "vexel.$option in git's configuration must be a path"; fi
     case $value in
       /*) ;;
-      *) value=$(pwd)/$value ;;
+      *) value=$PWD/$value ;;
     esac
     options="$options --$option $(quoted "$value")"
   done

@@ -92,7 +92,7 @@ decided_in() {
 exclude_records() (
   exclude=$(exclude_file)
   [ -n "$exclude" ] || return 0
-  state=$(git rev-parse --git-common-dir)/vexel-merge
+  state=$(common_path vexel-merge)
   set_block "$exclude" exclude "*$record_suffix"
 )
 exclude_file() {
@@ -109,7 +109,7 @@ remove_record() (
 # Git tells nobody that a merge was aborted, or a file added by hand, but it has a hook for every change of the
 # index. Ours is there only as long as a record is, and never in place of another one.
 hook_path() {
-  hooks=$(git rev-parse --git-common-dir)/hooks
+  hooks=$(common_path hooks)
   if [ -h "$hooks" ] || git config --get core.hooksPath >/dev/null; then return 0; fi
   printf '%s/post-index-change\n' "$hooks"
 }
@@ -162,8 +162,7 @@ sweep() (
 
 # Whether any work tree of this repository has a record.
 has_records() (
-  common=$(git rev-parse --git-common-dir)
-  for folder in "$common/vexel-merge-records" "$common"/worktrees/*/vexel-merge-records; do
+  for folder in "$(common_path vexel-merge-records)" "$(common_path worktrees)"/*/vexel-merge-records; do
     if [ -d "$folder" ]; then return 0; fi
   done
   return 1

@@ -24,7 +24,7 @@ report() {
   page_shown=$page
   case $page in
     '' | /*) ;;
-    *) page=$(pwd)/$page ;;
+    *) page=$PWD/$page ;;
   esac
   make_scratch
   if [ -n "$commit" ]; then
@@ -95,6 +95,7 @@ report_listed() {
   if [ -n "$page" ] && [ "$(wc -l <"$scratch/assets")" -gt 1 ]; then
     die "-o takes one file's page; name its path behind --"
   fi
+  if [ -n "$page" ] && leaves_top "$page"; then die "$page_shown lies behind a symbolic link of the work tree, or is one"; fi
   outcome=0
   while IFS= read -r line; do
     path_of "$line"
@@ -119,7 +120,7 @@ report_asset() {
   fi
   case $target in
     /*) ;;
-    *) target=$(pwd)/$target ;;
+    *) target=$PWD/$target ;;
   esac
   title=$asset
   [ -z "$commit" ] || title="$asset, the parents of $(git rev-parse --short "$commit") merged anew"

@@ -38,9 +38,9 @@ use_scope() {
     if [ ! -e "$config" ] && [ -e "$user_folder/config" ]; then config=$user_folder/config; fi
   else
     go_to_top
-    state=$(git rev-parse --git-common-dir)/vexel-merge
+    state=$(common_path vexel-merge)
     attributes=.gitattributes
-    config=$(git rev-parse --git-common-dir)/config
+    config=$(common_path config)
   fi
 }
 
@@ -143,7 +143,7 @@ enable() {
   if [ "$scope" = local ]; then is_plain "$attributes" || die "git follows no symbolic link or folder at $attributes"; fi
   for_wanted_keys check_key
   block_part "$attributes" inside >/dev/null
-  mkdir -p "$(dirname "$state")"
+  mkdir -p "${state%/*}"
   keep_configuration
   for_wanted_keys set_key
   [ ! -f "$state.before" ] || cp "$config" "$state.after"
