@@ -51,6 +51,7 @@ check "the merge stops" refuses git merge -q left >/dev/null 2>"$work/err"
 untouched merge
 check "each scene is in conflict" test "$(conflicts)" -eq "$number"
 check "each conflict has a record" test "$(grep -c ', listed in ' "$work/err")" -eq "$number"
+check "a record of theirs is none" refuses grep -qF 'dir/x.vexel.vexel-conflicts; to settle' "$work/err"
 check "no other file has changed" refuses grep -qv '^UU\|^A  dir/' <(git status --porcelain)
 vexel-merge-git resolve . >/dev/null 2>"$work/err" || :
 check "a record that nobody has edited settles nothing" test "$(conflicts)" -eq "$number"
@@ -77,6 +78,15 @@ done
 git merge --abort
 check "an aborted merge leaves nothing" is_clean
 check "no list and no hook either" test ! -e .git/vexel-merge-records -a ! -e .git/hooks/post-index-change
+git cherry-pick left >/dev/null 2>&1 || vexel-merge-git status >"$work/out"
+check "nor is one of theirs that git brings last" grep -q '^  its record is .git/' <(grep -A 1 dir/x.vexel "$work/out")
+GIT_EDITOR="sed -i 's/^# left.right.base/left/'" vexel-merge-git resolve dir/x.vexel >/dev/null 2>&1 || :
+check "the record that is ours counts" grep -qFx '  m_Intensity: 1' dir/x.vexel
+cp -R .git/vexel-merge-records "$work" && git cherry-pick --abort
+cp -R "$work/vexel-merge-records" .git && touch .git/index.lock && vexel-merge-git status >/dev/null
+check "while git is at work, no record goes" test -e .git/vexel-merge-records
+rm .git/index.lock && vexel-merge-git status >/dev/null
+check "and then all do" test ! -e .git/vexel-merge-records
 untouched "all of it"
 
 # Two work trees at once: the hook must not go with the last record of one while the other one gets its first.

@@ -7,7 +7,8 @@ record=
 # find_record PATH: sets $record to this asset's record, empty where it has none, $beside and $kept to the places for
 # one, and $entry to what we remember of it. Only what is remembered is ours: a file of this name that the repository
 # tracks, or that somebody else has put there, is neither read nor written. Then, and where the name would be too long
-# or lies behind a symbolic link, the record is kept in git's folder.
+# or lies behind a symbolic link, the record is the one that is kept in git's folder. There is one in any case, since
+# git checks out what the other side has added only after the merge, also over the one beside the asset.
 find_record() {
   records=$(git_path vexel-merge-records)
   record_id=$(printf '%s' "$1" | git hash-object --stdin)
@@ -15,17 +16,32 @@ find_record() {
   kept=$records/$record_id$record_suffix
   entry=$records/$record_id.path
   record=
-  if [ -f "$kept" ]; then
-    record=$kept
-  elif [ -f "$entry" ] && [ -f "$beside" ] && is_for_us "$1$record_suffix"; then
+  if [ -f "$entry" ] && is_record "$beside" && is_for_us "$1$record_suffix"; then
     record=$beside
+  elif [ -f "$kept" ]; then
+    record=$kept
   fi
 }
+
+# is_record FILE: whether it still looks like one, also after somebody has taken one of the two lines out.
+is_record() { [ -f "$1" ] && grep -q -e '^# What is in conflict in ' -e '^Conflict handling:' "$1"; }
 
 # is_for_us PATH: a command of the user may be at work on another index.
 is_for_us() (
   unset GIT_INDEX_FILE
   is_plain "$1" && [ -z "$(git ls-files -- ":(literal)$1")" ]
+)
+
+# comes_with_theirs PATH: whether a commit that git is merging has something under this name. What is picked by hand or
+# popped from a stash, it tells nobody.
+comes_with_theirs() (
+  rebase=$(git_path rebase-merge/done)
+  commits=$(env | sed -n 's/^GITHEAD_\([0-9a-f]*\)=.*/\1/p')
+  [ ! -f "$rebase" ] || commits="$commits $(sed -n '$s/^[a-z]* \([0-9a-f]*\).*/\1/p' "$rebase")"
+  for commit in $commits MERGE_HEAD CHERRY_PICK_HEAD REVERT_HEAD REBASE_HEAD; do
+    if git cat-file -e "$commit:$1" 2>/dev/null; then return 0; fi
+  done
+  return 1
 )
 
 # hash_of PATH [FILE]: the blob that git would make of FILE, the work tree's file if not given, under this path.
@@ -58,17 +74,18 @@ TEXT
 # place_record PATH HASH: remembered first, so that no record is there that nobody removes.
 place_record() {
   find_record "$1"
-  place=$kept
-  if [ "$record" = "$beside" ] || { [ ! -e "$beside" ] && is_for_us "$1$record_suffix"; }; then place=$beside; fi
+  goes_beside=false
+  if [ "$record" = "$beside" ] || { [ ! -e "$beside" ] && is_for_us "$1$record_suffix"; }; then
+    comes_with_theirs "$1$record_suffix" || goes_beside=true
+  fi
   # The first version had a list of this name.
   [ ! -f "$records" ] || rm -f "$records"
   mkdir -p "$records" || return 1
   printf '%s\n%s\n' "$(line_of "$1")" "$2" | put_file "$entry" || return 1
   place_hook || :
-  if [ "$place" = "$beside" ] && mkdir -p "${beside%/*}" 2>/dev/null && put_file "$beside" <"$scratch/new-record"; then
-    rm -f "$kept"
-  else
-    put_file "$kept" <"$scratch/new-record"
+  put_file "$kept" <"$scratch/new-record" || return 1
+  if [ "$goes_beside" = true ] && mkdir -p "${beside%/*}" 2>/dev/null; then
+    put_file "$beside" <"$scratch/new-record" || :
   fi
 }
 
@@ -81,10 +98,12 @@ resolve_call() (
 )
 
 # decided_in RECORD: what the last section says, which is the one that people edit. What stands above comes from the
-# sides of the merge, and whatever it looks like, it decides nothing. Lines keep their numbers.
+# sides of the merge, and whatever it looks like, it decides nothing. Lines keep their numbers. A section that somebody
+# has removed decides nothing, but can be added to.
 decided_in() {
   awk 'NR == FNR {if (/^Conflict handling:\r?$/) last = FNR; next}
-    {print (last && FNR >= last ? $0 : "")}' "$1" "$1"
+    {print (last && FNR >= last ? $0 : "")}
+    END {if (!last) print "Conflict handling:"}' "$1" "$1"
 }
 
 # Records are for one person on one machine: git must not offer to add them. What lies behind a symbolic link
@@ -143,11 +162,15 @@ unmerged_paths() (
   unmerged_below
 )
 
-# Removes the records whose files are no longer unmerged.
+# Removes the records whose files are no longer unmerged. While git holds the index, a merge may be at work whose
+# records are there before its conflicts: what it leaves can be swept when it is done.
 sweep() (
   go_to_top
   records=$(git_path vexel-merge-records)
-  [ -d "$records" ] || return 0
+  if [ -d "$records" ]; then locked sweep_records; fi
+)
+sweep_records() {
+  [ ! -e "$(git_path index.lock)" ] || return 0
   unmerged=$(unmerged_paths)
   {
     printf '%s\n\n' "$unmerged"
@@ -157,8 +180,8 @@ sweep() (
       path_of "$line"
       remove_record "$path"
     done
-  locked remove_hook
-)
+  remove_hook
+}
 
 # Whether any work tree of this repository has a record.
 has_records() (
