@@ -1,60 +1,43 @@
-#include <cstdint>
-#include <sstream>
 #include <stdexcept>
-#include <string>
 
 #include "diff/yaml_mapping_diff.h"
 #include "fixups/duplicate_keys.h"
-#include "fixups/file_id_collisions.h"
 #include "fixups/post_process.h"
+#include "fixups/three_way_merge.h"
+#include "fuzz/support.h"
 #include "merge/recording_conflict_resolver.h"
 #include "yaml/read_yaml.h"
 #include "yaml/yaml_error.h"
 
-namespace {
-
 using namespace vexel_yaml;
 
-// The three versions, separated by a zero byte.
-std::string TakeVersion(std::string& input) {
-  const std::string version = input.substr(0, input.find('\0'));
-  input.erase(0, version.size() + 1);
-  return "%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n" + version;
-}
+namespace {
 
-void Merge(std::string input) {
+std::string Merge(const std::vector<std::string>& texts) {
   VexelObjects versions[3];
   DocumentCache cache;
-  for (VexelObjects& version : versions) {
-    ParseYAMLString(TakeVersion(input), version, &cache);
-    RefuseDuplicateKeys(version, "input");
+  for (size_t i = 0; i < std::size(versions); ++i) {
+    ParseYAMLString(fuzz::WithDirectives(texts[i]), versions[i], &cache);
+    RefuseDuplicateKeys(versions[i], "input");
   }
   auto& [base, left, right] = versions;
-  ConflictingFileIDs ids =
-      CreateConflictingFileIDsRemapper(PreProcess(base), PreProcess(left), PreProcess(right));
-  RemapCollidingAddFileIDs(ids, left, right);
+  PrepareForDiff(base, left, right);
   RecordingConflictResolver resolver(MergeResolve::kBase);
-  const YAMLMappingDiff* merged = YAMLMappingDiff::Merge(*YAMLMappingDiff::Diff(base, left),
-                                                         *YAMLMappingDiff::Diff(base, right), resolver);
-  merged->Apply(base);
-  PostProcessMergeOnly(base, left, right, resolver);
-  std::ostringstream out;
-  base.Output(out);
+  TimerStat silent("", nullptr);
+  const DiffPair diffs = CreateDiffPair({base, left}, {base, right}, false, silent);
+  const std::unique_ptr<VexelObjects> merged = MergeIntoCopy(base, diffs, resolver, silent);
+  PostProcessMergeOnly(*merged, left, right, resolver);
+  return fuzz::Written(*merged);
 }
 
 }  // namespace
 
-// A merge ends with a result or with an error of its own, never otherwise.
+// A merge of the three texts ends with an error of its own or with a file that can be read.
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-  static const bool ready = [] {
-    initialize();
-    std::istringstream rules("");
-    YAMLSequenceRemapper::LoadSequenceUniqueKeys(rules);
-    return true;
-  }();
-  if (!ready) return 0;
+  fuzz::SetUp();
+  std::string text;
   try {
-    Merge(std::string(reinterpret_cast<const char*>(data), size));
+    text = Merge(fuzz::SplitTexts(data, size, 3));
   } catch (const YAMLError&) {
     return 0;
   } catch (const std::length_error&) {
@@ -62,5 +45,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   } catch (const std::runtime_error&) {
     return 0;
   }
+  VexelObjects again;
+  ParseYAMLString(text, again);
   return 0;
 }

@@ -1,0 +1,42 @@
+#include <stdexcept>
+
+#include "app/laws.h"
+#include "fixups/duplicate_keys.h"
+#include "fixups/three_way_merge.h"
+#include "fuzz/support.h"
+#include "rules/yaml_sequence_remapper.h"
+#include "yaml/yaml_error.h"
+
+using namespace vexel_yaml;
+
+namespace {
+
+std::unique_ptr<VexelObjects> Read(const std::string& text) {
+  std::unique_ptr<VexelObjects> scene = ReadScene(text);
+  RefuseDuplicateKeys(*scene, "input");
+  return scene;
+}
+
+}  // namespace
+
+// The laws hold for any three texts that can be merged at all.
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+  fuzz::SetUp();
+  // A tolerance makes edits vanish that the laws ask for.
+  YAMLSequenceRemapper::s_ComparisonFieldPaths.clear();
+  const std::vector<std::string> texts = fuzz::SplitTexts(data, size, 3);
+  Laws laws;
+  try {
+    SceneTriple triple = {Read(texts[0]), Read(texts[1]), Read(texts[2]), true};
+    PrepareForDiff(*triple.base, *triple.left, *triple.right);
+    laws.Check(triple);
+  } catch (const YAMLError&) {
+    return 0;
+  } catch (const std::runtime_error&) {
+    return 0;
+  }
+  for (const Laws::Result& result : laws.GetResults()) {
+    fuzz::Require(result.broken == 0, (result.law + "\n" + result.example).c_str());
+  }
+  return 0;
+}
