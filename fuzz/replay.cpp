@@ -2,6 +2,7 @@
 // (one that is missing counts as empty) and on so many mutations of them, the same ones each time. Where the
 // target ends the process, the input stays in the current folder, in a file named after the program.
 #include <algorithm>
+#include <csignal>
 #include <cstdint>
 #include <cstdlib>
 #include <filesystem>
@@ -95,8 +96,18 @@ class Mutator {
   std::mt19937 random_;
 };
 
-void Run(const std::string& text, const std::string& copy) {
-  std::ofstream(copy, std::ios::binary) << text;
+const std::string* running = nullptr;
+std::string copy;
+
+// What is left to do where the target found a fault: the input is wanted.
+void KeepInput(int signal) {
+  std::ofstream(copy, std::ios::binary) << *running;
+  std::signal(signal, SIG_DFL);
+  std::raise(signal);
+}
+
+void Run(const std::string& text) {
+  running = &text;
   LLVMFuzzerTestOneInput(reinterpret_cast<const uint8_t*>(text.data()), text.size());
 }
 
@@ -111,11 +122,11 @@ int main(int argc, char** argv) {
     std::cerr << "usage: " << argv[0] << " MUTATIONS FOLDERS...; the folders must hold files\n";
     return 1;
   }
-  const std::string copy = std::filesystem::path(argv[0]).filename().string() + ".input";
-  for (const std::string& text : texts) Run(text, copy);
+  copy = std::filesystem::path(argv[0]).filename().string() + ".input";
+  for (const int signal : {SIGABRT, SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGTERM}) std::signal(signal, KeepInput);
+  for (const std::string& text : texts) Run(text);
   Mutator mutator(texts);
   const int mutations = std::atoi(argv[1]);
-  for (int i = 0; i < mutations; ++i) Run(mutator.Next(), copy);
-  std::filesystem::remove(copy);
+  for (int i = 0; i < mutations; ++i) Run(mutator.Next());
   std::cout << texts.size() << " files and " << mutations << " mutations\n";
 }

@@ -1,5 +1,3 @@
-#include <unistd.h>
-
 #include <cstdio>
 #include <cstdlib>
 
@@ -43,15 +41,13 @@ void CheckEntry(const FallbackCommandEntry& entry) {
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   fuzz::SetUp();
   // A name that leads back to the open file: nothing is left behind, however the run ends.
-  static std::FILE* file = std::tmpfile();
-  if (file == nullptr) std::abort();
-  std::rewind(file);
-  if (ftruncate(fileno(file), 0) != 0 || std::fwrite(data, 1, size, file) != size) std::abort();
-  std::fflush(file);
+  std::FILE* file = std::tmpfile();
+  if (file == nullptr || std::fwrite(data, 1, size, file) != size || std::fflush(file) != 0) std::abort();
   std::rewind(file);
   errs.str("");
   FallbackCommandMap map;
   PopulateFallbacks(map, "/dev/fd/" + std::to_string(fileno(file)));
+  std::fclose(file);
   for (const auto& [extension, entries] : map) {
     for (const FallbackCommandEntry& entry : entries) CheckEntry(entry);
     GetFallbackCommandEntry(map, "scene." + extension, "tools");
