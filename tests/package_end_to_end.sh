@@ -52,6 +52,9 @@ for field in 'Package: vexel-yaml-merge' "Version: $version" 'Section: vcs' 'Rec
   check "the package says $field" grep -q "^$field" fields
 done
 
+# As root it says that it should not be, unless it is allowed.
+check "lintian finds nothing" prints_nothing lintian --allow-root "made/$package"
+
 mkdir -p root/var/lib/dpkg/{info,updates} && touch root/var/lib/dpkg/{status,available}
 # Small systems tell dpkg to leave out documents and man pages.
 packages() { as_root dpkg --root="$work/root" --log="$work/dpkg.log" --force-depends --path-include='*' "$@"; }
