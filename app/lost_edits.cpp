@@ -73,7 +73,8 @@ struct Place {
 
 class LostEditSearch {
  public:
-  explicit LostEditSearch(const RecordingConflictResolver& resolver) : resolver_(resolver) {}
+  LostEditSearch(const RecordingConflictResolver& resolver, size_t& excused)
+      : resolver_(resolver), excused_(excused) {}
 
   bool IsLost(const Place& place) {
     const auto& [base, side, other, merged] = place;
@@ -82,7 +83,10 @@ class LostEditSearch {
     }
     if (side == nullptr || other == nullptr || side->GetKind() != other->GetKind()) return false;
     if (side->AsMapping() != nullptr) return IsLostInMapping(place);
-    return side->AsSequence() != nullptr && IsLostInList(place);
+    if (side->AsSequence() == nullptr || !IsLostInList(place)) return false;
+    if (!CountAsEqual(place)) return true;
+    ++excused_;
+    return false;
   }
 
  private:
@@ -106,6 +110,7 @@ class LostEditSearch {
     for (const YAMLNode* holder : {place.side, place.base}) {
       if (holder == nullptr || holder->AsMapping() == nullptr) continue;
       for (const auto& [key, value] : *holder->AsMapping()) {
+        if (holder == place.base && Child(place.side, key) != nullptr) continue;
         if (IsLostAt(key, {Child(place.base, key), Child(place.side, key), Child(place.other, key),
                            Child(place.merged, key)})) {
           return true;
@@ -119,7 +124,6 @@ class LostEditSearch {
     // Records name the places of the merged list, which can't be told from those of the versions.
     if (IsPending(true)) return false;
     if (place.base == nullptr || place.base->AsSequence() == nullptr) return IsLostByPlace(place);
-    if (CountAsEqual(place)) return false;
     const KeyPaths& paths = YAMLSequenceRemapper::ChooseKeyPaths(path_);
     const KeyedElements base(paths, place.base), side(paths, place.side), other(paths, place.other);
     const KeyedElements merged(paths, place.merged);
@@ -128,6 +132,7 @@ class LostEditSearch {
     }
     for (const KeyedElements* holder : {&side, &base}) {
       for (const auto& [key, element] : holder->Get()) {
+        if (holder == &base && side.Find(key) != nullptr) continue;
         if (IsLostAt(YAMLScalar::star, {base.Find(key), side.Find(key), other.Find(key), merged.Find(key)})) {
           return true;
         }
@@ -167,14 +172,17 @@ class LostEditSearch {
   }
 
   // Two edits that put the same at the same places count as equal, and left's is taken, though they may have
-  // removed or moved different elements.
+  // removed or moved different elements. Here the merge is asked itself, so that what it loses by this can't
+  // be found: whoever reads the result must be told how often.
   bool CountAsEqual(const Place& place) {
+    if (place.base == nullptr || place.base->AsSequence() == nullptr) return false;
     const Operation* side = CreateDiffOperation(path_, place.base, place.side);
     const Operation* other = CreateDiffOperation(path_, place.base, place.other);
     return side != nullptr && other != nullptr && OperationEquals(*side, *other);
   }
 
   const RecordingConflictResolver& resolver_;
+  size_t& excused_;
   FieldPath path_;
 };
 
@@ -196,8 +204,10 @@ std::string Content(const YAMLNode* node) {
 }
 
 bool IsAnythingLost(const YAMLNode& base, const YAMLNode& side, const YAMLNode& other, const YAMLNode& merged,
-                    const RecordingConflictResolver& resolver) {
-  return LostEditSearch(resolver).IsLost({&base, &side, &other, &merged});
+                    const RecordingConflictResolver& resolver, size_t* excused) {
+  size_t uncounted = 0;
+  return LostEditSearch(resolver, excused == nullptr ? uncounted : *excused)
+      .IsLost({&base, &side, &other, &merged});
 }
 
 }  // namespace vexel_yaml

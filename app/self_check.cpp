@@ -66,13 +66,16 @@ int PrintResults(const Laws& laws) {
   size_t failed = 0;
   size_t passed_laws = 0;
   for (const Laws::Result& result : laws.GetResults()) {
+    const std::string excused = result.excused == 0 ? "" : std::to_string(result.excused) + " excused";
     if (result.checked == 0) {
-      std::cout << "not checked, does not apply to these files: " << result.law << "\n";
+      std::cout << "not checked, does not apply to these files: " << result.law
+                << (excused.empty() ? "" : " (" + excused + ")") << "\n";
       continue;
     }
     const bool passed = result.broken == 0;
     passed_laws += passed ? 1 : 0;
     std::cout << (passed ? "passed: " : "FAILED: ") << result.law << " (" << result.checked << " checks";
+    if (!excused.empty()) std::cout << ", " << excused;
     if (!passed) std::cout << ", " << result.broken << " failed, for example:\n" << result.example;
     std::cout << ")\n";
     failed += passed ? 0 : 1;
