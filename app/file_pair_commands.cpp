@@ -70,7 +70,7 @@ int HandleStripCommand(const StripConfig& config) {
   FilePair& files = NewFilePair();
   const YAMLMappingDiff* diff = PrepareDiff(config, files, timer);
   StripUnchanged(files.second, *diff);
-  TransitionsToMappings(files.second);
+  StrippedTransitionsToMappings(files.second);
 
   TimerStat step(timer, "Output result");
   // All of it first: an object that can't be written must be found before the output is touched.

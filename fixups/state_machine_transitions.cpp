@@ -11,7 +11,8 @@ namespace vexel_yaml {
 
 namespace {
 
-// Walks down to the bodies of state machines, which stand right below their objects, and to nothing else.
+// Walks down to the bodies of state machines, which stand right below their objects, and to nothing else. A
+// body that repeats a key is one value for diff and strip, and no merge takes it.
 class StateMachineVisitor : public YAMLNodeVisitor {
  public:
   void Visit(const YAMLScalar& /*scalar*/) override {}
@@ -28,7 +29,7 @@ class StateMachineVisitor : public YAMLNodeVisitor {
         }
         return;
       default:
-        Convert(mapping);
+        if (!mapping.HasDuplicateKeys()) Convert(mapping);
     }
   }
 
@@ -69,13 +70,15 @@ class PreProcessInvalidMappingsVisitor final : public StateMachineVisitor {
 };
 
 class PostProcessInvalidMappingsVisitor final : public StateMachineVisitor {
+ public:
+  explicit PostProcessInvalidMappingsVisitor(bool is_stripped) : is_stripped_(is_stripped) {}
+
  private:
   void Convert(YAMLMapping& state_machine) override {
     const YAMLScalar* key = StateMachineTransitionsKey();
     YAMLNode* value = state_machine.Get(key);
-    // Stripping may have left nothing of them.
-    if (value == nullptr) return;
-    YAMLSequence* transitions = value->AsSequence();
+    if (value == nullptr && is_stripped_) return;
+    YAMLSequence* transitions = value == nullptr ? nullptr : value->AsSequence();
     if (transitions == nullptr) throw YAMLError("Expected key to point to yaml sequence: " + key->GetText());
     state_machine.Change(key, ToMapping(*transitions))->Free();
   }
@@ -94,6 +97,8 @@ class PostProcessInvalidMappingsVisitor final : public StateMachineVisitor {
     }
     return mapping;
   }
+
+  const bool is_stripped_;
 };
 
 }  // namespace
@@ -104,7 +109,12 @@ void TransitionsToSequences(YAMLMapping& root) {
 }
 
 void TransitionsToMappings(YAMLMapping& root) {
-  PostProcessInvalidMappingsVisitor visitor;
+  PostProcessInvalidMappingsVisitor visitor(false);
+  root.Accept(visitor);
+}
+
+void StrippedTransitionsToMappings(YAMLMapping& root) {
+  PostProcessInvalidMappingsVisitor visitor(true);
   root.Accept(visitor);
 }
 
