@@ -8,11 +8,13 @@ namespace vexel_yaml {
 
 namespace {
 
-// An object without its file ID or class could not be written; while the conflict is pending, left's stand.
-void RestorePseudoKeys(const YAMLMapping& left, YAMLMapping& merged) {
-  for (const YAMLScalar* key : {YAMLScalar::fileIDPlaceHolderName, YAMLScalar::classIDPlaceHolderName}) {
+// What both sides say of the object itself is no matter of choice: without its file ID or class it could not
+// be written, without its mark it would be another object. Where a choice kept neither side's, left's stands.
+void RestorePseudoKeys(const YAMLMapping& left, const YAMLMapping& right, YAMLMapping& merged) {
+  for (const YAMLScalar* key : {YAMLScalar::fileIDPlaceHolderName, YAMLScalar::classIDPlaceHolderName,
+                                YAMLScalar::strippedPrefabPlaceHolderName}) {
     const YAMLNode* value = left.Get(key);
-    if (value != nullptr && !merged.HasKey(key)) merged.Insert(key, value->Clone());
+    if (value != nullptr && right.HasKey(key) && !merged.HasKey(key)) merged.Insert(key, value->Clone());
   }
 }
 
@@ -23,7 +25,7 @@ YAMLNode* MergeAddedMappings(const YAMLMapping& left, const YAMLMapping& right, 
   const YAMLMappingDiff* right_diff = YAMLMappingDiff::Diff(path, empty, right);
   auto* merged = YAMLAlloc<YAMLMapping>::create(left.IsFlow());
   YAMLMappingDiff::Merge(*left_diff, *right_diff, resolver)->Apply(*merged);
-  RestorePseudoKeys(left, *merged);
+  RestorePseudoKeys(left, right, *merged);
   return merged;
 }
 
