@@ -52,7 +52,7 @@ class ConflictResolver {
   /// Replaces the path and returns the old one.
   FieldPath ExchangePath(FieldPath path);
 
-  /// File IDs of the objects whose transform both sides edited, one of them at least its parent.
+  /// File IDs of the objects whose transform both sides edited or added, one of them at least its parent.
   const std::set<const YAMLScalar*, ScalarTextLess>& GetMergedTransforms() const {
     return merged_transforms_;
   }
