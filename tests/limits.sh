@@ -48,6 +48,17 @@ for megabytes in {5..150..5}; do
 done
 [[ $status == 0 ]] || fail '150 MB are not enough'
 
+# Deep in brackets libyaml is slow: with many values at once, and spread over objects whose tags hide the depth.
+values=$(head -c 2000000 /dev/zero | sed 's/\x0/a,/g')
+{ head -n 2 base.vexel && printf -- '--- !v!1 &1\nA: %s%s\n' "$(printf '[%.0s' {1..990})" "$values"; } > deep.vexel
+{ head -n 2 base.vexel && for id in {1..20}; do
+  printf -- '--- !v!1 &%d\nA: %s%s%s\n' "$id" "$(printf '[!<]> %.0s' {1..400})" "${values::30000}" "$(printf ']%.0s' {1..400})"
+done; } > tags.vexel
+for file in deep tags; do
+  timeout 40 "$program" diff -h base.vexel "$file.vexel" > output 2> messages && fail "$file: read" || status=$?
+  [[ $status == 1 && "$(< messages)" == *'YAML nests too many values in brackets' ]] || fail "$file: status $status"
+done
+
 status=0
 (ulimit -f 8 && "${merge[@]}" old.vexel > output) 2> messages || status=$?
 [[ $status -gt 128 && "$(< old.vexel)" == old ]] || fail "file size: status $status"

@@ -19,12 +19,40 @@ constexpr size_t kMostAnchors = 10'000;
 constexpr size_t kMostExpandedNodes = 10'000'000;
 // libyaml looks for an alias's anchor from the document's first one on.
 constexpr size_t kMostAnchorsLookedAt = 100'000'000;
+// libyaml looks at every open bracket again with every token. Few brackets don't matter, so that a file of
+// any size may be written in them; what stands deeper is counted, and 100,000 values in 1,000 brackets are
+// enough.
+constexpr size_t kFewBrackets = 32;
+constexpr size_t kMostBracketsLookedAt = 100'000'000;
+
+// An upper bound of how many brackets are open. A text outside of brackets may hold any, which leaves it too
+// high or at none. Where one could hide in a quoted text, a comment or a tag within brackets, no bracket is
+// taken for closed any more.
+class OpenBrackets {
+ public:
+  void Add(char c) {
+    if (c == '[' || c == '{') {
+      if (++open_ > most_) most_ = open_;
+    } else if (c == ']' || c == '}') {
+      if (open_ != 0 && !any_may_hide_) --open_;
+    } else if (c == '"' || c == '\'' || c == '#' || c == '!') {
+      any_may_hide_ = any_may_hide_ || open_ != 0;
+    }
+  }
+
+  size_t GetMost() const { return most_; }
+
+ private:
+  size_t open_ = 0;
+  size_t most_ = 0;
+  bool any_may_hide_ = false;
+};
 
 // Whether one pass over a document's bytes shows that nothing is near a limit. Of the nesting depth it makes
 // an upper bound: every flow collection has its opening bracket, and of block collections at most two start
 // at one column, a list level with its key. The one anchor that counts for nothing is the object's file ID.
 bool IsSurelyHarmless(std::string_view document) {
-  size_t brackets = 0;
+  OpenBrackets brackets;
   size_t widest_indent = 0;
   size_t indent = 0;
   bool at_line_start = true;
@@ -38,11 +66,12 @@ bool IsSurelyHarmless(std::string_view document) {
       if (++indent > widest_indent) widest_indent = indent;
     } else {
       at_line_start = false;
-      brackets += c == '[' || c == '{' ? 1 : 0;
+      brackets.Add(c);
       if (c == '&' && i != file_id) return false;
     }
   }
-  return brackets + 2 * widest_indent + 2 < DocumentConverter::kDeepest;
+  return brackets.GetMost() <= kFewBrackets &&
+         kFewBrackets + 2 * widest_indent + 2 < DocumentConverter::kDeepest;
 }
 
 // Counts what loading a document would make, without making it.
@@ -51,10 +80,13 @@ class DocumentCount {
   explicit DocumentCount(DocumentLimits& limits) : limits_(limits) {}
 
   void Add(const yaml_event_t& event) {
+    AddBracketsLookedAt();
     if (event.type == YAML_MAPPING_START_EVENT) {
-      StartCollection(event.data.mapping_start.anchor);
+      const auto& start = event.data.mapping_start;
+      StartCollection(start.anchor, start.style == YAML_FLOW_MAPPING_STYLE);
     } else if (event.type == YAML_SEQUENCE_START_EVENT) {
-      StartCollection(event.data.sequence_start.anchor);
+      const auto& start = event.data.sequence_start;
+      StartCollection(start.anchor, start.style == YAML_FLOW_SEQUENCE_STYLE);
     } else if (event.type == YAML_MAPPING_END_EVENT || event.type == YAML_SEQUENCE_END_EVENT) {
       EndCollection();
     } else if (event.type == YAML_SCALAR_EVENT) {
@@ -76,14 +108,25 @@ class DocumentCount {
   struct Collection {
     Anchor* anchor;
     size_t size;
+    // The brackets around it, its own among them.
+    size_t brackets;
   };
 
-  void StartCollection(const yaml_char_t* anchor) {
+  void AddBracketsLookedAt() {
+    if (open_.empty() || open_.back().brackets <= kFewBrackets) return;
+    limits_.brackets_looked_at += open_.back().brackets;
+    if (limits_.brackets_looked_at > kMostBracketsLookedAt) {
+      throw YAMLError("YAML nests too many values in brackets");
+    }
+  }
+
+  void StartCollection(const yaml_char_t* anchor, bool in_brackets) {
     if (open_.size() == DocumentConverter::kDeepest) {
       throw YAMLError("YAML nesting is deeper than 1000 levels");
     }
     // The first anchor of all is the object's file ID.
-    open_.push_back({open_.empty() ? nullptr : TakeAnchor(anchor), 1});
+    const size_t brackets = (open_.empty() ? 0 : open_.back().brackets) + (in_brackets ? 1 : 0);
+    open_.push_back({open_.empty() ? nullptr : TakeAnchor(anchor), 1, brackets});
   }
 
   void EndCollection() {

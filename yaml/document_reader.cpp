@@ -179,9 +179,9 @@ std::string_view DocumentReader::FirstLine() const {
 }
 
 bool DocumentReader::ReadChunk(bool last, bool stripped, ReadObject& result, size_t& problem_line) {
-  const size_t anchors = limits_.anchors;
+  const DocumentLimits before = limits_;
   CheckDocumentLimits(chunk_, directives_.size(), limits_);
-  result.counts_for_limits = limits_.anchors != anchors;
+  result.counts_for_limits = limits_ != before;
   LoadedDocument loaded;
   try {
     if (!loaded.Load(chunk_)) return false;
