@@ -110,13 +110,14 @@ report_asset() {
   "$write_versions" "$asset" || return 1
   target=$page
   if [ -z "$target" ]; then
-    target=$(git_path vexel-merge-report)/$asset.html
-    # Not all that an asset may be called has room for a suffix.
-    name=${asset##*/}
-    if [ "$(printf '%s' "$name" | wc -c)" -gt 200 ]; then
-      target=${target%"$name.html"}$(printf '%s' "$name" | git hash-object --stdin).html
+    pages=$(git_path vexel-merge-report)
+    target=$pages/$asset.html
+    # Not all that an asset may be called has room for a suffix, and a folder can be called like another asset's page.
+    if [ "$(printf '%s' "${asset##*/}" | wc -c)" -gt 200 ] || ! mkdir -p "${target%/*}" 2>/dev/null ||
+      [ -d "$target" ]; then
+      target=$pages/$(printf '%s' "$asset" | git hash-object --stdin).html
+      mkdir -p "$pages" || return 1
     fi
-    mkdir -p "${target%/*}" || return 1
   fi
   case $target in
     /*) ;;
