@@ -8,8 +8,12 @@ put_file() (
   new=$(mktemp "${1%/*}/.vexel-XXXXXX" 2>/dev/null) || return 1
   trap 'rm -f "$new"' EXIT
   trap 'exit 1' HUP INT TERM
-  if [ -e "$1" ]; then cp -p "$1" "$new"; else chmod "${2:-=rw}" "$new"; fi &&
-    cat >"$new" && mv -f "$new" "$1" 2>/dev/null
+  if [ -e "$1" ]; then cp -p "$1" "$new" 2>/dev/null; else chmod "${2:-=rw}" "$new"; fi || return 1
+  guard=
+  if [ ! -w "$new" ]; then guard=u-w && chmod u+w "$new"; fi
+  cat >"$new" || return 1
+  [ -z "$guard" ] || chmod "$guard" "$new"
+  mv -f "$new" "$1" 2>/dev/null
 )
 
 # replace_file FILE: the same for a file of the user's own, whose symbolic links are meant to be followed.
@@ -80,6 +84,7 @@ locked() (
   tries=0
   until mkdir "$lock" 2>/dev/null || [ "$tries" -ge 100 ]; do
     tries=$((tries + 1))
+    [ "$tries" -ne 10 ] || say "waiting for $lock: another vexel-merge-git has it, or one that was killed has left it"
     sleep 0.1
   done
   trap 'rmdir "$lock" 2>/dev/null || :' EXIT
