@@ -1,5 +1,6 @@
 # Our lines in files that belong to somebody else, between two marks. vexel-merge-git sources this file.
-# What stood there before is remembered in the file $state, in git's configuration format.
+# What stood there before is remembered in the file $state, in git's configuration format, and a block that was there in
+# a file of its own: no command takes arguments of any length.
 
 block_begin='# vexel-merge-git begin ("vexel-merge-git disable" removes this)'
 block_end='# vexel-merge-git end'
@@ -31,9 +32,9 @@ set_block() {
   if has_block "$1"; then
     if ! recall "file.$2.before" >/dev/null; then
       remember "file.$2.before" marked
-      remember "file.$2.block" "$inside"
+      block_part "$1" inside >"$state.$2"
     fi
-    write_block "$1" "$3"
+    printf '%s\n' "$3" | write_block "$1"
     return 0
   fi
   before=there
@@ -48,13 +49,13 @@ set_block() {
   } | replace_file "$1"
 }
 
-# write_block FILE LINES: other lines where our block stands.
+# write_block FILE: standard input where our block stands.
 write_block() {
-  LINES_OF_BLOCK=$2 awk -v b="$block_begin" -v e="$block_end" '
+  awk -v b="$block_begin" -v e="$block_end" '
     {line = $0; sub(/\r$/, "", line)}
     line == e {skip = 0}
     !skip
-    line == b {skip = 1; print ENVIRON["LINES_OF_BLOCK"]}' "$1" | replace_file "$1"
+    line == b {skip = 1; while ((getline text < "-") > 0) print text}' "$1" | replace_file "$1"
 }
 
 # restore_block FILE NAME
@@ -63,7 +64,8 @@ restore_block() {
   outside=$(block_part "$1" outside && echo .) || exit
   has_block "$1" || return 0
   if [ "$before" = marked ]; then
-    write_block "$1" "$(recall "file.$2.block")"
+    # 1.0.1 remembered it among the settings.
+    { cat "$state.$2" 2>/dev/null || recall "file.$2.block"; } | write_block "$1"
     return 0
   fi
   # The line break in front of our block was ours, too, unless something follows now.

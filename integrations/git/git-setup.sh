@@ -31,6 +31,7 @@ parse_setup_options() {
 # use_scope: where the set-up of $scope is, and what is remembered of before.
 use_scope() {
   if [ "$scope" = global ]; then
+    [ -n "${HOME-}" ] || die "HOME is not set"
     user_folder=${XDG_CONFIG_HOME:-$HOME/.config}/git
     state=$user_folder/vexel-merge
     attributes=$(recall attributes.path) || attributes=$(user_attributes)
@@ -44,7 +45,9 @@ use_scope() {
   fi
 }
 
+# Without a home there is none.
 user_attributes() {
+  [ -n "${HOME-}" ] || return 0
   git config --global --includes --type=path --get core.attributesFile ||
     echo "${XDG_CONFIG_HOME:-$HOME/.config}/git/attributes"
 }
@@ -191,7 +194,7 @@ disable() {
     [ -z "$exclude" ] || restore_block "$exclude" exclude
   fi
   restore_configuration
-  rm -f "$state" "$state.before" "$state.after"
+  rm -f "$state" "$state.before" "$state.after" "$state.attributes" "$state.exclude"
   echo "Undone in $(where)."
   case $(git config --get merge.vexel.driver) in
     *vexel-merge-git*) echo "It is still set for all your repositories: see 'vexel-merge-git disable --global'." ;;
@@ -228,6 +231,8 @@ attribute_sources() {
     set -f
     for pattern in $given; do
       case $pattern in
+        # Of these there is a file whose name tells.
+        */*) ;;
         '*'.*)
           [ -n "$(line_of "x${pattern#?}" | ours_among)" ] && continue
           printf '  but not %s: another line takes it away\n' "$pattern"
