@@ -112,13 +112,9 @@ check "a pattern settles what it fits" vexel-merge-git resolve --left --path '*.
 check "it is left's value" value_is 1
 git reset -q --hard
 
-merge_darker
-sed -i '/^Conflict handling/d' "$record"
+merge_darker && sed -i '/^Conflict handling/d' "$record"
 check "a record can be decided that has lost its heading" vexel-merge-git resolve --left "$file" >/dev/null
-git reset -q --hard
-
-merge_darker
-echo mine >"$record"
+git reset -q --hard && merge_darker && echo mine >"$record"
 check "without the record, the conflict can be settled" vexel-merge-git resolve --left "$file" >/dev/null
 check "what stands in its place is left alone" test "$(cat "$record")" = mine
 git reset -q --hard && rm "$record"

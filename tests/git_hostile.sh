@@ -53,6 +53,8 @@ check "each scene is in conflict" test "$(conflicts)" -eq "$number"
 check "each conflict has a record" test "$(grep -c ', listed in ' "$work/err")" -eq "$number"
 check "a record of theirs is none" refuses grep -qF 'dir/x.vexel.vexel-conflicts; to settle' "$work/err"
 check "no other file has changed" refuses grep -qv '^UU\|^A  dir/' <(git status --porcelain)
+call=$(LC_ALL=C sed -n "s/.*to settle: \(.*red .*\)/\1/p" "$work/err")
+check "the advised command names its file in plain letters" grep -qF "left in ${odd[3]}" <(bash -c "${call//[^ -~]/}" 2>&1)
 vexel-merge-git resolve . >/dev/null 2>"$work/err" || :
 check "a record that nobody has edited settles nothing" test "$(conflicts)" -eq "$number"
 vexel-merge-git report -- "$long" file.vexel >/dev/null

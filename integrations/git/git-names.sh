@@ -7,6 +7,17 @@ quoted() (
   printf "'%s'\n" "${text%.}"
 )
 
+# typeable TEXT: the same for a person to paste into bash, zsh or ksh, where a terminal can't show the text as it is.
+typeable() (
+  tab=$(printf '\t')
+  text=$(printf '%s.' "$1" | sed "s/\\\\/&&/g; s/'/\\\\'/g; s/$tab/\\\\t/g" | escaped '\n')
+  case $1 in
+    *"$tab"*) ;;
+    *) if [ "$(printf '%s.' "$1" | escaped '\n')" = "$1." ]; then quoted "$1" && return; fi ;;
+  esac
+  printf "$'%s'\n" "${text%.}"
+)
+
 # Git's commands with the quoting of our lists, whatever the user has set.
 git_names() { git -c core.quotePath=true "$@"; }
 

@@ -60,7 +60,7 @@ leave_record() {
     cat <<TEXT
 # What is in conflict in $(printf '%s' "$1" | escaped '\n'). Left is "theirs", right is "ours".
 # To settle a conflict, take the "#" off its line at the end, and leave one of the three words. Then:
-#   $(resolve_call "$1" | escaped '\n')
+#   $(resolve_call "$1")
 TEXT
     cat "$scratch/record"
     cut -f 1 "$scratch/conflicts" | sed 's/^/# left|right|base /'
@@ -92,8 +92,8 @@ place_record() {
 # resolve_call PATH: the command that settles the conflicts in this file.
 resolve_call() (
   case $1 in
-    -*) printf 'vexel-merge-git resolve -- %s\n' "$(quoted "$1")" ;;
-    *) printf 'vexel-merge-git resolve %s\n' "$(quoted "$1")" ;;
+    -*) printf 'vexel-merge-git resolve -- %s\n' "$(typeable "$1")" ;;
+    *) printf 'vexel-merge-git resolve %s\n' "$(typeable "$1")" ;;
   esac
 )
 
