@@ -4,9 +4,7 @@
 
 #include <initializer_list>
 #include <sstream>
-#include <tuple>
 
-#include "app/inner_main.h"
 #include "platform/error_channel.h"
 
 namespace vexel_yaml {
@@ -32,29 +30,6 @@ class CommandLine : public ::testing::Test {
     gHeadlessEnabled = false;
   }
 };
-
-TEST_F(CommandLine, MistakesAreReportedWithStatus1) {
-  const std::string only_one = "Error: Only one of then -l, -r and -p may be provided";
-  const std::tuple<std::string, std::string, bool> mistakes[] = {
-      {"", "Error: need 'merge' command specified\n", true},
-      {"-l a b c d", "Missing command (e.g. 'merge') before option -l", false},
-      {"mend a b c", "Error: unknown command mend", true},
-      {"merge -l -r a b c", only_one, true},
-      {"merge -p --timing -p a b c", only_one, true},
-      {"merge --force a b", "Error: merge command takes exactly 3 paths but 2 was provided.", true},
-      {"merge -i r -o", "Error: option -o needs a value\n", true},
-      {"diff --nothreads a", "Error: diff command takes exactly 2 paths but 1 was provided.", false},
-  };
-  for (const auto& [words, message, with_usage] : mistakes) {
-    errs.str("");
-    ::testing::internal::CaptureStdout();
-    ::testing::internal::CaptureStderr();
-    EXPECT_EQ(InnerMain(Words(words)), 1) << words;
-    EXPECT_EQ(::testing::internal::GetCapturedStderr(), message);
-    EXPECT_EQ(::testing::internal::GetCapturedStdout().substr(0, 21),
-              with_usage ? "Vexel YAML Merge Tool" : "");
-  }
-}
 
 TEST_F(CommandLine, MergeTakesOptionsUpToTheFirstPath) {
   const std::string options =
@@ -82,14 +57,6 @@ TEST_F(CommandLine, DiffTakesItsOutputAsAThirdPath) {
   DiffConfig config;
   ASSERT_TRUE(ParseDiffArgs(Words("diff --timing a b out ignored"), 2, config));
   EXPECT_EQ(Join({config.first_path, config.second_path, config.output_path}), "a b out ");
-}
-
-TEST_F(CommandLine, SubversionPassesFivePaths) {
-  const CommandLineArguments call = Words("base theirs mine merged wc");
-  const MergeConfig config = SubversionMergeConfig(call);
-  EXPECT_EQ(Join({config.base_path, config.left_path, config.right_path, config.destination_path}),
-            "base theirs mine merged ");
-  EXPECT_TRUE(IsSubversionCall(call) && config.force && config.resolve_mode == kResolveToLeft);
 }
 
 }  // namespace

@@ -22,7 +22,7 @@ class FallbackTools : public ::testing::Test {
     std::string pattern = ::testing::TempDir() + "fallbackXXXXXX";
     root_ = mkdtemp(pattern.data());
     folder_ = root_ + "/it's \"$HOME\" $(id) `id` %r \\";
-    std::filesystem::create_directories(folder_ + "/Applications");
+    std::filesystem::create_directories(folder_);
     setenv("HOME", folder_.c_str(), 1);
   }
   ~FallbackTools() override {
@@ -64,32 +64,6 @@ TEST_F(FallbackTools, ToolsStatusIsTheExitStatus) {
   EXPECT_EQ(std::signal(SIGPIPE, previous), SIG_IGN);
   EXPECT_EQ(errs.str(), "") << "a missing destination is no reason to say that the tool did not start";
   for (const int nothing_ran : {-1, 1}) EXPECT_EQ(ExitStatusOfTool(nothing_ran), 1);
-}
-
-TEST_F(FallbackTools, WithoutAToolTheResultIs1) {
-  EXPECT_EQ(RunScript("exit 0", "\n# comment\n* merge \"/bin/sh\" \"%b\"\n"), 1);
-  EXPECT_EQ(errs.str(), "Unknown mode 'merge' on line 3\nCouldn't load spec file '" + folder_ + "/spec'\n");
-  errs.str("");
-  EXPECT_EQ(RunScript("exit 0", "* use \"/no/such/tool\"\n"), 1);
-  EXPECT_TRUE(errs.str().ends_with(" in " + folder_ + "/spec\n")) << errs.str();
-}
-
-TEST_F(FallbackTools, FirstExistingToolOfTheExtensionWinsThenThatOfAnyExtension) {
-  Write("Applications/mine", "");
-  FallbackCommandMap map;
-  EXPECT_FALSE(PopulateFallbacks(map, Write("spec",
-                                            "txt use \"/no/such/tool\" 1\n"
-                                            "txt\tuse-second-pass \t\"%programs%/mine\" \t2 \"%l\"\n"
-                                            "*  use-on-conflict \"/bin/sh\" 3\n"
-                                            "png use \"/no/such/tool\" 4\n"
-                                            "bad\n"
-                                            "jpg use \"/bin/sh\" 5\n")));
-  const FallbackCommandEntry own = GetFallbackCommandEntry(map, "a.txt", "spec");
-  EXPECT_EQ(own.tool + own.arguments, folder_ + "/Applications/mine2 \"%l\"");
-  EXPECT_EQ(own.mode, 2);
-  for (const std::string path : {"a.png", "a.jpg", "/tmp/MERGEabc"}) {
-    EXPECT_EQ(GetFallbackCommandEntry(map, path, "spec").arguments, "3") << path;
-  }
 }
 
 TEST_F(FallbackTools, TheUsersHiddenFileComesFirst) {

@@ -14,9 +14,6 @@ namespace vexel_yaml {
 namespace {
 
 const std::string kHeader = "%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n";
-const std::string kNameRecords =
-    "Conflicts:\nLeft  1.GameObject.m_Name change to Gate\n"
-    "Right 1.GameObject.m_Name change to Portal\nConflict handling:\n";
 const std::string kPaths = " base.vexel left.vexel right.vexel out.vexel ";
 
 std::string Door(const std::string& name, const std::string& layer, const std::string& tag = " Exit") {
@@ -72,25 +69,6 @@ class MergeCommand : public ::testing::Test {
   std::string output_;
 };
 
-TEST_F(MergeCommand, WithoutADestinationItOnlyChecks) {
-  EXPECT_EQ(Merge("base.vexel left.vexel right.vexel"), 2);
-  EXPECT_EQ(output_, kNameRecords);
-  EXPECT_EQ(Merge("base.vexel left.vexel base.vexel"), 0);
-  EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder_), {}), 4);
-}
-
-TEST_F(MergeCommand, AnErrorKeepsTheDestination) {
-  EXPECT_EQ(Merge("-i choices.txt" + kPaths), 1);
-  EXPECT_EQ(output_, "Couldn't open merge resolve file 'choices.txt'");
-  EXPECT_EQ(Merge("-o no_such_folder/records.txt" + kPaths), 1);
-  // Of two broken files the first counts, whichever thread was faster.
-  Write("left.vexel", Door(" Gate", "{"));
-  Write("right.vexel", "");
-  EXPECT_EQ(Merge(kPaths), 1);
-  EXPECT_TRUE(output_.starts_with("Cannot merge file 'base.vexel': Error parsing file 'left.vexel': "));
-  EXPECT_EQ(Read("out.vexel"), "old\n");
-}
-
 TEST_F(MergeCommand, PremergedFilesDifferOnlyInWhatIsPending) {
   Write("left.vexel", Door(" Gate", "0", " Left"));
   Write("right.vexel", Door(" Portal", "5", " Right"));
@@ -122,25 +100,6 @@ TEST_F(MergeCommand, ThreadsChangeNothing) {
   const std::string records = output_;
   EXPECT_EQ(Merge("--describe --nothreads" + kPaths), 2);
   EXPECT_TRUE(Read("out.vexel") == merged && output_ == records);
-}
-
-TEST_F(MergeCommand, TheToolGetsTheMergedFileAsLeft) {
-  Write("tools.txt", "* use \"/bin/sh\" -c \"cat %b %l %r > %d\"\n");
-  EXPECT_EQ(Merge("-r --fallback tools.txt" + kPaths), 0);
-  EXPECT_EQ(Read("out.vexel"), Door(" Door", "0") + Door(" Portal", "5") + Door(" Portal", "5"));
-  EXPECT_EQ(Merge("-p --fallback tools.txt" + kPaths), 0) << "the premerged files need no names for a tool";
-  EXPECT_EQ(Read("out.vexel"), Door(" Door", "5") + Door(" Gate", "5") + Door(" Portal", "5"));
-}
-
-TEST_F(MergeCommand, AToolWithoutAResultChangesNothing) {
-  Write("tools.txt", "* use \"/bin/sh\" -c \": > %d\"\n");
-  EXPECT_EQ(Merge("--fallback tools.txt" + kPaths), 0);
-  EXPECT_EQ(output_, kNameRecords + "The merge tool left its result empty: 'out.vexel' is unchanged\n");
-  EXPECT_EQ(Merge("--fallback tools.txt base.vexel left.vexel right.vexel"), 0);
-  EXPECT_EQ(output_, kNameRecords);
-  Write("tools.txt", "* use \"/bin/sh\" -c \"echo new > %d; exit 5\"\n");
-  EXPECT_EQ(Merge("--fallback tools.txt" + kPaths), 5);
-  EXPECT_EQ(Read("out.vexel"), "old\n");
 }
 
 }  // namespace

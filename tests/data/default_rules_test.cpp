@@ -4,7 +4,6 @@
 #include <iterator>
 
 #include "diff/yaml_mapping_diff.h"
-#include "fixups/state_machine_transitions.h"
 #include "merge/recording_conflict_resolver.h"
 #include "tests/support/yaml_text.h"
 
@@ -30,7 +29,6 @@ class DefaultRules : public testing::Test {
     const auto* left_diff = YAMLMappingDiff::Diff(*base_file, *left_file);
     YAMLMappingDiff::Merge(*left_diff, *YAMLMappingDiff::Diff(*base_file, *right_file), resolver)
         ->Apply(*merged);
-    TransitionsToMappings(*merged);
     std::string result =
         YAMLSequenceRemapper::GetYAMLNodeFieldByPath(merged->First(), PathFromText(path))->GetYAMLString();
     for (const auto& record : resolver.GetRecords()) {
@@ -66,8 +64,6 @@ class DefaultRules : public testing::Test {
       text += c == '\n' ? "\n" + indent : std::string(1, c);
     }
     auto objects = ObjectsFromText(text + "\n");
-    // A state machine without the field is refused.
-    if (path.ends_with("Transitions")) TransitionsToSequences(*objects);
     return objects;
   }
 
@@ -91,42 +87,10 @@ TEST_F(DefaultRules, ChildrenOfBothKindsOfTransform) {
   ExpectPairedAdditions("RectTransform.m_Children", "{fileID: ", "}");
 }
 
-TEST_F(DefaultRules, AnOverrideBelongsToOnePropertyOfOneObjectOfOnePrefab) {
-  const auto list = [](const std::vector<std::string>& values) {
-    constexpr const char* kKeys[] = {
-        "{fileID: 7, guid: a}\n  propertyPath: x", "{fileID: 7, guid: a}\n  propertyPath: y",
-        "{fileID: 7, guid: b}\n  propertyPath: x", "{fileID: 7}\n  propertyPath: x"};
-    std::string text;
-    for (size_t i = 0; i < values.size(); ++i) {
-      text += std::string("\n- target: ") + kKeys[i] + "\n  value: " + values[i];
-    }
-    return text;
-  };
-  for (const std::string instance : {"PrefabInstance", "Prefab"}) {
-    const auto merged = [&](const std::string& left, const std::string& right) {
-      return "\n" + Merged(instance + ".m_Modification.m_Modifications", list({"0", "0", "0"}), left, right);
-    };
-    EXPECT_EQ(merged(list({"1", "0", "2", "9"}), list({"0", "3", "0"})), list({"1", "3", "2", "9"}));
-    EXPECT_EQ(merged(list({"1", "0", "2"}), list({"5", "3", "6"})),
-              list({"0", "3", "0"}) + " conflict at.0.value conflict at.2.value");
-  }
-}
-
 TEST_F(DefaultRules, NodesOfAStateMachineAreWhatTheyPlace) {
   ExpectPairedAdditions("AnimatorStateMachine.m_ChildStates",
                         "{m_State: {fileID: ", "}, m_Position: {x: 0}}");
   ExpectPairedAdditions("AnimatorStateMachine.m_ChildStateMachines", "{m_StateMachine: {fileID: ", "}}");
-}
-
-TEST_F(DefaultRules, TransitionsOfOneMachineBelongTogether) {
-  const auto transitions = [](const std::string& of_one, const std::string& of_two) {
-    return "data:\n  first: {fileID: 1}\n  second: [" + of_one +
-           "]\ndata:\n  first: {fileID: 2}\n  second: [" + of_two + "]";
-  };
-  EXPECT_EQ(Merged("AnimatorStateMachine.m_StateMachineTransitions", "\n" + transitions("{fileID: 8}", ""),
-                   "\n" + transitions("{fileID: 8}, {fileID: 10}", ""),
-                   "\n" + transitions("{fileID: 9}, {fileID: 8}", "{fileID: 12}")),
-            transitions("{fileID: 9}, {fileID: 8}, {fileID: 10}", "{fileID: 12}"));
 }
 
 TEST_F(DefaultRules, ParametersOfAControllerAreTheirNames) {

@@ -44,26 +44,6 @@ std::string Turn(std::string_view from_text, std::string_view to_text, std::stri
   return text;
 }
 
-TEST(CreateAndApply, ListsAreTurnedIntoOneAnother) {
-  const ScopedRules rules("[arrays]\nset *.A.keyed id");
-  EXPECT_EQ(Turn("[{id: 1, v: a}, {id: 2, v: b}, {id: 3, v: c}]", "[{id: 3, v: x}, {id: 4}, {id: 1, v: a}]",
-                 "1.A.keyed"),
-            "2-0 edited 0 new 1");
-  EXPECT_EQ(Turn("[{id: 1}, {id: 2, v: b}]", "[{id: 1}, {id: 2, v: c}]", "1.A.keyed"), " edited 1");
-  EXPECT_EQ(Turn("[a, b, c]", "[a, x, c]"), "0-2 new 1");
-  EXPECT_EQ(Turn("[a, b, c, d]", "[d, c, b, a]"), "3210");
-  EXPECT_EQ(Turn("[[a, b], [c]]", "[[c], [a, x]]"), "-0 new 1");
-  EXPECT_EQ(Turn("[a]", "[z, a, {b: []}]"), "1 new 0 new 2");
-  EXPECT_EQ(Turn("[a, b]", "[]"), "--");
-}
-
-TEST(CreateAndApply, FieldsAreTurnedIntoOneAnother) {
-  Turn("{a: 1, b: {c: [1, 2], d: x}, e: []}", "{b: {d: [x], c: [2, 1], n: 1}, e: {}, f: {g: [h]}}");
-  Turn("{a: 1, b: 2, c: 3, d: 4}", "{d: 4, n: 0, b: 5, a: 1}");
-  Turn("{a: 1}", "{}");
-  Turn("{}", "{a: {b: [c]}}");
-}
-
 TEST(CreateAndApply, RulesHoldAtThePathsOfNestedElements) {
   const ScopedRules rules(
       "[arrays]\nset *.A.outer id\nset *.A.outer.*.inner id\n[comparisons]\nfloat *.A.outer.1.size 0.1 0.1");

@@ -5,8 +5,6 @@
 
 #include <chrono>
 
-#include "fixups/post_process.h"
-#include "merge/recording_conflict_resolver.h"
 #include "tests/support/yaml_text.h"
 #include "yaml/type_info.h"
 
@@ -129,17 +127,6 @@ TEST_F(ComponentDependencies, OnlySomeClassesMayStandTwiceOnOneObject) {
   EXPECT_THAT(doubled(kCollider, kBox), IsEmpty());
 }
 
-TEST_F(ComponentDependencies, AComponentMustNotOutliveItsGameObject) {
-  const std::string survivor = Component(2, kBox);
-  EXPECT_THAT(Found(survivor, survivor, Object({{2, kBox}})), ElementsAre("Left removes 1"));
-  EXPECT_THAT(Found(survivor, Object({{2, kBox}}), survivor), ElementsAre("Right removes 1"));
-  EXPECT_THAT(Found(survivor, survivor, survivor), IsEmpty());
-  for (const std::string reference : {"{fileID: 0}", "{fileID: ''}", "{}", "{fileID: 1, guid: a}", "1"}) {
-    const std::string text = Component(2, kBox, reference);
-    EXPECT_THAT(Found(text, Object({{2, kBox}}) + Object({}, 0), text), IsEmpty()) << reference;
-  }
-}
-
 TEST_F(ComponentDependencies, EachConflictIsFoundOnce) {
   EXPECT_THAT(Found(Component(2, kBox) + Component(3, kBody), Object({}), ""),
               ElementsAre("Right removes 1"));
@@ -164,25 +151,6 @@ TEST_F(ComponentDependencies, ManyComponentsOfOneObjectStayAffordable) {
   const auto start = std::chrono::steady_clock::now();
   EXPECT_EQ(FindComponentDependencyConflicts(*merged, *left, *ObjectsFromText("")).size(), 1);
   EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
-}
-
-TEST_F(ComponentDependencies, OneConflictLeftOpenMakesTheMergePending) {
-  const auto is_pending = [&](const std::vector<std::string>& settled, size_t records) {
-    RecordingConflictResolver resolver(MergeResolve::kBase);
-    std::vector<RecordingConflictResolver::RecordResolve> resolutions;
-    for (const std::string& id : settled) resolutions.push_back({PathFromText(id), MergeResolve::kLeft});
-    resolver.SetResolveMethodForPaths(resolutions);
-    const auto merged = ObjectsFromText(Object({{2, kSensor}, {4, kBody}, {5, kBody}}));
-    const auto left = ObjectsFromText(Object({{2, kSensor}, {3, kBox}, {4, kBody}}));
-    const bool result = PostProcess(*merged, *left, *ObjectsFromText(Object({{5, kBody}})), resolver);
-    EXPECT_EQ(resolver.GetRecords().size(), records);
-    return result;
-  };
-  EXPECT_TRUE(is_pending({"3"}, 2));
-  EXPECT_TRUE(is_pending({"5"}, 2));
-  EXPECT_FALSE(is_pending({"3", "5"}, 2));
-  ReadTypes(" []\n");
-  EXPECT_FALSE(is_pending({}, 0));
 }
 
 }  // namespace

@@ -90,20 +90,6 @@ std::string Repaired(const std::string& text, const std::string& removed = "",
   return Written(*merged);
 }
 
-TEST(PrefabRepairs, UnlinkOrRemoveWhatHasLostItsPrefab) {
-  const auto transform = [](const std::string& id, int game_object, int prefab) {
-    return "--- !v!4 &" + id + "\nTransform:\n  m_GameObject: {fileID: " + std::to_string(game_object) +
-           "}\n  m_PrefabInternal: {fileID: " + std::to_string(prefab) + "}\n  m_Father: {fileID: 0}\n";
-  };
-  const std::string object = Object(1, "GameObject"), prefab = Object(9, "Prefab");
-  EXPECT_EQ(Repaired(object + transform("2", 1, 9), prefab), object + transform("2", 1, 0));
-  EXPECT_EQ(Repaired(object + transform("2", 3, 9), prefab), object);
-  // What never was in a file is only cleared, unless nothing but the reference makes the transform.
-  EXPECT_EQ(Repaired(object + transform("2", 3, 9)), object + transform("2", 3, 0));
-  EXPECT_EQ(Repaired(object + transform("2 stripped", 3, 9)), object);
-  EXPECT_EQ(Repaired(prefab + transform("2 stripped", 3, 9)), prefab + transform("2 stripped", 3, 9));
-}
-
 TEST(TransformParents, RemovedOnesAreForgottenAndLoopsBroken) {
   EXPECT_EQ(Repaired(Transform(1, 5) + Transform(2, 6), Transform(5, 0)), Transform(1, 0) + Transform(2, 6));
   // Nobody collected the loop: it is broken at its first transform in the file, not at one that leads there.

@@ -74,29 +74,6 @@ std::string MergedList(const std::string& base, const std::string& left, const s
   return MergedField(base, left, right, resolver);
 }
 
-TEST(SequenceMerge, AlignsBothSidesElements) {
-  EXPECT_EQ(MergedList("[a, b]", "[x, a, p, b]", "[y, a, q, b, r]"), "[x, y, a, p, q, b, r]");
-  EXPECT_EQ(MergedList("[a, b, c]", "[b, c, x]", "[a, b]"), "[b, x]");
-  EXPECT_EQ(MergedList("[a]", "[a, x]", "[a, x]"), "[a, x]");
-  // What both added is there once, also where it stands at different places.
-  EXPECT_EQ(MergedList("[{fileID: 1}]", "[{fileID: 1}, {fileID: 2}, {fileID: 3}]",
-                       "[{fileID: 1}, {fileID: 3}, {fileID: 4}]"),
-            "[{fileID: 1}, {fileID: 2}, {fileID: 3}, {fileID: 4}]");
-  // One side only edits in place, the other moves.
-  EXPECT_EQ(MergedList("[{fileID: 1}, {fileID: 2}]", "[{fileID: 1}, {fileID: 2, v: 5}]",
-                       "[{fileID: 2}, {fileID: 9}, {fileID: 1}]"),
-            "[{fileID: 2, v: 5}, {fileID: 9}, {fileID: 1}]");
-}
-
-TEST(SequenceMerge, RefusedAdditionsLeaveNoSlotAndRefusedEditsTheBaseElement) {
-  EXPECT_EQ(MergedList("[a]", "[a, x, z]", "[a, y]", "base 1.C.f.1"), "[a, z, y]");
-  EXPECT_EQ(MergedList("[a]", "[a, x, z]", "[a, y]", "right 1.C.f.*"), "[a, y]");
-  EXPECT_EQ(
-      MergedList("[{fileID: 1}, {fileID: 2}]", "[{fileID: 7}, {fileID: 1}, {fileID: 2, v: 3}, {fileID: 3}]",
-                 "[{fileID: 1}, {fileID: 2}, {fileID: 4}]", "base 1.C.f.0\nbase 1.C.f.2"),
-      "[{fileID: 1}, {fileID: 2}, {fileID: 3}, {fileID: 4}]");
-}
-
 TEST(RecordingResolver, AResolutionGivesThatVersionOfTheField) {
   const std::string cases[][3] = {{"1", "2", "1"},
                                   {"1", "1", "2"},
@@ -124,42 +101,6 @@ TEST(RecordingResolver, AResolutionGivesThatVersionOfTheField) {
       EXPECT_FALSE(resolver.HasPendingConflicts());
     }
   }
-}
-
-TEST(RecordingResolver, TheDefaultSideStandsInForAConflict) {
-  constexpr MergeResolve kSides[] = {MergeResolve::kBase, MergeResolve::kLeft, MergeResolve::kRight,
-                                     MergeResolve::kBlank};
-  const auto merged = [&](const std::string& base, const std::string& left, const std::string& right) {
-    std::vector<std::string> fields;
-    for (const MergeResolve side : kSides) {
-      Recording resolver(side);
-      fields.push_back(MergedField(base, left, right, resolver));
-      EXPECT_TRUE(resolver.HasPendingConflicts());
-    }
-    return fields;
-  };
-  EXPECT_THAT(merged("{x: 1, y: 1}", "{x: 2, y: 1}", "{x: 1, y: 3}"),
-              testing::ElementsAre("{x: 1, y: 1}", "{x: 2, y: 1}", "{x: 1, y: 3}", "{x: '', y: 1}"));
-  EXPECT_THAT(merged("{x: 1, y: 1}", "", "{x: 1, y: 3}"),
-              testing::ElementsAre("{x: 1, y: 1}", "none", "{x: 1, y: 3}", "{x: 1, y: ''}"));
-  EXPECT_THAT(merged("", "4", "5"), testing::ElementsAre("none", "4", "5", ""));
-}
-
-TEST(ConflictRecords, OfObjectsAddedOnBothSidesAreWrittenInOrder) {
-  const VexelObjects base;
-  const auto left = ObjectsFromText("--- !v!1 &5\nC:\n  a: 1\n  b: 1\n");
-  const auto right = ObjectsFromText("--- !v!2 &5\nC:\n  b: 2\n  c: 3\n");
-  Recording resolver = Resolver("> note\nleft *.x\n");
-  const auto merged = Merged(base, *left, *right, resolver);
-  std::ostringstream text, records;
-  merged->Output(text);
-  EXPECT_THAT(text.str(), testing::EndsWith("--- !v!1 &5\nC:\n  a: 1\n  c: 3\n"));
-  OutputConflictRecords(records, resolver, true);
-  EXPECT_THAT(records.str(),
-              testing::StartsWith("Conflicts:\nLeft  5.C.b add as 1\nRight 5.C.b add as 2\n"
-                                  "Left  5.MERGE_ClassID add as 1\nRight 5.MERGE_ClassID add as 2\n"
-                                  "Conflict handling:\nLeft *.x\nNon-conflicts:\nBoth adds 5 content\n"
-                                  "Both adds 5.C content\nLeft adds 5.C.a add as 1\n"));
 }
 
 TEST(ConflictRecords, ErrorsNameTheLine) {

@@ -63,15 +63,6 @@ TEST(Emit, TextsThatAreHardToWriteAreReadBackAsTheyWere) {
   }
 }
 
-TEST(Emit, KeepsNestedStylesAndRepeatedKeys) {
-  const std::string file = kHeader +
-                           "--- !v!1 &1\nA:\n  none: []\n  blank:\n  m:\n    list:\n    - - 1\n      - [2, "
-                           "{x: 3}]\n    - a: {b: [], c: {d: e}}\n"
-                           "      f:\n        g: h\n    - {}\n  data:\n    first: 1\n  other: 2\n  data:\n   "
-                           " first: 3\n  data: {a: 1, a: 2}\n";
-  EXPECT_EQ(Rewritten(file), file);
-}
-
 TEST(Emit, WhatIsNotUtf8IsRefused) {
   for (const std::string text : {"\xFF", "\xC3", "a\x80z"}) EXPECT_THROW(FileWith(text), YAMLError);
 }
