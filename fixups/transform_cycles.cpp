@@ -10,7 +10,7 @@ namespace vexel_yaml {
 
 namespace {
 
-// A transform with more parents above it than this is taken to be in a loop.
+// A transform with as many parents above it, or more, is taken to be in a loop.
 constexpr int kDeepestHierarchy = 100;
 
 bool IsInCycle(const TransformParents& parents, const YAMLScalar* transform) {
