@@ -22,8 +22,8 @@ class RecordingConflictResolver final : public ConflictResolver {
   };
 
   struct RecordResolve {
-    /// "*" stands for any one component. Any other matches as it stands, or with its escapes resolved: what
-    /// PathToString wrote is a pattern for that path.
+    /// "*" stands for any one component. Any other matches as it stands, or with its escapes resolved, so
+    /// that what PathToString wrote is a pattern for that path, if maybe not for it alone.
     FieldPath pattern;
     MergeResolve resolution;
   };

@@ -1,6 +1,7 @@
 #include <algorithm>
 #include <map>
 
+#include "report/record_patterns.h"
 #include "report/report_rows.h"
 #include "report/side_walk.h"
 
@@ -57,7 +58,8 @@ std::string_view SettledState(MergeResolve resolution) {
 
 class Collector {
  public:
-  explicit Collector(const MergedFiles& files) : files_(files), names_(NamesFor(files)) {}
+  explicit Collector(const MergedFiles& files)
+      : files_(files), names_(NamesFor(files)), patterns_(files.resolver) {}
 
   std::vector<ReportObject> Collect() {
     AddSide(&ReportRow::left, &ReportObject::left, *files_.diffs.left, files_.read.left);
@@ -149,7 +151,7 @@ class Collector {
     }
     row.pending |= pending;
     row.state = pending ? "conflict" : SettledState(record.resolution);
-    row.record_path = PathToString(record.path);
+    row.record_path = patterns_.For(record);
     if (record.type == ConflictType::kTransformCycle) {
       row.note = "The parents of the transforms formed a circle; it was broken here";
     } else if (const std::string_view dependency = DependencyText(record); !dependency.empty()) {
@@ -271,6 +273,7 @@ class Collector {
   const MergedFiles& files_;
   ObjectNames names_;
   ReportRows rows_{names_};
+  RecordPatterns patterns_;
   SideWalk::Places places_;
   // Elements of lists, and the versions that they went out of.
   std::map<FieldPath, std::vector<ReportCell ReportRow::*>> gone_;

@@ -12,6 +12,7 @@
 #include "platform/temporary_files.h"
 #include "report/merged_files.h"
 #include "report/readable_headers.h"
+#include "report/record_patterns.h"
 #include "report/value_text.h"
 #include "report/write_page.h"
 #include "yaml/yaml_error.h"
@@ -26,7 +27,8 @@ constexpr std::string_view kUsage =
     "usage: vexel-merge-report [options] <base> <left> <right>\n"
     "           writes what a merge of the three files does as a page for the browser\n"
     "       vexel-merge-report --conflicts [options] <base> <left> <right>\n"
-    "           prints one line a conflict: path, what left did, what right did, between tabs\n"
+    "           prints one line a conflict: a pattern for its path, what left did, what right did, between "
+    "tabs\n"
     "       vexel-merge-report --text <file>\n"
     "           prints a scene or prefab with the names of its objects in their header lines\n"
     "\n"
@@ -124,9 +126,10 @@ std::string SideText(const Record& record, const Operation* operation, bool is_l
 }
 
 void PrintConflicts(const RecordingConflictResolver& resolver) {
+  const RecordPatterns patterns(resolver);
   for (const Record& record : resolver.GetRecords()) {
     if (record.resolution != MergeResolve::kConflict) continue;
-    std::cout << OnOneLine(PathToString(record.path)) << '\t' << SideText(record, record.left, true) << '\t'
+    std::cout << patterns.For(record) << '\t' << SideText(record, record.left, true) << '\t'
               << SideText(record, record.right, false) << '\n';
   }
 }

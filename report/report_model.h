@@ -40,7 +40,7 @@ struct ReportRow {
   ReportCell result;
   /// What became of it, in a word or two; empty where the merge failed.
   std::string_view state;
-  /// Whether the conflict still waits for somebody, and under which path it is settled.
+  /// Whether the conflict still waits for somebody, and with which pattern it is settled.
   bool pending = false;
   std::string record_path;
   bool repaired = false;

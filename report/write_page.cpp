@@ -105,7 +105,7 @@ std::string_view RowClass(const ReportRow& row) {
   return row.repaired ? " class=\"repaired\"" : "";
 }
 
-// The path as it stands in record files, with places for line breaks behind its dots.
+// The pattern as it stands in record files, with places for line breaks behind its dots.
 void WriteRecordPath(std::ostream& out, std::string_view path) {
   out << "<code>";
   for (size_t dot = path.find('.'); dot != std::string_view::npos; dot = path.find('.')) {

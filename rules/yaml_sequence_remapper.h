@@ -5,6 +5,7 @@
 #include <string>
 #include <string_view>
 #include <unordered_map>
+#include <unordered_set>
 #include <vector>
 
 #include "yaml/yaml_scalar.h"
@@ -170,12 +171,17 @@ class YAMLSequenceRemapper {
 /// Whether `path` has as many components as `pattern`, each equal to the pattern's or met by its "*".
 bool MatchesPattern(const FieldPath& pattern, const FieldPath& path);
 
-/// The components joined by ".", on one line: control characters and line breaks are written as in C, "\n" or
-/// "\x1b", a character of several bytes as one "\x" for each. Nothing else is escaped, not even a dot.
+/// The components joined by ".", on one line: control characters, line breaks and marks that turn the
+/// direction of a text are written as in C, "\n" or "\x1b", a character of several bytes as one "\x" for
+/// each. Nothing else is escaped, not even a dot.
 std::string PathToString(const FieldPath& path);
 
+/// A pattern for a line of a record file that matches `path` and, of the paths whose components are all among
+/// `others`, no other one, neither as it stands nor with its escapes resolved.
+std::string PathPattern(const FieldPath& path, const std::unordered_set<const YAMLScalar*>& others);
+
 /// The component that such a text stands for: `component` itself where it holds no escape. "\x" takes exactly
-/// two digits, so that every byte can be written, a dot or a blank too.
+/// two digits, so that every byte can be written, a dot or a blank too; "\&" stands for nothing.
 const YAMLScalar* ResolveEscapes(const YAMLScalar* component);
 
 /// Reads the rules file: `path` is the value of "--rules", "auto" for the default file beside the executable.

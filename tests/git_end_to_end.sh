@@ -186,4 +186,28 @@ for side in one two; do
 done
 check "two merges that differ don't merge silently" refuses git merge -q --no-edit kept-one >/dev/null 2>&1
 
+# Keys that are patterns, escapes or headers, or hold what ends a path, and file IDs that are equal as numbers: each
+# choice is for its own place alone.
+keys=('"*"' "'\\x2a'" "'\\x2a\\&'" '"a\nb"' "'a\\nb'" "'a\\x0ab'" speed '"speed x"' x.b '"Conflicts:"' '"\u202Eturned"')
+commit_keys() { # commit_keys BRANCH VALUE SOLO
+  git checkout -q -B "$1" start && scene 2 10 >"$file"
+  printf "  %s: $2\n" "${keys[@]}" >>"$file" && printf '  x: {b: %s}\n  solo: %s\n' "$2" "$3" >>"$file"
+  printf -- "--- !v!108 &612873651265321735%s\nLight:\n  m_Range: $2\n" 1 2 >>"$file" && git commit -q -a -m "$1"
+}
+git reset -q --hard && commit_keys keys 3 3 && git branch -f start && commit_keys keys-left 7 7 && commit_keys keys-right 8 3
+git merge -q keys-left >/dev/null 2>&1 || first=$(grep -n -m 1 '^# left.right.base' "$record" | cut -d : -f 1)
+last=$(wc -l <"$record")
+check "each place has a line" test $((last - first)) -eq $((${#keys[@]} + 2))
+for ((line = first; line <= last; line++)); do
+  edit="sed -i -e '$line s/^# left.right.base/left/' -e 's/^# left.right.base/right/'"
+  check "each line is read" env GIT_EDITOR="$edit" vexel-merge-git resolve "$file" >/dev/null
+  check "line $line is for one place" test "$(grep -c ': 7}\?$' "$file")" -eq 2
+  git hash-object "$file" >>"$work/results" && git checkout -q -m -- "$file" 2>/dev/null
+done
+check "and for no other line's" test "$(sort -u "$work/results" | wc -l)" -eq $((last - first + 1))
+vexel-merge-git resolve --left --path '6128736512653217351.*.*' "$file" >/dev/null 2>&1 || :
+check "a file ID is no number" test "$(grep -c '^# left.right.base' "$record")" -eq $((last - first))
+check "the rest is settled" vexel-merge-git resolve --right "$file" >/dev/null
+check "what only one side edited stays" test "$(grep -c ': 7$' "$file")" -eq 2
+
 end_of_checks "git merges through vexel-merge-git"

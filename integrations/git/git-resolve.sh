@@ -14,16 +14,17 @@ make_record() {
   leave_record "$asset" "$(hash_of "$asset" "$scratch/merged")"
 }
 
-# choose_side SIDE PATTERN: adds to $scratch/decided a resolution for each pending conflict whose path fits the pattern, since a pattern in
-# the record itself would also decide about places that only one side has changed.
+# choose_side SIDE PATTERN: adds to $scratch/decided a resolution for each pending conflict whose path fits the pattern,
+# since a pattern in the record itself would also decide about places that only one side has changed. Paths are texts:
+# as numbers, two file IDs of 19 digits may be equal.
 choose_side() (
   [ -s "$scratch/conflicts" ] || return 0
   SIDE=$1 PATTERN=$2 awk -F '\t' '
     function fits(path, pattern,   p, q, n, i) {
       n = split(path, p, ".")
-      if (pattern == "" || path == pattern) return 1
+      if (pattern == "") return 1
       if (split(pattern, q, ".") != n) return 0
-      for (i = 1; i <= n; i++) if (q[i] != "*" && q[i] != p[i]) return 0
+      for (i = 1; i <= n; i++) if (q[i] != "*" && q[i] "" != p[i] "") return 0
       return 1
     }
     fits($1, ENVIRON["PATTERN"]) {print ENVIRON["SIDE"], $1}' "$scratch/conflicts" >"$scratch/chosen"
@@ -79,9 +80,6 @@ settle() (
     0) put_asset <"$scratch/merged" || return 1 ;;
     2 | 3)
       list_conflicts "$base" "$left" "$right" -i "$scratch/decided" || return 1
-      if [ -n "$side" ] && cut -f 1 "$scratch/conflicts" | sed "s/^/$side /" | grep -qxFf "$scratch/chosen"; then
-        complain "a key with a blank or a dot can't be named in a record: settle that place in the file itself"
-      fi
       return 2
       ;;
     *) return 1 ;;
