@@ -168,8 +168,13 @@ bool ReportMistypedOption(const MergeConfig& config) {
   const auto distance = [&](std::string_view option) { return EditDistance(given, option); };
   const std::string_view meant = std::ranges::min(kMergeOptions, {}, distance);
   errs << "Error: '" << given << "' is no file and no option of merge";
-  // Of other words no option is nearer than the rest.
-  if (distance(meant) * 2 < given.size()) errs << "; did you mean " << meant << "?";
+  if (distance(meant) * 2 < given.size()) {
+    errs << "; did you mean " << meant << "?";
+  } else {
+    // No option is nearer than the rest.
+    errs << "; merge knows";
+    for (const std::string_view option : kMergeOptions) errs << ' ' << option;
+  }
   errs << '\n';
   ErrMsg(errs);
   return true;
