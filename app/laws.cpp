@@ -195,14 +195,14 @@ void Laws::CheckBothSides(const SceneTriple& triple) {
   Expect(kSwapped, Content(merged.scene.get()) == Content(swapped.scene.get()), triple);
 }
 
-bool Laws::Check(const SceneTriple& triple) {
+std::string Laws::Check(const SceneTriple& triple) {
   try {
     CheckSide(triple, *triple.left);
     CheckSide(triple, *triple.right);
     CheckBothSides(triple);
-    return true;
-  } catch (const std::length_error&) {
-    return false;
+    return {};
+  } catch (const std::length_error& error) {
+    return error.what();
   }
 }
 

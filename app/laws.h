@@ -23,10 +23,10 @@ class Laws {
 
   Laws();
 
-  /// Checks every law on `triple`. False where its lists can't be matched, which a merge reports as an error:
-  /// equal elements at both ends of a list that gets shorter can't be told apart. Throws what diffing,
-  /// merging and writing throw otherwise.
-  bool Check(const SceneTriple& triple);
+  /// Checks every law on `triple` and returns an empty text. Where its lists can't be matched, which a merge
+  /// reports as an error, it returns the reason: equal elements at both ends of a list that gets shorter
+  /// can't be told apart. Throws what diffing, merging and writing throw otherwise.
+  std::string Check(const SceneTriple& triple);
 
   const std::vector<Result>& GetResults() const { return results_; }
 

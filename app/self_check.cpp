@@ -50,8 +50,9 @@ bool CheckUsersScene(const CommandLineArguments& arguments, Laws& laws) {
   // Nobody knows whether something was moved in the user's scene.
   SceneTriple triple = {ReadFile(arguments[2]), ReadFile(arguments[3]), ReadFile(arguments[4]), true};
   PrepareForDiff(*triple.base, *triple.left, *triple.right);
-  if (laws.Check(triple)) return true;
-  errs << "The lists of these files can't be matched; merge says which\n";
+  const std::string reason = laws.Check(triple);
+  if (reason.empty()) return true;
+  errs << "These files can't be checked: " << reason << '\n';
   ErrMsg(errs);
   return false;
 }
