@@ -2,6 +2,8 @@
 
 #include <utility>
 
+#include "platform/mutex.h"
+
 namespace vexel_yaml {
 
 TimerStat::TimerStat(std::string name, std::ostream* out)
@@ -17,8 +19,10 @@ TimerStat::~TimerStat() {
   if (out_ == nullptr) return;
   const auto elapsed =
       std::chrono::duration_cast<std::chrono::milliseconds>(std::chrono::steady_clock::now() - start_);
-  // In one piece, since two premerge threads may end a step at once.
   const std::string indent(2 * static_cast<size_t>(depth_), ' ');
+  // Two threads may end a step at once, and what escapes for a terminal takes one character after another.
+  static Mutex printing;
+  AutoLock lock(printing);
   *out_ << indent + name_ + ": " + std::to_string(elapsed.count()) + "\n" << std::flush;
 }
 
