@@ -6,12 +6,12 @@
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
-#include <fstream>
 #include <iostream>
 
 #include "app/command_line.h"
 #include "app/fallback_spec_file.h"
 #include "platform/error_channel.h"
+#include "platform/file_replacement.h"
 #include "platform/files.h"
 
 namespace vexel_yaml {
@@ -86,7 +86,7 @@ int FallbackMergeTool(const std::string& base, const std::string& left, const st
   const FallbackCommandEntry entry = GetFallbackCommandEntry(map, left, spec_path);
   if (entry.tool.empty()) return 1;
   const std::string arguments = SubstituteMergePlaceholderFilePaths(entry.arguments, base, left, right, dest);
-  if (!FileExists(dest)) std::ofstream(VexelToNativePath(dest), std::ios::binary);
+  if (!FileExists(dest)) ReplaceFile(VexelToNativePath(dest), "");
 
   // For lists that name a script of the program's, whose folder they can't know.
   setenv(kDataFilesVariable, GetDataFilesDir().c_str(), 1);

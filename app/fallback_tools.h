@@ -14,8 +14,9 @@ std::string SubstituteMergePlaceholderFilePaths(std::string_view arguments, cons
 
 /// Hands the files to the outside merge tool that the fallback specification file (a value of "--fallback")
 /// has for the kind of `left`, and waits for it. The destination exists (empty if need be) when the tool
-/// starts, and the environment variable VEXEL_DATA_FILES holds the folder of the data files. Returns what
-/// `system` returned, or 1, with the reason reported, where no tool was found.
+/// starts (throws FileError where it can't be made), and the environment variable VEXEL_DATA_FILES holds the
+/// folder of the data files. Returns what `system` returned, or 1, with the reason reported, where no tool
+/// was found.
 int FallbackMergeTool(const std::string& base, const std::string& left, const std::string& right,
                       const std::string& dest, const std::string& spec_file);
 

@@ -1,5 +1,7 @@
 #include "app/merge_command.h"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <array>
 #include <cerrno>
@@ -22,12 +24,15 @@ namespace vexel_yaml {
 
 namespace {
 
-constexpr char kNoOutputFile[] = "Couldn't create temporary output file for merge result";
-
 int Report(const std::string& message) {
   errs << message;
   ErrMsg(errs);
   return 1;
+}
+
+// One that can't be opened may hold something.
+bool IsKnownToBeEmpty(const std::string& path) {
+  return access(path.c_str(), R_OK) == 0 && IsFileEmpty(path);
 }
 
 // Extensions are compared as they stand; of upper-case forms only those of three letters are known.
@@ -95,9 +100,10 @@ int MergeWithTool(const MergeConfig& config, const std::string& extension, const
     return Report("Don't know how to merge " + extension + " files. Consider specifying a specFile argument");
   }
   if (ReportMistypedOption(config)) return 1;
+  // Before the tool runs, which may empty its inputs.
+  const bool may_be_empty = IsKnownToBeEmpty(config.left_path) || IsKnownToBeEmpty(config.right_path);
   const int tool_result = FallbackMergeTool(config.base_path, config.left_path, config.right_path, merged,
                                             config.fallback_spec_file);
-  const bool may_be_empty = IsFileEmpty(config.left_path) || IsFileEmpty(config.right_path);
   return FinishWithTool(tool_result, merged, config.destination_path, may_be_empty);
 }
 
@@ -105,7 +111,9 @@ int MergeWithTemporaryFiles(MergeConfig config) {
   // Only a tool needs one: what is merged without it is written beside its destination.
   const bool may_need_tool = config.fallback_spec_file != kNoSpecFile;
   const std::string merged = may_need_tool ? CreateTempFile() : std::string();
-  if (may_need_tool && merged.empty()) return ReportTemporaryFile(kNoOutputFile);
+  if (may_need_tool && merged.empty()) {
+    return ReportTemporaryFile("Couldn't create temporary output file for merge result");
+  }
   if (config.premerge && (SetupPremergePath(config.premerge_base_destination) != 0 ||
                           SetupPremergePath(config.premerge_right_destination) != 0)) {
     return ReportTemporaryFile("Couldn't create temporary output premerge base file for merge result");
@@ -126,12 +134,7 @@ int ProcessMergeCommand(const MergeConfig& config) {
     WriteHint(error.GetHint());
     return 1;
   } catch (const FileError& error) {
-    if (error.GetStep() != FileError::Step::kMakingTemporaryFile) {
-      return Report(std::string(error.what()) + "\n");
-    }
-    Report(kNoOutputFile);
-    WriteHint(error.what());
-    return 1;
+    return Report(std::string(error.what()) + "\n");
   }
 }
 

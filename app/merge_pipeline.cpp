@@ -1,10 +1,12 @@
 #include "app/merge_pipeline.h"
 
+#include <array>
 #include <cerrno>
 #include <deque>
 #include <iostream>
 #include <memory>
 #include <optional>
+#include <string_view>
 #include <system_error>
 #include <vector>
 
@@ -16,6 +18,7 @@
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/run_main.h"
 #include "platform/timer_stat.h"
 #include "rules/setup.h"
 #include "rules/yaml_sequence_remapper.h"
@@ -115,10 +118,11 @@ class MergeRun {
     }
     const MergeResolve base_side =
         YAMLSequenceRemapper::CheckBlankPremergeBaseEnabled() ? MergeResolve::kBlank : MergeResolve::kBase;
-    FileReplacement& base = others_.emplace_back(VexelToNativePath(config_.premerge_base_destination));
-    FileReplacement& right = others_.emplace_back(VexelToNativePath(config_.premerge_right_destination));
-    RunPremerges({{{base_side, base}, {MergeResolve::kRight, right}}}, documents_, diffs_,
-                 resolver_.GetResolutions(), config_.threads, timer_);
+    std::array<PremergeTarget, 2> targets = {{{base_side, {}}, {MergeResolve::kRight, {}}}};
+    RunPremerges(targets, documents_, diffs_, resolver_.GetResolutions(), config_.threads, timer_);
+    // One after the other: two at once may be more than the descriptors that are left.
+    Write(config_.premerge_base_destination, targets[0].text.view());
+    Write(config_.premerge_right_destination, targets[1].text.view());
   }
 
   // Not before all of them are on the disk: a merge that fails leaves no file of a merge. The result comes
@@ -134,6 +138,12 @@ class MergeRun {
   }
 
  private:
+  void Write(const std::string& path, std::string_view text) {
+    FileReplacement& file = others_.emplace_back(VexelToNativePath(path));
+    file.Stream() << text;
+    file.Finish();
+  }
+
   const MergeConfig& config_;
   MergeDocuments& documents_;
   std::unique_ptr<VexelObjects>& merged_;
@@ -160,6 +170,8 @@ int HandleMergeCommand(const MergeConfig& config, const std::string& path_for_to
   run.OutputConflicts();
   run.OutputResult(path_for_tool);
   run.OutputPremerge();
+  // The last that can fail before the destination changes.
+  if (!FlushStandardOutput()) return 1;
   run.CommitFiles();
   return run.GetResult();
 }

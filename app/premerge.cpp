@@ -11,7 +11,7 @@ namespace {
 
 // One premerged file on its way.
 struct PremergeJob {
-  const PremergeTarget& target;
+  PremergeTarget& target;
   // A fresh copy of base: one that already holds the merge can't take it again.
   std::unique_ptr<VexelObjects> copy;
 };
@@ -23,7 +23,7 @@ struct PremergeInput {
   const std::vector<RecordingConflictResolver::RecordResolve>& resolutions;
 };
 
-void Premerge(MergeResolve side, FileReplacement& file, VexelObjects& copy, const PremergeInput& input,
+void Premerge(MergeResolve side, std::ostream& out, VexelObjects& copy, const PremergeInput& input,
               TimerStat& timer) {
   RecordingConflictResolver resolver(side);
   // What the user has settled is no conflict in any of the files.
@@ -39,12 +39,11 @@ void Premerge(MergeResolve side, FileReplacement& file, VexelObjects& copy, cons
     PostProcessMergeOnly(copy, input.documents.left, input.documents.right, resolver);
   }
   TimerStat step(timer, "Output premerge result");
-  copy.Output(file.Stream(), VexelObjects::Headers::kAsTheyAre);
-  file.Finish();
+  copy.Output(out, VexelObjects::Headers::kAsTheyAre);
 }
 
 void PremergeThreadFunction(PremergeJob& job, const PremergeInput& input, TimerStat& timer) {
-  Premerge(job.target.side, job.target.file, *job.copy, input, timer);
+  Premerge(job.target.side, job.target.text, *job.copy, input, timer);
 }
 
 void SpawnPremergeThread(Thread& thread, PremergeJob& job, const PremergeInput& input, TimerStat& timer) {
@@ -53,14 +52,14 @@ void SpawnPremergeThread(Thread& thread, PremergeJob& job, const PremergeInput& 
 
 }  // namespace
 
-void RunPremerges(const std::array<PremergeTarget, 2>& targets, const MergeDocuments& documents,
+void RunPremerges(std::array<PremergeTarget, 2>& targets, const MergeDocuments& documents,
                   const DiffPair& diffs,
                   const std::vector<RecordingConflictResolver::RecordResolve>& resolutions, bool threads,
                   TimerStat& timer) {
   std::vector<PremergeJob> jobs;
   {
     TimerStat step(timer, "Clone base roots");
-    for (const PremergeTarget& target : targets) {
+    for (PremergeTarget& target : targets) {
       jobs.push_back({target, std::unique_ptr<VexelObjects>(documents.base.Clone())});
     }
   }

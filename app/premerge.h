@@ -1,11 +1,11 @@
 #pragma once
 
 #include <array>
+#include <sstream>
 #include <vector>
 
 #include "fixups/three_way_merge.h"
 #include "merge/recording_conflict_resolver.h"
-#include "platform/file_replacement.h"
 #include "platform/timer_stat.h"
 
 namespace vexel_yaml {
@@ -14,13 +14,12 @@ namespace vexel_yaml {
 /// there were conflicts.
 struct PremergeTarget {
   MergeResolve side;
-  FileReplacement& file;
+  std::ostringstream text;
 };
 
-/// Writes both premerged files and finishes them, each on a thread of its own if `threads`, with the user's
-/// resolutions; the caller commits them, so that it is both or none.
-/// Throws what merging and post-processing throw, and FileError; the first target's exception first.
-void RunPremerges(const std::array<PremergeTarget, 2>& targets, const MergeDocuments& documents,
+/// Makes the texts of both premerged files, each on a thread of its own if `threads`, with the user's
+/// resolutions. Throws what merging and post-processing throw, the first target's exception first.
+void RunPremerges(std::array<PremergeTarget, 2>& targets, const MergeDocuments& documents,
                   const DiffPair& diffs,
                   const std::vector<RecordingConflictResolver::RecordResolve>& resolutions, bool threads,
                   TimerStat& timer);

@@ -10,7 +10,7 @@ namespace vexel_yaml {
 class FileError : public std::runtime_error {
  public:
   /// What failed. Opening for writing includes making the file that is to take the place of another.
-  enum class Step { kReading, kOpening, kMakingTemporaryFile, kWriting, kClosing };
+  enum class Step { kReading, kOpening, kWriting, kClosing };
 
   /// `error_number` as in errno.
   FileError(Step step, const std::string& path, int error_number);

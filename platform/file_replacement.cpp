@@ -5,11 +5,13 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <charconv>
 #include <cstdio>
 #include <filesystem>
 #include <system_error>
 #include <utility>
 
+#include "platform/ending_signals.h"
 #include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
 
@@ -26,17 +28,45 @@ const mode_t process_umask = [] {
   return mask;
 }();
 
+// Whether `path` stands in the folder of a process's open files, or in one that is like it: what looks like a
+// link there leads to an open file, whose name may be gone or be another file's by now.
+bool LeadsToOpenFile(const std::filesystem::path& path) {
+  std::error_code error;
+  const std::string folder = std::filesystem::canonical(path.parent_path(), error).string();
+  return folder.starts_with("/proc/") || folder == "/dev/fd";
+}
+
+// The descriptor of this process that `path` stands for ("/dev/fd/7"), else -1.
+int OwnDescriptor(const std::filesystem::path& path) {
+  std::error_code error;
+  const std::filesystem::path folder = std::filesystem::canonical(path.parent_path(), error);
+  if (folder.empty() || (folder != std::filesystem::canonical("/proc/self/fd", error) &&
+                         folder != std::filesystem::canonical("/dev/fd", error))) {
+    return -1;
+  }
+  const std::string name = path.filename().string();
+  int descriptor = -1;
+  const auto [end, failure] = std::from_chars(name.data(), name.data() + name.size(), descriptor);
+  return failure == std::errc() && end == name.data() + name.size() ? descriptor : -1;
+}
+
 // The link's target, also where that does not exist yet.
 std::string FollowLinks(const std::string& path) {
   std::error_code error;
   std::filesystem::path target = path;
-  for (int links = 0; std::filesystem::is_symlink(target, error); ++links) {
+  for (int links = 0; std::filesystem::is_symlink(target, error) && !LeadsToOpenFile(target); ++links) {
     // A longer chain is a loop.
     if (links == 40) throw FileError(Step::kOpening, path, ELOOP);
     const std::filesystem::path next = std::filesystem::read_symlink(target, error);
     target = next.is_absolute() ? next : target.parent_path() / next;
   }
   return target.string();
+}
+
+// On a file system without permissions a new file gets what every file has there.
+bool ChangeMode(int descriptor, mode_t mode) {
+  return fchmod(descriptor, mode) == 0 || errno == EPERM || errno == EINVAL || errno == ENOTSUP ||
+         errno == ENOSYS;
 }
 
 bool IsRegular(int descriptor) {
@@ -78,24 +108,25 @@ int ReserveRoom([[maybe_unused]] int descriptor, [[maybe_unused]] size_t size) {
 
 }  // namespace
 
-FileReplacement::FileReplacement(const std::string& path) : path_(path), target_(path) {
+FileReplacement::FileReplacement(const std::string& path) : path_(path), target_(FollowLinks(path)) {
   struct stat status = {};
   const bool exists = stat(path.c_str(), &status) == 0;
+  // Who may run a program as somebody else must not give that away with a new file.
+  mode_ = exists ? status.st_mode & 0777 : 0666 & ~process_umask;
+  own_descriptor_ = OwnDescriptor(target_);
+  const bool in_place = own_descriptor_ >= 0 || LeadsToOpenFile(target_) || !S_ISREG(status.st_mode);
   try {
-    // Before links are followed: what /dev/stdout leads to may be a pipe, which has no path.
-    if (exists && !S_ISREG(status.st_mode)) {
+    if (exists && in_place) {
       if (!OpenDestination()) throw FileError(Step::kOpening, path_, errno);
     } else {
-      target_ = FollowLinks(path);
       if (exists && access(target_.c_str(), W_OK) != 0) throw FileError(Step::kOpening, path_, errno);
+      MakeTemporaryFile(exists);
     }
-    mode_ = exists ? status.st_mode & 07777 : 0666 & ~process_umask;
-    MakeTemporaryFile(exists);
   } catch (...) {
     CloseAll();
     throw;
   }
-  stream_.emplace(&buffer_.emplace(temporary_descriptor_));
+  stream_.emplace(buffer_ ? static_cast<std::streambuf*>(&*buffer_) : &text_);
 }
 
 FileReplacement::~FileReplacement() { CloseAll(); }
@@ -108,41 +139,52 @@ void FileReplacement::CloseAll() {
 }
 
 void FileReplacement::MakeTemporaryFile(bool exists) {
-  if (target_descriptor_ < 0) {
-    temporary_ = target_.substr(0, target_.rfind('/') + 1) + ".mergeXXXXXX";
-    temporary_descriptor_ = OpenTempFile(temporary_);
-    if (temporary_descriptor_ >= 0) return;
-    temporary_.clear();
-    // Any other reason (a full disk, say) must not touch what stands there.
-    const bool in_place = errno == EACCES || errno == EPERM || errno == EROFS;
-    if (!exists || !in_place) throw FileError(Step::kOpening, path_, errno);
-    if (!OpenDestination()) throw FileError(Step::kOpening, path_, errno);
-  }
-  temporary_ = kTempFilePattern;
+  temporary_ = target_.substr(0, target_.rfind('/') + 1) + ".mergeXXXXXX";
   temporary_descriptor_ = OpenTempFile(temporary_);
-  if (temporary_descriptor_ >= 0) return;
+  if (temporary_descriptor_ >= 0) {
+    buffer_.emplace(temporary_descriptor_);
+    return;
+  }
   temporary_.clear();
-  throw FileError(Step::kMakingTemporaryFile, path_, errno);
+  const int error_number = errno;
+  // Any other reason (a full disk, say) must not touch what stands there.
+  const bool in_place = error_number == EACCES || error_number == EPERM || error_number == EROFS;
+  if (exists && in_place) {
+    if (!OpenDestination()) throw FileError(Step::kOpening, path_, errno);
+    return;
+  }
+  // What exists could have been opened: it is the text that found no room.
+  throw FileError(exists ? Step::kWriting : Step::kOpening, path_, error_number);
 }
 
 // Nothing is cut off yet.
 bool FileReplacement::OpenDestination() {
-  target_descriptor_ = open(target_.c_str(), O_WRONLY | O_CLOEXEC);
+  if (own_descriptor_ < 0) {
+    target_descriptor_ = open(target_.c_str(), O_WRONLY | O_CLOEXEC);
+  } else if ((fcntl(own_descriptor_, F_GETFL) & O_ACCMODE) == O_RDONLY) {
+    errno = EBADF;
+  } else {
+    // Opened anew, it would be written from its beginning, over what the caller has written.
+    target_descriptor_ = fcntl(own_descriptor_, F_DUPFD_CLOEXEC, 0);
+  }
   return target_descriptor_ >= 0;
 }
 
 void FileReplacement::Finish() {
   stream_->flush();
+  if (temporary_descriptor_ < 0) {
+    // The text waits in memory, or was finished before.
+    if (!*stream_) throw FileError(Step::kWriting, path_, EIO);
+    return;
+  }
   struct stat status = {};
   int error_number = buffer_->GetErrorNumber();
   if (error_number == 0 && fstat(temporary_descriptor_, &status) != 0) error_number = errno;
   // A stream that has failed without a reason, or a file that is not as long as what was written.
   const bool whole = *stream_ && static_cast<uint64_t>(status.st_size) == buffer_->GetCount();
   if (error_number == 0 && !whole) error_number = EIO;
-  // What is copied later is flushed where it comes to stand.
-  if (error_number == 0 && target_descriptor_ < 0) {
-    const bool changed = fchmod(temporary_descriptor_, mode_) == 0;
-    error_number = changed ? FlushToDisk(temporary_descriptor_) : errno;
+  if (error_number == 0) {
+    error_number = ChangeMode(temporary_descriptor_, mode_) ? FlushToDisk(temporary_descriptor_) : errno;
   }
   if (error_number != 0) throw FileError(Step::kWriting, path_, error_number);
   error_number = Close(temporary_descriptor_);
@@ -150,34 +192,39 @@ void FileReplacement::Finish() {
 }
 
 void FileReplacement::Commit() {
-  if (temporary_descriptor_ >= 0) Finish();
-  if (target_descriptor_ < 0) {
-    if (std::rename(temporary_.c_str(), target_.c_str()) == 0) {
-      ForgetTempFile(std::exchange(temporary_, {}));
-      return;
-    }
-    // Somebody else's file in a shared folder, or a mount point, may be written but not replaced.
-    if (errno != EPERM && errno != EACCES && errno != EBUSY) throw FileError(Step::kWriting, path_, errno);
-    const int error_number = errno;
-    if (!OpenDestination()) throw FileError(Step::kWriting, path_, error_number);
+  Finish();
+  if (target_descriptor_ >= 0) return WriteInPlace(text_.view());
+  if (std::rename(temporary_.c_str(), target_.c_str()) == 0) {
+    ForgetTempFile(std::exchange(temporary_, {}));
+    return;
   }
-  CopyIntoPlace();
-}
-
-void FileReplacement::CopyIntoPlace() {
+  // Somebody else's file in a shared folder, or a mount point, may be written but not replaced.
+  if (errno != EPERM && errno != EACCES && errno != EBUSY) throw FileError(Step::kWriting, path_, errno);
+  const int error_number = errno;
+  if (!OpenDestination()) throw FileError(Step::kWriting, path_, error_number);
   const std::optional<std::string> text = ReadWholeFile(temporary_);
   if (!text || text->size() != buffer_->GetCount()) {
     throw FileError(Step::kWriting, path_, text ? EIO : errno);
   }
+  WriteInPlace(*text);
+}
+
+void FileReplacement::WriteInPlace(std::string_view text) {
   const bool regular = IsRegular(target_descriptor_);
-  int error_number = regular ? ReserveRoom(target_descriptor_, text->size()) : 0;
+  // Ended in the middle, it would be half the old and half the new file. A pipe may wait for its reader
+  // for ever, and nobody could end that.
+  std::optional<SignalsHeld> held;
+  if (regular) held.emplace();
+  // What the caller has opened goes on behind the text.
+  const bool replaced = regular && own_descriptor_ < 0;
+  int error_number = replaced ? ReserveRoom(target_descriptor_, text.size()) : 0;
   if (error_number != 0) throw FileError(Step::kWriting, path_, error_number);
   DescriptorBuffer copy(target_descriptor_);
-  copy.sputn(text->data(), static_cast<std::streamsize>(text->size()));
+  copy.sputn(text.data(), static_cast<std::streamsize>(text.size()));
   copy.pubsync();
   error_number = copy.GetErrorNumber();
-  if (error_number == 0 && regular) {
-    const bool cut = ftruncate(target_descriptor_, static_cast<off_t>(text->size())) == 0;
+  if (error_number == 0 && replaced) {
+    const bool cut = ftruncate(target_descriptor_, static_cast<off_t>(text.size())) == 0;
     error_number = cut ? FlushToDisk(target_descriptor_) : errno;
   }
   if (error_number != 0) throw FileError(Step::kWriting, path_, error_number);

@@ -27,6 +27,12 @@ void OpenStandardDescriptors() {
 
 }  // namespace
 
+bool FlushStandardOutput() {
+  if (std::cout.flush()) return true;
+  WriteErrorLine("Cannot write to standard output");
+  return false;
+}
+
 int RunMain(int argc, char** argv, int (*run)(const std::vector<std::string>& arguments)) {
   OpenStandardDescriptors();
   // Dying of a closed pipe would leave temporary files behind; as a failed write it passes through the code.
@@ -35,12 +41,8 @@ int RunMain(int argc, char** argv, int (*run)(const std::vector<std::string>& ar
   const TerminalOutput errors(std::cerr, STDERR_FILENO);
   try {
     const int status = run(std::vector<std::string>(argv, argv + argc));
-    // Whoever reads the output must not take a part of it for the whole.
-    if (status == 0 && !std::cout.flush()) {
-      WriteErrorLine("Cannot write to standard output");
-      return 1;
-    }
-    return status;
+    // Whoever reads the output must not take a part of it for the whole. What has failed has its message.
+    return status == 1 || FlushStandardOutput() ? status : 1;
   } catch (const std::bad_alloc&) {
     EndOutOfMemory();
   } catch (const HintedError& error) {

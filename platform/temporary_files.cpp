@@ -9,7 +9,9 @@
 #include <cerrno>
 #include <csignal>
 #include <cstdlib>
+#include <utility>
 
+#include "platform/ending_signals.h"
 #include "platform/mutex.h"
 
 namespace vexel_yaml {
@@ -27,16 +29,13 @@ struct Slot {
 std::array<Slot, 16> slots;
 Mutex slots_mutex;
 
-// What a person, the system's shutdown or a limit on file size or time ends the process with.
-constexpr std::array kEndingSignals = {SIGHUP, SIGINT, SIGTERM, SIGXFSZ, SIGXCPU};
-
 extern "C" void RemoveTempFilesAndDie(int signal_number) {
   UnlinkTempFiles();
   std::signal(signal_number, SIG_DFL);
   raise(signal_number);
 }
 
-bool HandleSignals() {
+void HandleSignals() {
   for (const int signal_number : kEndingSignals) {
     struct sigaction action = {};
     // A signal that the caller has switched off (nohup) stays off.
@@ -44,32 +43,15 @@ bool HandleSignals() {
     action.sa_handler = RemoveTempFilesAndDie;
     sigaction(signal_number, &action, nullptr);
   }
-  return true;
 }
-
-// Holds the signals back that would find a file that is not remembered yet.
-class SignalsHeld {
- public:
-  SignalsHeld() {
-    sigset_t held;
-    sigemptyset(&held);
-    for (const int signal_number : kEndingSignals) sigaddset(&held, signal_number);
-    pthread_sigmask(SIG_BLOCK, &held, &previous_);
-  }
-  SignalsHeld(const SignalsHeld&) = delete;
-  SignalsHeld& operator=(const SignalsHeld&) = delete;
-  ~SignalsHeld() { pthread_sigmask(SIG_SETMASK, &previous_, nullptr); }
-
- private:
-  sigset_t previous_;
-};
 
 // Returns 0 or an errno.
 int RememberTempFile(const std::string& path) {
   AutoLock lock(slots_mutex);
-  static const bool handled = HandleSignals();
+  static bool handled = false;
+  if (!std::exchange(handled, true)) HandleSignals();
   Slot* slot = std::find_if(slots.begin(), slots.end(), [](const Slot& s) { return !s.used; });
-  if (!handled || slot == slots.end()) return EMFILE;
+  if (slot == slots.end()) return EMFILE;
   if (path.size() >= slot->path.size()) return ENAMETOOLONG;
   *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';
   slot->used = true;
@@ -79,6 +61,7 @@ int RememberTempFile(const std::string& path) {
 }  // namespace
 
 int OpenTempFile(std::string& pattern) {
+  // A signal now would find a file that is not remembered yet.
   const SignalsHeld held;
   const int file = mkstemp(pattern.data());
   if (file < 0) return -1;

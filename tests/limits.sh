@@ -1,7 +1,9 @@
 #!/usr/bin/env bash
-# limits.sh PROGRAM: merges where the machine gives too little, and shows hostile names on a terminal.
+# limits.sh PROGRAM [LIBRARY]: merges where the machine gives too little, and shows hostile names on a terminal.
+# LIBRARY lets a signal come at a chosen time (see faults/fail_calls.cpp).
 set -euo pipefail
 program=$(realpath "$1")
+library=${2:+$(realpath "$2")}
 folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT
 cd "$folder"
@@ -65,6 +67,32 @@ status=0
 status=0
 "${merge[@]}" old.vexel >&- 2> messages || status=$?
 [[ $status == 1 && "$(< old.vexel)" == old ]] || fail "closed output: status $status"
+"$program" strip -h base.vexel left.vexel > plain
+echo -old > log && (echo before; "$program" strip -h base.vexel left.vexel /dev/stdout; echo after) >> log
+printf '%s\n' -old before "$(< plain)" after | cmp -s - log || fail 'the log is not continued'
+(exec 7> fd7 && rm fd7 && "${merge[@]}" /dev/fd/7 > output && cmp -s /dev/fd/7 wanted.vexel) || fail 'an open file without a name'
+(exec 3>&- && ulimit -n 4 && "$program" strip -h base.vexel left.vexel /dev/stdout) | cmp -s - plain || fail 'pipe'
+scene clash 3 3
+status=0
+(exec 3>&- && ulimit -n 4 && "${merge[@]:0:5}" -p base.vexel left.vexel clash.vexel merged base right) > output || status=$?
+[[ $status == 2 && -s base && -s right ]] || fail "few descriptors for premerged files: status $status"
+cp wanted.vexel run_as && chmod 4755 run_as && "${merge[@]}" run_as > output && [[ $(stat -c %a run_as) == 755 ]] || fail 'mode'
+
+status=0
+"${merge[@]:0:5}" --timing -o records "${merge[@]:5}" old.vexel > /dev/full 2> messages || status=$?
+[[ $status == 1 && "$(< old.vexel)" == old && "$(< messages)" == 'Cannot write to standard output' ]] || fail 'full output'
+
+# Overwritten in place by a shorter text, with a signal behind one write after the other.
+mkdir closed && : > calls && : > count && chmod 666 calls count
+for write in ${library:+1 2 3 4 5 6 7 8 9}; do
+  head -c 8 /dev/zero > count && cp "$library" library.so
+  cat wanted.vexel wanted.vexel > closed/file && cp closed/file twice && chmod 666 closed/file && chmod 555 closed
+  "${as_user[@]}" env LD_PRELOAD="$PWD/library.so" FAULT_COUNT=count FAULT_LOG=calls FAULT="write -15 $write 0" \
+    "./${program##*/}" "${merge[@]:1}" closed/file > output || true
+  chmod 755 closed
+  cmp -s closed/file wanted.vexel || cmp -s closed/file twice || fail 'a file is half new'
+done
+[[ -z $library ]] || grep -q 'failed.*closed/file' calls || fail "no signal came while writing in place: $(< calls)"
 [[ -z "$(find . -name '.merge*')" ]] || fail 'a temporary file stayed'
 
 shown=$(script -qec "$program strip -h base.vexel $'\e[1m\u9b\u82e9\xff\n.vexel'" /dev/null | tr -d '\r' || true)

@@ -45,7 +45,7 @@ FAULTS = {
 }
 ONCE = {EINTR, -SIGTERM, -SIGKILL}
 # No harm is done: nobody may notice.
-HARMLESS = {("read", 0), ("write", 0), ("thread", EAGAIN)}
+HARMLESS = {("read", 0), ("write", 0), ("thread", EAGAIN), ("mode", EPERM)}
 
 Result = namedtuple("Result", "status stdout stderr files left failed calls")
 
@@ -136,8 +136,9 @@ def judge(command, kind, error, old, clean, result):
     if kind != "rename" and len([name for name in new if "_base" in name or "_right" in name]) == 1:
         problems.append("only one premerged file is new")
     is_whole = (result.status, result.stdout, result.files) == (clean.status, clean.stdout, clean.files)
-    # Of a file that can't be opened or closed, these commands say nothing: their callers expect it so.
-    is_silent = kind in ("open", "create", "close") and any("out/" in place for place in result.failed)
+    # Of a file that can't be opened or closed, these commands say nothing: their callers expect it so. One that
+    # exists could have been opened.
+    is_silent = kind in ["open", "close"] + ["create"] * (not old) and any("out/" in place for place in result.failed)
     if is_silent and (" strip " in command or " diff " in command):
         return problems + ["it is not silent"] * ((result.status, result.files, result.stderr) != (0, old, b""))
     if is_whole or result.status != 1 or (kind, error) in HARMLESS:

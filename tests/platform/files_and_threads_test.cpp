@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "platform/file_replacement.h"
+#include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
 #include "platform/thread.h"
 
@@ -49,12 +50,15 @@ TEST(FileReplacement, ReplacesTheTargetOfALinkOrNothing) {
 
   const auto replace_as_ordinary_user = [] {
     if (geteuid() == 0 && setuid(65534) != 0) _exit(2);
-    fputs((Replace(kFile, "") + Replace(kFolder + "new", "")).c_str(), stderr);
+    std::string said = Replace(kFile, std::string(100'000, 'x'));
+    if (fs::file_size(kFile) != 100'000) said = "too short";
+    said += Replace(kFile, "in place");
+    fputs((said + Replace(kFolder + "new", "")).c_str(), stderr);
     _exit(0);
   };
   fs::permissions(kFolder, fs::perms(0555));
   EXPECT_EXIT(replace_as_ordinary_user(), testing::ExitedWithCode(0), "^Cannot write '.*new': Permission");
-  EXPECT_EQ(fs::file_size(kFile), 0);
+  EXPECT_EQ(ReadWholeFile(kFile), "in place");
   fs::permissions(kFolder, fs::perms(0755));
   fs::remove_all(kFolder);
 }
@@ -62,7 +66,11 @@ TEST(FileReplacement, ReplacesTheTargetOfALinkOrNothing) {
 TEST(TemporaryFiles, GoAwayAlsoAfterAnInterrupt) {
   const std::string path = CreateTempFile();
   EXPECT_EQ(fs::status(path).permissions(), fs::perms(0600));
-  EXPECT_EXIT(raise(SIGINT), testing::KilledBySignal(SIGINT), "");
+  for (const int signal_number : {SIGINT, SIGQUIT, SIGUSR1, SIGABRT}) {
+    const std::string interrupted = CreateTempFile();
+    EXPECT_EXIT(raise(signal_number), testing::KilledBySignal(signal_number), "");
+    EXPECT_FALSE(fs::exists(interrupted)) << signal_number;
+  }
   EXPECT_FALSE(fs::exists(path));
   const std::string later = CreateTempFile();
   { const TempFilesGuard guard; }
