@@ -13,37 +13,6 @@
 namespace vexel_yaml {
 namespace {
 
-// Diffs two values at `path`; the diff and its copy must make the second of the first, in any place. Tells
-// where the elements of two lists went and which ones of the new list are new or edited.
-std::string Turn(std::string_view from_text, std::string_view to_text, std::string_view at = "1.A.list") {
-  const OwnedNode from = ValueFromText(from_text);
-  const OwnedNode to = ValueFromText(to_text);
-  FieldPath path = PathFromText(at);
-  const Operation* made = CreateDiffOperation(path, from.get(), to.get());
-  EXPECT_EQ(path, PathFromText(at));
-  EXPECT_EQ(from->GetYAMLString(), ValueFromText(from_text)->GetYAMLString());
-  const Operation* copy = MergeTreeCloneVisitor::Clone(made);
-  EXPECT_TRUE(OperationEquals(*copy, *made) && copy->IsMergeable() == made->IsMergeable());
-  YAMLSequence list(false);
-  for (const Operation* operation : {made, copy}) {
-    list.Append(from->Clone());
-    operation->Apply(list, static_cast<int>(list.Size()) - 1);
-    EXPECT_EQ(list.GetItems().back()->GetYAMLString(), to->GetYAMLString());
-  }
-  std::string text;
-  if (made->GetKind() != Operation::Kind::kChangeSequence) return text;
-  const auto* changed = static_cast<const ChangeSequenceOperation*>(made);
-  if (const auto* remapper = changed->GetRemapper()) {
-    for (const uint32_t index : remapper->GetMapping()) {
-      text += index == YAMLSequenceRemapper::kDropped ? "-" : std::to_string(index);
-    }
-  }
-  for (const auto& [index, operation] : changed->GetDiff()->GetEntries()) {
-    text += (operation->GetKind() == Operation::Kind::kAdd ? " new " : " edited ") + std::to_string(index);
-  }
-  return text;
-}
-
 TEST(CreateAndApply, RulesHoldAtThePathsOfNestedElements) {
   const ScopedRules rules(
       "[arrays]\nset *.A.outer id\nset *.A.outer.*.inner id\n[comparisons]\nfloat *.A.outer.1.size 0.1 0.1");
