@@ -19,7 +19,7 @@ class FilePairCommands : public ::testing::TestWithParam<bool> {
     folder_ = mkdtemp(pattern.data());
     std::filesystem::current_path(folder_);
     std::ofstream("rules.txt") << "";
-    std::ofstream("old") << "%YAML 1.1\n--- !v!1 &1\nA: {b: 1}\n";
+    std::ofstream("old") << "%YAML 1.1\n%TAG !v! tag:x,2011:\n--- !v!1 &1\nA: {b: 1}\n";
   }
   ~FilePairCommands() override {
     std::filesystem::current_path(previous_);
