@@ -24,24 +24,6 @@ void CheckHeader(const YAMLMapping::Slot& slot, VexelObjects::Headers headers) {
   }
 }
 
-void CheckValues(const YAMLNode& node) {
-  const auto check_pair = [](const YAMLMapping::Slot& slot) {
-    slot.key->CheckWritable();
-    CheckValues(*slot.value);
-  };
-  if (const YAMLScalar* scalar = node.AsScalar()) {
-    scalar->CheckWritable();
-  } else if (const YAMLSequence* sequence = node.AsSequence()) {
-    for (const YAMLNode* item : sequence->GetItems()) {
-      if (item != nullptr) CheckValues(*item);
-    }
-  } else if (const YAMLMapping* mapping = node.AsMapping(); mapping->HasDuplicateKeys()) {
-    for (const YAMLMapping::Slot& slot : mapping->GetDuplicatePairs()) check_pair(slot);
-  } else {
-    for (const YAMLMapping::Slot& slot : *mapping) check_pair(slot);
-  }
-}
-
 // Takes the pseudo keys out of an object and puts them back at its end, also when it can't be written.
 struct TakenPseudoKeys {
   explicit TakenPseudoKeys(YAMLMapping& from)
@@ -69,24 +51,15 @@ struct TakenPseudoKeys {
 
 }  // namespace
 
-void VexelObjects::CheckWritable() const {
-  for (const Slot& slot : *this) {
-    try {
-      CheckHeader(slot, Headers::kComplete);
-      CheckValues(*slot.value);
-    } catch (const YAMLError& error) {
-      throw YAMLError(error.what(), "see object " + slot.key->GetText());
-    }
-  }
-}
-
-void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) {
+void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) try {
   CheckHeader(slot, headers);
   YAMLMapping* object = slot.value->AsMapping();
   const TakenPseudoKeys taken(*object);
   out << "--- !v!" << TextOf(taken.class_id) << " &" << TextOf(taken.file_id);
   if (taken.stripped != nullptr) out << " stripped";
   out << '\n' << object->GetYAMLString() << '\n';
+} catch (const YAMLError& error) {
+  throw YAMLError(error.what(), "see object " + slot.key->GetText());
 }
 
 void VexelObjects::OutputHeader(std::ostream& out) const {

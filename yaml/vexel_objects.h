@@ -47,18 +47,14 @@ class VexelObjects final : public YAMLMapping {
   /// version for a text merge tool has it blanked.
   enum class Headers : uint8_t { kComplete, kAsTheyAre };
 
-  /// Throws what Output would throw, so that nothing need be written to find out: YAMLError for an object
-  /// that is no mapping, repeats its own keys, has no class ID or file ID, or holds a value that can't be
-  /// written. The hint names the object.
-  void CheckWritable() const;
-
   /// Writes the file: the two directives, then a document for each object. Throws what OutputObject throws.
   void Output(std::ostream& out, Headers headers = Headers::kComplete);
 
   /// The two parts of it, for callers that write objects on several threads.
   void OutputHeader(std::ostream& out) const;
-  /// Throws what CheckWritable throws, but for the IDs where `headers` allows them to be missing. The pseudo
-  /// keys are at its end afterwards.
+  /// Throws YAMLError for an object that is no mapping, repeats its own keys, has no class ID or file ID
+  /// (which `headers` may allow), or holds a value that can't be written. The hint names the object. The
+  /// pseudo keys are at its end afterwards.
   static void OutputObject(std::ostream& out, const Slot& slot, Headers headers = Headers::kComplete);
 
   /// A deep copy of all objects, owned by the caller.

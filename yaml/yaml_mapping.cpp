@@ -1,7 +1,6 @@
 #include "yaml/yaml_mapping.h"
 
 #include <algorithm>
-#include <new>
 
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_error.h"
@@ -38,33 +37,19 @@ YAMLNode* YAMLMapping::Find(const YAMLScalar* key) const {
   return slot == kNotFound ? nullptr : slots_[slot].value;
 }
 
-// Where memory is short the mapping does without its index: it is searched in place, and what the caller
-// adds or moves is not lost half way.
 void YAMLMapping::BuildIndex() {
   index_.reset();
   if (slots_.size() < kIndexFrom) return;
-  try {
-    auto index = std::make_unique<Index>(slots_.capacity());
-    for (size_t i = 0; i < slots_.size(); ++i) {
-      if (slots_[i].key != nullptr) index->emplace(slots_[i].key, i);
-    }
-    index_ = std::move(index);
-  } catch (const std::bad_alloc&) {
-  }
-}
-
-void YAMLMapping::IndexSlot(const YAMLScalar* key, size_t slot) {
-  try {
-    index_->insert_or_assign(key, slot);
-  } catch (const std::bad_alloc&) {
-    index_.reset();
+  index_ = std::make_unique<Index>(slots_.capacity());
+  for (size_t i = 0; i < slots_.size(); ++i) {
+    if (slots_[i].key != nullptr) index_->emplace(slots_[i].key, i);
   }
 }
 
 void YAMLMapping::AddSlot(const YAMLScalar* key, YAMLNode* value) {
   slots_.push_back({key, value});
   if (index_) {
-    IndexSlot(key, slots_.size() - 1);
+    index_->insert_or_assign(key, slots_.size() - 1);
   } else if (slots_.size() >= kIndexFrom) {
     BuildIndex();
   }
@@ -118,7 +103,7 @@ void YAMLMapping::ChangeKey(const YAMLScalar* old_key, const YAMLScalar* new_key
   slots_[slot].key = new_key;
   if (index_) {
     index_->erase(old_key);
-    IndexSlot(new_key, slot);
+    index_->insert_or_assign(new_key, slot);
   }
 }
 

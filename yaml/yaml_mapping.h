@@ -139,7 +139,6 @@ class YAMLMapping : public YAMLNode {
   void AddSlot(const YAMLScalar* key, YAMLNode* value);
   void CloseGaps();
   void BuildIndex();
-  void IndexSlot(const YAMLScalar* key, size_t slot);
 
   std::vector<Slot> slots_;
   // Only for mappings with many keys: the root of a file has one an object, an object only a few.
