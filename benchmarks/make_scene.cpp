@@ -25,7 +25,8 @@ struct Options {
 constexpr std::string_view kUsage =
     "usage: make_scene [--objects N] [--edited PERCENT] [--seed S] <base> <left> <right>\n"
     "  Writes a scene of N objects (30000) and two edited versions of it, in each of which about\n"
-    "  PERCENT (1, at most 50) per cent of the objects are changed, added or removed.\n";
+    "  PERCENT (1, at most 50) per cent of the objects are changed, added or removed. With 100, both of\n"
+    "  them change every object, in fields of their own.\n";
 
 uint64_t ParseCount(const std::string& option, const std::string& text, uint64_t lowest, uint64_t highest) {
   char* end = nullptr;
@@ -42,8 +43,8 @@ uint64_t ParseCount(const std::string& option, const std::string& text, uint64_t
 double ParsePercent(const std::string& text) {
   char* end = nullptr;
   const double value = std::strtod(text.c_str(), &end);
-  if (text.empty() || *end != '\0' || !(value >= 0 && value <= 50)) {
-    throw std::invalid_argument("--edited takes a percentage from 0 to 50, not '" + text + "'");
+  if (text.empty() || *end != '\0' || !((value >= 0 && value <= 50) || value == 100)) {
+    throw std::invalid_argument("--edited takes a percentage from 0 to 50, or 100, not '" + text + "'");
   }
   return value;
 }

@@ -46,7 +46,10 @@ bool IsDrawnBy(Version version, double drawn, double share) {
 }  // namespace
 
 ScenePlan::ScenePlan(uint64_t objects, double edited_share, uint64_t seed)
-    : objects_(objects), edited_share_(edited_share), seed_(Mix(seed)) {}
+    : objects_(objects),
+      edited_share_(edited_share == 1 ? 0 : edited_share),
+      is_all_edited_(edited_share == 1),
+      seed_(Mix(seed)) {}
 
 uint64_t ScenePlan::TailCount(Version version) const {
   return version == Version::kBase || edited_share_ == 0 ? 0 : kTailGroups;
@@ -108,9 +111,10 @@ int ScenePlan::EditOf(uint64_t slot, Version version) const {
   if (version == Version::kBase || slot >= objects_) return 0;
   const double drawn = Chance(slot, kChanged);
   const double share = kChangedDocuments * edited_share_;
-  if (drawn >= 2 * share || IsRemovedByAnySide(slot / kGroupSize)) return 0;
+  const bool is_edited = is_all_edited_ || (drawn < 2 * share && !IsRemovedByAnySide(slot / kGroupSize));
+  if (!is_edited) return 0;
   const uint64_t field = Random(slot, kField);
-  if (Chance(slot, kShared) < kChangedByBoth) {
+  if (is_all_edited_ || Chance(slot, kShared) < kChangedByBoth) {
     return static_cast<int>(field % 2) + (version == Version::kLeft ? 1 : 3);
   }
   return IsDrawnBy(version, drawn, share) ? static_cast<int>(field % 4) + 1 : 0;

@@ -16,7 +16,8 @@ class ScenePlan {
  public:
   static constexpr uint64_t kGroupSize = 6;
 
-  /// `edited_share` is the part of the objects that each side changes, adds or removes, at most 0.5.
+  /// `edited_share` is the part of the objects that each side changes, adds or removes, at most 0.5. With a
+  /// share of 1 both sides change a field of every object that has fields, and add and remove nothing.
   ScenePlan(uint64_t objects, double edited_share, uint64_t seed);
 
   uint64_t group_count() const { return objects_ / kGroupSize; }
@@ -58,5 +59,6 @@ class ScenePlan {
 
   uint64_t objects_;
   double edited_share_;
+  bool is_all_edited_;
   uint64_t seed_;
 };
