@@ -18,6 +18,9 @@ merge_darker() { git checkout -q brighter && refuses git merge -q --no-edit dark
 is_unmerged() { [ "$(git status --porcelain | cut -c 1-2)" = UU ]; }
 # Nothing is left of us but what the repository had before.
 has_no_record() { [ ! -e "$record" ] && [ ! -e .git/vexel-merge-records ] && [ ! -e .git/hooks/post-index-change ]; }
+# Permissions bind root, too, who has given up the power over them.
+as_owner=()
+if [[ $EUID == 0 ]]; then as_owner=(setpriv --bounding-set=-dac_override); fi
 value_is() { grep -qFx "  m_Intensity: $1" "$file"; }
 
 mkdir "$work/repository" && cd "$work/repository"
@@ -35,6 +38,8 @@ cp .git/config "$work/enabled"
 cp .gitattributes "$work/enabled-attributes"
 check "the set-up is complete" vexel-merge-git status >"$work/status"
 check "the status names the version" grep -q '^program  *VexelYAMLMerge [0-9.]* (' "$work/status"
+check "without a home, too" cmp "$work/status" <(env -u HOME vexel-merge-git status 2>&1)
+check "each command has the help" cmp -s <(vexel-merge-git resolve --help) <(vexel-merge-git --help)
 vexel-merge-git enable >/dev/null
 check "a second time changes no setting" cmp -s .git/config "$work/enabled"
 check "a second time changes no attribute" cmp -s .gitattributes "$work/enabled-attributes"
@@ -44,6 +49,14 @@ check "the configuration is restored" cmp .git/config "$work/config"
 check "the attributes are restored" cmp .gitattributes "$work/attributes"
 check "the excluded files are restored" cmp .git/info/exclude "$work/exclude"
 check "no state is left" test ! -e .git/vexel-merge
+# A block that is longer than an argument may be, and a pattern that no name can be made of.
+sed "1,20000s|.*|Assets/Scenes/*.vexel merge=vexel|; 1i $(grep begin "$work/enabled-attributes")" <(seq 20000) >.gitattributes
+echo '# vexel-merge-git end' >>.gitattributes && cp .gitattributes "$work/long"
+vexel-merge-git enable --patterns '*.d/[a-z]*.vexel' >/dev/null
+check "a pattern with a folder counts" vexel-merge-git status >/dev/null
+vexel-merge-git disable >/dev/null
+check "a long block is restored" cmp -s .gitattributes "$work/long"
+cp "$work/attributes" .gitattributes
 
 git config --unset merge.vexel.driver
 # For all repositories: the only set-up that writes outside of this one.
@@ -104,6 +117,13 @@ check "it is right's value" value_is 5
 check "and staged" test -z "$(git ls-files -u)"
 check "the record is gone" has_no_record
 check "there is nothing to resolve again" refuses vexel-merge-git resolve "$file" 2>/dev/null
+git reset -q --hard
+
+merge_darker && chmod 444 "$file" && mkdir .git/vexel-merge.lock
+{ sleep 2 && rmdir .git/vexel-merge.lock; } &
+check "a read-only file is settled" "${as_owner[@]}" vexel-merge-git resolve --left "$file" >/dev/null 2>"$work/err"
+check "and stays read-only" test "$(stat -c %a "$file")" = 444
+check "a lock that is waited for is named" grep -q '^waiting for .*/vexel-merge.lock: ' "$work/err"
 git reset -q --hard
 
 merge_darker

@@ -9,7 +9,8 @@ exec </dev/null
 export GIT_EDITOR=true
 
 long="$(printf 'n%.0s' {1..230}).vexel"
-odd=('-$(touch pwned).vexel' $'folder\n/last\n.vexel\n' '*.vexel' $'\e[31mred \u9b.vexel' "$long" 'a=%P "\101.vexel')
+inside=file.vexel.html/x.vexel
+odd=("$inside" '-$(touch pwned).vexel' $'folder\n/last\n.vexel\n' '*.vexel' $'\e[31mred \u9b.vexel' "$long" 'a=%P "\101.vexel')
 guarded=(link.vexel file.vexel folder.vexel)
 # What outside looks like, and what is tracked beside the assets.
 outside() { (cd "$work" && find outside repository -ls | awk '{$1 = ""; print}' && find outside repository -type f -exec cat {} +); }
@@ -25,7 +26,7 @@ all_scenes() {
 # Another repository is where a command's output, which loses the line breaks at its end, would lead to.
 git init -q "$work/repository" && mkdir "$work/outside" "$work/repository"$'\n' && cd "$work/repository"$'\n'
 mkdir "$work/outside/dir" && echo mine | tee "$work"/outside/{attributes,record,asset,edited,page,own} >/dev/null
-git init -q -b main && mkdir $'folder\n' dir
+git init -q -b main && mkdir $'folder\n' dir "${inside%/*}"
 ln -s ../outside/attributes .gitattributes.vexel-new
 ln -s ../outside/page report.html && ln -s ../outside folder.link
 for name in "${guarded[@]}"; do
@@ -54,10 +55,13 @@ check "each conflict has a record" test "$(grep -c ', listed in ' "$work/err")" 
 check "a record of theirs is none" refuses grep -qF 'dir/x.vexel.vexel-conflicts; to settle' "$work/err"
 check "no other file has changed" refuses grep -qv '^UU\|^A  dir/' <(git status --porcelain)
 call=$(LC_ALL=C sed -n "s/.*to settle: \(.*red .*\)/\1/p" "$work/err")
-check "the advised command names its file in plain letters" grep -qF "left in ${odd[3]}" <(bash -c "${call//[^ -~]/}" 2>&1)
+check "the advised command names its file in plain letters" grep -qF "left in ${odd[4]}" <(bash -c "${call//[^ -~]/}" 2>&1)
 vexel-merge-git resolve . >/dev/null 2>"$work/err" || :
 check "a record that nobody has edited settles nothing" test "$(conflicts)" -eq "$number"
-vexel-merge-git report -- "$long" file.vexel >/dev/null
+check "pages are made" vexel-merge-git report -- "$long" file.vexel "$inside" >/dev/null
+check "each page has a place, whatever the others are called" test "$(find .git/vexel-merge-report -type f | wc -l)" -eq 3
+rm -r .git/vexel-merge-report && vexel-merge-git report -- "$inside" >/dev/null
+check "also where a folder came first" vexel-merge-git report -- file.vexel >/dev/null
 for link in report.html dir/../report.html folder.link/page; do
   check "no page goes through $link" refuses vexel-merge-git report -o "$link" -- file.vexel 2>/dev/null
 done
@@ -67,7 +71,7 @@ check "the page's name is said" grep -qF report.html "$work/err"
 untouched "a default page"
 git -c mergetool.keepBackup=false mergetool -y -t vexel file.vexel >/dev/null 2>&1 || :
 check "a terminal gets no control characters" refuses grep -q $'\e\[31m' \
-  <(script -qec "vexel-merge-git resolve '${odd[3]}'; vexel-merge-git status" /dev/null)
+  <(script -qec "vexel-merge-git resolve '${odd[4]}'; vexel-merge-git status" /dev/null)
 
 mv dir "$work/dir" && ln -s ../outside/dir dir && cp "$work/dir/x.vexel" "$work/outside/dir" && outside >"$work/before"
 check "what lies behind a link is refused" refuses vexel-merge-git resolve --left --force dir/x.vexel 2>/dev/null

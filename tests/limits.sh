@@ -86,13 +86,26 @@ status=0
 mkdir closed && : > calls && : > count && chmod 666 calls count
 for write in ${library:+1 2 3 4 5 6 7 8 9}; do
   head -c 8 /dev/zero > count && cp "$library" library.so
-  cat wanted.vexel wanted.vexel > closed/file && cp closed/file twice && chmod 666 closed/file && chmod 555 closed
+  cat left.vexel left.vexel > closed/file && cp closed/file twice && chmod 666 closed/file && chmod 555 closed
   "${as_user[@]}" env LD_PRELOAD="$PWD/library.so" FAULT_COUNT=count FAULT_LOG=calls FAULT="write -15 $write 0" \
     "./${program##*/}" "${merge[@]:1}" closed/file > output || true
   chmod 755 closed
   cmp -s closed/file wanted.vexel || cmp -s closed/file twice || fail 'a file is half new'
 done
 [[ -z $library ]] || grep -q 'failed.*closed/file' calls || fail "no signal came while writing in place: $(< calls)"
+# What scripts look for where a file or the tool's shell can't be made.
+printf '%s\n' '* use "/bin/true" "%d"' > tools
+while [[ -n $library ]] && read -r kind error at name; do
+  head -c 8 /dev/zero > count
+  LD_PRELOAD=$library FAULT_COUNT=count FAULT_LOG=calls FAULT="$kind $error $at 0" "${merge[@]:0:4}" tools -p \
+    base.vexel left.vexel clash.vexel old.vexel > output 2> messages && fail "$kind $at: status 0"
+  [[ "$(< messages)" == "$name"* ]] || fail "$kind $at: $(< messages)"
+done << 'CASES'
+create 28 1 Couldn't create temporary output file for merge result
+create 28 3 Couldn't create temporary output premerge base file for merge result
+create 28 7 Couldn't create temporary output2 file for merge result
+process 11 1 Could not start fallback merge command '/bin/true' code -1 Resource temporarily unavailable
+CASES
 [[ -z "$(find . -name '.merge*')" ]] || fail 'a temporary file stayed'
 
 # The bytes are spelled out, and the shell is named: script takes the user's, which needn't know these quotes.

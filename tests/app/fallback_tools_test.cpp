@@ -10,6 +10,7 @@
 
 #include "app/fallback_spec_file.h"
 #include "platform/error_channel.h"
+#include "platform/file_error.h"
 #include "platform/files.h"
 
 namespace vexel_yaml {
@@ -64,6 +65,7 @@ TEST_F(FallbackTools, ToolsStatusIsTheExitStatus) {
   EXPECT_EQ(std::signal(SIGPIPE, previous), SIG_IGN);
   EXPECT_EQ(errs.str(), "") << "a missing destination is no reason to say that the tool did not start";
   for (const int nothing_ran : {-1, 1}) EXPECT_EQ(ExitStatusOfTool(nothing_ran), 1);
+  EXPECT_THROW(FallbackMergeTool("b", "l", "r", folder_ + "/none/dest", folder_ + "/spec"), FileError);
 }
 
 TEST_F(FallbackTools, TheUsersHiddenFileComesFirst) {

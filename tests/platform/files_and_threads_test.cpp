@@ -1,14 +1,21 @@
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/resource.h>
 #include <unistd.h>
 
+#include <array>
+#include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <ostream>
+#include <streambuf>
+#include <thread>
 
 #include "platform/file_replacement.h"
 #include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
 #include "platform/thread.h"
+#include "platform/timer_stat.h"
 
 namespace vexel_yaml {
 namespace {
@@ -82,6 +89,27 @@ TEST(Thread, CarriesItsException) {
   thread.Start([] { throw std::length_error("far away"); });
   thread.Join();
   EXPECT_THROW(thread.CheckForExceptions(), std::length_error);
+}
+
+// Takes one character after another, as one that escapes for a terminal.
+struct SlowBuffer : std::streambuf {
+  int overflow(int character) override {
+    std::this_thread::sleep_for(std::chrono::microseconds(1));
+    text += static_cast<char>(character);
+    return character;
+  }
+  std::string text;
+};
+
+TEST(TimerStat, ThreadsPrintOneLineAfterTheOther) {
+  SlowBuffer buffer;
+  std::ostream printed(&buffer);
+  {
+    TimerStat all("all", &printed);
+    std::array<std::jthread, 4> threads;
+    for (std::jthread& thread : threads) thread = std::jthread([&] { TimerStat(all, "part"); });
+  }
+  EXPECT_THAT(buffer.text, testing::MatchesRegex("(  part: [0-9]+\n){4}all: [0-9]+\n"));
 }
 
 }  // namespace
