@@ -14,13 +14,22 @@ fail() {
 }
 scene() { # scene NAME FIRST LAST: many lights, the first and the last with these ranges
   { printf '%%YAML 1.1\n%%TAG !v! tag:vexel.com,2011:\n'
-    for id in {1..2000}; do printf -- '--- !v!108 &%d\nLight:\n  m_Range: %d\n' "$id" "$((id == 1 ? $2 : id == 2000 ? $3 : 1))"; done
+    for ((id = 1; id <= objects; id++)); do
+      printf -- '--- !v!108 &%d\nLight:\n  m_Range: %d\n' "$id" "$((id == 1 ? $2 : id == objects ? $3 : 1))"
+    done
   } > "$1.vexel"
 }
-scene base 1 1
-scene left 2 1
-scene right 1 3
-scene wanted 2 3
+# The larger ones take more than two threads to write, in more than one go.
+for objects in 9000 2000; do
+  scene base 1 1
+  scene left 2 1
+  scene right 1 3
+  scene wanted 2 3
+  for threads in -h --nothreads; do
+    "$program" merge -h "$threads" --fallback none base.vexel left.vexel right.vexel out.vexel > output
+    cmp -s out.vexel wanted.vexel || fail "$objects objects, $threads"
+  done
+done
 merge=("$program" merge -h --fallback none base.vexel left.vexel right.vexel)
 
 # One thread, and one descriptor for all three files.
