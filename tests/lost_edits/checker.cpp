@@ -216,8 +216,14 @@ void Checker::CheckReplacement(const std::string& path, const Place& at) {
 void Checker::CheckList(const std::string& path, const Place& at) {
   const Value* const files[] = {&at.base, &at.left, &at.right, &at.merged};
   std::map<std::string, Group> groups;
+  // Elements of one content have one name: a merge may have put another field first, which would name
+  // another.
+  std::map<std::string, std::string> names;
   for (size_t i = 0; i < std::size(files); ++i) {
-    for (const Value& item : files[i]->items) groups[IdentityOrContent(path, item)][i].push_back(&item);
+    for (const Value& item : files[i]->items) {
+      const auto name = names.try_emplace(Canonical(item), IdentityOrContent(path, item)).first;
+      groups[name->second][i].push_back(&item);
+    }
   }
   const bool by_equality =
       !std::ranges::all_of(files, [&](const Value* file) { return AreToldApart(path, *file); });
