@@ -1,24 +1,15 @@
-#include <sstream>
+#include <optional>
 #include <stdexcept>
 
 #include "diff/yaml_mapping_diff.h"
 #include "fuzz/support.h"
 #include "merge/recording_conflict_resolver.h"
 #include "rules/yaml_sequence_remapper.h"
+#include "tests/support/yaml_text.h"
 
 using namespace vexel_yaml;
 
 namespace {
-
-void ForgetRules() {
-  YAMLSequenceRemapper::s_ArrayUniqueKeyMap.clear();
-  YAMLSequenceRemapper::s_ExclusionFieldPaths.clear();
-  YAMLSequenceRemapper::s_DiffExclusionFieldPaths.clear();
-  YAMLSequenceRemapper::s_ComparisonFieldPaths.clear();
-  YAMLSequenceRemapper::s_PremergeBaseValues = false;
-  YAMLSequenceRemapper::defaultPath.clear();
-  YAMLSequenceRemapper::defaultDirectPath.clear();
-}
 
 bool EndsInLineNumber(const std::string& message) {
   const size_t blank = message.find_last_of(' ');
@@ -32,10 +23,11 @@ bool EndsInLineNumber(const std::string& message) {
 // make edits vanish, the diff of a version still leads to that version.
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   fuzz::SetUp();
-  ForgetRules();
-  std::istringstream rules(std::string(reinterpret_cast<const char*>(data), size));
+  // The first to go out of force are the default rules.
+  { const ScopedRules forgotten(""); }
+  std::optional<ScopedRules> rules;
   try {
-    YAMLSequenceRemapper::LoadSequenceUniqueKeys(rules);
+    rules.emplace(std::string_view(reinterpret_cast<const char*>(data), size));
   } catch (const std::runtime_error& error) {
     fuzz::Require(EndsInLineNumber(error.what()), "a rule that is refused is found by its line");
     return 0;

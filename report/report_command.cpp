@@ -66,7 +66,7 @@ std::string* ValueTarget(std::string_view option, Arguments& parsed) {
 
 // Nobody has chosen this name, so a repository could have a link there that leads to a file of the user's.
 std::string DefaultPage() {
-  const std::string page = "report.html";
+  std::string page = "report.html";
   std::error_code error;
   if (!std::filesystem::is_symlink(page, error)) return page;
   throw std::runtime_error(page + " is a symbolic link; say -o " + page + " to write where it leads to");
