@@ -14,7 +14,9 @@
 #include <string_view>
 #include <utility>
 
+#ifdef __APPLE__
 extern char** environ;
+#endif
 
 namespace vexel_yaml {
 
