@@ -12,6 +12,7 @@
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/thread.h"
 #include "rules/setup.h"
 #include "yaml/read_files.h"
 
@@ -42,10 +43,11 @@ void WriteResult(const std::string& path, std::string_view text) {
 // The diff from the first file to the second; the files are read into `files`.
 const YAMLMappingDiff* PrepareDiff(const FilePairConfig& config, FilePair& files, TimerStat& timer) {
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
-  // On threads, only both together are timed.
+  // On threads, only both together are timed, whatever their size.
   ReadFiles({{config.threads ? "" : "Read base", config.first_path, files.first},
              {config.threads ? "" : "Read left", config.second_path, files.second}},
-            config.threads, timer);
+            config.threads && (config.timing || AreWorthThreads({config.first_path, config.second_path})),
+            timer);
   {
     TimerStat step(timer, "Creating mappings");
     TimerStat preprocessing(step, "Preprocess mappings");

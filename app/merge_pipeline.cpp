@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "app/premerge.h"
+#include "app/writing.h"
 #include "fixups/post_process.h"
 #include "fixups/three_way_merge.h"
 #include "merge/conflict_record_file.h"
@@ -18,10 +19,10 @@
 #include "platform/file_replacement.h"
 #include "platform/files.h"
 #include "platform/run_main.h"
+#include "platform/thread.h"
 #include "platform/timer_stat.h"
 #include "rules/setup.h"
 #include "rules/yaml_sequence_remapper.h"
-#include "yaml/write_objects.h"
 
 namespace vexel_yaml {
 
@@ -47,10 +48,13 @@ class MergeRun {
         documents_(documents.read),
         merged_(documents.merged),
         timer_(timer),
+        // Whoever asks for times is shown the same steps for every file.
+        threads_(config.threads &&
+                 (config.timing || AreWorthThreads({config.base_path, config.left_path, config.right_path}))),
         resolver_(static_cast<MergeResolve>(config.resolve_mode)) {}
 
   void Read() {
-    ReadMergeDocuments(config_.base_path, config_.left_path, config_.right_path, documents_, config_.threads,
+    ReadMergeDocuments(config_.base_path, config_.left_path, config_.right_path, documents_, threads_,
                        timer_);
   }
 
@@ -62,8 +66,8 @@ class MergeRun {
 
   void CreateDiffs() {
     TimerStat step(timer_, "Creating diffs");
-    diffs_ = CreateDiffPair({documents_.base, documents_.left}, {documents_.base, documents_.right},
-                            config_.threads, step);
+    diffs_ = CreateDiffPair({documents_.base, documents_.left}, {documents_.base, documents_.right}, threads_,
+                            step);
   }
 
   // False when the file can't be opened, which has been reported.
@@ -103,11 +107,11 @@ class MergeRun {
     if (path.empty()) {
       // The merge is only a check, which an object that can't be written fails, too.
       std::ostream nowhere(nullptr);
-      WriteObjects(*merged_, nowhere, config_.threads);
+      WriteObjects(*merged_, nowhere, threads_);
       return;
     }
     result_.emplace(VexelToNativePath(path));
-    WriteObjects(*merged_, result_->Stream(), config_.threads);
+    WriteObjects(*merged_, result_->Stream(), threads_);
     result_->Finish();
   }
 
@@ -119,7 +123,7 @@ class MergeRun {
     const MergeResolve base_side =
         YAMLSequenceRemapper::CheckBlankPremergeBaseEnabled() ? MergeResolve::kBlank : MergeResolve::kBase;
     std::array<PremergeTarget, 2> targets = {{{base_side, {}}, {MergeResolve::kRight, {}}}};
-    RunPremerges(targets, documents_, diffs_, resolver_.GetResolutions(), config_.threads, timer_);
+    RunPremerges(targets, documents_, diffs_, resolver_.GetResolutions(), threads_, timer_);
     // One after the other: two at once may be more than the descriptors that are left.
     Write(config_.premerge_base_destination, targets[0].text.view());
     Write(config_.premerge_right_destination, targets[1].text.view());
@@ -148,6 +152,7 @@ class MergeRun {
   MergeDocuments& documents_;
   std::unique_ptr<VexelObjects>& merged_;
   TimerStat& timer_;
+  const bool threads_;
   DiffPair diffs_;
   RecordingConflictResolver resolver_;
   bool breaks_dependency_ = false;

@@ -1,5 +1,7 @@
 #include "platform/thread.h"
 
+#include <sys/stat.h>
+
 #include <system_error>
 #include <utility>
 
@@ -30,6 +32,17 @@ void Thread::Thread_Helper(Thread* self) {
   } catch (...) {
     self->exception_ = std::current_exception();
   }
+}
+
+bool AreWorthThreads(const std::vector<std::string>& paths) {
+  constexpr off_t kManyBytes = 1 << 18;
+  off_t bytes = 0;
+  for (const std::string& path : paths) {
+    struct stat status = {};
+    if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) return true;
+    bytes += status.st_size;
+  }
+  return bytes >= kManyBytes;
 }
 
 }  // namespace vexel_yaml

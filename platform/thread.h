@@ -2,7 +2,9 @@
 
 #include <exception>
 #include <functional>
+#include <string>
 #include <thread>
+#include <vector>
 
 namespace vexel_yaml {
 
@@ -33,5 +35,10 @@ class Thread {
   std::function<void()> function_;
   std::exception_ptr exception_;
 };
+
+/// Whether threads bring more than they cost where these files are read, compared and written. A thread has
+/// storage of its own to set up and to give back, which takes as long as reading some ten kilobytes. True
+/// also where a size isn't known, as that of a pipe.
+bool AreWorthThreads(const std::vector<std::string>& paths);
 
 }  // namespace vexel_yaml

@@ -6,6 +6,7 @@
 #include "fixups/state_machine_transitions.h"
 #include "merge/conflict_record_file.h"
 #include "platform/hinted_error.h"
+#include "platform/thread.h"
 #include "rules/setup.h"
 
 namespace vexel_yaml {
@@ -34,9 +35,10 @@ void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   TimerStat silent("", nullptr);
   SetupRulesAndTypes(config.rules_file, config.type_info_file, silent);
   MergeDocuments& read = files.read;
-  ReadMergeDocuments(config.base_path, config.left_path, config.right_path, read, true, silent);
+  const bool threads = AreWorthThreads({config.base_path, config.left_path, config.right_path});
+  ReadMergeDocuments(config.base_path, config.left_path, config.right_path, read, threads, silent);
   files.renumbered = PrepareForDiff(read.base, read.left, read.right);
-  files.diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, true, silent);
+  files.diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, threads, silent);
   if (!config.merge_file.empty() && !InputConflictRecords(config.merge_file, files.resolver)) {
     throw YAMLError("Couldn't open merge resolve file '" + config.merge_file + "'");
   }

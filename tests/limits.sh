@@ -12,7 +12,7 @@ fail() {
   printf 'limits: %s\n' "$*" >&2
   exit 1
 }
-scene() { # scene NAME FIRST LAST: many lights, the first and the last with these ranges
+scene() { # scene NAME FIRST LAST: enough lights for threads, the first and the last with these ranges
   { printf '%%YAML 1.1\n%%TAG !v! tag:vexel.com,2011:\n'
     for ((id = 1; id <= objects; id++)); do
       printf -- '--- !v!108 &%d\nLight:\n  m_Range: %d\n' "$id" "$((id == 1 ? $2 : id == objects ? $3 : 1))"
@@ -20,7 +20,7 @@ scene() { # scene NAME FIRST LAST: many lights, the first and the last with thes
   } > "$1.vexel"
 }
 # The larger ones take more than two threads to write, in more than one go.
-for objects in 9000 2000; do
+for objects in 9000 3000; do
   scene base 1 1
   scene left 2 1
   scene right 1 3

@@ -225,7 +225,8 @@ def main():
             return SKIPPED
         os.environ["FAULTS_MOUNT"] = "1"
         os.execvp(unshare[0], [*unshare, sys.executable, *sys.argv])
-    check, objects, few, many = {"calls": (check_calls, 3, 3, 0), "git": (check_calls, 3, 1, 0),
+    # Enough objects for threads, where they matter.
+    check, objects, few, many = {"calls": (check_calls, 18, 3, 0), "git": (check_calls, 3, 1, 0),
                                  "signals": (check_signals, 200, 1, 13), "disk": (check_disk, 30, 0, 0)}[part]
     arguments.sample = many if arguments.all else few
     lines = [line.split(":", 1) for line in (HERE / "commands.txt").read_text().splitlines() if line and line[0] != "#"]

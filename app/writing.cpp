@@ -1,4 +1,4 @@
-#include "yaml/write_objects.h"
+#include "app/writing.h"
 
 #include <algorithm>
 #include <span>
