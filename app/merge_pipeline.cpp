@@ -11,7 +11,6 @@
 #include <vector>
 
 #include "app/premerge.h"
-#include "app/writing.h"
 #include "fixups/post_process.h"
 #include "fixups/three_way_merge.h"
 #include "merge/conflict_record_file.h"
@@ -23,6 +22,7 @@
 #include "platform/timer_stat.h"
 #include "rules/setup.h"
 #include "rules/yaml_sequence_remapper.h"
+#include "yaml/write_objects.h"
 
 namespace vexel_yaml {
 

@@ -1,6 +1,7 @@
 #include "platform/temporary_files.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -46,7 +47,7 @@ void HandleSignals() {
 }
 
 // Returns 0 or an errno.
-int RememberTempFile(const std::string& path) {
+int Remember(const std::string& path) {
   AutoLock lock(slots_mutex);
   static bool handled = false;
   if (!std::exchange(handled, true)) HandleSignals();
@@ -67,7 +68,7 @@ int OpenTempFile(std::string& pattern) {
   if (file < 0) return -1;
   // A merge tool that runs meanwhile has no business with it.
   fcntl(file, F_SETFD, FD_CLOEXEC);
-  const int error_number = RememberTempFile(pattern);
+  const int error_number = Remember(pattern);
   if (error_number == 0) return file;
   close(file);
   unlink(pattern.c_str());
@@ -83,6 +84,26 @@ std::string CreateTempFile() {
   return path;
 }
 
+bool MakeTempFolder(const std::string& path) {
+  const SignalsHeld held;
+  if (mkdir(path.c_str(), 0777) != 0) return false;
+  errno = Remember(path);
+  if (errno == 0) return true;
+  rmdir(path.c_str());
+  return false;
+}
+
+bool CreateTempFolder(std::string& pattern) {
+  const SignalsHeld held;
+  if (mkdtemp(pattern.data()) == nullptr) return false;
+  errno = Remember(pattern);
+  if (errno == 0) return true;
+  rmdir(pattern.c_str());
+  return false;
+}
+
+bool RememberTempFile(const std::string& path) { return Remember(path) == 0; }
+
 void ForgetTempFile(const std::string& path) {
   AutoLock lock(slots_mutex);
   for (Slot& slot : slots) {
@@ -92,7 +113,7 @@ void ForgetTempFile(const std::string& path) {
 
 void RemoveTempFile(const std::string& path) {
   if (path.empty()) return;
-  unlink(path.c_str());
+  if (unlink(path.c_str()) != 0) rmdir(path.c_str());
   ForgetTempFile(path);
 }
 
@@ -105,6 +126,10 @@ void RemoveTempFiles() {
 void UnlinkTempFiles() {
   for (const Slot& slot : slots) {
     if (slot.used) unlink(slot.path.data());
+  }
+  // Folders, which are empty by now.
+  for (const Slot& slot : slots) {
+    if (slot.used) rmdir(slot.path.data());
   }
 }
 

@@ -16,11 +16,22 @@ int OpenTempFile(std::string& pattern);
 /// Makes a file after `kTempFilePattern` in the same way. Returns its path, empty on failure; errno says why.
 std::string CreateTempFile();
 
+/// Makes a new folder for its owner alone in the same way, such as for files that other programs read. Once
+/// it is empty, it is removed with the files. Returns false on failure, with the reason in errno.
+bool CreateTempFolder(std::string& pattern);
+
+/// Makes the folder `path`, which must not exist yet, and remembers it. Returns false on failure, with the
+/// reason in errno.
+bool MakeTempFolder(const std::string& path);
+
+/// Remembers a file of this name that is about to be made. Returns false where there is no room for it.
+bool RememberTempFile(const std::string& path);
+
 /// Forgets a file again that has become one of the user's. May be called from any thread, as the others here
 /// but `OpenTempFile`: with a signal on another thread, the file it is just making would stay.
 void ForgetTempFile(const std::string& path);
 
-/// Removes a file that may be remembered. Does nothing for an empty path.
+/// Removes a file or an empty folder that may be remembered. Does nothing for an empty path.
 void RemoveTempFile(const std::string& path);
 
 /// Removes every file that is still remembered.

@@ -10,9 +10,9 @@
 #include "platform/files.h"
 #include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
+#include "report/conflict_list.h"
 #include "report/merged_files.h"
 #include "report/readable_headers.h"
-#include "report/record_patterns.h"
 #include "report/value_text.h"
 #include "report/write_page.h"
 #include "yaml/yaml_error.h"
@@ -20,8 +20,6 @@
 namespace vexel_yaml {
 
 namespace {
-
-using Record = RecordingConflictResolver::Record;
 
 constexpr std::string_view kUsage =
     "usage: vexel-merge-report [options] <base> <left> <right>\n"
@@ -118,19 +116,9 @@ int PrintText(const std::string& path) {
   return 0;
 }
 
-std::string SideText(const Record& record, const Operation* operation, bool is_left) {
-  const std::string_view dependency = DependencyText(record);
-  if (!dependency.empty()) return IsLeftType(record.type) == is_left ? std::string(dependency) : "-";
-  if (record.type == ConflictType::kTransformCycle) return "parents in a circle, broken here";
-  return operation == nullptr ? "-" : OperationText(*operation);
-}
-
 void PrintConflicts(const RecordingConflictResolver& resolver) {
-  const RecordPatterns patterns(resolver);
-  for (const Record& record : resolver.GetRecords()) {
-    if (record.resolution != MergeResolve::kConflict) continue;
-    std::cout << patterns.For(record) << '\t' << SideText(record, record.left, true) << '\t'
-              << SideText(record, record.right, false) << '\n';
+  for (const ListedConflict& conflict : ListConflicts(resolver)) {
+    std::cout << conflict.place << '\t' << conflict.left << '\t' << conflict.right << '\n';
   }
 }
 

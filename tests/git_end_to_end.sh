@@ -206,6 +206,26 @@ for side in one two; do
 done
 check "two merges that differ don't merge silently" refuses git merge -q --no-edit kept-one >/dev/null 2>&1
 
+# Without the program, as in a graphical client with a short PATH, nobody's edit is lost without a word.
+git reset -q --hard && git checkout -q -b short ":/^brighter" && short=/usr/bin:/bin
+check "without the program, the merge stops" refuses env PATH="$short" git merge -q --no-edit darker >/dev/null 2>"$work/err"
+check "and says why in one line" test "$(grep -c 'vexel-merge-git is not found' "$work/err")" -eq 1
+check "the file has conflict markers" grep -q '^<<<<<<< ours' "$file"
+git merge --abort
+# What 1.0.1 has set works, and is brought up to date and taken back.
+git reset -q --hard ":/^brighter" && git config merge.vexel.driver 'vexel-merge-git merge-driver %O %A %B %L %P'
+git config -f .git/vexel-merge key.merge.vexel.driver.added 'vexel-merge-git merge-driver %O %A %B %L %P'
+check "an old set-up is complete" vexel-merge-git status >/dev/null
+check "and merges" git merge -q --no-edit wider
+vexel-merge-git enable >/dev/null
+check "enable brings it up to date" grep -qF 'command -v' <(git config merge.vexel.driver)
+git log -p --all >/dev/null
+check "git keeps what textconv prints" git rev-parse -q --verify refs/notes/textconv/vexel >/dev/null
+check "an old set-up can be taken back" vexel-merge-git disable >/dev/null
+check "with all of its settings" refuses git config merge.vexel.driver
+check "with what git has kept" refuses git rev-parse -q --verify refs/notes/textconv/vexel
+vexel-merge-git enable >/dev/null && git reset -q --hard
+
 # Keys that are patterns, escapes or headers, or hold what ends a path, and file IDs that are equal as numbers: each
 # choice is for its own place alone.
 keys=('"*"' "'\\x2a'" "'\\x2a\\&'" '"a\nb"' "'a\\nb'" "'a\\x0ab'" speed '"speed x"' x.b '"Conflicts:"' '"\u202Eturned"')

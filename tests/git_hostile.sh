@@ -99,13 +99,15 @@ untouched "all of it"
 git checkout -q -b one start && scene 1 10 >file.vexel && git commit -q -a -m one
 git checkout -q -b two start && scene 5 10 >file.vexel && git commit -q -a -m two
 git worktree add -q --detach "$work/tree" two
-git merge -q one >/dev/null 2>&1 || mkdir "$work/bin"
-printf '#!/bin/sh\ncase $* in *post-index-change) touch %s/slow && sleep 3 ;; esac\nexec %s "$@"\n' \
-  "$work" "$(command -v rm)" >"$work/bin/rm" && chmod +x "$work/bin/rm"
-PATH="$work/bin:$PATH" git merge --abort &
-until [ -e "$work/slow" ]; do sleep 0.1; done
-check "the other one is in conflict" refuses git -C "$work/tree" merge -q one >/dev/null 2>&1
-wait && git -C "$work/tree" merge --abort
+git merge -q one >/dev/null 2>&1 || mkdir .git/vexel-merge.lock
+git merge --abort 2>/dev/null &
+git -C "$work/tree" merge -q one >/dev/null 2>&1 &
+other=.git/worktrees/tree/vexel-merge-records
+sleep 1 && touch "$work/slow"
+check "neither goes on without the lock" test -e .git/vexel-merge-records -a ! -e "$other"
+rmdir .git/vexel-merge.lock && wait
+check "the other one has its record and the hook" test -e "$other" -a -x .git/hooks/post-index-change
+git -C "$work/tree" merge --abort
 check "no record of it is left" test -z "$(find "$work/tree" .git -name '*.vexel-conflicts' -newer "$work/slow")"
 
 ln -s ../outside/hook .git/hooks/post-index-change

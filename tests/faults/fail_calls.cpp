@@ -47,7 +47,9 @@ int OpenFileOf(const char* variable, int flags) {
 __attribute__((constructor)) void Start() {
   const std::string_view program = program_invocation_short_name;
   const char* fault = std::getenv("FAULT");
-  if (fault == nullptr || (program != "VexelYAMLMerge" && program != "vexel-merge-report")) return;
+  constexpr std::array<std::string_view, 3> kPrograms = {"VexelYAMLMerge", "vexel-merge-git",
+                                                         "vexel-merge-report"};
+  if (fault == nullptr || std::ranges::find(kPrograms, program) == kPrograms.end()) return;
   std::sscanf(fault, "%15s %d %ld %d", failing_kind.data(), &error, &first, &goes_on);
   log_file = OpenFileOf("FAULT_LOG", kAppend);
   const int count = OpenFileOf("FAULT_COUNT", kReadWrite);

@@ -1,4 +1,4 @@
-#include "app/writing.h"
+#include "yaml/write_objects.h"
 
 #include <algorithm>
 #include <span>

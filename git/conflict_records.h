@@ -1,0 +1,80 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "git/asset_merge.h"
+#include "git/repository.h"
+
+namespace vexel_yaml {
+
+/// The records of conflicts that lie beside the assets: written by the merge driver, read by resolve, removed
+/// as soon as their conflict is gone. All paths are from the top folder, which is the current one.
+///
+/// Only what is remembered in git's folder is ours: a file of such a name that the repository tracks, or that
+/// somebody else has put there, is neither read nor written. Then, and where the name would be too long or
+/// lies behind a symbolic link, the record is the one that is kept in git's folder. There is one in any case,
+/// since git checks out what the other side has added only after the merge, also over the one beside the
+/// asset.
+class ConflictRecords {
+ public:
+  explicit ConflictRecords(const Repository& repository);
+
+  /// The path of this asset's record; empty where it has none.
+  std::string Find(const std::string& asset) const;
+
+  /// Whether the record is the one in git's folder.
+  bool IsKept(const std::string& record) const { return record.starts_with(folder_ + "/"); }
+
+  /// The blob of the asset as the merge left it, to see whether somebody has edited it since; empty for none.
+  std::string RecordedHash(const std::string& asset) const;
+
+  /// Makes a record of the merge, which left `hash`, and returns its path; empty where it can't.
+  std::string Leave(const std::string& asset, const AssetMerge& merge, const std::string& hash,
+                    const MergeSettings& settings) const;
+
+  void Remove(const std::string& asset) const;
+
+  /// Removes the records whose files are no longer unmerged. While git holds the index, a merge may be at
+  /// work whose records are there before its conflicts: what it leaves can be swept when it is done.
+  void Sweep() const;
+
+  /// Whether any work tree of this repository has a record.
+  bool HaveAny() const;
+
+ private:
+  struct Places {
+    std::string beside;
+    std::string kept;
+    std::string entry;  ///< What is remembered: the asset's path and the blob, a line each.
+  };
+  Places PlacesFor(const std::string& asset) const;
+  /// Returns the record's path; empty where it can't.
+  std::string Place(const std::string& asset, const std::string& text, const std::string& hash,
+                    bool may_use_hook) const;
+  void RemoveHook() const;
+
+  const Repository& repository_;
+  std::string folder_;
+};
+
+/// The command that settles the conflicts in this file.
+std::string ResolveCall(const std::string& asset);
+
+/// The path as people write it.
+std::string ShownRecord(std::string_view record);
+
+/// What a record's last section says, which is the one that people edit. What stands above comes from the
+/// sides of the merge, and whatever it looks like, it decides nothing. Lines keep their numbers. A section
+/// that somebody has removed decides nothing, but can be added to.
+std::string DecidedIn(const std::string& record);
+
+/// Keeps records out of git's sight: they are for one person on one machine. Returns whether that changed
+/// anything. Throws CommandError where it can't.
+bool ExcludeRecords(const Repository& repository);
+
+/// The file that says so; empty where it lies behind a symbolic link, and isn't the repository's.
+std::string ExcludeFile(const Repository& repository);
+
+}  // namespace vexel_yaml

@@ -1,0 +1,87 @@
+#include "git/git_call.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+
+#include "git/shown_text.h"
+
+namespace vexel_yaml {
+
+ProgramCall GitCall(std::vector<std::string> arguments) {
+  arguments.insert(arguments.begin(), "git");
+  return {.arguments = std::move(arguments)};
+}
+
+ProgramResult Git(std::vector<std::string> arguments) { return RunProgram(GitCall(std::move(arguments))); }
+
+ProgramResult GitQuietly(std::vector<std::string> arguments) {
+  ProgramCall call = GitCall(std::move(arguments));
+  call.errors = ProgramCall::Errors::kDropped;
+  return RunProgram(call);
+}
+
+std::string Line(const ProgramResult& result) {
+  return result.output.ends_with('\n') ? result.output.substr(0, result.output.size() - 1) : result.output;
+}
+
+std::vector<std::string> Pieces(std::string_view text, char end) {
+  std::vector<std::string> pieces;
+  while (!text.empty()) {
+    const size_t at = std::min(text.find(end), text.size());
+    pieces.emplace_back(text.substr(0, at));
+    text.remove_prefix(std::min(at + 1, text.size()));
+  }
+  return pieces;
+}
+
+std::optional<std::vector<std::string>> UnmergedBelow(const std::vector<std::string>& pathspecs,
+                                                      bool in_users_index) {
+  ProgramCall call = GitCall({"ls-files", "-z", "--unmerged", "--full-name", "--"});
+  call.arguments.insert(call.arguments.end(), pathspecs.begin(), pathspecs.end());
+  if (!in_users_index) call.without = {kIndexVariable};
+  const ProgramResult result = RunProgram(call);
+  if (result.status != 0) return std::nullopt;
+  std::vector<std::string> paths;
+  for (const std::string& entry : Pieces(result.output, '\0')) {
+    // Mode, blob and stage stand before a tab.
+    paths.push_back(entry.substr(entry.find('\t') + 1));
+  }
+  std::ranges::sort(paths);
+  paths.erase(std::unique(paths.begin(), paths.end()), paths.end());
+  return paths;
+}
+
+std::vector<std::string> OursAmong(const std::vector<std::string>& paths, const std::string& top) {
+  if (paths.empty()) return {};
+  ProgramCall call = GitCall({"-C", top, "check-attr", "-z", "--stdin", "merge"});
+  call.input.emplace();
+  for (const std::string& path : paths) call.input->append(path).push_back('\0');
+  const std::vector<std::string> fields = Pieces(RunProgram(call).output, '\0');
+  std::vector<std::string> ours;
+  // Path, attribute and value, three by three.
+  for (size_t i = 0; i + 2 < fields.size(); i += 3) {
+    if (fields[i + 2] == "vexel") ours.push_back(fields[i]);
+  }
+  return ours;
+}
+
+std::string TopFolder() {
+  const ProgramResult result = Git({"rev-parse", "--show-toplevel"});
+  if (result.status != 0) throw CommandError("", kGitRefused);
+  return Line(result);
+}
+
+void GoToTop() {
+  const std::string top = TopFolder();
+  if (chdir(top.c_str()) != 0) throw CommandError("cannot go to " + top);
+}
+
+ProgramCall HashCall(const std::string& path, std::string text) {
+  ProgramCall call = GitCall({"hash-object", "--path=" + path, "--stdin"});
+  call.errors = ProgramCall::Errors::kDropped;
+  call.input = std::move(text);
+  return call;
+}
+
+}  // namespace vexel_yaml

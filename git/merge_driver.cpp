@@ -1,0 +1,143 @@
+#include "git/merge_driver.h"
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include "git/asset_merge.h"
+#include "git/conflict_records.h"
+#include "git/git_call.h"
+#include "git/repository.h"
+#include "git/settings.h"
+#include "git/shown_text.h"
+#include "git/work_files.h"
+#include "platform/file_error.h"
+#include "report/report_command.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// A file on its way through the driver.
+class DriverRun {
+ public:
+  DriverRun(AssetVersions versions, std::string marker_size, bool is_ancestor)
+      : versions_(std::move(versions)), marker_size_(std::move(marker_size)), is_ancestor_(is_ancestor) {}
+
+  int Run() {
+    try {
+      return Merge();
+    } catch (const FileError& error) {
+      Complain(error.what());
+      return LeaveUnmerged();
+    }
+  }
+
+ private:
+  int Merge() {
+    // Git answers while the files are looked at.
+    SettingsQuery query;
+    keeps_records_ = !is_ancestor_ && repository_.IsChanging();
+    const bool is_ours = versions_.HasAsset();
+    settings_ = query.Get();
+    if (!is_ours) {
+      RemoveRecord();
+      return MergeAsText();
+    }
+    // Kept until the process ends: giving three scenes back node by node takes as long as merging them.
+    AssetMerge& merge = *new AssetMerge;
+    int status = merge.Run(versions_, settings_);
+    if (status != AssetMerge::kFailed && !PutFile(versions_.right, merge.GetText())) {
+      Complain("cannot write the merged " + versions_.asset);
+      status = AssetMerge::kFailed;
+    }
+    if (status == AssetMerge::kFailed) return LeaveUnmerged();
+    if (status == AssetMerge::kMerged) {
+      RemoveRecord();
+    } else if (!is_ancestor_) {
+      TellConflicts(merge);
+    }
+    return status;
+  }
+
+  void RemoveRecord() {
+    if (keeps_records_) records_.Remove(versions_.asset);
+  }
+
+  // Git does what it does without us to files that are none of ours, but bear their names.
+  int MergeAsText() {
+    const int status = GitQuietly({"merge-file", "-q", "--marker-size=" + marker_size_, "-L", "ours", "-L",
+                                   "base", "-L", "theirs", versions_.right, versions_.base, versions_.left})
+                           .status;
+    // Git would take a status above 128 for a driver that was killed, and give up.
+    if (status > 127) Complain(versions_.asset + " can't be merged, not even as text");
+    return status == 0 ? 0 : 1;
+  }
+
+  int LeaveUnmerged() {
+    RemoveRecord();
+    if (is_ancestor_) {
+      // Ours as the ancestor of both sides would make what theirs did look undone, and drop it.
+      PutFile(versions_.right, TextOf(versions_.base));
+    } else {
+      Say(versions_.asset +
+          " is not merged, but left as ours has it; take it so with 'git add', or theirs with 'git checkout "
+          "--theirs'");
+    }
+    return AssetMerge::kFailed;
+  }
+
+  // The merge goes on whatever fails here.
+  void TellConflicts(const AssetMerge& merge) {
+    SayConflicts(versions_.asset, merge.GetConflicts());
+    try {
+      if (keeps_records_) LeaveRecord(merge);
+    } catch (const FileError& error) {
+      Complain("cannot write the record of " + versions_.asset + ": " + error.what());
+    }
+  }
+
+  void LeaveRecord(const AssetMerge& merge) {
+    const std::string hash = Line(RunProgram(HashCall(versions_.asset, merge.GetText())));
+    const std::string record = records_.Leave(versions_.asset, merge, hash, settings_);
+    if (record.empty()) {
+      Complain("cannot write the record of " + versions_.asset);
+      return;
+    }
+    Say(Count(merge.GetConflicts()) + ", listed in " + ShownRecord(record) +
+        "; to settle: " + ResolveCall(versions_.asset));
+  }
+
+  const AssetVersions versions_;
+  const std::string marker_size_;
+  const bool is_ancestor_;
+  const Repository repository_;
+  const ConflictRecords records_{repository_};
+  MergeSettings settings_;
+  bool keeps_records_ = false;
+};
+
+void CloseStandardError() {
+  const int nowhere = open("/dev/null", O_WRONLY | O_CLOEXEC);
+  if (nowhere < 0) return;
+  dup2(nowhere, STDERR_FILENO);
+  close(nowhere);
+}
+
+}  // namespace
+
+int RunMergeDriver(std::vector<std::string> arguments) {
+  const bool is_ancestor = !arguments.empty() && arguments.front() == "--ancestor";
+  if (is_ancestor) arguments.erase(arguments.begin());
+  if (arguments.size() != 5) throw WrongUsage("merge-driver is called by git");
+  // What can't be done with an ancestor is for the merge itself to tell.
+  if (is_ancestor) CloseStandardError();
+  const AssetVersions versions = {arguments[4], arguments[0], arguments[2], arguments[1]};
+  return DriverRun(versions, arguments[3], is_ancestor).Run();
+}
+
+int RunTextconv(const std::vector<std::string>& arguments) {
+  if (arguments.empty()) throw WrongUsage("textconv is called by git");
+  return RunReport({"vexel-merge-report", "--text", "--", arguments.back()});
+}
+
+}  // namespace vexel_yaml

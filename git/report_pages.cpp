@@ -1,0 +1,217 @@
+#include "git/report_pages.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <iterator>
+#include <optional>
+
+#include "git/asset_merge.h"
+#include "git/conflict_records.h"
+#include "git/git_call.h"
+#include "git/path_names.h"
+#include "git/repository.h"
+#include "git/settings.h"
+#include "git/shown_text.h"
+#include "git/stage_files.h"
+#include "git/work_files.h"
+#include "platform/files.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using Paths = std::vector<std::string>;
+
+struct Arguments {
+  std::string page;
+  std::string commit;
+  Paths paths;
+};
+
+Arguments Parse(const std::vector<std::string>& arguments) {
+  Arguments parsed;
+  auto argument = arguments.begin();
+  for (; argument != arguments.end() && *argument != "--"; ++argument) {
+    if (*argument == "-o") {
+      if (++argument == arguments.end()) throw WrongUsage("-o needs a value");
+      parsed.page = *argument;
+    } else if (argument->starts_with('-')) {
+      throw WrongUsage("unknown option '" + *argument + "'");
+    } else {
+      if (!parsed.commit.empty()) throw WrongUsage("paths stand behind --");
+      parsed.commit = *argument;
+    }
+  }
+  if (argument != arguments.end()) parsed.paths.assign(argument + 1, arguments.end());
+  return parsed;
+}
+
+// The two sides of a merge commit, and what they come from.
+struct MergedCommits {
+  std::string commit;
+  std::string base;
+  std::string ours;
+  std::string theirs;
+};
+
+MergedCommits FindMerged(const std::string& name) {
+  const ProgramResult found = Git({"rev-parse", "--verify", "--quiet", name + "^{commit}"});
+  if (found.status != 0) throw CommandError("'" + name + "' is not a commit");
+  MergedCommits merged = {Line(found), {}, {}, {}};
+  const Paths parents = Pieces(Line(Git({"rev-list", "--parents", "-n", "1", merged.commit})), ' ');
+  if (parents.size() != 3) throw CommandError(merged.commit + " is not a merge of two commits");
+  merged.ours = parents[1];
+  merged.theirs = parents[2];
+  const ProgramResult base = Git({"merge-base", merged.ours, merged.theirs});
+  if (base.status != 0) throw CommandError("the parents of " + merged.commit + " have no common ancestor");
+  merged.base = Line(base);
+  return merged;
+}
+
+// Sorted.
+Paths Changed(const std::string& from, const std::string& to, const Paths& paths) {
+  ProgramCall call = GitCall({"diff", "-z", "--name-only", "--no-relative", "--no-renames", from, to, "--"});
+  call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
+  call.with = {"GIT_LITERAL_PATHSPECS=1"};
+  Paths changed = Pieces(RunProgram(call).output, '\0');
+  std::ranges::sort(changed);
+  return changed;
+}
+
+Paths ChangedOnBothSides(const MergedCommits& merged, const Paths& paths) {
+  const Paths in_ours = Changed(merged.base, merged.ours, paths);
+  const Paths in_theirs = Changed(merged.base, merged.theirs, paths);
+  Paths both;
+  std::ranges::set_intersection(in_ours, in_theirs, std::back_inserter(both));
+  return both;
+}
+
+std::string Short(const std::string& commit) { return Line(Git({"rev-parse", "--short", commit})); }
+
+// Made pages, one asset after the other.
+class PageMaker {
+ public:
+  PageMaker(const Arguments& arguments, std::string page, const std::optional<MergedCommits>& merged)
+      : shown_page_(arguments.page), page_(std::move(page)), merged_(merged) {}
+
+  // False where there is no page, and that has been said.
+  bool Make(const std::string& asset) {
+    AssetVersions versions;
+    if (!(merged_ ? WriteMerged(asset, versions) : WriteUnmerged(asset, versions))) return false;
+    const std::string target = page_.empty() ? DefaultPage(asset) : page_;
+    Paths call = {GetDataFilesDir() + "vexel-merge-report", "--rules", settings_.rules};
+    if (!settings_.type_info.empty()) call.insert(call.end(), {"--typeInfo", settings_.type_info});
+    // What is settled in the record of the conflict at hand shows as settled.
+    const std::string record = merged_ ? std::string() : records_.Find(asset);
+    if (!record.empty()) {
+      scratch_.Write("decided", DecidedIn(record));
+      call.insert(call.end(), {"-i", "decided"});
+    }
+    std::string title = asset;
+    if (merged_) title += ", the parents of " + Short(merged_->commit) + " merged anew";
+    call.insert(call.end(), {"-o", target, "--title", title, versions.base, versions.left, versions.right});
+    // From their folder, since the page shows the paths that were given.
+    const ProgramResult result = RunProgram(
+        {.arguments = call, .errors = ProgramCall::Errors::kInOutput, .folder = scratch_.GetPath()});
+    if (result.status != 0) {
+      SayMessages(WithRecord(result.output, ShownRecord(record)), versions);
+      return false;
+    }
+    Tell(shown_page_.empty() ? target : shown_page_);
+    return true;
+  }
+
+ private:
+  bool WriteMerged(const std::string& asset, AssetVersions& versions) {
+    scratch_.Clear();
+    versions = {asset, "base " + Short(merged_->base), "left " + Short(merged_->theirs),
+                "right " + Short(merged_->ours)};
+    const bool is_there = Write(merged_->base, versions.base, asset) &&
+                          Write(merged_->theirs, versions.left, asset) &&
+                          Write(merged_->ours, versions.right, asset);
+    if (!is_there) Say(asset + ": not in all three versions, so there is nothing to compare");
+    return is_there;
+  }
+
+  bool Write(const std::string& commit, const std::string& name, const std::string& asset) {
+    const ProgramResult version = GitQuietly({"cat-file", "--filters", commit + ":" + asset});
+    if (version.status == 0) scratch_.Write(name, version.output);
+    return version.status == 0;
+  }
+
+  bool WriteUnmerged(const std::string& asset, AssetVersions& versions) {
+    if (!StageFiles(asset).Write(scratch_, versions)) return false;
+    if (!versions.HasAsset()) {
+      Say(asset + " was merged as text");
+      return false;
+    }
+    versions = {asset, "base", "left", "right"};
+    return true;
+  }
+
+  // Not all that an asset may be called has room for a suffix, and a folder can be called like another
+  // asset's page.
+  std::string DefaultPage(const std::string& asset) {
+    const std::string pages =
+        std::filesystem::absolute(repository_.Path("vexel-merge-report")).string() + "/";
+    std::string page = pages + asset + ".html";
+    const size_t name_size = asset.size() - (asset.rfind('/') + 1);
+    if (name_size <= 200 && MakeFoldersFor(page) && !IsFolder(page)) return page;
+    MakeFoldersFor(pages);
+    return pages + HashedPath(asset) + ".html";
+  }
+
+  // A mistake in the record, whose line is named, was read from a copy.
+  static std::string WithRecord(const std::string& messages, const std::string& record) {
+    const size_t end = messages.find(" specified on line ");
+    if (record.empty() || end == std::string::npos) return messages;
+    const size_t begin = messages.rfind("': ", end);
+    const std::string message = begin == std::string::npos ? messages : messages.substr(begin + 3);
+    return Shown(record) + ": " + message.substr(0, message.find(" (in merge resolve file "));
+  }
+
+  const std::string shown_page_;
+  const std::string page_;
+  const std::optional<MergedCommits>& merged_;
+  const MergeSettings settings_ = SettingsQuery().Get();
+  const Repository repository_;
+  const ConflictRecords records_{repository_};
+  ScratchFolder scratch_{repository_};
+};
+
+}  // namespace
+
+int RunReportPages(const std::vector<std::string>& arguments) {
+  const Arguments parsed = Parse(arguments);
+  TopFolder();
+  // Before the folder changes, from which the user's paths count.
+  const std::string page =
+      parsed.page.empty() ? "" : (std::filesystem::current_path() / parsed.page).string();
+  std::optional<MergedCommits> merged;
+  Paths paths;
+  if (!parsed.commit.empty()) {
+    merged = FindMerged(parsed.commit);
+    paths = ChangedOnBothSides(*merged, parsed.paths);
+  } else {
+    if (parsed.paths.empty()) GoToTop();
+    paths = UnmergedBelow(parsed.paths).value_or(Paths());
+  }
+  GoToTop();
+  const Paths assets = OursAmong(paths);
+  if (assets.empty()) {
+    throw CommandError(merged ? "no file of ours was changed on both sides of " + parsed.commit
+                              : "no file of ours is in conflict; name a merge commit");
+  }
+  if (!page.empty() && assets.size() > 1) {
+    throw CommandError("-o takes one file's page; name its path behind --");
+  }
+  if (!page.empty() && LeavesTop(page)) {
+    throw CommandError(parsed.page + " lies behind a symbolic link of the work tree, or is one");
+  }
+  PageMaker maker(parsed, page, merged);
+  bool is_done = true;
+  for (const std::string& asset : assets) is_done = maker.Make(asset) && is_done;
+  return is_done ? 0 : 1;
+}
+
+}  // namespace vexel_yaml

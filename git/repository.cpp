@@ -1,0 +1,57 @@
+#include "git/repository.h"
+
+#include <cstdlib>
+#include <filesystem>
+
+#include "git/git_call.h"
+#include "git/shown_text.h"
+#include "git/work_files.h"
+#include "platform/files.h"
+#include "platform/read_whole_file.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+std::string Variable(const char* name) {
+  const char* value = std::getenv(name);
+  return value == nullptr ? std::string() : std::string(value);
+}
+
+// The path in a small file of git's, behind `prefix`; relative ones start from `folder`. Empty where there is
+// none.
+std::string PathIn(const std::string& file, const std::string& folder, const std::string& prefix) {
+  std::string text = ReadWholeFile(file).value_or("");
+  while (text.ends_with('\n') || text.ends_with('\r')) text.pop_back();
+  if (!text.starts_with(prefix)) return {};
+  std::error_code error;
+  const std::filesystem::path path = std::filesystem::path(folder) / text.substr(prefix.size());
+  return std::filesystem::canonical(path, error).string();
+}
+
+std::string FindFolder() {
+  if (std::string named = Variable("GIT_DIR"); !named.empty()) return named;
+  if (IsFolder(".git")) return ".git";
+  // Of a linked work tree or a submodule.
+  if (std::string linked = PathIn(".git", ".", "gitdir: "); IsFolder(linked)) return linked;
+  const ProgramResult result = Git({"rev-parse", "--absolute-git-dir"});
+  if (result.status != 0) throw CommandError("", kGitRefused);
+  return Line(result);
+}
+
+}  // namespace
+
+Repository::Repository() : folder_(FindFolder()), common_folder_(Variable("GIT_COMMON_DIR")) {
+  if (common_folder_.empty()) common_folder_ = PathIn(folder_ + "/commondir", folder_, "");
+  if (common_folder_.empty()) common_folder_ = folder_;
+}
+
+bool Repository::IsLocked() const { return FileExists(Path("index.lock")); }
+
+bool Repository::IsChanging() const {
+  if (!IsLocked()) return false;
+  if (FileExists(".git") || !Variable("GIT_WORK_TREE").empty()) return true;
+  return Line(Git({"rev-parse", "--is-inside-work-tree"})) == "true";
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,19 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+namespace vexel_yaml {
+
+/// Settles conflicts of the files that the arguments name. Returns 0, or 1 where something is left. Throws
+/// CommandError.
+int RunResolve(const std::vector<std::string>& arguments);
+
+/// Called by git mergetool with base, ours, theirs and the file's path. Git stages the result itself, and
+/// restores the file where this fails.
+int RunMergetool(const std::vector<std::string>& arguments);
+
+/// Removes the records of conflicts that are gone, from any folder of the work tree: what the hook calls.
+int RunSweep();
+
+}  // namespace vexel_yaml

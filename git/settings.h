@@ -1,0 +1,30 @@
+#pragma once
+
+#include <string>
+
+#include "platform/run_program.h"
+
+namespace vexel_yaml {
+
+/// What a repository's configuration says about merges.
+struct MergeSettings {
+  std::string rules = "auto";
+  std::string type_info;
+  /// Whether git calls other hooks than those of the repository.
+  bool has_other_hooks = false;
+};
+
+/// Reads them in one question to git, which is under way while the caller does something else.
+class SettingsQuery {
+ public:
+  SettingsQuery();
+
+  /// The answer; paths start from the current folder, which is the top one. Throws CommandError for a setting
+  /// that can't be understood: that must not count as not set, since other rules make another merge.
+  MergeSettings Get();
+
+ private:
+  Program question_;
+};
+
+}  // namespace vexel_yaml

@@ -1,0 +1,79 @@
+#include "git/stage_files.h"
+
+#include <unistd.h>
+
+#include <filesystem>
+
+#include "git/git_call.h"
+#include "git/shown_text.h"
+#include "git/work_files.h"
+#include "platform/temporary_files.h"
+
+namespace vexel_yaml {
+
+ScratchFolder::ScratchFolder(const Repository& repository) {
+  std::error_code error;
+  path_ = std::filesystem::absolute(repository.Path("vexel-merge.XXXXXX"), error).string();
+  if (!CreateTempFolder(path_)) throw CommandError("cannot write in " + repository.Path(""));
+}
+
+ScratchFolder::~ScratchFolder() {
+  Clear();
+  RemoveTempFile(path_);
+}
+
+std::string ScratchFolder::Write(const std::string& name, std::string_view text) {
+  std::string path = path_ + "/" + name;
+  files_.push_back(path);
+  // Also where a signal ends the process.
+  if (!RememberTempFile(path) || !PutFile(path, text)) throw CommandError("cannot write " + path);
+  return path;
+}
+
+void ScratchFolder::Clear() {
+  for (const std::string& file : files_) RemoveTempFile(file);
+  files_.clear();
+}
+
+std::vector<StageFiles::Stage> StageFiles::Stages() const {
+  std::vector<Stage> stages;
+  for (const std::string& entry :
+       Pieces(Git({"ls-files", "-z", "--unmerged", "--", ":(literal)" + asset_}).output, '\0')) {
+    const size_t end = entry.find('\t');
+    // Not what lies below a folder of this name.
+    if (end == std::string::npos || entry.substr(end + 1) != asset_) continue;
+    const std::vector<std::string> fields = Pieces(entry.substr(0, end), ' ');
+    if (fields.size() == 3) stages.push_back({fields[0], fields[1], fields[2]});
+  }
+  return stages;
+}
+
+bool StageFiles::Write(ScratchFolder& folder, AssetVersions& versions) const {
+  folder.Clear();
+  versions = {asset_, {}, {}, {}};
+  for (const Stage& stage : stages_) {
+    if (!stage.mode.starts_with("100")) {
+      Complain(asset_ + " is no file on every side: 'git add' or 'git rm' it");
+      return false;
+    }
+    const ProgramResult text = Git({"cat-file", "--filters", "--path=" + asset_, stage.blob});
+    if (text.status != 0) return false;
+    const std::string name = stage.number == "1" ? "base" : stage.number == "2" ? "right" : "left";
+    std::string& version = stage.number == "1"   ? versions.base
+                           : stage.number == "2" ? versions.right
+                                                 : versions.left;
+    version = folder.Write(name, text.output);
+  }
+  if (versions.left.empty() || versions.right.empty()) {
+    Complain(asset_ + " was removed or renamed on one side: 'git add' or 'git rm' it");
+    return false;
+  }
+  if (versions.base.empty()) {
+    Complain("both sides have added " + asset_ +
+             ": take one with 'git checkout --ours' or '--theirs', then 'git add' it");
+    return false;
+  }
+  return true;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,59 @@
+#pragma once
+
+#include <string>
+
+#include "git/asset_merge.h"
+#include "git/repository.h"
+
+namespace vexel_yaml {
+
+/// A folder for the versions of files, which goes with the process. In the repository, where nobody else
+/// looks and where there is as much room as the files themselves take.
+class ScratchFolder {
+ public:
+  /// Throws CommandError where it can't be made.
+  explicit ScratchFolder(const Repository& repository);
+  ScratchFolder(const ScratchFolder&) = delete;
+  ScratchFolder& operator=(const ScratchFolder&) = delete;
+  ~ScratchFolder();
+
+  /// Its absolute path.
+  const std::string& GetPath() const { return path_; }
+
+  /// Writes a file, which is empty from the next `Clear` on. Returns its path. Throws CommandError.
+  std::string Write(const std::string& name, std::string_view text);
+
+  void Clear();
+
+ private:
+  std::string path_;
+  std::vector<std::string> files_;
+};
+
+/// The three stages of a file that is in conflict.
+class StageFiles {
+ public:
+  /// Looks the stages up. The paths are from the top folder, which is the current one.
+  explicit StageFiles(const std::string& asset) : asset_(asset), stages_(Stages()) {}
+
+  /// Writes them as files of the work tree, in which line ends are what the user has set. False where that
+  /// are not three files, which has been said.
+  bool Write(ScratchFolder& folder, AssetVersions& versions) const;
+
+  /// Whether they are still the same.
+  bool AreSame() const { return Stages() == stages_; }
+
+ private:
+  struct Stage {
+    std::string mode;
+    std::string blob;
+    std::string number;
+    bool operator==(const Stage&) const = default;
+  };
+  std::vector<Stage> Stages() const;
+
+  std::string asset_;
+  std::vector<Stage> stages_;
+};
+
+}  // namespace vexel_yaml
