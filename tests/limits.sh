@@ -70,6 +70,22 @@ for file in deep tags; do
   [[ $status == 1 && "$(< messages)" == *'YAML nests too many values in brackets' ]] || fail "$file: status $status"
 done
 
+# Each of many components of one object may exclude each other one.
+components() { # components NAME CLASS FIRST LAST: of this class, with these file IDs, behind a light
+  { head -n 2 base.vexel && printf -- '--- !v!1 &1\nGameObject:\n  m_Component:\n  - component: {fileID: 80000}\n'
+    for ((id = $3; id <= $4; id++)); do printf '  - component: {fileID: %d}\n' "$id"; done
+    for ((id = $3; id <= $4; id++)); do printf -- '--- !v!%d &%d\nC:\n  m_GameObject: {fileID: 1}\n' "$2" "$id"; done
+    printf -- '--- !v!108 &80000\nLight:\n  m_GameObject: {fileID: 1}\n'
+  } > "$1.vexel"
+}
+components bare 0 1 0
+components cloths 21 2 60000
+components boxes 17 70000 70000
+{ head -n 2 base.vexel && printf -- '--- !v!0 &1\nMergeTypeInfo:\n'
+  printf -- "- {id: %d, name: n, ismulti: 1, baseid: 0, requires: '', conflicts: '%s'}\n" 17 '' 21 11000000; } > types.vexel
+timeout 20 "${merge[@]:0:5}" --typeInfo types.vexel bare.vexel cloths.vexel boxes.vexel > output || status=$?
+[[ $status == 3 && $(grep -c '^Right ' output) == 1 ]] || fail "many components: status $status"
+
 status=0
 (ulimit -f 8 && "${merge[@]}" old.vexel > output) 2> messages || status=$?
 [[ $status -gt 128 && "$(< old.vexel)" == old ]] || fail "file size: status $status"
