@@ -147,8 +147,9 @@ void Checker::WalkFields(const std::string& path, const Place& at) {
   for (const Value* value : {&at.base, &at.left, &at.right, &at.merged}) {
     for (const auto& [key, field] : value->fields) keys.insert(key);
   }
+  const std::string above = path.empty() ? "" : path + ".";
   for (const std::string& key : keys) {
-    Walk(path.empty() ? key : path + "." + key,
+    Walk(above + key,
          {Field(at.base, key), Field(at.left, key), Field(at.right, key), Field(at.merged, key)});
   }
 }
