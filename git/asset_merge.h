@@ -1,6 +1,7 @@
 #pragma once
 
-#include <optional>
+#include <exception>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -32,14 +33,20 @@ struct Decisions {
 /// base. The documents live as long as the object.
 class AssetMerge {
  public:
+  explicit AssetMerge(AssetVersions versions) : versions_(std::move(versions)) {}
+
   static constexpr int kMerged = 0;
   static constexpr int kFailed = 1;
   static constexpr int kConflicts = 2;
   static constexpr int kBrokenDependencies = 3;
 
+  /// Reads the versions, which takes no settings: a part of `Run` for which there may be time before that.
+  /// What goes wrong is kept for `Run`.
+  void Read();
+
   /// Returns one of these. What went wrong has been said, with the asset's own name for those of the
   /// versions. To be called once. All merges of a process have the same settings.
-  int Run(const AssetVersions& versions, const MergeSettings& settings, const Decisions* decisions = nullptr);
+  int Run(const MergeSettings& settings, const Decisions* decisions = nullptr);
 
   /// The merged asset.
   const std::string& GetText() const { return text_; }
@@ -49,8 +56,13 @@ class AssetMerge {
   std::string GetRecord() const;
 
  private:
-  int Merge(const AssetVersions& versions, const MergeSettings& settings, const Decisions* decisions);
+  int Merge(const MergeSettings& settings, const Decisions* decisions);
 
+  const AssetVersions versions_;
+  bool is_read_ = false;
+  std::exception_ptr read_failure_;
+  // What was written to standard error.
+  std::string messages_;
   MergeDocuments documents_;
   DiffPair diffs_;
   std::unique_ptr<VexelObjects> merged_;

@@ -8,10 +8,10 @@
 #include <filesystem>
 #include <sstream>
 
-#include "git/commits_at_hand.h"
 #include "git/folder_lock.h"
 #include "git/git_call.h"
 #include "git/marked_block.h"
+#include "git/name_in_use.h"
 #include "git/path_names.h"
 #include "git/record_hook.h"
 #include "git/shown_text.h"
@@ -34,16 +34,12 @@ bool IsRecord(const std::string& path) {
   });
 }
 
-ProgramCall TrackedCall(const std::string& path) {
+bool IsForUs(const std::string& path) {
+  if (!IsPlain(path)) return false;
   ProgramCall call = GitCall({"ls-files", "-z", "--", ":(literal)" + path});
   // A command of the user may be at work on another index.
   call.without = {kIndexVariable};
-  return call;
-}
-
-bool IsForUs(const std::string& path) {
-  if (!IsPlain(path)) return false;
-  const ProgramResult tracked = RunProgram(TrackedCall(path));
+  const ProgramResult tracked = RunProgram(call);
   return tracked.status == 0 && tracked.output.empty();
 }
 
@@ -82,7 +78,8 @@ std::string ConflictRecords::RecordedHash(const std::string& asset) const {
   return lines.size() < 2 ? std::string() : lines[1];
 }
 
-std::string ConflictRecords::Leave(const std::string& asset, const AssetMerge& merge, const std::string& hash,
+std::string ConflictRecords::Leave(const std::string& asset, const AssetMerge& merge,
+                                   const std::function<std::string()>& hash,
                                    const MergeSettings& settings) const {
   const std::string text = RecordText(asset, merge);
   std::string record;
@@ -101,26 +98,22 @@ std::string ConflictRecords::Leave(const std::string& asset, const AssetMerge& m
 }
 
 // Remembered first, so that no record is there that nobody removes.
-std::string ConflictRecords::Place(const std::string& asset, const std::string& text, const std::string& hash,
-                                   bool may_use_hook) const {
+std::string ConflictRecords::Place(const std::string& asset, const std::string& text,
+                                   const std::function<std::string()>& hash, bool may_use_hook) const {
   const Places places = PlacesFor(asset);
   const std::string name = asset + std::string(kSuffix);
-  // Git answers both questions while the other one is asked.
-  Program tracked(TrackedCall(name));
-  CommitsAtHand commits(repository_, name);
+  // Git answers while the files are looked at.
+  NameInUse in_use(repository_, name);
   const bool is_ours = IsFile(places.entry) && IsRecord(places.beside);
   const bool is_free = access(places.beside.c_str(), F_OK) != 0;
-  const ProgramResult tracking = tracked.Wait();
-  const bool is_for_us = IsPlain(name) && tracking.status == 0 && tracking.output.empty();
-  const bool comes_with_theirs = commits.HaveIt();
+  const bool is_for_us = IsPlain(name) && !in_use.Get();
   // The first version had a list of this name.
   if (IsFile(folder_)) unlink(folder_.c_str());
   if (mkdir(folder_.c_str(), 0777) != 0 && !IsFolder(folder_)) return {};
-  if (!PutFile(places.entry, QuotedPath(asset) + "\n" + hash + "\n")) return {};
+  if (!PutFile(places.entry, QuotedPath(asset) + "\n" + hash() + "\n")) return {};
   if (may_use_hook) PlaceHook(repository_);
   if (!PutFile(places.kept, text)) return {};
-  if ((is_ours || is_free) && is_for_us && !comes_with_theirs && MakeFoldersFor(places.beside) &&
-      PutFile(places.beside, text)) {
+  if ((is_ours || is_free) && is_for_us && MakeFoldersFor(places.beside) && PutFile(places.beside, text)) {
     return places.beside;
   }
   return places.kept;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -30,9 +31,10 @@ class ConflictRecords {
   /// The blob of the asset as the merge left it, to see whether somebody has edited it since; empty for none.
   std::string RecordedHash(const std::string& asset) const;
 
-  /// Makes a record of the merge, which left `hash`, and returns its path; empty where it can't.
-  std::string Leave(const std::string& asset, const AssetMerge& merge, const std::string& hash,
-                    const MergeSettings& settings) const;
+  /// Makes a record of the merge and returns its path; empty where it can't. `hash` tells the blob that the
+  /// merge has left, as late as it is wanted.
+  std::string Leave(const std::string& asset, const AssetMerge& merge,
+                    const std::function<std::string()>& hash, const MergeSettings& settings) const;
 
   void Remove(const std::string& asset) const;
 
@@ -51,8 +53,8 @@ class ConflictRecords {
   };
   Places PlacesFor(const std::string& asset) const;
   /// Returns the record's path; empty where it can't.
-  std::string Place(const std::string& asset, const std::string& text, const std::string& hash,
-                    bool may_use_hook) const;
+  std::string Place(const std::string& asset, const std::string& text,
+                    const std::function<std::string()>& hash, bool may_use_hook) const;
   void RemoveHook() const;
 
   const Repository& repository_;

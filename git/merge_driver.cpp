@@ -38,14 +38,15 @@ class DriverRun {
     SettingsQuery query;
     keeps_records_ = !is_ancestor_ && repository_.IsChanging();
     const bool is_ours = versions_.HasAsset();
+    // Kept until the process ends: giving three scenes back node by node takes as long as merging them.
+    AssetMerge& merge = *new AssetMerge(versions_);
+    if (is_ours) merge.Read();
     settings_ = query.Get();
     if (!is_ours) {
       RemoveRecord();
       return MergeAsText();
     }
-    // Kept until the process ends: giving three scenes back node by node takes as long as merging them.
-    AssetMerge& merge = *new AssetMerge;
-    int status = merge.Run(versions_, settings_);
+    int status = merge.Run(settings_);
     if (status != AssetMerge::kFailed && !PutFile(versions_.right, merge.GetText())) {
       Complain("cannot write the merged " + versions_.asset);
       status = AssetMerge::kFailed;
@@ -97,8 +98,10 @@ class DriverRun {
   }
 
   void LeaveRecord(const AssetMerge& merge) {
-    const std::string hash = Line(RunProgram(HashCall(versions_.asset, merge.GetText())));
-    const std::string record = records_.Leave(versions_.asset, merge, hash, settings_);
+    // Git answers while it is asked other things.
+    Program hash(HashCall(versions_.asset, merge.GetText()));
+    const std::string record = records_.Leave(
+        versions_.asset, merge, [&] { return Line(hash.Wait()); }, settings_);
     if (record.empty()) {
       Complain("cannot write the record of " + versions_.asset);
       return;

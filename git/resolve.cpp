@@ -74,7 +74,7 @@ bool ResolveAsset(const std::string& asset, const SettleContext& general, Scratc
   }
   SettleContext context = general;
   context.is_same_conflict = [&] { return stages.AreSame(); };
-  AssetMerge merge;
+  AssetMerge merge(versions);
   const int status = Settle(versions, context, merge);
   if (status == AssetMerge::kFailed) return false;
   if (status == AssetMerge::kMerged) {
@@ -85,7 +85,10 @@ bool ResolveAsset(const std::string& asset, const SettleContext& general, Scratc
   }
   // What is settled already counts when the rest is settled in the engine.
   if (!PutAsset(asset, merge.GetText())) return false;
-  if (context.records.Leave(asset, merge, HashOfAsset(asset), context.settings).empty()) {
+  if (context.records
+          .Leave(
+              asset, merge, [&] { return HashOfAsset(asset); }, context.settings)
+          .empty()) {
     Complain("cannot write the record of " + asset);
   }
   Say(Count(merge.GetConflicts()) + " left in " + asset + ":");
@@ -140,9 +143,9 @@ int RunMergetool(const std::vector<std::string>& arguments) {
   const Repository repository;
   const ConflictRecords records(repository);
   const std::string start = TextOf("./" + asset);
-  AssetMerge merge;
-  const int status =
-      Settle({asset, arguments[0], arguments[2], arguments[1]}, {records, settings, Choice()}, merge);
+  const AssetVersions versions = {asset, arguments[0], arguments[2], arguments[1]};
+  AssetMerge merge(versions);
+  const int status = Settle(versions, {records, settings, Choice()}, merge);
   if (status != AssetMerge::kMerged && IsFile("./" + asset)) {
     // Git puts the old file back where we fail.
     const std::string text = TextOf("./" + asset);
@@ -150,7 +153,10 @@ int RunMergetool(const std::vector<std::string>& arguments) {
   }
   if (status == AssetMerge::kMerged) records.Remove(asset);
   if (status == AssetMerge::kConflicts || status == AssetMerge::kBrokenDependencies) {
-    if (records.Leave(asset, merge, records.RecordedHash(asset), settings).empty()) {
+    if (records
+            .Leave(
+                asset, merge, [&] { return records.RecordedHash(asset); }, settings)
+            .empty()) {
       Complain("cannot write the record of " + asset);
     }
     Say(Count(merge.GetConflicts()) + " left in " + asset);

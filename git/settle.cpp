@@ -15,10 +15,11 @@ namespace {
 std::string RecordOf(const AssetVersions& versions, const SettleContext& context) {
   std::string record = context.records.Find(versions.asset);
   if (!record.empty()) return record;
-  AssetMerge merge;
-  if (merge.Run(versions, context.settings) == AssetMerge::kFailed) return {};
-  const std::string hash = Line(RunProgram(HashCall(versions.asset, merge.GetText())));
-  record = context.records.Leave(versions.asset, merge, hash, context.settings);
+  AssetMerge merge(versions);
+  if (merge.Run(context.settings) == AssetMerge::kFailed) return {};
+  record = context.records.Leave(
+      versions.asset, merge, [&] { return Line(RunProgram(HashCall(versions.asset, merge.GetText()))); },
+      context.settings);
   if (record.empty()) Complain("cannot write the record of " + versions.asset);
   return record;
 }
@@ -80,8 +81,8 @@ bool Decide(const AssetVersions& versions, const SettleContext& context, const s
   decided.record = ShownRecord(record);
   if (!context.choice.side.empty()) {
     decided.text = DecidedIn(record);
-    AssetMerge merge;
-    if (merge.Run(versions, context.settings, &decided) == AssetMerge::kFailed) return false;
+    AssetMerge merge(versions);
+    if (merge.Run(context.settings, &decided) == AssetMerge::kFailed) return false;
     return ChooseSide(merge, context.choice, asset, decided.text);
   }
   if (!Edit(record)) {
@@ -121,7 +122,7 @@ int Settle(const AssetVersions& versions, const SettleContext& context, AssetMer
   if (record.empty() || IsEdited(asset, context) || !Decide(versions, context, record, decided)) {
     return AssetMerge::kFailed;
   }
-  const int status = merge.Run(versions, context.settings, &decided);
+  const int status = merge.Run(context.settings, &decided);
   if (status == AssetMerge::kMerged && !PutAsset(asset, merge.GetText())) return AssetMerge::kFailed;
   return status;
 }

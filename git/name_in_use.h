@@ -9,17 +9,17 @@
 
 namespace vexel_yaml {
 
-/// Whether a commit that git is merging has something under a name. What is picked by hand or popped from a
-/// stash, it tells nobody. Git looks while the caller does something else.
-class CommitsAtHand {
+/// Whether the index, or a commit that git is merging, has something under a name. What is picked by hand or
+/// popped from a stash, git tells nobody. It looks while the caller does something else.
+class NameInUse {
  public:
-  CommitsAtHand(const Repository& repository, const std::string& path);
+  NameInUse(const Repository& repository, const std::string& path);
 
   /// To be called once.
-  bool HaveIt();
+  bool Get();
 
  private:
-  // What git calls the name in each of the commits.
+  // What git calls the name in each place where it may be.
   std::vector<std::string> objects_;
   // Nothing for a name with a line break, which can't be asked for in a list.
   std::optional<Program> list_;

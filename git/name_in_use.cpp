@@ -1,4 +1,4 @@
-#include "git/commits_at_hand.h"
+#include "git/name_in_use.h"
 
 #include <unistd.h>
 
@@ -21,6 +21,14 @@ std::string HashAt(std::string_view text) {
   return std::string(text.substr(0, std::min(text.find_first_not_of("0123456789abcdef"), text.size())));
 }
 
+ProgramCall Quiet(std::vector<std::string> arguments) {
+  ProgramCall call = GitCall(std::move(arguments));
+  call.errors = ProgramCall::Errors::kDropped;
+  // A command of the user may be at work on another index.
+  call.without = {kIndexVariable};
+  return call;
+}
+
 std::vector<std::string> Commits(const Repository& repository) {
   std::vector<std::string> commits = {"MERGE_HEAD", "CHERRY_PICK_HEAD", "REVERT_HEAD", "REBASE_HEAD"};
   constexpr std::string_view kVariable = "GITHEAD_";
@@ -36,27 +44,31 @@ std::vector<std::string> Commits(const Repository& repository) {
 
 }  // namespace
 
-CommitsAtHand::CommitsAtHand(const Repository& repository, const std::string& path) {
+NameInUse::NameInUse(const Repository& repository, const std::string& path) {
+  // The index has files, in four stages, and no folders.
+  for (const char* place : {"HEAD:", ":0:", ":1:", ":2:", ":3:"}) objects_.push_back(place + path);
   for (const std::string& commit : Commits(repository)) {
     if (!commit.empty()) objects_.emplace_back(commit).append(":").append(path);
   }
   if (path.find('\n') != std::string::npos) return;
-  ProgramCall call = GitCall({"cat-file", "--batch-check=%(objecttype)"});
-  call.errors = ProgramCall::Errors::kDropped;
+  ProgramCall call = Quiet({"cat-file", "--batch-check=%(objecttype)"});
   call.input.emplace();
   for (const std::string& object : objects_) call.input->append(object).push_back('\n');
   list_.emplace(call);
 }
 
-bool CommitsAtHand::HaveIt() {
+bool NameInUse::Get() {
   if (!list_) {
     return std::ranges::any_of(objects_, [](const std::string& object) {
-      return GitQuietly({"cat-file", "-e", object}).status == 0;
+      return RunProgram(Quiet({"cat-file", "-e", object})).status == 0;
     });
   }
-  // Of what isn't there, git repeats the name.
-  return std::ranges::any_of(Pieces(list_->Wait().output, '\n'), [](const std::string& line) {
-    return line == "blob" || line == "tree" || line == "commit";
+  const std::vector<std::string> types = Pieces(list_->Wait().output, '\n');
+  // A file of the last commit that is no longer in the index is none of the repository's.
+  if (!types.empty() && types.front() == "tree") return true;
+  return std::any_of(types.begin() + (types.empty() ? 0 : 1), types.end(), [](const std::string& type) {
+    // Of what isn't there, git repeats the name.
+    return type == "blob" || type == "tree" || type == "commit";
   });
 }
 
