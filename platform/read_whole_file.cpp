@@ -40,9 +40,8 @@ class Descriptor {
   int number_;
 };
 
-}  // namespace
-
-std::optional<std::string> ReadWholeFile(const std::string& path) {
+template <typename Text>
+std::optional<Text> Read(const std::string& path) {
   const int opened = OpenPatiently(path);
   if (opened < 0) return std::nullopt;
   const Descriptor file(opened);
@@ -53,7 +52,7 @@ std::optional<std::string> ReadWholeFile(const std::string& path) {
     return std::nullopt;
   }
   constexpr size_t kPiece = 65536;
-  std::string text;
+  Text text;
   // One byte more than there should be, so that the end is seen without growing the text.
   size_t room = S_ISREG(status.st_mode) ? static_cast<size_t>(status.st_size) + 1 : kPiece;
   for (size_t size = 0;;) {
@@ -68,5 +67,11 @@ std::optional<std::string> ReadWholeFile(const std::string& path) {
     return text;
   }
 }
+
+}  // namespace
+
+std::optional<std::string> ReadWholeFile(const std::string& path) { return Read<std::string>(path); }
+
+std::optional<FileText> ReadFileText(const std::string& path) { return Read<FileText>(path); }
 
 }  // namespace vexel_yaml
