@@ -7,6 +7,7 @@
 #include "diff/yaml_mapping_diff.h"
 #include "diff/yaml_sequence_diff.h"
 #include "yaml/content_digests.h"
+#include "yaml/folded_object.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_error.h"
 
@@ -86,10 +87,9 @@ OwnedNodePtr<YAMLSequence> KeySequence(const YAMLMapping& mapping) {
   return keys;
 }
 
-bool HaveSameText(const YAMLNode& from, const YAMLNode& to) {
-  const YAMLMapping* a = from.AsMapping();
-  const YAMLMapping* b = to.AsMapping();
-  return a != nullptr && b != nullptr && a->GetTextNumber() != 0 && a->GetTextNumber() == b->GetTextNumber();
+// Folded objects have no hashes.
+void Unfold(const YAMLNode& node) {
+  if (node.AsMapping() != nullptr) node.AsMapping()->Unfold();
 }
 
 // Makes one diff.
@@ -104,6 +104,9 @@ class DiffMaker {
     if (from == nullptr) return YAMLAlloc<AddOperation>::create(to, IsMergeable(path_, to));
     // Before the hashes: an empty list and an empty mapping have the same one.
     if (from->GetKind() != to->GetKind()) return YAMLAlloc<ChangeOperation>::create(to);
+    if (HaveSameText(*from, *to)) return nullptr;
+    Unfold(*from);
+    Unfold(*to);
     // Scalars are compared as they are, which costs no more than their hashes.
     if (from->AsScalar() == nullptr && from->GetHash() == to->GetHash() && HaveSameContent(*from, *to))
       return nullptr;
@@ -151,7 +154,6 @@ class DiffMaker {
   // once more with every level below: nested deeply, and made so that all their hashes are equal, two files
   // would take the square of their size. So from the first such pair on, digests tell which ones differ.
   bool HaveSameContent(const YAMLNode& from, const YAMLNode& to) {
-    if (HaveSameText(from, to)) return true;
     if (hashes_mislead_ && digests_.Of(&from) != digests_.Of(&to)) return false;
     if (from.HasSameContent(to)) return true;
     hashes_mislead_ = true;

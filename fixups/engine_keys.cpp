@@ -1,5 +1,7 @@
 #include "fixups/engine_keys.h"
 
+#include "yaml/folded_object.h"
+
 namespace vexel_yaml {
 
 const YAMLScalar* AnimatorStateMachineKey() {
@@ -39,6 +41,11 @@ const YAMLScalar* GetMappingPath(const YAMLMapping& mapping, const YAMLScalar* f
 YAMLMapping* GetTransformBody(YAMLMapping& object) {
   YAMLMapping* body = GetSubmapping(object, YAMLScalar::transform);
   return body != nullptr ? body : GetSubmapping(object, YAMLScalar::rectTransform);
+}
+
+bool SurelyRefersToNoPrefab(const YAMLNode& object) {
+  const FoldedObject* folded = GetFolded(&object);
+  return folded != nullptr && !folded->refers_to_prefab;
 }
 
 }  // namespace vexel_yaml

@@ -22,6 +22,10 @@ const YAMLMapping* GetSubmapping(const YAMLMapping& mapping, const YAMLScalar* k
 /// The body of a transform's document, null for other objects.
 YAMLMapping* GetTransformBody(YAMLMapping& object);
 
+/// Whether no "m_PrefabInternal" in an object refers to anything, as far as its text tells without reading
+/// it: so it is with nearly every object.
+bool SurelyRefersToNoPrefab(const YAMLNode& object);
+
 /// Whether a file ID refers to nothing: none, empty or "0".
 inline bool IsNullReference(const YAMLScalar* file_id) {
   return file_id == nullptr || file_id == YAMLScalar::zero || file_id == YAMLScalar::empty;

@@ -67,6 +67,7 @@ void RepairOrphanedPrefabTransforms(YAMLMapping& merged, const FileIDMap& left, 
   const FileIDMap objects = CollectFileIDMap(merged);
   std::vector<const YAMLScalar*> orphans;
   for (const auto& [file_id, value] : merged) {
+    if (SurelyRefersToNoPrefab(*value)) continue;
     YAMLMapping* body = value->AsMapping() == nullptr ? nullptr : GetTransformBody(*value->AsMapping());
     if (body == nullptr) continue;
     const YAMLScalar* prefab = GetMappingPath(*body, YAMLScalar::mPrefabInternal, YAMLScalar::fileID);
@@ -87,6 +88,7 @@ void ClearDanglingPrefabReferences(YAMLMapping& merged) {
   std::vector<const YAMLScalar*> removed;
   PostProcessVisitor visitor(CollectFileIDMap(merged));
   for (const auto& [file_id, value] : merged) {
+    if (SurelyRefersToNoPrefab(*value)) continue;
     visitor.VisitObject(*value);
     if (!visitor.TakeCleared()) continue;
     YAMLMapping* object = value->AsMapping();

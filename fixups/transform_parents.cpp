@@ -1,12 +1,23 @@
 #include "fixups/transform_parents.h"
 
 #include "fixups/engine_keys.h"
+#include "yaml/folded_object.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 
-void TransformParents::Record(const YAMLScalar* transform, const YAMLScalar* parent, YAMLMapping* reference) {
-  links_[transform] = {parent, reference};
+namespace {
+
+YAMLMapping* GetFather(YAMLMapping& transform_object) {
+  YAMLMapping* body = GetTransformBody(transform_object);
+  return body == nullptr ? nullptr : GetSubmapping(*body, YAMLScalar::mFather);
+}
+
+}  // namespace
+
+void TransformParents::Record(const YAMLScalar* transform, const YAMLScalar* parent, YAMLMapping* reference,
+                              YAMLMapping* object) {
+  links_[transform] = {parent, reference, object};
 }
 
 const YAMLScalar* TransformParents::GetParent(const YAMLScalar* transform) const {
@@ -16,7 +27,9 @@ const YAMLScalar* TransformParents::GetParent(const YAMLScalar* transform) const
 }
 
 void TransformParents::Detach(const YAMLScalar* transform) {
-  YAMLMapping* reference = links_.at(transform).reference;
+  Link& link = links_.at(transform);
+  if (link.reference == nullptr) link.reference = GetFather(*link.object);
+  YAMLMapping* reference = link.reference;
   reference->Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
   detached_.insert(reference);
 }
@@ -55,8 +68,20 @@ const YAMLScalar* FileIDOf(const YAMLMapping* reference) {
 
 TransformParents RepairTransformParents(YAMLMapping& merged, const FileIDMap& left, const FileIDMap& right) {
   TransformParents parents;
+  const auto is_removed = [&](const YAMLScalar* parent) {
+    return !merged.HasKey(parent) && (left.Contains(parent) || right.Contains(parent));
+  };
   for (const auto& [transform, value] : merged) {
-    YAMLMapping* body = value->AsMapping() == nullptr ? nullptr : GetTransformBody(*value->AsMapping());
+    YAMLMapping* object = value->AsMapping();
+    if (object == nullptr) continue;
+    const FoldedObject* folded = object->GetFolded();
+    const bool is_transform = folded != nullptr && (folded->body_key == YAMLScalar::transform ||
+                                                    folded->body_key == YAMLScalar::rectTransform);
+    if (is_transform && folded->father != nullptr && !is_removed(folded->father)) {
+      parents.Record(transform, folded->father, nullptr, object);
+      continue;
+    }
+    YAMLMapping* body = GetTransformBody(*object);
     if (body == nullptr) continue;
     const bool has_father = body->HasKey(YAMLScalar::mFather);
     YAMLMapping* reference = nullptr;
@@ -69,11 +94,11 @@ TransformParents RepairTransformParents(YAMLMapping& merged, const FileIDMap& le
     }
     const YAMLScalar* parent = FileIDOf(reference);
     if (parent == nullptr) continue;
-    if (has_father && !merged.HasKey(parent) && (left.Contains(parent) || right.Contains(parent))) {
+    if (has_father && is_removed(parent)) {
       reference->Change(YAMLScalar::fileID, YAMLScalar::zero->AsValue());
     }
     // The parent as read, even where it has just been cleared: whoever walks up from here meets the gap.
-    parents.Record(transform, parent, reference);
+    parents.Record(transform, parent, reference, object);
   }
   return parents;
 }

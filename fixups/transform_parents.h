@@ -10,8 +10,10 @@ namespace vexel_yaml {
 /// The parent links between the transforms of one file.
 class TransformParents {
  public:
-  /// Records a transform's parent and the reference in the file that names it.
-  void Record(const YAMLScalar* transform, const YAMLScalar* parent, YAMLMapping* reference);
+  /// Records a transform's parent and the reference in the file that names it. Null stands for the "m_Father"
+  /// of a transform that nobody has read; `object` is its document.
+  void Record(const YAMLScalar* transform, const YAMLScalar* parent, YAMLMapping* reference,
+              YAMLMapping* object);
 
   /// The parent's file ID ("0" or empty for none), null where none is recorded.
   const YAMLScalar* GetParent(const YAMLScalar* transform) const;
@@ -24,6 +26,7 @@ class TransformParents {
   struct Link {
     const YAMLScalar* parent;
     YAMLMapping* reference;
+    YAMLMapping* object;
   };
 
   std::unordered_map<const YAMLScalar*, Link> links_;

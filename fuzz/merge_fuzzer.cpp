@@ -17,7 +17,7 @@ std::string Merge(const std::vector<std::string>& texts) {
   VexelObjects versions[3];
   DocumentCache cache;
   for (size_t i = 0; i < std::size(versions); ++i) {
-    ParseYAMLString(fuzz::WithDirectives(texts[i]), versions[i], &cache);
+    ParseYAMLText(FileText(fuzz::WithDirectives(texts[i])), versions[i], cache);
     RefuseDuplicateKeys(versions[i], "input");
   }
   auto& [base, left, right] = versions;

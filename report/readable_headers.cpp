@@ -43,10 +43,10 @@ std::optional<std::string> WithReadableHeaders(const std::string& text) {
     const ObjectNames names({&objects});
     const AssetText asset(text);
     std::string result(asset.GetHeader());
-    for (const AssetText::Document& document : asset.GetDocuments()) {
-      const std::string_view line = document.text.substr(0, document.text.find_first_of("\r\n"));
+    for (const std::string_view document : asset.GetDocuments()) {
+      const std::string_view line = document.substr(0, document.find_first_of("\r\n"));
       result += ReadableHeader(line, names);
-      result += document.text.substr(line.size());
+      result += document.substr(line.size());
     }
     return result;
   } catch (const YAMLError&) {

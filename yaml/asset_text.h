@@ -10,13 +10,6 @@ namespace vexel_yaml {
 /// The text of one asset file, cut into its documents. Refers to the text, which must outlive it.
 class AssetText {
  public:
-  struct Document {
-    /// From its "---" line to the next document's.
-    std::string_view text;
-    /// 0-based line in the file.
-    size_t line;
-  };
-
   /// Throws YAMLError for a text that starts with a UTF-16 byte-order mark and for one that holds anything
   /// but directives and comments where it has no document.
   explicit AssetText(std::string_view text);
@@ -27,13 +20,14 @@ class AssetText {
   /// The prefix that "%TAG !v! " gives, empty where there is none.
   std::string_view GetTagPrefix() const;
 
-  const std::vector<Document>& GetDocuments() const { return documents_; }
+  /// Each from its "---" line to the next document's.
+  const std::vector<std::string_view>& GetDocuments() const { return documents_; }
 
  private:
   void CheckOnlyDirectives() const;
 
   std::string_view header_;
-  std::vector<Document> documents_;
+  std::vector<std::string_view> documents_;
 };
 
 }  // namespace vexel_yaml

@@ -1,37 +1,75 @@
 #include "yaml/document_cache.h"
 
-#include <atomic>
-#include <cstdint>
 #include <utility>
+
+#include "platform/text_hash.h"
 
 namespace vexel_yaml {
 
-std::string_view DocumentCache::Keep(std::string text, size_t& reader) {
+namespace {
+
+// More than a merge reads; a file that repeats one line for ever must not make looking it up slow.
+constexpr size_t kMostWithOneLine = 8;
+
+std::string_view FirstLine(std::string_view document) { return document.substr(0, document.find('\n')); }
+
+}  // namespace
+
+std::string_view KeptTexts::Keep(FileText text) {
   AutoLock lock(mutex_);
-  reader = texts_.size();
-  return texts_.emplace_back(std::move(text));
+  return texts_.emplace_back(std::move(text)).View();
 }
 
-bool DocumentCache::Serves(std::string_view header) {
+ObjectFolder& KeptTexts::CreateFolder(std::string_view header) {
   AutoLock lock(mutex_);
-  if (!std::exchange(has_header_, true)) header_ = header;
-  return header == header_;
+  return folders_.emplace_back(header);
 }
 
-const YAMLMapping* DocumentCache::Find(std::string_view document) {
-  Shard& shard = ShardOf(document);
-  AutoLock lock(shard.mutex);
-  const auto found = shard.objects.find(document);
-  return found == shard.objects.end() ? nullptr : found->second;
+SharedDocuments::SharedDocuments(const std::vector<std::string_view>& documents)
+    : entries_(documents.size()), index_(documents.size()) {
+  for (size_t i = 0; i < documents.size(); ++i) {
+    entries_[i].text = documents[i];
+    const std::string_view line = FirstLine(documents[i]);
+    const uint64_t hash = HashText(line);
+    if (CountWithFirstLine(line, hash) < kMostWithOneLine) index_.Insert(hash, static_cast<uint32_t>(i));
+  }
 }
 
-void DocumentCache::Publish(std::string_view document, YAMLMapping* object) {
-  // Objects of two caches may be compared, too.
-  static std::atomic<uint32_t> last_number = 0;
-  Shard& shard = ShardOf(document);
-  AutoLock lock(shard.mutex);
-  const auto [published, is_first] = shard.objects.emplace(document, object);
-  object->SetTextNumber(is_first ? ++last_number : published->second->GetTextNumber());
+size_t SharedDocuments::CountWithFirstLine(std::string_view line, uint64_t hash) const {
+  size_t count = 0;
+  index_.Find(hash, [&](uint32_t i) {
+    if (FirstLine(entries_[i].text) == line) ++count;
+    return count == kMostWithOneLine;
+  });
+  return count;
+}
+
+uint32_t SharedDocuments::Find(std::string_view document, size_t expected) const {
+  if (expected < entries_.size() && entries_[expected].text == document) {
+    return static_cast<uint32_t>(expected);
+  }
+  return index_.Find(HashText(FirstLine(document)), [&](uint32_t i) { return entries_[i].text == document; });
+}
+
+SharedDocuments::Known SharedDocuments::Get(size_t index) const {
+  const Entry& entry = entries_[index];
+  return {entry.folded.load(std::memory_order_acquire), entry.object.load(std::memory_order_acquire)};
+}
+
+void SharedDocuments::Publish(size_t index, Known known) {
+  entries_[index].folded.store(known.folded, std::memory_order_release);
+  entries_[index].object.store(known.object, std::memory_order_release);
+}
+
+SharedDocuments* DocumentCache::Share(std::string_view header, const std::vector<std::string_view>& documents,
+                                      bool& is_first) {
+  AutoLock lock(mutex_);
+  is_first = documents_ == nullptr;
+  if (is_first) {
+    header_ = header;
+    documents_ = std::make_unique<SharedDocuments>(documents);
+  }
+  return header == header_ ? documents_.get() : nullptr;
 }
 
 }  // namespace vexel_yaml

@@ -4,9 +4,11 @@
 
 #include <algorithm>
 #include <new>
+#include <span>
 #include <utility>
 
 #include "yaml/convert_document.h"
+#include "yaml/pseudo_keys.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -92,14 +94,6 @@ class LoadedDocument {
   size_t problem_line_ = 0;
 };
 
-// The pseudo keys count in the hash, so that a change of the class ID or of the stripped mark alone is seen.
-void AppendPseudoKey(YAMLMapping& object, const YAMLScalar* key, const YAMLScalar* value, uint32_t position) {
-  object.Append(key, value->AsValue());
-  uint32_t hash = YAMLNode::Combine(object.GetHash(), key->GetHash());
-  hash = YAMLNode::Combine(hash, value->GetHash());
-  object.SetHash(YAMLNode::Combine(hash, position));
-}
-
 // A file that holds one as a key of its own could not be told from what is read from the header line.
 void RefusePseudoKeys(const YAMLMapping& object) {
   const auto refuse = [](const YAMLMapping::Slot& slot) {
@@ -122,12 +116,9 @@ void Convert(LoadedDocument& document, size_t dropped_lines, std::string_view fi
   result.skipped_key_lines = converter.GetSkippedKeyLines();
 
   result.file_id = YAMLScalar::Lookup(FileIDIn(first_line));
-  auto position = static_cast<uint32_t>(root->data.mapping.pairs.top - root->data.mapping.pairs.start);
-  AppendPseudoKey(*result.object, YAMLScalar::fileIDPlaceHolderName, result.file_id, position++);
-  AppendPseudoKey(*result.object, YAMLScalar::classIDPlaceHolderName,
-                  YAMLScalar::Lookup(document.GetClassID()), position++);
-  if (!stripped) return;
-  AppendPseudoKey(*result.object, YAMLScalar::strippedPrefabPlaceHolderName, YAMLScalar::one, position);
+  const auto pairs = static_cast<uint32_t>(root->data.mapping.pairs.top - root->data.mapping.pairs.start);
+  AppendPseudoKeys(*result.object, result.file_id, YAMLScalar::Lookup(document.GetClassID()), stripped,
+                   pairs);
 }
 
 // Whether a line of the header says nothing to libyaml.
@@ -142,7 +133,8 @@ size_t CountLines(std::string_view text) { return static_cast<size_t>(std::range
 
 // Only what libyaml needs, and little of it: it gets the directives again with every document, and a header
 // of some megabytes before a million small ones would take hours.
-DocumentReader::DocumentReader(std::string_view header) {
+DocumentReader::DocumentReader(std::string_view header, const char* first_line)
+    : file_begin_(first_line), counted_to_(first_line) {
   constexpr size_t kMostDirectives = 1024;
   for (size_t begin = 0; begin < header.size();) {
     const size_t line_end = header.find('\n', begin);
@@ -194,15 +186,27 @@ bool DocumentReader::ReadChunk(bool last, bool stripped, ReadObject& result, siz
   return true;
 }
 
-bool DocumentReader::Read(const AssetText::Document& document, bool last, ReadObject& result) {
+// 0-based. From the place where it was last asked for: a hostile file may ask for every document's.
+size_t DocumentReader::LineOf(std::string_view document) {
+  if (document.data() < counted_to_) {
+    counted_to_ = file_begin_;
+    counted_lines_ = 0;
+  }
+  counted_lines_ += static_cast<size_t>(std::count(counted_to_, document.data(), '\n'));
+  counted_to_ = document.data();
+  return counted_lines_;
+}
+
+bool DocumentReader::Read(std::string_view document, bool last, ReadObject& result) {
   chunk_ = directives_;
-  chunk_ += document.text;
+  chunk_ += document;
 
   // In the chunk the document starts on the line behind the directives, in the file on a line of its own.
   // libyaml counts the end of a text as one line more.
-  const size_t last_line = CountLines(document.text.substr(0, document.text.size() - 1));
-  const auto line_in_file = [&](size_t line) {
-    return document.line + 1 + std::min(line > kept_lines_ ? line - kept_lines_ : 0, last_line);
+  const auto count_in_file = [&](std::span<size_t> lines) {
+    const size_t first = LineOf(document) + 1;
+    const size_t end = first + CountLines(document.substr(0, document.size() - 1));
+    for (size_t& line : lines) line = std::min(first + (line > kept_lines_ ? line - kept_lines_ : 0), end);
   };
   size_t problem_line = 0;
   try {
@@ -211,12 +215,13 @@ bool DocumentReader::Read(const AssetText::Document& document, bool last, ReadOb
     if (!last) chunk_ += "---";
     if (!ReadChunk(last, stripped, result, problem_line)) return false;
   } catch (const YAMLError& error) {
-    std::string place = "see line " + std::to_string(line_in_file(problem_line));
+    count_in_file({&problem_line, 1});
+    std::string place = "see line " + std::to_string(problem_line);
     if (const std::string_view file_id = FileIDIn(FirstLine()); !file_id.empty())
       place.append(", object ").append(file_id);
     throw YAMLError(error.what(), std::move(place));
   }
-  for (size_t& line : result.skipped_key_lines) line = line_in_file(line);
+  if (!result.skipped_key_lines.empty()) count_in_file(result.skipped_key_lines);
   return true;
 }
 

@@ -4,7 +4,6 @@
 #include <string_view>
 #include <vector>
 
-#include "yaml/asset_text.h"
 #include "yaml/document_limits.h"
 #include "yaml/yaml_mapping.h"
 
@@ -25,19 +24,25 @@ struct ReadObject {
 /// Reads documents of one asset, one at a time, with libyaml.
 class DocumentReader {
  public:
-  /// The directives of `header` stand in front of every document.
+  /// The directives of `header` stand in front of every document. Lines are counted from `first_line`, where
+  /// the file begins.
   /// Throws YAMLError "YAML directives are longer than 1024 bytes".
-  explicit DocumentReader(std::string_view header);
+  DocumentReader(std::string_view header, const char* first_line);
 
-  /// Reads one document. `last`: no other follows in the file. Returns false when libyaml can't start.
+  /// Reads one document of the file. `last`: no other follows in it. Returns false when libyaml can't start.
   /// Throws std::bad_alloc, and YAMLError with the 1-based line and the object in its hint.
-  bool Read(const AssetText::Document& document, bool last, ReadObject& result);
+  bool Read(std::string_view document, bool last, ReadObject& result);
 
  private:
   bool TakeStrippedMark();
   std::string_view FirstLine() const;
+  size_t LineOf(std::string_view document);
   bool ReadChunk(bool last, bool stripped, ReadObject& result, size_t& problem_line);
 
+  // Up to where the file's lines have been counted, for the few documents that anyone asks for.
+  const char* file_begin_;
+  const char* counted_to_;
+  size_t counted_lines_ = 0;
   std::string directives_;
   // Of the header: how many there are in the directives, and how many were left out.
   size_t kept_lines_ = 0;

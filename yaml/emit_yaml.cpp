@@ -81,6 +81,7 @@ int YAMLScalar::PopulateDocument(yaml_document_s* document) const {
 }
 
 int YAMLMapping::PopulateDocument(yaml_document_s* document) const {
+  Unfold();
   const int id = CheckedId(
       yaml_document_add_mapping(document, nullptr, flow_ ? YAML_FLOW_MAPPING_STYLE : YAML_ANY_MAPPING_STYLE));
   const auto append = [&](const Slot& slot) {

@@ -17,8 +17,8 @@ namespace vexel_yaml {
 namespace {
 
 // "%YAML" must begin within the first bytes; a byte-order mark may stand before it.
-void CheckHeader(const std::string& text) {
-  if (text.substr(0, 9).find("%YAML") != std::string::npos) return;
+void CheckHeader(std::string_view text) {
+  if (text.substr(0, 9).find("%YAML") != std::string_view::npos) return;
   throw YAMLError(
       "File is not a valid text serialized YAML file. Make sure that Asset Serialization is set to 'Force "
       "text' in Editor Settings.");
@@ -27,10 +27,11 @@ void CheckHeader(const std::string& text) {
 }  // namespace
 
 bool ParseYAMLFile(const std::string& path, VexelObjects& objects, DocumentCache* cache) {
-  std::optional<std::string> text = ReadWholeFile(path);
+  std::optional<FileText> text = ReadFileText(path);
   if (!text) throw YAMLError("Cannot open file", std::generic_category().message(errno));
-  CheckHeader(*text);
-  return ParseYAMLString(std::move(*text), objects, cache);
+  CheckHeader(text->View());
+  if (cache == nullptr) return ParseYAMLString(text->View(), objects);
+  return ParseYAMLText(std::move(*text), objects, *cache);
 }
 
 void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache* cache) {

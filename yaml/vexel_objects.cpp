@@ -1,5 +1,6 @@
 #include "yaml/vexel_objects.h"
 
+#include "yaml/folded_object.h"
 #include "yaml/yaml_error.h"
 #include "yaml/yaml_sequence.h"
 
@@ -54,6 +55,10 @@ struct TakenPseudoKeys {
 void VexelObjects::OutputObject(std::ostream& out, const Slot& slot, Headers headers) try {
   CheckHeader(slot, headers);
   YAMLMapping* object = slot.value->AsMapping();
+  if (const FoldedObject* folded = object->GetFolded()) {
+    out << folded->text;
+    return;
+  }
   const TakenPseudoKeys taken(*object);
   out << "--- !v!" << TextOf(taken.class_id) << " &" << TextOf(taken.file_id);
   if (taken.stripped != nullptr) out << " stripped";
@@ -76,6 +81,7 @@ VexelObjects* VexelObjects::Clone() const {
   auto* clone = new VexelObjects;
   CloneInto(*clone);
   clone->tag_prefix_ = tag_prefix_;
+  clone->texts_ = texts_;
   return clone;
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <ostream>
 #include <string>
 #include <vector>
@@ -47,6 +48,9 @@ class VexelObjects final : public YAMLMapping {
   /// version for a text merge tool has it blanked.
   enum class Headers : uint8_t { kComplete, kAsTheyAre };
 
+  /// Keeps what folded objects refer to for as long as these objects and their copies live.
+  void KeepTexts(std::shared_ptr<const void> texts) { texts_ = std::move(texts); }
+
   /// Writes the file: the two directives, then a document for each object. Throws what OutputObject throws.
   void Output(std::ostream& out, Headers headers = Headers::kComplete);
 
@@ -64,6 +68,7 @@ class VexelObjects final : public YAMLMapping {
   void Free() override { delete this; }
 
  private:
+  std::shared_ptr<const void> texts_;
   std::string tag_prefix_ = "tag:vexel.com,2011:";
   std::vector<SkippedKey> skipped_keys_;
   std::vector<const YAMLScalar*> objects_with_duplicate_keys_;

@@ -3,21 +3,66 @@
 #include <algorithm>
 #include <span>
 #include <sstream>
+#include <string_view>
 #include <vector>
 
 #include "platform/thread.h"
+#include "yaml/folded_object.h"
 
 namespace vexel_yaml {
 
 namespace {
 
-// The texts made ahead of the writing stay small beside the objects.
-constexpr size_t kObjectsAThread = 4096;
+using Slots = std::span<const YAMLMapping::Slot>;
 
-// The next piece of at most kObjectsAThread slots, taken off the front of `slots`.
-std::span<const YAMLMapping::Slot> TakePiece(std::span<const YAMLMapping::Slot>& slots) {
-  const size_t count = std::min(kObjectsAThread, slots.size());
-  const auto piece = slots.first(count);
+// The texts made ahead of the writing stay small beside the objects.
+constexpr size_t kReadObjectsAThread = 2048;
+
+// Writes the texts of folded objects in pieces as large as they come: neighbours in the file they were read
+// from lie side by side, so an untouched scene is one piece.
+class ObjectWriter {
+ public:
+  explicit ObjectWriter(std::ostream& out) : out_(out) {}
+  ObjectWriter(const ObjectWriter&) = delete;
+  ObjectWriter& operator=(const ObjectWriter&) = delete;
+
+  void Write(const YAMLMapping::Slot& slot) {
+    const FoldedObject* folded = GetFolded(slot.value);
+    if (folded == nullptr) {
+      Flush();
+      VexelObjects::OutputObject(out_, slot);
+    } else if (gathered_.data() + gathered_.size() == folded->text.data()) {
+      gathered_ = {gathered_.data(), gathered_.size() + folded->text.size()};
+    } else {
+      Flush();
+      gathered_ = folded->text;
+    }
+  }
+
+  void Flush() {
+    out_ << gathered_;
+    gathered_ = {};
+  }
+
+ private:
+  std::ostream& out_;
+  std::string_view gathered_;
+};
+
+void WriteAll(Slots slots, std::ostream& out) {
+  ObjectWriter writer(out);
+  for (const YAMLMapping::Slot& slot : slots) writer.Write(slot);
+  writer.Flush();
+}
+
+// The next piece with not too many objects that must be turned into text, taken off the front of `slots`.
+Slots TakePiece(Slots& slots) {
+  size_t read = 0;
+  size_t count = 0;
+  for (; count < slots.size() && read < kReadObjectsAThread; ++count) {
+    if (GetFolded(slots[count].value) == nullptr) ++read;
+  }
+  const Slots piece = slots.first(count);
   slots = slots.subspan(count);
   return piece;
 }
@@ -25,24 +70,19 @@ std::span<const YAMLMapping::Slot> TakePiece(std::span<const YAMLMapping::Slot>&
 }  // namespace
 
 void WriteObjects(VexelObjects& objects, std::ostream& out, bool threads) {
-  if (!threads) {
-    objects.Output(out);
-    return;
-  }
   std::vector<YAMLMapping::Slot> slots;
   slots.reserve(objects.Size());
   for (const YAMLMapping::Slot& slot : objects) slots.push_back(slot);
 
   objects.OutputHeader(out);
-  for (std::span<const YAMLMapping::Slot> rest = slots; !rest.empty();) {
-    const auto first = TakePiece(rest);
-    const auto second = TakePiece(rest);
+  for (Slots rest = slots; !rest.empty();) {
+    const Slots first = TakePiece(rest);
+    const Slots second = threads ? TakePiece(rest) : Slots();
     std::ostringstream second_text;
     Thread thread;
-    thread.Start([&] {
-      for (const YAMLMapping::Slot& slot : second) VexelObjects::OutputObject(second_text, slot);
-    });
-    for (const YAMLMapping::Slot& slot : first) VexelObjects::OutputObject(out, slot);
+    if (!second.empty()) thread.Start([&] { WriteAll(second, second_text); });
+    WriteAll(first, out);
+    if (second.empty()) continue;
     thread.Join();
     thread.CheckForExceptions();
     out << second_text.view();

@@ -1,7 +1,10 @@
 #include "yaml/yaml_mapping.h"
 
 #include <algorithm>
+#include <array>
+#include <cstdint>
 
+#include "yaml/folded_object.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_error.h"
 #include "yaml/yaml_sequence.h"
@@ -13,18 +16,40 @@ namespace {
 constexpr size_t kIndexFrom = 16;
 constexpr size_t kNotFound = static_cast<size_t>(-1);
 
+// Keys are interned: the address is the text.
+uint64_t HashOf(const YAMLScalar* key) { return reinterpret_cast<uintptr_t>(key); }
+
 }  // namespace
 
 YAMLMapping::~YAMLMapping() { Clear(); }
 
+void YAMLMapping::ReadFolded() const {
+  // A lock for each mapping would cost more memory than the few that two threads ask for at once are worth.
+  static std::array<Mutex, 64> mutexes;
+  AutoLock lock(mutexes[(reinterpret_cast<uintptr_t>(this) / sizeof(YAMLMapping)) % mutexes.size()]);
+  const FoldedObject* folded = GetFolded();
+  if (folded == nullptr) return;
+  OwnedNodePtr<YAMLMapping> read(folded->Read());
+  auto& self = const_cast<YAMLMapping&>(*this);
+  self.slots_ = std::exchange(read->slots_, {});
+  self.SetHash(read->GetHash());
+  self.SetLine(read->GetLine());
+  self.BuildIndex();
+  // The others may look at the content once they see this.
+  folded_.store(nullptr, std::memory_order_release);
+}
+
 void YAMLMapping::RefuseDuplicates() const {
+  Unfold();
   if (duplicates_) throw YAMLError("Cannot perform this operation on a YAML file with duplicate keys");
 }
 
 size_t YAMLMapping::FindSlot(const YAMLScalar* key) const {
   if (index_) {
-    const auto found = index_->find(key);
-    return found == index_->end() ? kNotFound : found->second;
+    // Of a slot that has gone, or has another key now, the entry stays.
+    const uint32_t found = index_->Find(
+        HashOf(key), [&](uint32_t slot) { return slot < slots_.size() && slots_[slot].key == key; });
+    return found == PositionIndex::kNone ? kNotFound : found;
   }
   const auto found =
       std::find_if(slots_.begin(), slots_.end(), [&](const Slot& slot) { return slot.key == key; });
@@ -32,6 +57,11 @@ size_t YAMLMapping::FindSlot(const YAMLScalar* key) const {
 }
 
 YAMLNode* YAMLMapping::Find(const YAMLScalar* key) const {
+  // All but the body is known.
+  if (const FoldedObject* folded = GetFolded(); folded != nullptr && key != folded->body_key) {
+    const YAMLScalar* value = folded->GetPseudoValue(key);
+    return value == nullptr ? nullptr : value->AsValue();
+  }
   RefuseDuplicates();
   const size_t slot = FindSlot(key);
   return slot == kNotFound ? nullptr : slots_[slot].value;
@@ -40,22 +70,28 @@ YAMLNode* YAMLMapping::Find(const YAMLScalar* key) const {
 void YAMLMapping::BuildIndex() {
   index_.reset();
   if (slots_.size() < kIndexFrom) return;
-  index_ = std::make_unique<Index>(slots_.capacity());
+  // With room to spare: renaming a key leaves an entry behind.
+  index_ = std::make_unique<PositionIndex>(slots_.capacity() + slots_.size() / 4);
   for (size_t i = 0; i < slots_.size(); ++i) {
-    if (slots_[i].key != nullptr) index_->emplace(slots_[i].key, i);
+    if (slots_[i].key != nullptr) index_->Insert(HashOf(slots_[i].key), static_cast<uint32_t>(i));
+  }
+}
+
+void YAMLMapping::IndexSlot(size_t slot) {
+  if (index_ != nullptr && !index_->IsFull()) {
+    index_->Insert(HashOf(slots_[slot].key), static_cast<uint32_t>(slot));
+  } else if (index_ != nullptr || slots_.size() >= kIndexFrom) {
+    BuildIndex();
   }
 }
 
 void YAMLMapping::AddSlot(const YAMLScalar* key, YAMLNode* value) {
   slots_.push_back({key, value});
-  if (index_) {
-    index_->insert_or_assign(key, slots_.size() - 1);
-  } else if (slots_.size() >= kIndexFrom) {
-    BuildIndex();
-  }
+  IndexSlot(slots_.size() - 1);
 }
 
 void YAMLMapping::Append(const YAMLScalar* key, YAMLNode* value) {
+  Unfold();
   if (duplicates_) {
     duplicates_->push_back({key, value});
     return;
@@ -101,10 +137,7 @@ void YAMLMapping::ChangeKey(const YAMLScalar* old_key, const YAMLScalar* new_key
     ++gaps_;
   }
   slots_[slot].key = new_key;
-  if (index_) {
-    index_->erase(old_key);
-    index_->insert_or_assign(new_key, slot);
-  }
+  IndexSlot(slot);
 }
 
 YAMLNode& YAMLMapping::GetRef(const YAMLScalar* key) {
@@ -118,7 +151,6 @@ YAMLNode* YAMLMapping::Steal(const YAMLScalar* key) {
   const size_t slot = FindSlot(key);
   if (slot == kNotFound) return nullptr;
   YAMLNode* value = slots_[slot].value;
-  if (index_) index_->erase(key);
   if (slot + 1 == slots_.size()) {
     slots_.pop_back();
     return value;
@@ -158,6 +190,11 @@ YAMLMapping::Iterator YAMLMapping::end() const {
   return {end, end};
 }
 
+const YAMLScalar* YAMLMapping::FirstKey() const {
+  const FoldedObject* folded = GetFolded();
+  return folded != nullptr ? folded->body_key : (*begin()).key;
+}
+
 void YAMLMapping::Reorder(const std::vector<const YAMLScalar*>& order) {
   RefuseDuplicates();
   std::vector<Slot> reordered;
@@ -176,6 +213,7 @@ void YAMLMapping::Reorder(const std::vector<const YAMLScalar*>& order) {
 }
 
 YAMLSequence* YAMLMapping::ToSequence() const {
+  Unfold();
   OwnedNodePtr<YAMLSequence> sequence(YAMLAlloc<YAMLSequence>::create(flow_));
   const auto append = [&](const Slot& slot) {
     OwnedNodePtr<YAMLMapping> pair(YAMLAlloc<YAMLMapping>::create(false));
@@ -193,6 +231,7 @@ YAMLSequence* YAMLMapping::ToSequence() const {
 }
 
 void YAMLMapping::Clear() {
+  folded_.store(nullptr, std::memory_order_relaxed);
   for (const Slot& slot : slots_) {
     if (slot.value != nullptr) slot.value->Free();
   }
@@ -206,9 +245,13 @@ void YAMLMapping::Clear() {
 
 void YAMLMapping::CloneInto(YAMLMapping& target) const {
   target.SetFlow(flow_);
-  target.SetHash(GetHash());
   target.SetLine(GetLine());
-  target.text_number_ = text_number_;
+  // Before the content is looked at, which another thread may be reading.
+  if (const FoldedObject* folded = GetFolded()) {
+    target.Fold(*folded);
+    return;
+  }
+  target.SetHash(GetHash());
   target.slots_.reserve(slots_.size());
   for (const Slot& slot : slots_) {
     if (slot.key == nullptr) continue;
@@ -219,6 +262,7 @@ void YAMLMapping::CloneInto(YAMLMapping& target) const {
 }
 
 void YAMLMapping::ForgetPairs() {
+  folded_.store(nullptr, std::memory_order_relaxed);
   slots_.clear();
   gaps_ = 0;
   index_.reset();
@@ -239,6 +283,8 @@ YAMLMapping* YAMLMapping::Clone() const {
 }
 
 bool YAMLMapping::Equals(const YAMLNode* other) const {
+  Unfold();
+  if (vexel_yaml::GetFolded(other) != nullptr) other->AsMapping()->Unfold();
   if (other != nullptr && GetHash() != 0 && other->GetHash() != 0) return GetHash() == other->GetHash();
   return EqualsExpensive(other);
 }
@@ -262,11 +308,15 @@ void YAMLMapping::RebuildHash(bool shallow) {
   uint32_t hash = 0;
   uint32_t position = 0;
   for (const Slot& slot : *this) {
+    // The hash of a file whose objects are not read is nobody's business, and would read them all.
+    if (shallow && vexel_yaml::GetFolded(slot.value) != nullptr) {
+      SetHash(0);
+      return;
+    }
     if (!shallow) slot.value->RebuildHash(false);
     hash = Combine(Combine(Combine(hash, slot.key->GetHash()), slot.value->GetHash()), position++);
   }
   SetHash(hash);
-  text_number_ = 0;
 }
 
 }  // namespace vexel_yaml

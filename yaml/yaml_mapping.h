@@ -1,14 +1,17 @@
 #pragma once
 
+#include <atomic>
 #include <cstddef>
 #include <memory>
-#include <unordered_map>
 #include <utility>
 #include <vector>
 
+#include "yaml/position_index.h"
 #include "yaml/yaml_scalar.h"
 
 namespace vexel_yaml {
+
+struct FoldedObject;
 
 /// An ordered set of key/value pairs. Owns its values; its keys are interned.
 ///
@@ -16,6 +19,9 @@ namespace vexel_yaml {
 /// document order, but every operation marked "keyed" throws the YAMLError
 /// "Cannot perform this operation on a YAML file with duplicate keys" and leaves the mapping as it was.
 /// Scenes hold such mappings where the engine writes lists as mappings; reading and writing them must work.
+///
+/// An object's mapping may be folded: its text is known, its content is read when first asked for. Nobody can
+/// tell but by the clock, and by asking `GetFolded`. Several threads may ask one mapping at once.
 class YAMLMapping : public YAMLNode {
  public:
   /// One pair of a mapping. A slot without a key is a gap that a removed pair has left.
@@ -52,10 +58,17 @@ class YAMLMapping : public YAMLNode {
   void SetFlow(bool flow) { flow_ = flow; }
   bool HasDuplicateKeys() const { return duplicates_ != nullptr; }
 
-  /// Two mappings that came from one text have one number, so that they need not be compared; 0 says nothing.
-  /// A copy has its original's. Like the hash it tells of what was read: RebuildHash sets it to 0.
-  uint32_t GetTextNumber() const { return text_number_; }
-  void SetTextNumber(uint32_t number) { text_number_ = number; }
+  /// Makes this empty mapping stand for an object's text, which must outlive it.
+  void Fold(const FoldedObject& folded) { folded_.store(&folded, std::memory_order_release); }
+  /// What the mapping is folded to, null where its content has been read.
+  const FoldedObject* GetFolded() const { return folded_.load(std::memory_order_acquire); }
+  /// Reads the content of a folded mapping. Every operation does so where it needs to.
+  void Unfold() const {
+    if (GetFolded() != nullptr) ReadFolded();
+  }
+
+  /// Makes room for this many pairs in all.
+  void Reserve(size_t count) { slots_.reserve(count); }
 
   /// Adds a pair at the end; the mapping then owns `value`. A pair whose key is present with an equal value
   /// is dropped (and not freed); with another value it starts duplicate-key mode. Never throws a YAMLError;
@@ -97,7 +110,7 @@ class YAMLMapping : public YAMLNode {
   Iterator end() const;
 
   /// Keyed. The first key and its value; only on a mapping that is not empty.
-  const YAMLScalar* FirstKey() const { return (*begin()).key; }
+  const YAMLScalar* FirstKey() const;
   const YAMLNode* First() const { return (*begin()).value; }
   YAMLNode* First() { return (*begin()).value; }
 
@@ -131,23 +144,30 @@ class YAMLMapping : public YAMLNode {
   void RebuildHash(bool shallow) override;
 
  private:
-  using Index = std::unordered_map<const YAMLScalar*, size_t>;
-
   void RefuseDuplicates() const;
+  void ReadFolded() const;
   YAMLNode* Find(const YAMLScalar* key) const;
   size_t FindSlot(const YAMLScalar* key) const;
   void AddSlot(const YAMLScalar* key, YAMLNode* value);
+  void IndexSlot(size_t slot);
   void CloseGaps();
   void BuildIndex();
 
+  // In an order that leaves no gaps: a scene has some hundred thousand of these.
+  bool flow_;
+  uint32_t gaps_ = 0;
   std::vector<Slot> slots_;
   // Only for mappings with many keys: the root of a file has one an object, an object only a few.
-  std::unique_ptr<Index> index_;
+  std::unique_ptr<PositionIndex> index_;
   std::unique_ptr<std::vector<Slot>> duplicates_;
-  size_t gaps_ = 0;
-  uint32_t text_number_ = 0;
-  bool flow_;
+  mutable std::atomic<const FoldedObject*> folded_ = nullptr;
 };
+
+/// The object that `node` is folded to, null where it is no folded mapping.
+inline const FoldedObject* GetFolded(const YAMLNode* node) {
+  const YAMLMapping* mapping = node == nullptr ? nullptr : node->AsMapping();
+  return mapping == nullptr ? nullptr : mapping->GetFolded();
+}
 
 inline const YAMLMapping* YAMLNode::AsMapping() const {
   return kind_ == Kind::kMapping ? static_cast<const YAMLMapping*>(this) : nullptr;

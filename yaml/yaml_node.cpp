@@ -2,6 +2,7 @@
 
 #include <algorithm>
 
+#include "yaml/folded_object.h"
 #include "yaml/yaml_mapping.h"
 #include "yaml/yaml_sequence.h"
 
@@ -22,6 +23,7 @@ bool ItemsHaveSameContent(const YAMLNode* a, const YAMLNode* b) {
 bool YAMLNode::HasSameContent(const YAMLNode& other) const {
   if (this == &other) return true;
   if (kind_ != other.kind_) return false;
+  if (HaveSameText(*this, other)) return true;
   switch (kind_) {
     case Kind::kScalar:
       return false;  // Interned: another scalar is another text.

@@ -81,7 +81,8 @@ class YAMLNode {
   const YAMLSequence* AsSequence() const;
   YAMLSequence* AsSequence();
 
-  /// 32-bit structural hash, 0 while it is not computed. Empty mappings and sequences have 0, too.
+  /// 32-bit structural hash, 0 while it is not computed (a folded object, say). Empty mappings and sequences
+  /// have 0, too.
   uint32_t GetHash() const { return hash_; }
   void SetHash(uint32_t hash) { hash_ = hash; }
 

@@ -4,7 +4,7 @@
 #include <climits>
 #include <locale>
 #include <sstream>
-#include <unordered_set>
+#include <vector>
 
 #include "platform/mutex.h"
 #include "platform/text_hash.h"
@@ -22,20 +22,36 @@ struct Probe {
   uint64_t hash;
 };
 
-struct YAMLScalarPointerCompare {
-  using is_transparent = void;
-  size_t operator()(const YAMLScalar* scalar) const { return HashText(scalar->GetText()); }
-  size_t operator()(const Probe& probe) const { return probe.hash; }
-  bool operator()(const YAMLScalar* a, const YAMLScalar* b) const { return a->GetText() == b->GetText(); }
-  bool operator()(const Probe& a, const YAMLScalar* b) const { return a.text == b->GetText(); }
-  bool operator()(const YAMLScalar* a, const Probe& b) const { return a->GetText() == b.text; }
-};
-
-// One piece of the registry. With a single one, three reader threads stand in line for its lock for most of
-// their time.
+// One piece of the registry: a table with open addressing and linear probing, whose every other entry at
+// least is free. With a single one, three reader threads stand in line for its lock for most of their time.
 struct RegistryShard {
+  struct Entry {
+    uint64_t hash;
+    const YAMLScalar* scalar;
+  };
+
+  Entry& Find(const Probe& probe) {
+    for (size_t at = probe.hash >> 32;; ++at) {
+      Entry& entry = entries[at & (entries.size() - 1)];
+      if (entry.scalar == nullptr || (entry.hash == probe.hash && entry.scalar->GetText() == probe.text))
+        return entry;
+    }
+  }
+
+  void Grow() {
+    std::vector<Entry> old(entries.size() * 2);
+    entries.swap(old);
+    for (const Entry& entry : old) {
+      size_t at = entry.hash >> 32;
+      if (entry.scalar == nullptr) continue;
+      while (entries[at & (entries.size() - 1)].scalar != nullptr) ++at;
+      entries[at & (entries.size() - 1)] = entry;
+    }
+  }
+
   Mutex g_LookupMutex;
-  std::unordered_set<const YAMLScalar*, YAMLScalarPointerCompare, YAMLScalarPointerCompare> s_YAMLScalarSet;
+  size_t count = 0;
+  std::vector<Entry> entries = std::vector<Entry>(16);
 };
 
 const YAMLScalar* LookupInRegistry(const Probe& probe) {
@@ -43,10 +59,11 @@ const YAMLScalar* LookupInRegistry(const Probe& probe) {
   static auto& shards = *new std::array<RegistryShard, 256>;
   RegistryShard& shard = shards[(probe.hash ^ (probe.hash >> 11)) % shards.size()];
   AutoLock lock(shard.g_LookupMutex);
-  const auto found = shard.s_YAMLScalarSet.find(probe);
-  if (found != shard.s_YAMLScalarSet.end()) return *found;
+  RegistryShard::Entry& found = shard.Find(probe);
+  if (found.scalar != nullptr) return found.scalar;
   const YAMLScalar* scalar = YAMLAlloc<YAMLScalar>::create(probe.text);
-  shard.s_YAMLScalarSet.insert(scalar);
+  found = {probe.hash, scalar};
+  if (++shard.count * 2 > shard.entries.size()) shard.Grow();
   return scalar;
 }
 

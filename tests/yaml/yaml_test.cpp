@@ -135,7 +135,11 @@ const std::string kHeader = "%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n";
 // The file written again, or the error.
 std::string Read(const std::string& text, DocumentCache* cache = nullptr) try {
   VexelObjects objects;
-  ParseYAMLString(text, objects, cache);
+  if (cache == nullptr) {
+    ParseYAMLString(text, objects);
+  } else {
+    ParseYAMLText(FileText(text), objects, *cache);
+  }
   std::ostringstream out;
   objects.Output(out);
   return out.str();
@@ -244,7 +248,7 @@ TEST(DocumentCache, SharedDocumentsReadAsIfAlone) {
   DocumentCache cache;
   {
     std::vector<std::jthread> threads;
-    for (int i : {0, 1, 2}) threads.emplace_back([&, i] { ParseYAMLString(texts[i], shared[i], &cache); });
+    for (int i : {0, 1, 2}) threads.emplace_back([&, i] { ParseYAMLText(FileText(texts[i]), shared[i], cache); });
   }
   for (int i : {0, 1, 2}) {
     VexelObjects alone;

@@ -1,0 +1,77 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+#include "yaml/written_style_characters.h"
+
+/// Values in quotes in the written style. Each function is given where the value begins and where its line
+/// does, and returns where the value ends, behind its last quote, or null where libyaml might write the value
+/// otherwise. All rely on a line break before the end of the text.
+namespace vexel_yaml::written_style {
+
+// libyaml breaks a line at a blank, and a collection in brackets before an entry, beyond this column.
+inline constexpr ptrdiff_t kBestWidth = 80;
+/// Whether the blank at `at` stays one: not at the end of the line, nor where the line would be broken.
+inline bool IsPlainBlank(const char* at, const char* line) {
+  return at[1] != '\n' && at - line <= kBestWidth;
+}
+
+/// `step` goes over one character other than a blank.
+template <typename Step>
+const char* SkipQuoted(const char* at, const char* line, Step step) {
+  const char quote = *at;
+  const char* begin = ++at;
+  while (*at != quote) {
+    if (*at == ' ') {
+      if (at == begin || at[1] == ' ' || at[1] == quote || !IsPlainBlank(at, line)) return nullptr;
+      ++at;
+    } else if (!step(at)) {
+      return nullptr;
+    }
+  }
+  return at == begin ? nullptr : at + 1;
+}
+
+/// "\xE9" or "\u20AC", where no shorter escape exists. Steps behind it.
+inline bool StepOverEscape(const char*& at) {
+  ++at;
+  const size_t digits = *at == 'x' ? 2 : *at == 'u' ? 4 : 0;
+  ++at;
+  uint32_t code = 0;
+  for (size_t i = 0; i < digits; ++i, ++at) {
+    if (!Is(*at, kHexadecimal)) return false;
+    code = code * 16 + static_cast<uint32_t>(*at <= '9' ? *at - '0' : *at - 'A' + 10);
+  }
+  if (digits == 2) return code > 0xA0;
+  const bool is_surrogate = code >= 0xD800 && code <= 0xDFFF;
+  return digits == 4 && code > 0xFF && code != 0x2028 && code != 0x2029 && !is_surrogate && code < 0xFFFE;
+}
+
+/// libyaml writes these only where a character beyond ASCII makes it, with every such character escaped.
+inline const char* SkipDoubleQuoted(const char* begin, const char* line) {
+  bool is_needed = false;
+  const char* end = SkipQuoted(begin, line, [&](const char*& at) {
+    if (*at != '\\') return Is(*at++, kBlock | kColon);
+    is_needed = true;
+    return StepOverEscape(at);
+  });
+  return is_needed ? end : nullptr;
+}
+
+/// libyaml writes these only where the text would mean something else without quotes.
+inline const char* SkipSingleQuoted(const char* begin, const char* line) {
+  const char first = begin[1];
+  const bool is_alone = first != '\n' && (begin[2] == ' ' || begin[2] == '\'');
+  bool is_needed = std::strchr("#,[]{}&*!|>\"%@`", first) != nullptr ||
+                   (is_alone && (first == '-' || first == '?' || first == ':'));
+  const char* end = SkipQuoted(begin, line, [&](const char*& at) {
+    if (*at == ':' && (at[1] == ' ' || at[1] == '\'')) is_needed = true;
+    if (*at == '#' && at[-1] == ' ') is_needed = true;
+    return Is(*at++, kBlock | kColon);
+  });
+  return is_needed ? end : nullptr;
+}
+
+}  // namespace vexel_yaml::written_style
