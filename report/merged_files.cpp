@@ -17,14 +17,22 @@ std::string WithHint(const std::string& message, const std::string& hint) {
   return hint.empty() ? message : message + " (" + hint + ")";
 }
 
+// What is still folded was not edited, and has no hash that could be out of date.
+void RebuildHashesOfRead(VexelObjects& objects) {
+  for (const YAMLMapping::Slot& slot : objects) {
+    if (GetFolded(slot.value) == nullptr) slot.value->RebuildHash(false);
+  }
+  objects.RebuildHash(true);
+}
+
 void Merge(MergedFiles& files, TimerStat& timer) {
   auto merged = MergeIntoCopy(files.read.base, files.diffs, files.resolver, timer);
   std::unique_ptr<VexelObjects> unrepaired(merged->Clone());
   PostProcess(*merged, files.read.left, files.read.right, files.resolver);
   // Mappings with repeated keys can't be compared, and neither can nodes whose hashes are out of date.
   TransitionsToSequences(*merged);
-  merged->RebuildHash(false);
-  unrepaired->RebuildHash(false);
+  RebuildHashesOfRead(*merged);
+  RebuildHashesOfRead(*unrepaired);
   files.unrepaired = std::move(unrepaired);
   files.merged = std::move(merged);
 }
