@@ -89,7 +89,9 @@ class FileReader {
   bool ReadSharing(size_t index, ObjectFolder& folder, SharedDocuments* shared, size_t shared_index) {
     using Known = SharedDocuments::Known;
     Known known = shared == nullptr ? Known() : shared->Get(shared_index);
-    if (known.object != nullptr) {
+    // At the end of a file libyaml refuses what it takes for the next document's directives elsewhere.
+    const bool is_last = index + 1 == Count();
+    if (known.object != nullptr && !is_last) {
       objects_[index] = {known.object->Get(YAMLScalar::fileIDPlaceHolderName)->AsScalar(),
                          known.object->Clone()};
       return true;
@@ -110,7 +112,7 @@ class FileReader {
     bool is_shareable = false;
     if (!Read(index, is_shareable)) return false;
     known.object = objects_[index].value->AsMapping();
-    if (is_shareable && shared != nullptr) shared->Publish(shared_index, known);
+    if (is_shareable && !is_last && shared != nullptr) shared->Publish(shared_index, known);
     return true;
   }
 
