@@ -27,8 +27,7 @@ struct WrittenDocument {
 /// Knows the dialect that engines write: block mappings and sequences, one-line flow collections of plain
 /// values, plain values of harmless characters, quoted ones of the frequent kinds. It never guesses: for a
 /// document with anything else in it (comments, nested brackets, raw UTF-8) it returns false, and libyaml has
-/// to read it. So do
-/// state machines, whose transitions must be taken apart.
+/// to read it. State machines, whose transitions must be taken apart, are never known, either.
 ///
 /// `document` must stand behind a header for which `IsWrittenHeader` holds.
 bool IsInWrittenStyle(std::string_view document, WrittenDocument& result);

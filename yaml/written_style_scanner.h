@@ -51,7 +51,7 @@ class StyleScanner {
         sink_(sink) {}
 
   bool Scan() {
-    if (!ScanHeaderLine() || !ScanBodyKey()) return false;
+    if (!ScanHeaderLine() || at_ == end_ || !ScanBodyKey()) return false;
     while (at_ != end_) {
       if (!ScanLine()) return false;
     }

@@ -113,6 +113,7 @@ void YAMLMapping::Append(const YAMLScalar* key, YAMLNode* value) {
 }
 
 void YAMLMapping::Insert(const YAMLScalar* key, YAMLNode* value) {
+  Unfold();
   if (HasKey(key)) throw YAMLError("Cannot add existing key in YAMLMapping");
   AddSlot(key, value);
 }
@@ -283,6 +284,7 @@ YAMLMapping* YAMLMapping::Clone() const {
 }
 
 bool YAMLMapping::Equals(const YAMLNode* other) const {
+  if (other != nullptr && HaveSameText(*this, *other)) return true;
   Unfold();
   if (vexel_yaml::GetFolded(other) != nullptr) other->AsMapping()->Unfold();
   if (other != nullptr && GetHash() != 0 && other->GetHash() != 0) return GetHash() == other->GetHash();
