@@ -1,10 +1,6 @@
-#include <optional>
 #include <sstream>
 #include <stdexcept>
 
-#include "fixups/duplicate_keys.h"
-#include "fixups/post_process.h"
-#include "fixups/three_way_merge.h"
 #include "fuzz/support.h"
 #include "merge/conflict_record_file.h"
 #include "yaml/read_yaml.h"
@@ -23,15 +19,9 @@ std::string Merge(const std::vector<std::string>& texts, DocumentCache* cache) t
     } else {
       ParseYAMLText(FileText(texts[i]), versions[i], *cache);
     }
-    RefuseDuplicateKeys(versions[i], "input");
   }
-  auto& [base, left, right] = versions;
-  PrepareForDiff(base, left, right);
   RecordingConflictResolver resolver(MergeResolve::kBase);
-  TimerStat silent("", nullptr);
-  const DiffPair diffs = CreateDiffPair({base, left}, {base, right}, false, silent);
-  const std::unique_ptr<VexelObjects> merged = MergeIntoCopy(base, diffs, resolver, silent);
-  PostProcessMergeOnly(*merged, left, right, resolver);
+  const auto merged = fuzz::Merge(versions[0], versions[1], versions[2], resolver);
   std::ostringstream records;
   OutputConflictRecords(records, resolver, true);
   return fuzz::Written(*merged) + records.str();

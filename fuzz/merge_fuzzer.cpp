@@ -1,11 +1,6 @@
 #include <stdexcept>
 
-#include "diff/yaml_mapping_diff.h"
-#include "fixups/duplicate_keys.h"
-#include "fixups/post_process.h"
-#include "fixups/three_way_merge.h"
 #include "fuzz/support.h"
-#include "merge/recording_conflict_resolver.h"
 #include "yaml/read_yaml.h"
 #include "yaml/yaml_error.h"
 
@@ -18,15 +13,9 @@ std::string Merge(const std::vector<std::string>& texts) {
   DocumentCache cache;
   for (size_t i = 0; i < std::size(versions); ++i) {
     ParseYAMLText(FileText(fuzz::WithDirectives(texts[i])), versions[i], cache);
-    RefuseDuplicateKeys(versions[i], "input");
   }
-  auto& [base, left, right] = versions;
-  PrepareForDiff(base, left, right);
   RecordingConflictResolver resolver(MergeResolve::kBase);
-  TimerStat silent("", nullptr);
-  const DiffPair diffs = CreateDiffPair({base, left}, {base, right}, false, silent);
-  const std::unique_ptr<VexelObjects> merged = MergeIntoCopy(base, diffs, resolver, silent);
-  PostProcessMergeOnly(*merged, left, right, resolver);
+  const auto merged = fuzz::Merge(versions[0], versions[1], versions[2], resolver);
   return fuzz::Written(*merged);
 }
 

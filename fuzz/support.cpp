@@ -5,6 +5,9 @@
 #include <iostream>
 #include <sstream>
 
+#include "fixups/duplicate_keys.h"
+#include "fixups/post_process.h"
+#include "fixups/three_way_merge.h"
 #include "platform/error_channel.h"
 #include "rules/yaml_sequence_remapper.h"
 #include "yaml/read_yaml.h"
@@ -76,6 +79,17 @@ const Example& GetExample() {
     return read;
   }();
   return example;
+}
+
+std::unique_ptr<VexelObjects> Merge(VexelObjects& base, VexelObjects& left, VexelObjects& right,
+                                    RecordingConflictResolver& resolver) {
+  for (const VexelObjects* version : {&base, &left, &right}) RefuseDuplicateKeys(*version, "input");
+  PrepareForDiff(base, left, right);
+  TimerStat silent("", nullptr);
+  const DiffPair diffs = CreateDiffPair({base, left}, {base, right}, false, silent);
+  std::unique_ptr<VexelObjects> merged = MergeIntoCopy(base, diffs, resolver, silent);
+  PostProcessMergeOnly(*merged, left, right, resolver);
+  return merged;
 }
 
 void Require(bool holds, const char* what) {

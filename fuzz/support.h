@@ -2,9 +2,11 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <vector>
 
+#include "merge/recording_conflict_resolver.h"
 #include "yaml/vexel_objects.h"
 
 /// What the fuzz targets share. A target ends the process where the program would be wrong, and returns where
@@ -24,6 +26,10 @@ std::string WithDirectives(const std::string& documents);
 
 /// The text of all objects as it would be written to a file.
 std::string Written(VexelObjects& objects);
+
+/// What a merge of base, left and right comes to, repairs included. Throws YAMLError.
+std::unique_ptr<VexelObjects> Merge(VexelObjects& base, VexelObjects& left, VexelObjects& right,
+                                    RecordingConflictResolver& resolver);
 
 /// A scene of a few objects and two edits of it, among them lists, references and a conflict: what rules,
 /// records and type information are tried on. Read once; whoever changes one works on a copy.
