@@ -135,7 +135,14 @@ void ConflictRecords::Sweep() const {
   std::error_code error;
   for (const auto& file : std::filesystem::directory_iterator(folder_, error)) {
     if (file.path().extension() != ".path") continue;
-    const std::string asset = UnquotedPath(Pieces(TextOf(file.path().string()), '\n').front());
+    const std::vector<std::string> lines = Pieces(TextOf(file.path().string()), '\n');
+    if (lines.empty()) {
+      // A crash has left it without its text.
+      unlink(std::filesystem::path(file.path()).replace_extension(kSuffix).c_str());
+      unlink(file.path().c_str());
+      continue;
+    }
+    const std::string asset = UnquotedPath(lines.front());
     if (!std::ranges::binary_search(*unmerged, asset)) Remove(asset);
   }
   RemoveHook();

@@ -9,6 +9,7 @@
 #include "git/shown_text.h"
 #include "git/stage_files.h"
 #include "git/work_files.h"
+#include "platform/file_error.h"
 
 namespace vexel_yaml {
 
@@ -129,7 +130,13 @@ int RunResolve(const std::vector<std::string>& arguments) {
   {
     ScratchFolder scratch(repository);
     for (const std::string& asset : assets) {
-      if (!ResolveAsset(asset, {records, settings, choice}, scratch)) is_done = false;
+      try {
+        if (!ResolveAsset(asset, {records, settings, choice}, scratch)) is_done = false;
+      } catch (const FileError& error) {
+        // The others can be settled all the same.
+        Complain(error.what());
+        is_done = false;
+      }
     }
   }
   records.Sweep();

@@ -46,12 +46,12 @@ std::string Doubled(std::string text) {
 }
 
 // Without the program, git would take ours as the result, without a marker. A graphical client has a short
-// PATH, and programs are moved and removed.
+// PATH, and programs are moved and removed. A shell that can't run one gives 126 or 127.
 std::string DriverCommand(const std::string& call, const std::string& option) {
   const std::string program = Doubled(call);
-  return "f() { if command -v " + program + " >/dev/null 2>&1; then exec " + program + " merge-driver " +
-         option + "\"$@\"; fi; echo " +
-         Doubled(ShellQuoted("error: " + call + " is not found: merged as text")) +
+  return "f() { if command -v " + program + " >/dev/null 2>&1; then " + program + " merge-driver " + option +
+         "\"$@\"; s=$?; [ $s = 126 ] || [ $s = 127 ] || exit $s; fi; echo " +
+         Doubled(ShellQuoted("error: " + call + " is not found or cannot be run: merged as text")) +
          " >&2; git merge-file -q --marker-size=\"$4\" -L ours -L base -L theirs \"$2\" \"$1\" \"$3\" || "
          "exit 1; }; "
          "f %O %A %B %L %P";
@@ -103,6 +103,9 @@ std::string CommandForGit() {
 // function, git could show no difference at all once the program is gone.
 std::vector<std::pair<std::string, std::string>> WantedConfiguration() {
   const std::string call = CommandForGit();
+  // Git keeps what textconv made in a commit of its own: without a name for its author, every diff would
+  // fail.
+  const bool has_author = GitQuietly({"var", "GIT_COMMITTER_IDENT"}).status == 0;
   return {{"merge.vexel.name", "structural merge of scenes and prefabs"},
           {"merge.vexel.driver", DriverCommand(call, "")},
           {"merge.vexel.recursive", "vexel-ancestor"},
@@ -110,7 +113,7 @@ std::vector<std::pair<std::string, std::string>> WantedConfiguration() {
           {"merge.vexel-ancestor.driver", DriverCommand(call, "--ancestor ")},
           {"diff.vexel.textconv", "f() { " + call + " textconv --format=" + std::string(kTextconvFormat) +
                                       " \"$1\" 2>/dev/null || cat -- \"$1\"; }; f"},
-          {"diff.vexel.cachetextconv", "true"},
+          {"diff.vexel.cachetextconv", has_author ? "true" : "false"},
           {"diff.vexel.xfuncname", "^--- (.*)$"},
           {"mergetool.vexel.cmd", call + R"( mergetool "$BASE" "$LOCAL" "$REMOTE" "$MERGED")"},
           {"mergetool.vexel.trustExitCode", "true"},

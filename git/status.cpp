@@ -57,6 +57,7 @@ bool IsTakenAway(const std::string& pattern) {
 // The patterns that are given to us, and the files that say so.
 Finding FindAttributes(const Repository& repository) {
   Finding finding = {{}, false};
+  bool is_taken_away = false;
   for (const std::string& file :
        {std::string(".gitattributes"), UserAttributes(), repository.CommonPath("info/attributes")}) {
     if (!IsFile(file)) continue;
@@ -67,9 +68,10 @@ Finding FindAttributes(const Repository& repository) {
     for (const std::string& pattern : given) {
       if (!IsTakenAway(pattern)) continue;
       finding.text += "\n  but not " + pattern + ": another line takes it away";
-      finding.is_complete = false;
+      is_taken_away = true;
     }
   }
+  finding.is_complete = finding.is_complete && !is_taken_away;
   if (finding.text.empty()) finding.text = "no pattern with merge=vexel";
   return finding;
 }

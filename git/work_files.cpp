@@ -62,7 +62,8 @@ bool PutFile(const std::string& path, std::string_view text, mode_t mode) {
   if (descriptor < 0) return false;
   bool is_written = Write(descriptor, text);
   // A file system without either leaves what a new file has there.
-  if (exists && old.st_uid != geteuid() && fchown(descriptor, old.st_uid, old.st_gid) != 0) errno = 0;
+  const bool is_ours = old.st_uid == geteuid() && old.st_gid == getegid();
+  if (exists && !is_ours && fchown(descriptor, old.st_uid, old.st_gid) != 0) errno = 0;
   fchmod(descriptor, exists ? old.st_mode & 07777 : mode & ~UserMask());
   is_written = close(descriptor) == 0 && is_written;
   // Git doesn't wait for the disk either: after a crash there is a merge to be made once more.
@@ -144,7 +145,9 @@ bool MakeCopy(std::string& pattern, std::string_view text) {
   const int descriptor = mkstemp(pattern.data());
   if (descriptor < 0) return false;
   const bool is_written = Write(descriptor, text);
-  return close(descriptor) == 0 && is_written;
+  if (close(descriptor) == 0 && is_written) return true;
+  unlink(pattern.c_str());
+  return false;
 }
 
 }  // namespace vexel_yaml

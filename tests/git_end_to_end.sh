@@ -212,6 +212,19 @@ check "without the program, the merge stops" refuses env PATH="$short" git merge
 check "and says why in one line" test "$(grep -c 'vexel-merge-git is not found' "$work/err")" -eq 1
 check "the file has conflict markers" grep -q '^<<<<<<< ours' "$file"
 git merge --abort
+# The same where it lies in its place, but can't be run.
+touch "$work/no-program" && driver=$(git config merge.vexel.driver)
+git config merge.vexel.driver "${driver//vexel-merge-git/$work/no-program}"
+check "a program that can't be run is merged without, too" refuses git merge -q --no-edit darker >/dev/null 2>&1
+check "with conflict markers" grep -q '^<<<<<<< ours' "$file"
+git merge --abort && git config merge.vexel.driver "$driver"
+git merge -q --no-edit darker >/dev/null 2>&1 || : > "$(ls .git/vexel-merge-records/*.path)"
+check "a record without its text doesn't stay in the way" vexel-merge-git status >/dev/null
+git merge --abort && rm -f "$record"
+# Who only reads needs no name for the author of what git keeps.
+git config user.useConfigOnly true && (unset GIT_AUTHOR_EMAIL GIT_COMMITTER_EMAIL EMAIL && vexel-merge-git enable >/dev/null)
+check "diffs need no author" env -u GIT_AUTHOR_EMAIL -u GIT_COMMITTER_EMAIL git log -p -1 >/dev/null
+git config --unset user.useConfigOnly
 # What 1.0.1 has set works, and is brought up to date and taken back.
 git reset -q --hard ":/^brighter" && git config merge.vexel.driver 'vexel-merge-git merge-driver %O %A %B %L %P'
 git config -f .git/vexel-merge key.merge.vexel.driver.added 'vexel-merge-git merge-driver %O %A %B %L %P'
