@@ -1,7 +1,6 @@
 #include "git/asset_merge.h"
 
 #include <exception>
-#include <filesystem>
 #include <iostream>
 #include <new>
 #include <sstream>
@@ -11,6 +10,7 @@
 #include "git/work_files.h"
 #include "merge/conflict_record_file.h"
 #include "platform/file_error.h"
+#include "platform/thread.h"
 #include "report/merged_files.h"
 #include "report/value_text.h"
 #include "rules/setup.h"
@@ -39,15 +39,6 @@ class CapturedErrors {
   std::ostringstream text_;
   std::streambuf* previous_;
 };
-
-// Starting threads and ending them, with the memory that each has for itself, takes a third of the time of a
-// merge of 30 KB; it is worth it from about a megabyte on.
-bool IsLarge(const AssetVersions& versions) {
-  constexpr uintmax_t kLarge = 1'000'000;
-  std::error_code error;
-  const uintmax_t size = std::filesystem::file_size(versions.base, error);
-  return !error && size >= kLarge;
-}
 
 // Both stay loaded, and can be loaded only once a process: what is wrong with them is wrong for every merge.
 void LoadRulesAndTypes(const MergeSettings& settings) {
@@ -88,8 +79,8 @@ void AssetMerge::Read() {
   const CapturedErrors captured;
   try {
     TimerStat silent("", nullptr);
-    ReadMergeDocuments(versions_.base, versions_.left, versions_.right, documents_, IsLarge(versions_),
-                       silent);
+    threads_ = AreWorthThreads({versions_.base, versions_.left, versions_.right});
+    ReadMergeDocuments(versions_.base, versions_.left, versions_.right, documents_, threads_, silent);
   } catch (...) {
     read_failure_ = std::current_exception();
   }
@@ -98,12 +89,11 @@ void AssetMerge::Read() {
 
 int AssetMerge::Merge(const MergeSettings& settings, const Decisions* decisions) {
   TimerStat silent("", nullptr);
-  const bool threads = IsLarge(versions_);
   // What is wrong with these is told first.
   LoadRulesAndTypes(settings);
   if (read_failure_) std::rethrow_exception(read_failure_);
   PrepareForDiff(documents_.base, documents_.left, documents_.right);
-  diffs_ = CreateDiffPair({documents_.base, documents_.left}, {documents_.base, documents_.right}, threads,
+  diffs_ = CreateDiffPair({documents_.base, documents_.left}, {documents_.base, documents_.right}, threads_,
                           silent);
   if (decisions != nullptr) {
     std::istringstream stream(decisions->text);
@@ -116,7 +106,7 @@ int AssetMerge::Merge(const MergeSettings& settings, const Decisions* decisions)
   merged_ = MergeIntoCopy(documents_.base, diffs_, resolver_, silent);
   const bool breaks_dependency = PostProcess(*merged_, documents_.left, documents_.right, resolver_);
   std::ostringstream text;
-  WriteObjects(*merged_, text, threads);
+  WriteObjects(*merged_, text, threads_);
   text_ = std::move(text).str();
   if (!resolver_.HasPendingConflicts()) return kMerged;
   conflicts_ = ListConflicts(resolver_);

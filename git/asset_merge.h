@@ -60,6 +60,7 @@ class AssetMerge {
 
   const AssetVersions versions_;
   bool is_read_ = false;
+  bool threads_ = false;
   std::exception_ptr read_failure_;
   // What was written to standard error.
   std::string messages_;
