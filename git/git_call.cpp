@@ -3,6 +3,8 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cstdlib>
+#include <filesystem>
 
 #include "git/shown_text.h"
 
@@ -74,6 +76,13 @@ std::string TopFolder() {
 
 void GoToTop() {
   const std::string top = TopFolder();
+  // From there, relative ones would lead to another repository.
+  for (const char* name : {"GIT_DIR", "GIT_COMMON_DIR", "GIT_WORK_TREE"}) {
+    const char* path = std::getenv(name);
+    if (path != nullptr && *path != '\0' && *path != '/') {
+      setenv(name, std::filesystem::absolute(path).c_str(), 1);
+    }
+  }
   if (chdir(top.c_str()) != 0) throw CommandError("cannot go to " + top);
 }
 

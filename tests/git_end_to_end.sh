@@ -65,6 +65,11 @@ check "a global set-up is found" vexel-merge-git status >/dev/null
 check "it gives us the three kinds of files" test "$(git check-attr merge x.prefab)" = "x.prefab: merge: vexel"
 vexel-merge-git disable --global >/dev/null
 check "nothing of it is left" test -z "$(find "$HOME" -type f)"
+# Relative folders are meant from where the call was made.
+git init -q inner && mkdir inner/sub
+(cd inner/sub && GIT_DIR=../.git GIT_WORK_TREE=.. vexel-merge-git enable >/dev/null)
+check "the named repository is set up" git config -f inner/.git/config merge.vexel.driver >/dev/null
+rm -rf inner
 
 vexel-merge-git enable >/dev/null
 mkdir -p "${file%/*}"

@@ -26,7 +26,16 @@ check() { # check WHAT COMMAND...
     failures=$((failures + 1))
   fi
 }
-refuses() { ! "$@"; }
+# A crash, or a program that can't be run, refuses nothing. (git's own refusals end with 128, Mercurial's with 255.)
+refuses() {
+  local status=0
+  "$@" || status=$?
+  case $status in
+    0 | 126 | 127) return 1 ;;
+    128 | 255) return 0 ;;
+    *) [[ $status -lt 128 ]] ;;
+  esac
+}
 # shows PAGE FILE: the page has the lines that FILE sets, so that readers who copy them get what is tested.
 shows() { [[ "$(<"$1")" == *"$(sed '/^#/d' "$2")"* ]]; }
 end_of_checks() { # end_of_checks TEXT: the last line of a test, whose status is the test's
