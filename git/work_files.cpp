@@ -13,6 +13,7 @@
 #include "git/shown_text.h"
 #include "platform/descriptor_buffer.h"
 #include "platform/file_error.h"
+#include "platform/file_replacement.h"
 #include "platform/files.h"
 #include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
@@ -81,12 +82,7 @@ void ReplaceOwnFile(const std::string& path, std::string_view text) {
 
 std::string TargetOf(const std::string& path) {
   std::error_code error;
-  std::filesystem::path target = path;
-  // A longer chain is a loop.
-  for (int links = 0; std::filesystem::is_symlink(target, error) && links < 40; ++links) {
-    const std::filesystem::path next = std::filesystem::read_symlink(target, error);
-    target = next.is_absolute() ? next : target.parent_path() / next;
-  }
+  const std::filesystem::path target = FollowLinks(path);
   const std::filesystem::path folder = target.has_parent_path() ? target.parent_path() : ".";
   return (std::filesystem::canonical(folder, error) / target.filename()).string();
 }

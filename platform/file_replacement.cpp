@@ -50,19 +50,6 @@ int OwnDescriptor(const std::filesystem::path& path) {
   return failure == std::errc() && end == name.data() + name.size() ? descriptor : -1;
 }
 
-// The link's target, also where that does not exist yet.
-std::string FollowLinks(const std::string& path) {
-  std::error_code error;
-  std::filesystem::path target = path;
-  for (int links = 0; std::filesystem::is_symlink(target, error) && !LeadsToOpenFile(target); ++links) {
-    // A longer chain is a loop.
-    if (links == 40) throw FileError(Step::kOpening, path, ELOOP);
-    const std::filesystem::path next = std::filesystem::read_symlink(target, error);
-    target = next.is_absolute() ? next : target.parent_path() / next;
-  }
-  return target.string();
-}
-
 // On a file system without permissions a new file gets what every file has there.
 bool ChangeMode(int descriptor, mode_t mode) {
   return fchmod(descriptor, mode) == 0 || errno == EPERM || errno == EINVAL || errno == ENOTSUP ||
@@ -107,6 +94,18 @@ int ReserveRoom([[maybe_unused]] int descriptor, [[maybe_unused]] size_t size) {
 }
 
 }  // namespace
+
+std::string FollowLinks(const std::string& path) {
+  std::error_code error;
+  std::filesystem::path target = path;
+  for (int links = 0; std::filesystem::is_symlink(target, error) && !LeadsToOpenFile(target); ++links) {
+    // A longer chain is a loop.
+    if (links == 40) throw FileError(Step::kOpening, path, ELOOP);
+    const std::filesystem::path next = std::filesystem::read_symlink(target, error);
+    target = next.is_absolute() ? next : target.parent_path() / next;
+  }
+  return target.string();
+}
 
 FileReplacement::FileReplacement(const std::string& path) : path_(path), target_(FollowLinks(path)) {
   struct stat status = {};

@@ -13,6 +13,10 @@
 
 namespace vexel_yaml {
 
+/// What a chain of symbolic links leads to, also where that does not exist yet; other paths as they are.
+/// Throws FileError for a loop.
+std::string FollowLinks(const std::string& path);
+
 /// Writes a file that is replaced whole or not at all.
 ///
 /// The text goes to a new file beside the destination, which takes the destination's place (and its
