@@ -75,6 +75,16 @@ RecordingConflictResolver::Record& RecordingConflictResolver::AddRecord(FieldPat
   return records_.back();
 }
 
+MergeResolve RecordingConflictResolver::SettleConflict(FieldPath path, ConflictType type,
+                                                       const Operation* left, const Operation* right) {
+  const MergeResolve found = FindResolution(path);
+  const bool is_settled =
+      found == MergeResolve::kBase || found == MergeResolve::kLeft || found == MergeResolve::kRight;
+  AddRecord(std::move(path), type, is_settled ? found : MergeResolve::kConflict, left, right);
+  const MergeResolve side = is_settled ? found : default_side_;
+  return side == MergeResolve::kLeft || side == MergeResolve::kRight ? side : MergeResolve::kBase;
+}
+
 template <typename T>
 const Operation* RecordingConflictResolver::SingleSideResolve(const T* operation, ConflictType type) {
   const bool from_left = IsLeftType(type);

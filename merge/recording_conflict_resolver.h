@@ -34,6 +34,12 @@ class RecordingConflictResolver final : public ConflictResolver {
   /// Replaces the user's resolutions; the first one that matches a place wins.
   void SetResolveMethodForPaths(std::vector<RecordResolve> resolutions);
 
+  /// Records a conflict that was found outside of the diff trees, at `path`; either operation may be null.
+  /// Returns what is to stand there: base, left or right, where it is pending the default side's (base's for
+  /// blank).
+  MergeResolve SettleConflict(FieldPath path, ConflictType type, const Operation* left,
+                              const Operation* right);
+
   /// Whether a record is neither settled by the user nor by itself.
   bool HasPendingConflicts() const;
   const std::vector<Record>& GetRecords() const { return records_; }
