@@ -49,11 +49,12 @@ bool TakeOptions(const CommandLineArguments& arguments, size_t& index, std::span
   return true;
 }
 
-// The options that `merge` takes, for whoever mistypes one.
+// The options that `merge` takes, for whoever mistypes one. The last one is offered, but not listed: the
+// message with the list is one that scripts compare.
 constexpr std::array kMergeOptions = {
     kOptionUseLeft,         kOptionUseRight, kOptionUsePremerge, kOptionHeadless, kOptionUseMergeFile,
     kOptionUseConflictFile, kOptionRules,    kOptionTypeInfo,    kOptionFallback, kOptionDescribe,
-    kOptionForce,           kOptionTiming,   kOptionNoThreads};
+    kOptionForce,           kOptionTiming,   kOptionNoThreads,   kOptionSafe};
 
 // How many characters have to be changed, added or left out to make one text of the other; case is for free.
 size_t EditDistance(std::string_view a, std::string_view b) {
@@ -132,11 +133,9 @@ bool ParseDiffArgs(const CommandLineArguments& arguments, int first, DiffConfig&
 }
 
 bool ParseMergeArgs(const CommandLineArguments& arguments, int first, MergeConfig& config) {
-  const Switch switches[] = {{kOptionForce, config.force, true},
-                             {kOptionDescribe, config.describe, true},
-                             {kOptionTiming, config.timing, true},
-                             {kOptionNoThreads, config.threads, false},
-                             {kOptionHeadless, gHeadlessEnabled, true}};
+  const Switch switches[] = {{kOptionForce, config.force, true},   {kOptionDescribe, config.describe, true},
+                             {kOptionTiming, config.timing, true}, {kOptionNoThreads, config.threads, false},
+                             {kOptionSafe, config.safe, true},     {kOptionHeadless, gHeadlessEnabled, true}};
   const ValueOption value_options[] = {{kOptionUseMergeFile, config.merge_file},
                                        {kOptionUseConflictFile, config.conflict_file},
                                        {kOptionRules, config.rules_file},
@@ -148,6 +147,7 @@ bool ParseMergeArgs(const CommandLineArguments& arguments, int first, MergeConfi
     if (index == arguments.size() || !IsSideOption(arguments[index])) break;
     if (!TakeSideOption(arguments[index++], config)) return false;
   }
+  gHintsEnabled = config.safe;
   if (!HasEnoughPaths(kCmdMerge, 3, arguments.size() - index)) {
     usage();
     return false;
@@ -173,7 +173,8 @@ bool ReportMistypedOption(const MergeConfig& config) {
   } else {
     // No option is nearer than the rest.
     errs << "; merge knows";
-    for (const std::string_view option : kMergeOptions) errs << ' ' << option;
+    for (const std::string_view option : std::span(kMergeOptions).first<kMergeOptions.size() - 1>())
+      errs << ' ' << option;
   }
   errs << '\n';
   ErrMsg(errs);

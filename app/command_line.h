@@ -27,6 +27,7 @@ inline constexpr std::string_view kOptionDescribe = "--describe";
 inline constexpr std::string_view kOptionForce = "--force";
 inline constexpr std::string_view kOptionTiming = "--timing";
 inline constexpr std::string_view kOptionNoThreads = "--nothreads";
+inline constexpr std::string_view kOptionSafe = "--safe";
 
 inline constexpr std::string_view kDefaultSpecFile = "auto";
 inline constexpr std::string_view kDefaultRulesFile = "auto";
@@ -58,6 +59,8 @@ struct MergeConfig {
   bool describe = false;
   bool timing = false;
   bool threads = true;
+  /// Whether scenes are merged as scenes, rather than value by value.
+  bool safe = false;
 };
 
 /// What a command on two files was asked to do.
@@ -76,7 +79,7 @@ struct DiffConfig : FilePairConfig {};
 
 /// Parse the arguments from index `first` on: options, then paths, where the first argument that is no option
 /// is the first path. They return false after an error, which has been reported. "-h" takes effect at once,
-/// so that it already holds for the errors of the arguments behind it.
+/// so that it already holds for the errors of the arguments behind it; "--safe" enables hints.
 bool ParseStripArgs(const CommandLineArguments& arguments, int first, StripConfig& config);
 bool ParseDiffArgs(const CommandLineArguments& arguments, int first, DiffConfig& config);
 bool ParseMergeArgs(const CommandLineArguments& arguments, int first, MergeConfig& config);

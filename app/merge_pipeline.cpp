@@ -22,6 +22,7 @@
 #include "platform/timer_stat.h"
 #include "rules/setup.h"
 #include "rules/yaml_sequence_remapper.h"
+#include "scene/safe_merge.h"
 #include "yaml/write_objects.h"
 
 namespace vexel_yaml {
@@ -31,8 +32,9 @@ namespace {
 // What is kept until the process ends: giving back the nodes of three scenes one by one would take as long as
 // merging them.
 struct KeptDocuments {
-  MergeDocuments read;
+  SceneDocuments read;
   std::unique_ptr<VexelObjects> merged;
+  std::array<PremergeTarget, 2> premerged;
 };
 
 KeptDocuments& NewKeptDocuments() {
@@ -47,6 +49,7 @@ class MergeRun {
       : config_(config),
         documents_(documents.read),
         merged_(documents.merged),
+        premerged_(documents.premerged),
         timer_(timer),
         // Whoever asks for times is shown the same steps for every file.
         threads_(config.threads &&
@@ -88,6 +91,18 @@ class MergeRun {
     breaks_dependency_ = PostProcess(*merged_, documents_.left, documents_.right, resolver_);
   }
 
+  void ReadSceneDocuments() {
+    ReadScenes(config_.base_path, config_.left_path, config_.right_path, documents_, threads_, timer_);
+    if (!MayPremerge()) return;
+    for (PremergeTarget& target : premerged_) target.versions = documents_.Copy();
+  }
+
+  void MergeScenes() {
+    SafeMergeResult result = SafeMerge(documents_, resolver_, {.threads = threads_}, timer_);
+    merged_ = std::move(result.merged);
+    breaks_dependency_ = result.breaks_dependency;
+  }
+
   void OutputConflicts() {
     TimerStat step(timer_, "Output conflicts");
     if (config_.conflict_file.empty()) {
@@ -116,17 +131,14 @@ class MergeRun {
   }
 
   void OutputPremerge() {
-    if (!resolver_.HasPendingConflicts() || config_.premerge_base_destination.empty() ||
-        config_.premerge_right_destination.empty()) {
-      return;
-    }
-    const MergeResolve base_side =
+    if (!resolver_.HasPendingConflicts() || !MayPremerge()) return;
+    premerged_[0].side =
         YAMLSequenceRemapper::CheckBlankPremergeBaseEnabled() ? MergeResolve::kBlank : MergeResolve::kBase;
-    std::array<PremergeTarget, 2> targets = {{{base_side, {}}, {MergeResolve::kRight, {}}}};
-    RunPremerges(targets, documents_, diffs_, resolver_.GetResolutions(), threads_, timer_);
+    premerged_[1].side = MergeResolve::kRight;
+    RunPremerges(premerged_, documents_, diffs_, resolver_.GetResolutions(), threads_, timer_);
     // One after the other: two at once may be more than the descriptors that are left.
-    Write(config_.premerge_base_destination, targets[0].text.view());
-    Write(config_.premerge_right_destination, targets[1].text.view());
+    Write(config_.premerge_base_destination, premerged_[0].text.view());
+    Write(config_.premerge_right_destination, premerged_[1].text.view());
   }
 
   // Not before all of them are on the disk: a merge that fails leaves no file of a merge. The result comes
@@ -142,6 +154,10 @@ class MergeRun {
   }
 
  private:
+  bool MayPremerge() const {
+    return !config_.premerge_base_destination.empty() && !config_.premerge_right_destination.empty();
+  }
+
   void Write(const std::string& path, std::string_view text) {
     FileReplacement& file = others_.emplace_back(VexelToNativePath(path));
     file.Stream() << text;
@@ -149,8 +165,9 @@ class MergeRun {
   }
 
   const MergeConfig& config_;
-  MergeDocuments& documents_;
+  SceneDocuments& documents_;
   std::unique_ptr<VexelObjects>& merged_;
+  std::array<PremergeTarget, 2>& premerged_;
   TimerStat& timer_;
   const bool threads_;
   DiffPair diffs_;
@@ -167,11 +184,19 @@ int HandleMergeCommand(const MergeConfig& config, const std::string& path_for_to
   TimerStat timer("Merge Command", config.timing ? &std::cout : nullptr);
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
   MergeRun run(config, NewKeptDocuments(), timer);
-  run.Read();
-  run.CreateMappings();
-  run.CreateDiffs();
+  if (config.safe) {
+    run.ReadSceneDocuments();
+  } else {
+    run.Read();
+    run.CreateMappings();
+    run.CreateDiffs();
+  }
   if (!run.ReadResolutions()) return 1;
-  run.Merge();
+  if (config.safe) {
+    run.MergeScenes();
+  } else {
+    run.Merge();
+  }
   run.OutputConflicts();
   run.OutputResult(path_for_tool);
   run.OutputPremerge();

@@ -1,9 +1,8 @@
 #include "app/premerge.h"
 
-#include <memory>
-
 #include "fixups/post_process.h"
 #include "platform/thread.h"
+#include "scene/safe_merge.h"
 
 namespace vexel_yaml {
 
@@ -12,7 +11,8 @@ namespace {
 // One premerged file on its way.
 struct PremergeJob {
   PremergeTarget& target;
-  // A fresh copy of base: one that already holds the merge can't take it again.
+  // A fresh copy of base: one that already holds the merge can't take it again. Null where the target has
+  // versions of its own.
   std::unique_ptr<VexelObjects> copy;
 };
 
@@ -42,7 +42,19 @@ void Premerge(MergeResolve side, std::ostream& out, VexelObjects& copy, const Pr
   copy.Output(out, VexelObjects::Headers::kAsTheyAre);
 }
 
+void PremergeScene(PremergeTarget& target, const PremergeInput& input, TimerStat& timer) {
+  RecordingConflictResolver resolver(target.side);
+  resolver.SetResolveMethodForPaths(input.resolutions);
+  TimerStat step(timer, "Merging premerge");
+  SafeMerge(*target.versions, resolver, {.threads = false}, step)
+      .merged->Output(target.text, VexelObjects::Headers::kAsTheyAre);
+}
+
 void PremergeThreadFunction(PremergeJob& job, const PremergeInput& input, TimerStat& timer) {
+  if (job.target.versions != nullptr) {
+    PremergeScene(job.target, input, timer);
+    return;
+  }
   Premerge(job.target.side, job.target.text, *job.copy, input, timer);
 }
 
@@ -60,7 +72,8 @@ void RunPremerges(std::array<PremergeTarget, 2>& targets, const MergeDocuments& 
   {
     TimerStat step(timer, "Clone base roots");
     for (PremergeTarget& target : targets) {
-      jobs.push_back({target, std::unique_ptr<VexelObjects>(documents.base.Clone())});
+      jobs.push_back({target, nullptr});
+      if (target.versions == nullptr) jobs.back().copy.reset(documents.base.Clone());
     }
   }
   const PremergeInput input = {documents, diffs, resolutions};

@@ -72,7 +72,8 @@ _vexel_yaml_merge() {
   fi
   case "${COMP_WORDS[1]}" in
     merge)
-      options=(-l -r -p -i -o -h --rules --typeInfo --fallback --force --describe --timing --nothreads)
+      options=(-l -r -p -i -o -h --rules --typeInfo --fallback --force --describe --timing --nothreads
+        --safe)
       ;;
     diff | strip) options=(--rules --typeInfo -h --timing --nothreads) ;;
   esac
@@ -100,7 +101,7 @@ _vexel_merge_report() {
       *) if _vexel_option_value; then return; fi ;;
     esac
     if [[ "$cur" == -* ]]; then
-      _vexel_offer -o --title -i --rules --typeInfo --conflicts --text --version --help
+      _vexel_offer -o --title -i --rules --typeInfo --safe --conflicts --text --version --help
       return
     fi
   fi

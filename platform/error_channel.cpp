@@ -10,8 +10,16 @@
 namespace vexel_yaml {
 
 bool gHeadlessEnabled = false;
+bool gHintsEnabled = false;
 Mutex s_cerrLock;
 std::stringstream errs;
+
+namespace {
+
+// Where hints follow, messages must end their lines.
+bool ShowsHints() { return gHintsEnabled || isatty(STDERR_FILENO) != 0; }
+
+}  // namespace
 
 void ErrMsg(std::stringstream& stream) {
   AutoLock lock(s_cerrLock);
@@ -19,7 +27,7 @@ void ErrMsg(std::stringstream& stream) {
   if (!gHeadlessEnabled) ShowErrorDialog("VexelYAMLMerge Error", text);
   std::cerr << text;
   // Some messages end without a line break, since scripts read them so; a shell prompt must not follow them.
-  if (!text.empty() && text.back() != '\n' && isatty(STDERR_FILENO) != 0) std::cerr << '\n';
+  if (!text.empty() && text.back() != '\n' && ShowsHints()) std::cerr << '\n';
   std::cerr.flush();
   stream.clear();
 }
@@ -30,7 +38,7 @@ void WriteErrorLine(std::string_view line) {
 }
 
 void WriteHint(std::string_view text) {
-  if (!text.empty() && isatty(STDERR_FILENO) != 0) WriteErrorLine("hint: " + std::string(text));
+  if (!text.empty() && ShowsHints()) WriteErrorLine("hint: " + std::string(text));
 }
 
 }  // namespace vexel_yaml

@@ -125,7 +125,7 @@ class Collector {
   }
 
   void AddRenumbered() {
-    for (const RenumberedObject& renumbered : files_.renumbered) {
+    for (const RenumberedObject& renumbered : files_.read.renumbered) {
       ReportRow& row = rows_.RowAt({renumbered.new_id});
       row.repaired = true;
       row.note = "Both sides added another object as " + renumbered.old_id->GetText() +

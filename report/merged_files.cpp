@@ -8,6 +8,7 @@
 #include "platform/hinted_error.h"
 #include "platform/thread.h"
 #include "rules/setup.h"
+#include "scene/safe_merge.h"
 
 namespace vexel_yaml {
 
@@ -25,16 +26,35 @@ void RebuildHashesOfRead(VexelObjects& objects) {
   objects.RebuildHash(true);
 }
 
-void Merge(MergedFiles& files, TimerStat& timer) {
-  auto merged = MergeIntoCopy(files.read.base, files.diffs, files.resolver, timer);
-  std::unique_ptr<VexelObjects> unrepaired(merged->Clone());
-  PostProcess(*merged, files.read.left, files.read.right, files.resolver);
-  // Mappings with repeated keys can't be compared, and neither can nodes whose hashes are out of date.
-  TransitionsToSequences(*merged);
-  RebuildHashesOfRead(*merged);
-  RebuildHashesOfRead(*unrepaired);
-  files.unrepaired = std::move(unrepaired);
-  files.merged = std::move(merged);
+struct Merged {
+  std::unique_ptr<VexelObjects> unrepaired;
+  std::unique_ptr<VexelObjects> repaired;
+};
+
+Merged MergeValues(MergedFiles& files, TimerStat& timer) {
+  const auto& [base, left, right] = static_cast<const MergeDocuments&>(files.read);
+  Merged merged;
+  merged.repaired = MergeIntoCopy(base, files.diffs, files.resolver, timer);
+  merged.unrepaired.reset(merged.repaired->Clone());
+  PostProcess(*merged.repaired, left, right, files.resolver);
+  // Mappings with repeated keys can't be compared.
+  TransitionsToSequences(*merged.repaired);
+  return merged;
+}
+
+Merged MergeScenes(MergedFiles& files, TimerStat& timer) {
+  files.settled = files.read.Copy();
+  SafeMergeResult result = SafeMerge(*files.settled, files.resolver, {.keep_comparable = true}, timer);
+  return {std::move(result.unrepaired), std::move(result.repaired)};
+}
+
+void Merge(MergedFiles& files, bool safe, TimerStat& timer) {
+  Merged merged = safe ? MergeScenes(files, timer) : MergeValues(files, timer);
+  // Neither can nodes whose hashes are out of date.
+  RebuildHashesOfRead(*merged.repaired);
+  RebuildHashesOfRead(*merged.unrepaired);
+  files.unrepaired = std::move(merged.unrepaired);
+  files.merged = std::move(merged.repaired);
 }
 
 }  // namespace
@@ -42,17 +62,21 @@ void Merge(MergedFiles& files, TimerStat& timer) {
 void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   TimerStat silent("", nullptr);
   SetupRulesAndTypes(config.rules_file, config.type_info_file, silent);
-  MergeDocuments& read = files.read;
+  SceneDocuments& read = files.read;
   const bool threads = AreWorthThreads({config.base_path, config.left_path, config.right_path});
-  ReadMergeDocuments(config.base_path, config.left_path, config.right_path, read, threads, silent);
-  files.renumbered = PrepareForDiff(read.base, read.left, read.right);
+  if (config.safe) {
+    ReadScenes(config.base_path, config.left_path, config.right_path, read, threads, silent);
+  } else {
+    ReadMergeDocuments(config.base_path, config.left_path, config.right_path, read, threads, silent);
+    read.renumbered = PrepareForDiff(read.base, read.left, read.right);
+  }
   files.diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, threads, silent);
   if (!config.merge_file.empty() && !InputConflictRecords(config.merge_file, files.resolver)) {
     throw YAMLError("Couldn't open merge resolve file '" + config.merge_file + "'");
   }
   // What both sides did is worth a look all the same where the merge fails.
   try {
-    Merge(files, silent);
+    Merge(files, config.safe, silent);
   } catch (const std::bad_alloc&) {
     throw;
   } catch (const YAMLError& error) {

@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "fixups/three_way_merge.h"
 #include "merge/recording_conflict_resolver.h"
+#include "scene/scene_documents.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -18,14 +18,16 @@ struct ReportConfig {
   std::string merge_file;  ///< Where resolutions are read from; empty for none.
   std::string rules_file = "auto";
   std::string type_info_file;
+  bool safe = false;  ///< Whether scenes are merged as scenes.
 };
 
 /// A merge with everything it went through, ready to be looked at. What was converted for the diff is not
 /// converted back.
 struct MergedFiles {
-  MergeDocuments read;
-  std::vector<RenumberedObject> renumbered;
+  SceneDocuments read;
   DiffPair diffs;
+  /// What became of the versions where they were merged as scenes, else null: records may refer to it.
+  std::unique_ptr<SceneDocuments> settled;
   RecordingConflictResolver resolver{MergeResolve::kBase};
   /// Before and after the repairs; null where the merge failed.
   std::unique_ptr<VexelObjects> unrepaired;

@@ -35,6 +35,7 @@ constexpr std::string_view kUsage =
     "         -i FILE         settle conflicts as FILE says\n"
     "         --rules FILE    other merge rules than the default ones\n"
     "         --typeInfo FILE check components, with the type information in FILE\n"
+    "         --safe          merge scenes as scenes, as VexelYAMLMerge merge --safe does\n"
     "         --version, --help\n";
 
 enum class Mode { kPage, kConflicts, kText };
@@ -85,6 +86,8 @@ Arguments Parse(const std::vector<std::string>& arguments) {
       parsed.mode = Mode::kConflicts;
     } else if (argument == "--text") {
       parsed.mode = Mode::kText;
+    } else if (argument == "--safe") {
+      parsed.config.safe = true;
     } else if (std::string* target = ValueTarget(argument, parsed)) {
       if (++index == arguments.size()) throw std::runtime_error("option " + argument + " needs a value");
       *target = arguments[index];

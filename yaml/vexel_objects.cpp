@@ -79,10 +79,14 @@ void VexelObjects::Output(std::ostream& out, Headers headers) {
 
 VexelObjects* VexelObjects::Clone() const {
   auto* clone = new VexelObjects;
-  CloneInto(*clone);
-  clone->tag_prefix_ = tag_prefix_;
-  clone->texts_ = texts_;
+  CopyTo(*clone);
   return clone;
+}
+
+void VexelObjects::CopyTo(VexelObjects& target) const {
+  CloneInto(target);
+  target.tag_prefix_ = tag_prefix_;
+  target.texts_ = texts_;
 }
 
 }  // namespace vexel_yaml

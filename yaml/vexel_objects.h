@@ -63,6 +63,8 @@ class VexelObjects final : public YAMLMapping {
 
   /// A deep copy of all objects, owned by the caller.
   VexelObjects* Clone() const override;
+  /// The same into objects that are there already, and empty.
+  void CopyTo(VexelObjects& target) const;
 
   /// Only for objects that `Clone` or `new` made: none comes from a pool.
   void Free() override { delete this; }

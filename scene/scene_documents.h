@@ -1,0 +1,24 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "fixups/three_way_merge.h"
+#include "platform/timer_stat.h"
+
+namespace vexel_yaml {
+
+/// The three versions of a scene on their way through a safe merge.
+struct SceneDocuments : MergeDocuments {
+  std::vector<RenumberedObject> renumbered;
+
+  std::unique_ptr<SceneDocuments> Copy() const;
+};
+
+/// Reads the three files into empty `documents`, on threads of their own if `threads`, and prepares them for
+/// a diff. Throws what ReadMergeDocuments and PrepareForDiff throw.
+void ReadScenes(const std::string& base_path, const std::string& left_path, const std::string& right_path,
+                SceneDocuments& documents, bool threads, TimerStat& timer);
+
+}  // namespace vexel_yaml
