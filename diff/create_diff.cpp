@@ -1,11 +1,11 @@
 #include <algorithm>
-#include <cmath>
-#include <limits>
 #include <memory>
 #include <vector>
 
 #include "diff/yaml_mapping_diff.h"
 #include "diff/yaml_sequence_diff.h"
+#include "rules/path_step.h"
+#include "rules/scalar_tolerance.h"
 #include "yaml/content_digests.h"
 #include "yaml/folded_object.h"
 #include "yaml/yaml_alloc.h"
@@ -15,36 +15,13 @@ namespace vexel_yaml {
 
 namespace {
 
-// Stands one level deeper in a path for its own lifetime.
-class PathStep {
- public:
-  PathStep(FieldPath& path, const YAMLScalar* component) : path_(path) { path_.push_back(component); }
-  PathStep(const PathStep&) = delete;
-  PathStep& operator=(const PathStep&) = delete;
-  ~PathStep() { path_.pop_back(); }
-
- private:
-  FieldPath& path_;
-};
-
 bool IsMergeable(const FieldPath& path, const YAMLNode* node) {
   bool matched = false;
   return YAMLSequenceRemapper::IsMergeablePath(path, node, matched);
 }
 
-bool IsWithinTolerance(const ComparisonInfo& rule, const YAMLScalar& from, const YAMLScalar& to) {
-  if (!(rule.relativeTolerance > 0) || !(rule.absoluteTolerance > 0)) return false;
-  const float a = from.GetFloatValue();
-  const float b = to.GetFloatValue();
-  if (a == b) return true;
-  const float magnitude = std::min(std::abs(a) + std::abs(b), std::numeric_limits<float>::max());
-  return std::abs(a - b) < std::max(rule.absoluteTolerance, rule.relativeTolerance * magnitude);
-}
-
 Operation* DiffScalars(const FieldPath& path, const YAMLScalar& from, const YAMLScalar& to) {
-  if (from.Equals(&to)) return nullptr;
-  const ComparisonInfo* rule = YAMLSequenceRemapper::FindComparison(path);
-  if (rule != nullptr && IsWithinTolerance(*rule, from, to)) return nullptr;
+  if (AreSameScalars(path, from, to)) return nullptr;
   return YAMLAlloc<ChangeOperation>::create(&to);
 }
 
