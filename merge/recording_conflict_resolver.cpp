@@ -75,6 +75,10 @@ RecordingConflictResolver::Record& RecordingConflictResolver::AddRecord(FieldPat
   return records_.back();
 }
 
+void RecordingConflictResolver::AddRecord(Record record) {
+  AddRecord(std::move(record.path), record.type, record.resolution, record.left, record.right);
+}
+
 MergeResolve RecordingConflictResolver::SettleConflict(FieldPath path, ConflictType type,
                                                        const Operation* left, const Operation* right) {
   const MergeResolve found = FindResolution(path);

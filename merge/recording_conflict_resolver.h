@@ -34,9 +34,14 @@ class RecordingConflictResolver final : public ConflictResolver {
   /// Replaces the user's resolutions; the first one that matches a place wins.
   void SetResolveMethodForPaths(std::vector<RecordResolve> resolutions);
 
-  /// Records a conflict that was found outside of the diff trees, at `path`; either operation may be null.
-  /// Returns what is to stand there: base, left or right, where it is pending the default side's (base's for
-  /// blank).
+  /// For conflicts that are found outside of the diff trees: what the user wants at `path`; automatic where
+  /// nothing is said of it.
+  MergeResolve FindResolution(const FieldPath& path) const;
+  MergeResolve GetDefaultSide() const { return default_side_; }
+  void AddRecord(Record record);
+
+  /// Both at once. Either operation may be null. Returns what is to stand there: base, left or right, where
+  /// it is pending the default side's (base's for blank).
   MergeResolve SettleConflict(FieldPath path, ConflictType type, const Operation* left,
                               const Operation* right);
 
@@ -65,7 +70,6 @@ class RecordingConflictResolver final : public ConflictResolver {
   bool OnComponentDependencyConflict(const ComponentDependencyConflict& conflict) override;
 
  private:
-  MergeResolve FindResolution(const FieldPath& path) const;
   bool Matches(size_t place, const FieldPath& path) const;
   /// The place of the first resolution that begins with `first` and matches `path`.
   size_t FindResolution(const YAMLScalar* first, const FieldPath& path) const;

@@ -2,12 +2,18 @@
 
 #include "fixups/post_process.h"
 #include "fixups/state_machine_transitions.h"
+#include "scene/settle_scene.h"
 
 namespace vexel_yaml {
 
 SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& resolver,
                           const SafeMergeOptions& options, TimerStat& timer) {
-  const auto& [base, left, right] = static_cast<const MergeDocuments&>(documents);
+  auto& [base, left, right] = static_cast<MergeDocuments&>(documents);
+  SettledScene settled;
+  {
+    TimerStat step(timer, "Settling the scene");
+    settled = SettleScene({base, left, right}, resolver);
+  }
   DiffPair diffs;
   {
     TimerStat step(timer, "Creating diffs");
@@ -17,7 +23,7 @@ SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& 
   result.merged = MergeIntoCopy(base, diffs, resolver, timer);
   TimerStat step(timer, "Post process merged changes");
   if (options.keep_comparable) result.unrepaired.reset(result.merged->Clone());
-  RepairMerged(*result.merged, left, right, resolver);
+  CheckMergedScene(settled, *result.merged, resolver);
   result.breaks_dependency = ReportBrokenDependencies(*result.merged, left, right, resolver);
   if (options.keep_comparable) result.repaired.reset(result.merged->Clone());
   TransitionsToMappings(*result.merged);

@@ -1,0 +1,299 @@
+#include "scene/contests.h"
+
+#include <algorithm>
+#include <map>
+#include <unordered_set>
+
+#include "diff/merge_tree_visitor.h"
+#include "fixups/engine_keys.h"
+#include "scene/holders.h"
+#include "scene/object_links.h"
+#include "yaml/folded_object.h"
+#include "yaml/yaml_alloc.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using FileIDs = std::vector<const YAMLScalar*>;
+
+// What the other side did to one deleted thing.
+struct Deeds {
+  // The objects in which it did it, in the order in which they were found.
+  FileIDs edited;
+  FileIDs additions;
+  FileIDs moved_in;
+  // The objects elsewhere that refer to it now.
+  FileIDs referring;
+  // The transforms and instances that it moved out.
+  FileIDs moved_out;
+
+  bool IsEmpty() const {
+    return edited.empty() && additions.empty() && moved_in.empty() && referring.empty();
+  }
+};
+
+// For objects that are gone through one after the other.
+void AddOnce(FileIDs& file_ids, const YAMLScalar* file_id) {
+  if (file_ids.empty() || file_ids.back() != file_id) file_ids.push_back(file_id);
+}
+
+FileIDs Joined(const FileIDs& a, const FileIDs& b) {
+  FileIDs joined = a;
+  joined.insert(joined.end(), b.begin(), b.end());
+  return joined;
+}
+
+// The objects that an object refers to, lists that follow from others and its father aside.
+std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
+  std::unordered_set<const YAMLScalar*> targets;
+  YAMLMapping* body = GetBody(const_cast<YAMLNode*>(object));
+  if (body == nullptr) return targets;
+  const YAMLMapping* father = GetFatherReference(const_cast<YAMLNode*>(object));
+  const YAMLScalar* owner = ReadLinks(object).owner;
+  for (const auto& [key, value] : *body) {
+    if (key == ChildrenKey() || key == YAMLScalar::mComponent) continue;
+    VisitReferences(value, [&](YAMLMapping& reference) {
+      const YAMLScalar* target = GetLocalTarget(&reference);
+      if (&reference != father && target != owner) targets.insert(target);
+    });
+  }
+  return targets;
+}
+
+// Finds what the side that deleted nothing of it did to each thing that the other one deleted.
+class DeedSearch {
+ public:
+  DeedSearch(const SceneEdits& edits, SceneSide deleter)
+      : base_(edits.versions.base),
+        other_(edits.Version(OtherSide(deleter))),
+        changes_(edits.Changes(OtherSide(deleter))),
+        deleted_(edits.Deleted(deleter)),
+        holders_(other_, Joined(changes_.added, edits.Changes(deleter).removed)) {}
+
+  std::map<size_t, Deeds> Search() {
+    for (const YAMLScalar* file_id : changes_.added) {
+      const size_t deletion = Reached(file_id);
+      if (deletion != Deletions::kNone) deeds_[deletion].additions.push_back(file_id);
+    }
+    for (const YAMLScalar* file_id : changes_.changed) {
+      const size_t deletion = deleted_.Find(file_id);
+      if (deletion == Deletions::kNone) {
+        LookAtMove(file_id);
+      } else {
+        LookAtEdit(file_id, deletion);
+      }
+    }
+    for (const FileIDs* file_ids : {&changes_.changed, &changes_.added}) {
+      for (const YAMLScalar* file_id : *file_ids) LookAtReferences(file_id);
+    }
+    return std::move(deeds_);
+  }
+
+ private:
+  // The deletion that an object is a part of or, as an addition, hangs on.
+  size_t Reached(const YAMLScalar* file_id) const {
+    std::unordered_set<const YAMLScalar*> passed;
+    for (const YAMLScalar* step = file_id; step != nullptr && passed.insert(step).second;
+         step = holders_.Get(step)) {
+      const size_t deletion = deleted_.Find(step);
+      if (deletion != Deletions::kNone) return deletion;
+    }
+    return Deletions::kNone;
+  }
+
+  void LookAtMove(const YAMLScalar* file_id) {
+    const YAMLScalar* father = FatherIn(other_, file_id);
+    if (father == nullptr || father == FatherIn(base_, file_id)) return;
+    const size_t deletion = Reached(father);
+    if (deletion != Deletions::kNone) deeds_[deletion].moved_in.push_back(file_id);
+  }
+
+  void LookAtEdit(const YAMLScalar* file_id, size_t deletion) {
+    const YAMLNode* edited = other_.Get(file_id);
+    const YAMLScalar* father = FatherIn(other_, file_id);
+    if (father != FatherIn(base_, file_id)) {
+      const YAMLScalar* thing = deleted_.Get()[deletion].thing;
+      const bool is_thing = file_id == thing || ReadLinks(edited).owner == thing;
+      if (!is_thing && (father == nullptr || Reached(father) != deletion)) {
+        deeds_[deletion].moved_out.push_back(file_id);
+      } else {
+        deeds_[deletion].edited.push_back(file_id);
+      }
+    }
+    if (IsEdited(file_id, base_.Get(file_id), edited)) AddOnce(deeds_[deletion].edited, file_id);
+  }
+
+  void LookAtReferences(const YAMLScalar* file_id) {
+    if (deleted_.Get().empty()) return;
+    std::unordered_set<const YAMLScalar*> known;
+    bool has_looked = false;
+    for (const YAMLScalar* target : OwnTargets(other_.Get(file_id))) {
+      const size_t deletion = deleted_.Find(target);
+      if (deletion == Deletions::kNone || Reached(file_id) == deletion) continue;
+      if (!has_looked) known = OwnTargets(base_.Get(file_id));
+      has_looked = true;
+      if (!known.contains(target)) AddOnce(deeds_[deletion].referring, file_id);
+    }
+  }
+
+  const VexelObjects& base_;
+  const VexelObjects& other_;
+  const SideChanges& changes_;
+  const Deletions& deleted_;
+  const Holders holders_;
+  std::map<size_t, Deeds> deeds_;
+};
+
+Contest MakeDeletionContest(const SceneEdits& edits, SceneSide deleter, size_t deletion,
+                            const YAMLScalar* thing, FileIDs objects, const Deeds& deeds,
+                            const FileIDs& edited) {
+  Contest contest;
+  contest.path = {thing};
+  FileIDs shown = Joined(edited, deeds.additions);
+  shown = Joined(Joined(shown, deeds.moved_in), deeds.referring);
+  const Operation* removal = YAMLAlloc<RemoveOperation>::create(true);
+  const Operation* edit = EditsInShort(edits, OtherSide(deleter), shown);
+  contest.left = deleter == SceneSide::kLeft ? removal : edit;
+  contest.right = deleter == SceneSide::kLeft ? edit : removal;
+  contest.deleted = {deleter, deletion, std::move(objects), deeds.additions, deeds.moved_in};
+  return contest;
+}
+
+// The parts that were moved out, each with what it consists of; none that lies in another one.
+std::vector<std::pair<const YAMLScalar*, FileIDs>> MovedOutParts(const VexelObjects& base,
+                                                                 const FileIDs& moved_out,
+                                                                 const FileIDs& objects) {
+  std::vector<std::pair<const YAMLScalar*, FileIDs>> parts;
+  for (const YAMLScalar* node : moved_out) parts.emplace_back(node, CollectBelow(base, node, objects));
+  std::vector<std::pair<const YAMLScalar*, FileIDs>> outermost;
+  for (const auto& part : parts) {
+    const bool is_inner = std::ranges::any_of(parts, [&](const auto& other) {
+      return other.first != part.first && std::ranges::find(other.second, part.first) != other.second.end();
+    });
+    if (!is_inner) outermost.push_back(part);
+  }
+  return outermost;
+}
+
+void AddDeletionContests(const SceneEdits& edits, SceneSide deleter, size_t deletion, const Deeds& deeds,
+                         std::vector<Contest>& contests) {
+  const Deletion& deleted = edits.Deleted(deleter).Get()[deletion];
+  const auto parts = MovedOutParts(edits.versions.base, deeds.moved_out, deleted.objects);
+  const auto lies_in_part = [&](const YAMLScalar* file_id) {
+    return std::ranges::any_of(parts, [&](const auto& part) {
+      return std::ranges::find(part.second, file_id) != part.second.end();
+    });
+  };
+  const bool only_moved_out = !parts.empty() && deeds.additions.empty() && deeds.moved_in.empty() &&
+                              deeds.referring.empty() && std::ranges::all_of(deeds.edited, lies_in_part);
+  if (!only_moved_out) {
+    contests.push_back(MakeDeletionContest(edits, deleter, deletion, deleted.thing, deleted.objects, deeds,
+                                           Joined(deeds.moved_out, deeds.edited)));
+    return;
+  }
+  for (const auto& [node, objects] : parts) {
+    const YAMLScalar* owner = ReadLinks(edits.versions.base.Get(node)).owner;
+    FileIDs edited = {node};
+    for (const YAMLScalar* file_id : deeds.edited) {
+      if (std::ranges::find(objects, file_id) != objects.end()) AddOnce(edited, file_id);
+    }
+    contests.push_back(MakeDeletionContest(edits, deleter, deletion, owner == nullptr ? node : owner, objects,
+                                           Deeds(), edited));
+  }
+}
+
+bool IsFatherContested(const SceneEdits& edits, const YAMLScalar* node) {
+  const SceneVersions& versions = edits.versions;
+  if (GetFatherReference(versions.left.Get(node)) == nullptr ||
+      GetFatherReference(versions.right.Get(node)) == nullptr) {
+    return false;
+  }
+  const YAMLScalar* left = FatherIn(versions.left, node);
+  const YAMLScalar* right = FatherIn(versions.right, node);
+  if (left == right) return false;
+  if (!versions.base.HasKey(node)) return true;
+  const YAMLScalar* base = FatherIn(versions.base, node);
+  return left != base && right != base;
+}
+
+}  // namespace
+
+SceneEdits::SceneEdits(const SceneVersions& scene)
+    : versions(scene),
+      changes{FindChanges(scene.base, scene.left), FindChanges(scene.base, scene.right)},
+      deletions{Deletions(scene.base, changes[0].removed), Deletions(scene.base, changes[1].removed)} {}
+
+const YAMLScalar* FatherIn(const VexelObjects& objects, const YAMLScalar* node) {
+  const YAMLNode* object = objects.Get(node);
+  const FoldedObject* folded = GetFolded(object);
+  if (folded != nullptr && folded->father != nullptr) {
+    return IsNullReference(folded->father) ? nullptr : folded->father;
+  }
+  return ReadLinks(object).father;
+}
+
+FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object) {
+  const ObjectLinks links = ReadLinks(object);
+  FieldPath path = {node, links.body_key};
+  if (links.kind == ObjectLinks::Kind::kPrefabInstance) {
+    path.push_back(YAMLScalar::mModification);
+    path.push_back(YAMLScalar::mTransformParent);
+  } else {
+    path.push_back(YAMLScalar::mFather);
+  }
+  return path;
+}
+
+const Operation* EditsInShort(const SceneEdits& edits, SceneSide side, const FileIDs& objects) {
+  auto* diff = YAMLAlloc<YAMLMappingDiff>::create();
+  for (const YAMLScalar* file_id : objects) {
+    FieldPath path = {file_id};
+    const Operation* operation =
+        CreateDiffOperation(path, edits.versions.base.Get(file_id), edits.Version(side).Get(file_id));
+    if (operation != nullptr && !diff->HasKey(file_id)) diff->Add(file_id, operation);
+  }
+  const Operation* whole = YAMLAlloc<ChangeMappingOperation>::create(diff, true);
+  return MergeTreeCloneVisitor::Clone(whole);
+}
+
+Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node) {
+  const SceneVersions& versions = edits.versions;
+  const auto father_edit = [&](const VexelObjects& side) -> const Operation* {
+    FieldPath path = FatherPath(node, side.Get(node));
+    const Operation* operation =
+        CreateDiffOperation(path, GetFatherReference(versions.base.Get(node)),
+                            GetFatherReference(const_cast<VexelObjects&>(side).Get(node)));
+    return operation == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(operation);
+  };
+  Contest contest;
+  contest.path = FatherPath(node, versions.left.Get(node));
+  contest.node = node;
+  if (!versions.base.HasKey(node)) contest.type = ConflictType::kBothAdd;
+  contest.left = father_edit(versions.left);
+  contest.right = father_edit(versions.right);
+  return contest;
+}
+
+std::vector<Contest> FindContests(const SceneEdits& edits) {
+  std::vector<Contest> contests;
+  for (const SceneSide deleter : {SceneSide::kLeft, SceneSide::kRight}) {
+    if (edits.Deleted(deleter).Get().empty()) continue;
+    for (const auto& [deletion, deeds] : DeedSearch(edits, deleter).Search()) {
+      if (deeds.IsEmpty() && deeds.moved_out.empty()) continue;
+      AddDeletionContests(edits, deleter, deletion, deeds, contests);
+    }
+  }
+  const SideChanges& right = edits.Changes(SceneSide::kRight);
+  for (const FileIDs* file_ids :
+       {&edits.Changes(SceneSide::kLeft).changed, &edits.Changes(SceneSide::kLeft).added}) {
+    for (const YAMLScalar* node : *file_ids) {
+      if ((right.Changed(node) || right.Added(node)) && IsFatherContested(edits, node)) {
+        contests.push_back(MakeFatherContest(edits, node));
+      }
+    }
+  }
+  return contests;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,84 @@
+#pragma once
+
+#include <array>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "merge/recording_conflict_resolver.h"
+#include "scene/deletions.h"
+#include "scene/scene_versions.h"
+#include "scene/side_changes.h"
+
+namespace vexel_yaml {
+
+/// Three versions of a scene, and what each side did to it.
+struct SceneEdits {
+  explicit SceneEdits(const SceneVersions& versions);
+
+  const VexelObjects& Version(SceneSide side) const {
+    return side == SceneSide::kLeft ? versions.left : versions.right;
+  }
+  const SideChanges& Changes(SceneSide side) const { return changes[static_cast<size_t>(side)]; }
+  const Deletions& Deleted(SceneSide side) const { return deletions[static_cast<size_t>(side)]; }
+
+  SceneVersions versions;
+  std::array<SideChanges, 2> changes;
+  std::array<Deletions, 2> deletions;
+};
+
+/// An edit of one side against one of the other that only a person can settle, as a whole.
+struct Contest {
+  /// The thing's file ID, or the place of a father.
+  FieldPath path;
+  ConflictType type = ConflictType::kBothChange;
+  /// What each side did, for people. Copies.
+  const Operation* left = nullptr;
+  const Operation* right = nullptr;
+
+  /// What the user wants, kConflict while it is open.
+  MergeResolve resolution = MergeResolve::kConflict;
+  /// What is to stand: base, left or right.
+  MergeResolve side = MergeResolve::kBase;
+  /// Why a choice of the user's could not be carried out.
+  std::string reason;
+
+  /// One side deleted the thing, and the other did something to it.
+  struct Deleted {
+    SceneSide by;
+    /// The place in that side's deletions.
+    size_t deletion;
+    /// The objects that the contest is about. Fewer than the deletion has where the other side moved a part
+    /// of it out, and did nothing else to it: the rest follows.
+    std::vector<const YAMLScalar*> objects;
+    /// What the other side added to the thing, with all below it.
+    std::vector<const YAMLScalar*> additions;
+    /// The transforms and prefab instances that the other side moved below it.
+    std::vector<const YAMLScalar*> moved_in;
+  };
+  std::optional<Deleted> deleted;
+
+  /// Else the transform or prefab instance whose father is contested.
+  const YAMLScalar* node = nullptr;
+  /// Contests of one number are about one circle of fathers; 0 for none.
+  size_t circle = 0;
+};
+
+/// Finds them, circles aside, in no particular order.
+std::vector<Contest> FindContests(const SceneEdits& edits);
+
+/// A contest about the father of a transform or prefab instance that both sides have. `others`: what the
+/// other side did where only one moved it.
+Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node);
+
+/// Where the father of an object stands: the path of the reference.
+FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object);
+
+/// The father of an object in one version, null at the top and for an object that the version lacks.
+const YAMLScalar* FatherIn(const VexelObjects& objects, const YAMLScalar* node);
+
+/// What one side did to some objects, as one operation on the file. A copy.
+const Operation* EditsInShort(const SceneEdits& edits, SceneSide side,
+                              const std::vector<const YAMLScalar*>& objects);
+
+}  // namespace vexel_yaml

@@ -1,0 +1,246 @@
+#include <algorithm>
+#include <unordered_map>
+#include <unordered_set>
+#include <utility>
+
+#include "scene/object_links.h"
+#include "scene/scene_plan.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using FileIDs = std::vector<const YAMLScalar*>;
+
+bool IsSettled(const Contest& contest) { return contest.resolution != MergeResolve::kConflict; }
+
+// Whether a contest decides where an object hangs.
+bool Places(const Contest& contest, const YAMLScalar* node) {
+  if (!contest.deleted) return contest.node == node;
+  const auto holds = [&](const FileIDs& file_ids) {
+    return std::ranges::find(file_ids, node) != file_ids.end();
+  };
+  return holds(contest.deleted->moved_in) || holds(contest.deleted->objects);
+}
+
+// Whether a contest decides that an object is there.
+bool Removes(const Contest& contest, const SceneEdits& edits, const YAMLScalar* file_id) {
+  if (!contest.deleted) return false;
+  const Contest::Deleted& deleted = *contest.deleted;
+  return edits.Deleted(deleted.by).Find(file_id) == deleted.deletion ||
+         std::ranges::find(deleted.additions, file_id) != deleted.additions.end();
+}
+
+class Reconciliation {
+ public:
+  Reconciliation(const SceneEdits& edits, const RecordingConflictResolver& resolver,
+                 std::vector<Contest>& contests, ScenePlan& plan)
+      : edits_(edits), resolver_(resolver), contests_(contests), plan_(plan) {
+    CollectNodes();
+    SortContests();
+  }
+
+  // Each step takes back a choice, a deletion or a place, of which there are finitely many.
+  void Run() {
+    do {
+      plan_.Follow(contests_);
+    } while (FixMissingFather() || FixCircle());
+  }
+
+ private:
+  // The transforms and prefab instances that may hang elsewhere than in base, or on something else.
+  void CollectNodes() {
+    std::unordered_set<const YAMLScalar*> seen;
+    const auto add = [&](const VexelObjects& objects, const YAMLScalar* file_id) {
+      if (ReadLinks(objects.Get(file_id)).HasFather() && seen.insert(file_id).second)
+        nodes_.push_back(file_id);
+    };
+    for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
+      const SideChanges& changes = edits_.Changes(side);
+      for (const YAMLScalar* file_id : changes.changed) add(edits_.Version(side), file_id);
+      for (const YAMLScalar* file_id : changes.added) add(edits_.Version(side), file_id);
+      for (const YAMLScalar* file_id : changes.removed) add(edits_.versions.base, file_id);
+    }
+  }
+
+  void SortContests() {
+    std::ranges::stable_sort(contests_, [](const Contest& a, const Contest& b) {
+      return std::ranges::lexicographical_compare(a.path, b.path, ScalarTextLess());
+    });
+  }
+
+  bool FixMissingFather() {
+    for (const YAMLScalar* node : nodes_) {
+      const YAMLScalar* father = plan_.GetFather(node);
+      if (father == nullptr || !plan_.Has(node) || plan_.Has(father)) continue;
+      std::vector<Contest*> concerned;
+      for (Contest& contest : contests_) {
+        if (Places(contest, node) || Removes(contest, edits_, father)) concerned.push_back(&contest);
+      }
+      const bool is_contested = std::ranges::any_of(
+          concerned, [&](const Contest* contest) { return Removes(*contest, edits_, father); });
+      if (!is_contested && KeepDeleted(father)) return true;
+      if (!is_contested && !WasThere(father)) continue;
+      if (Retreat(concerned)) return true;
+      plan_.Uproot(node);
+      return true;
+    }
+    return false;
+  }
+
+  bool WasThere(const YAMLScalar* file_id) const {
+    const SceneVersions& versions = edits_.versions;
+    return versions.base.HasKey(file_id) || versions.left.HasKey(file_id) || versions.right.HasKey(file_id);
+  }
+
+  // Whether a deletion could be taken back.
+  bool KeepDeleted(const YAMLScalar* file_id) {
+    bool is_kept = false;
+    for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
+      const size_t deletion = edits_.Deleted(side).Find(file_id);
+      if (deletion == Deletions::kNone || edits_.Deleted(OtherSide(side)).Find(file_id) != Deletions::kNone) {
+        continue;
+      }
+      is_kept |= plan_.Keep(side, deletion);
+    }
+    return is_kept;
+  }
+
+  // Opens the last of the settled ones again, or, where none is, lets the last one that can stand otherwise
+  // do so. Returns whether there was one.
+  static bool Retreat(const std::vector<Contest*>& concerned) {
+    for (auto contest = concerned.rbegin(); contest != concerned.rend(); ++contest) {
+      if (!IsSettled(**contest)) continue;
+      (*contest)->resolution = MergeResolve::kConflict;
+      StepBack(**contest);
+      (*contest)->reason = "this choice can't be carried out together with what stands at " +
+                           PathToString(Reason(concerned, **contest).path);
+      return true;
+    }
+    return std::ranges::any_of(concerned.rbegin(), concerned.rend(),
+                               [](Contest* contest) { return StepBack(*contest); });
+  }
+
+  static const Contest& Reason(const std::vector<Contest*>& concerned, const Contest& contest) {
+    const auto other = std::ranges::find_if(concerned, [&](const Contest* c) { return c != &contest; });
+    return other == concerned.end() ? contest : **other;
+  }
+
+  // To base or, where base has none, to the right side. Returns false where that stands already.
+  static bool StepBack(Contest& contest) {
+    const MergeResolve last =
+        contest.type == ConflictType::kBothAdd ? MergeResolve::kRight : MergeResolve::kBase;
+    return std::exchange(contest.side, last) != last;
+  }
+
+  bool FixCircle() {
+    const FileIDs circle = FindCircle();
+    if (circle.empty()) return false;
+    FileIDs moved;
+    std::vector<Contest*> concerned;
+    for (const YAMLScalar* node : circle) {
+      if (!edits_.versions.base.HasKey(node) ||
+          plan_.GetFather(node) == FatherIn(edits_.versions.base, node)) {
+        continue;
+      }
+      const size_t before = concerned.size();
+      for (Contest& contest : contests_) {
+        if (Places(contest, node)) concerned.push_back(&contest);
+      }
+      if (concerned.size() == before) moved.push_back(node);
+    }
+    if (!moved.empty()) {
+      AddCircle(moved);
+    } else if (!Retreat(concerned)) {
+      plan_.Uproot(circle.front());
+    }
+    return true;
+  }
+
+  // The nodes of one circle of fathers, empty where there is none. Every node is walked over once.
+  FileIDs FindCircle() const {
+    std::unordered_set<const YAMLScalar*> safe;
+    for (const YAMLScalar* node : nodes_) {
+      if (!plan_.Has(node)) continue;
+      FileIDs walk;
+      std::unordered_set<const YAMLScalar*> on_walk;
+      const YAMLScalar* step = node;
+      while (step != nullptr && !safe.contains(step) && on_walk.insert(step).second) {
+        walk.push_back(step);
+        step = plan_.Has(step) ? plan_.GetFather(step) : nullptr;
+      }
+      if (step != nullptr && !safe.contains(step) && !IsCircleInBase(step)) {
+        return {std::ranges::find(walk, step), walk.end()};
+      }
+      safe.insert(walk.begin(), walk.end());
+    }
+    return {};
+  }
+
+  // What was broken before is nobody's conflict.
+  bool IsCircleInBase(const YAMLScalar* node) const {
+    const VexelObjects& base = edits_.versions.base;
+    std::unordered_set<const YAMLScalar*> passed;
+    const YAMLScalar* step = FatherIn(base, node);
+    while (step != nullptr && step != node && passed.insert(step).second) step = FatherIn(base, step);
+    return step == node;
+  }
+
+  // One side moved one, the other another: each contest shows both moves.
+  void AddCircle(const FileIDs& moved) {
+    ++circles_;
+    std::vector<Contest> added;
+    MergeResolve chosen = MergeResolve::kConflict;
+    for (const YAMLScalar* node : moved) {
+      Contest contest = MakeFatherContest(edits_, node);
+      FileIDs others = moved;
+      std::erase(others, node);
+      if (contest.left == nullptr) contest.left = EditsInShort(edits_, SceneSide::kLeft, others);
+      if (contest.right == nullptr) contest.right = EditsInShort(edits_, SceneSide::kRight, others);
+      contest.circle = circles_;
+      Decide(resolver_, contest);
+      if (IsSettled(contest) && chosen == MergeResolve::kConflict) chosen = contest.resolution;
+      added.push_back(std::move(contest));
+    }
+    // They are one: who has settled one of them has settled the others.
+    for (Contest& contest : added) {
+      if (chosen != MergeResolve::kConflict && !IsSettled(contest))
+        contest.resolution = contest.side = chosen;
+      contests_.push_back(std::move(contest));
+    }
+    SortContests();
+  }
+
+  const SceneEdits& edits_;
+  const RecordingConflictResolver& resolver_;
+  std::vector<Contest>& contests_;
+  ScenePlan& plan_;
+  FileIDs nodes_;
+  size_t circles_ = 0;
+};
+
+}  // namespace
+
+void Decide(const RecordingConflictResolver& resolver, Contest& contest) {
+  const auto is_version = [](MergeResolve resolve) {
+    return resolve == MergeResolve::kBase || resolve == MergeResolve::kLeft ||
+           resolve == MergeResolve::kRight;
+  };
+  const MergeResolve found = resolver.FindResolution(contest.path);
+  contest.resolution = is_version(found) ? found : MergeResolve::kConflict;
+  contest.side = is_version(found)                       ? found
+                 : is_version(resolver.GetDefaultSide()) ? resolver.GetDefaultSide()
+                                                         : MergeResolve::kBase;
+  // Base has none, and no object lacks its father.
+  if (contest.type == ConflictType::kBothAdd && contest.side == MergeResolve::kBase) {
+    contest.side = MergeResolve::kLeft;
+  }
+}
+
+void Reconcile(const SceneEdits& edits, const RecordingConflictResolver& resolver,
+               std::vector<Contest>& contests, ScenePlan& plan) {
+  for (Contest& contest : contests) Decide(resolver, contest);
+  Reconciliation(edits, resolver, contests, plan).Run();
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,120 @@
+#include "scene/scene_plan.h"
+
+#include <algorithm>
+#include <map>
+
+#include "scene/object_links.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using Source = ScenePlan::Source;
+
+Source SourceOf(SceneSide side) { return side == SceneSide::kLeft ? Source::kLeft : Source::kRight; }
+
+// The version that a choice takes a thing from, which one side deleted.
+Source SourceOf(const Contest& contest) {
+  if (contest.side == MergeResolve::kBase) return Source::kBase;
+  const SceneSide chosen = contest.side == MergeResolve::kLeft ? SceneSide::kLeft : SceneSide::kRight;
+  return contest.deleted && chosen == contest.deleted->by ? Source::kNone : SourceOf(chosen);
+}
+
+}  // namespace
+
+const VexelObjects& ScenePlan::Version(Source source) const {
+  switch (source) {
+    case Source::kLeft:
+      return edits_.versions.left;
+    case Source::kRight:
+      return edits_.versions.right;
+    case Source::kNone:
+    case Source::kBase:
+      break;
+  }
+  return edits_.versions.base;
+}
+
+bool ScenePlan::Has(const YAMLScalar* file_id) const {
+  const auto planned = objects_.find(file_id);
+  if (planned != objects_.end()) {
+    return planned->second != Source::kNone && Version(planned->second).HasKey(file_id);
+  }
+  const SceneVersions& versions = edits_.versions;
+  const bool in_left = versions.left.HasKey(file_id);
+  const bool in_right = versions.right.HasKey(file_id);
+  return versions.base.HasKey(file_id) ? in_left && in_right : in_left || in_right;
+}
+
+const YAMLScalar* ScenePlan::GetFather(const YAMLScalar* node) const {
+  if (uprooted_.contains(node)) return nullptr;
+  const auto father = fathers_.find(node);
+  if (father != fathers_.end()) return FatherIn(Version(father->second), node);
+  const auto object = objects_.find(node);
+  if (object != objects_.end()) return FatherIn(Version(object->second), node);
+  const SceneVersions& versions = edits_.versions;
+  if (!versions.left.HasKey(node)) return FatherIn(versions.right, node);
+  const YAMLScalar* left = FatherIn(versions.left, node);
+  if (!versions.right.HasKey(node) || !versions.base.HasKey(node)) return left;
+  return left != FatherIn(versions.base, node) ? left : FatherIn(versions.right, node);
+}
+
+void ScenePlan::Follow(const std::vector<Contest>& contests) {
+  objects_.clear();
+  fathers_.clear();
+  std::set<std::pair<SceneSide, size_t>> contested;
+  std::map<std::pair<SceneSide, size_t>, std::vector<const Contest*>> deletions;
+  for (const Contest& contest : contests) {
+    if (!contest.deleted) continue;
+    deletions[{contest.deleted->by, contest.deleted->deletion}].push_back(&contest);
+    contested.insert({contest.deleted->by, contest.deleted->deletion});
+  }
+  FollowUncontested(SceneSide::kLeft, contested);
+  FollowUncontested(SceneSide::kRight, contested);
+  for (const auto& [deletion, parts] : deletions) FollowRest(parts);
+  for (const Contest& contest : contests) {
+    if (contest.deleted) FollowDeletion(contest);
+  }
+  for (const Contest& contest : contests) {
+    if (!contest.deleted) fathers_[contest.node] = SourceOf(contest);
+  }
+  for (const YAMLScalar* node : uprooted_) fathers_[node] = Source::kNone;
+}
+
+// Also where the other side touched what follows from others only, or fields that stand in another order now:
+// the engine would take that for an edit.
+void ScenePlan::FollowUncontested(SceneSide deleter,
+                                  const std::set<std::pair<SceneSide, size_t>>& contested) {
+  const std::vector<Deletion>& deletions = edits_.Deleted(deleter).Get();
+  for (size_t i = 0; i < deletions.size(); ++i) {
+    const bool is_kept = kept_.contains({deleter, i});
+    if (contested.contains({deleter, i})) continue;
+    for (const YAMLScalar* file_id : deletions[i].objects) {
+      const bool touched = edits_.Changes(OtherSide(deleter)).Changed(file_id);
+      if (is_kept || touched) objects_[file_id] = is_kept ? SourceOf(OtherSide(deleter)) : Source::kNone;
+    }
+  }
+}
+
+// Where parts of a deleted thing were moved out, and at least one of them is to stand where base has it, the
+// rest stays, too; else it goes.
+void ScenePlan::FollowRest(const std::vector<const Contest*>& parts) {
+  const Contest::Deleted& deleted = *parts.front()->deleted;
+  const bool stays =
+      kept_.contains({deleted.by, deleted.deletion}) ||
+      std::ranges::any_of(parts, [](const Contest* part) { return SourceOf(*part) == Source::kBase; });
+  for (const YAMLScalar* file_id : edits_.Deleted(deleted.by).Get()[deleted.deletion].objects) {
+    objects_[file_id] = stays ? SourceOf(OtherSide(deleted.by)) : Source::kNone;
+  }
+}
+
+void ScenePlan::FollowDeletion(const Contest& contest) {
+  const Source source = SourceOf(contest);
+  for (const YAMLScalar* file_id : contest.deleted->objects) objects_[file_id] = source;
+  if (source == SourceOf(OtherSide(contest.deleted->by))) return;
+  // Without what the other side made of it.
+  for (const YAMLScalar* file_id : contest.deleted->additions) objects_[file_id] = Source::kNone;
+  for (const YAMLScalar* node : contest.deleted->moved_in) fathers_[node] = Source::kBase;
+}
+
+}  // namespace vexel_yaml

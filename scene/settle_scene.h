@@ -1,0 +1,33 @@
+#pragma once
+
+#include <set>
+#include <unordered_set>
+#include <vector>
+
+#include "merge/recording_conflict_resolver.h"
+#include "scene/scene_check.h"
+#include "scene/scene_versions.h"
+
+namespace vexel_yaml {
+
+/// What has to be looked at once the engine has merged a settled scene.
+struct SettledScene {
+  /// The objects that somebody edited, each once.
+  std::vector<const YAMLScalar*> touched;
+  /// The objects that some version had, and not all of them: references to them may lead nowhere now.
+  std::unordered_set<const YAMLScalar*> vanishing;
+  /// What was broken in some version already.
+  std::set<SceneFault> known_faults;
+};
+
+/// Settles whatever the engine can't decide place by place: what happens to things that one side deleted and
+/// the other edited, where objects hang, the lists that follow from that, and values that both sides edited.
+/// Conflicts are recorded; what is decided stands in all three versions alike afterwards. A choice that can't
+/// be carried out is pending again, and a line on standard error says why.
+SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver);
+
+/// Repairs what the merge broke in a merged scene and has one repair, and records everything else as pending,
+/// with a line on standard error that says what is broken.
+void CheckMergedScene(const SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver);
+
+}  // namespace vexel_yaml

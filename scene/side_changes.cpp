@@ -1,0 +1,77 @@
+#include "scene/side_changes.h"
+
+#include "scene/object_links.h"
+#include "scene/same_fields.h"
+#include "yaml/folded_object.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+bool IsSame(const YAMLNode& a, const YAMLNode& b) {
+  if (&a == &b || HaveSameText(a, b)) return true;
+  // Of two different texts in the written style only reading tells whether they mean the same.
+  return GetFolded(&a) == nullptr && GetFolded(&b) == nullptr && a.EqualsByContent(&b);
+}
+
+bool IsDerived(const YAMLScalar* key) {
+  return key == ChildrenKey() || key == RootOrderKey() || key == YAMLScalar::mComponent ||
+         key == YAMLScalar::mFather || key == YAMLScalar::mTransformParent;
+}
+
+// Whether all but the derived fields of two mappings at `path` are the same.
+bool HaveSameOwnFields(FieldPath& path, const YAMLMapping& a, const YAMLMapping& b) {
+  const auto is_same_at = [&](const YAMLScalar* key) {
+    path.push_back(key);
+    const YAMLMapping* nested_a = a.Get(key) == nullptr ? nullptr : a.Get(key)->AsMapping();
+    const YAMLMapping* nested_b = b.Get(key) == nullptr ? nullptr : b.Get(key)->AsMapping();
+    const bool holds_father = key == YAMLScalar::mModification && nested_a != nullptr && nested_b != nullptr;
+    const bool is_same = holds_father ? HaveSameOwnFields(path, *nested_a, *nested_b)
+                                      : HaveSameFields(path, a.Get(key), b.Get(key));
+    path.pop_back();
+    return is_same;
+  };
+  for (const auto& [key, value] : a) {
+    if (!IsDerived(key) && !is_same_at(key)) return false;
+  }
+  for (const auto& [key, value] : b) {
+    if (!IsDerived(key) && !a.HasKey(key)) return false;
+  }
+  return true;
+}
+
+}  // namespace
+
+SideChanges FindChanges(const VexelObjects& base, const VexelObjects& side) {
+  SideChanges changes;
+  for (const auto& [file_id, object] : base) {
+    const YAMLNode* other = side.Get(file_id);
+    if (other == nullptr) {
+      changes.removed.push_back(file_id);
+      changes.kinds.emplace(file_id, SideChanges::Kind::kRemoved);
+    } else if (!IsSame(*object, *other)) {
+      changes.changed.push_back(file_id);
+      changes.kinds.emplace(file_id, SideChanges::Kind::kChanged);
+    }
+  }
+  for (const auto& [file_id, object] : side) {
+    if (base.HasKey(file_id)) continue;
+    changes.added.push_back(file_id);
+    changes.kinds.emplace(file_id, SideChanges::Kind::kAdded);
+  }
+  return changes;
+}
+
+bool IsEdited(const YAMLScalar* file_id, const YAMLNode* base, const YAMLNode* side) {
+  const YAMLMapping* body = GetBody(base);
+  const YAMLMapping* edited = GetBody(side);
+  FieldPath path = {file_id};
+  const ObjectLinks links = ReadLinks(base);
+  if (body == nullptr || edited == nullptr || ReadLinks(side).body_key != links.body_key) {
+    return !HaveSameFields(path, base, side);
+  }
+  path.push_back(links.body_key);
+  return !HaveSameOwnFields(path, *body, *edited);
+}
+
+}  // namespace vexel_yaml
