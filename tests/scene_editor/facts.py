@@ -1,0 +1,98 @@
+"""What each side did, looked for in a merged scene: a walk over the versions, place by place."""
+
+import itertools
+from collections import Counter
+
+from scene import NONE, is_unit, owners, target_of
+
+DERIVED = {"m_Children", "m_Component"}  # The other ends of m_Father and m_GameObject.
+
+
+def _get(fields, key):
+    """A field, or None; the overrides of a prefab instance by what they override, since their order means nothing."""
+    value = fields.get(key) if isinstance(fields, dict) else None
+    if key != "m_Modifications" or value is None:
+        return value
+    return {f"#{item['target']['fileID']} {item['propertyPath']}": item for item in value}
+
+
+def _missing(path, base, side, other, merged):
+    """The places below `path` where `side` differs from `base`, and `merged` doesn't show it."""
+    if side == base or path[-1] in DERIVED:
+        return
+    if isinstance(side, dict) and not is_unit(side):
+        for key in side.keys() | (base or {}).keys():
+            yield from _missing((*path, key), *(_get(version, key) for version in (base, side, other, merged)))
+    elif isinstance(side, list) and isinstance(merged, list):
+        yield from _missing_in_list(path, base or [], side, (base or []) if other is None else other, merged)
+    elif side != merged:
+        yield path, side
+
+
+def _missing_in_list(path, base, side, other, merged):
+    found = False
+    counts = [Counter(map(repr, version)) for version in (base, side, other, merged)]
+    for text, item in {repr(item): item for item in base + side}.items():
+        before, mine, theirs, after = (count[text] for count in counts)
+        # The same done on both sides may be one or two edits.
+        wanted = mine + theirs - before if (mine - before) * (theirs - before) < 0 else mine
+        if after < wanted and mine > before or after > wanted and mine < before:
+            found = True
+            yield path, item
+    if not found and (merged != side if other == base else order_lost(base, side, other, merged)):
+        yield path, "order"
+
+
+def order_lost(base, side, other, merged):
+    """Whether two elements that only `side` put the other way round still stand as they stood."""
+    versions = [[repr(item) for item in version] for version in (base, side, other, merged)]
+    at = [{item: place for place, item in enumerate(version)} for version in versions]
+    if any(len(places) != len(version) for places, version in zip(at, versions)):
+        return False
+    common = [item for item in versions[0] if all(item in places for places in at)]
+    before, mine, theirs, after = at
+    return any(mine[a] > mine[b] and theirs[a] < theirs[b] and after[a] < after[b]
+               for n, a in enumerate(common) for b in common[n + 1:])
+
+
+def lost(base, side, other, merged):
+    """Every edit from `base` to `side` that `merged` doesn't show, as (object, path, value)."""
+    for file_id in base.keys() | side.keys():
+        items = [version.get(file_id) for version in (base, side, other, merged)]
+        before, mine, _, after = items
+        name = (mine or before).name
+        if mine is None:
+            if after is not None:
+                yield file_id, (name,), None
+        elif before is None or before is not mine:
+            if after is None:
+                if before is None or before.fields != mine.fields:
+                    yield file_id, (name,), mine.fields
+                continue
+            for path, value in _missing((name,), *(item and item.fields for item in items)):
+                yield file_id, path, value
+            if name == "Transform" and before and not mine.stripped:
+                lists = [item.fields["m_Children"] if item else [] for item in items]
+                if order_lost(*lists) or lists[0] == lists[2] and lists[1] != lists[3] and \
+                        sorted(map(str, lists[1])) == sorted(map(str, lists[3])):
+                    yield file_id, (name, "m_Children"), "order"
+
+
+def is_covered(fact, base, side, other, pending):
+    """Whether a pending path is the place of the edit, one inside it, or a thing that it is about."""
+    file_id, path, value = fact
+    things = {part for version in (base, side, other) for part in owners(version, file_id)}
+    if value is None and len(path) == 1:
+        # A deletion is one act with what it took along, and with what the other side put there.
+        top = [part for part in owners(base, file_id) if part not in side][-1]
+        things |= {part for version in (base, other) for part in version if top in owners(version, part)}
+    old = base[file_id].fields if file_id in base else {}
+    for key in path[1:]:
+        old = _get(old, key)
+    targets = [target for target in (target_of(value), value == NONE and target_of(old)) if target]
+    if any(target not in side for target in targets):
+        return True  # The editor cleared the reference, since its object was deleted.
+    things |= {part for target in targets for version in (base, side, other) for part in owners(version, target)}
+    place = (file_id, *itertools.takewhile(lambda key: not key.startswith("#"), path))
+    return any(thing in things if not below else
+               all(a == b for a, b in zip(place, (thing, *below))) for thing, *below in pending)

@@ -1,0 +1,131 @@
+"""What must hold for every merge of three sound scenes, whatever was edited."""
+
+import re
+import subprocess
+from pathlib import Path
+
+import yaml
+
+import facts
+from scene import Object, parse, whole, write
+from soundness import faults
+
+SIDES = ("left", "right")
+
+
+class Broken(Exception):
+    """A law that doesn't hold: its name, and what was seen."""
+
+
+class Merger:
+    """Runs the program in a folder of its own."""
+
+    def __init__(self, program, folder, safe=True):
+        self.command = [program, "merge", *["--safe"] * safe, "-h", "--fallback", "none", "-o", "records"]
+        self.folder = Path(folder)
+
+    def merge(self, *names, choices=None):
+        """Merges files of the folder. Returns the scene and the pending paths, each split at its dots."""
+        (self.folder / "choices").write_text("Conflict handling:\n" + "".join(
+            f"{side} {'.'.join(path)}\n" for path, side in (choices or {}).items()))
+        done = subprocess.run([*self.command, "-i", "choices", *(name + ".vexel" for name in (*names, "merged"))],
+                              cwd=self.folder, capture_output=True, check=False, timeout=60)
+        if done.returncode not in (0, 2):
+            raise Broken("status", f"{done.returncode}: {done.stderr.decode('utf-8', 'replace').strip()}")
+        conflicts = (self.folder / "records").read_text().split("Conflict handling:")[0]
+        pending = dict.fromkeys(tuple(path.split(".")) for path in re.findall(r"^(?:Left|Right) +(\S+)", conflicts, re.M))
+        if bool(pending) != (done.returncode == 2):
+            raise Broken("status", f"{done.returncode} with the conflicts {list(pending)}")
+        try:
+            return parse((self.folder / "merged.vexel").read_text()), list(pending)
+        except (ValueError, yaml.YAMLError) as error:
+            raise Broken("readable", str(error)) from error
+
+
+def check_edits(law, versions, merged, pending_for):
+    """`pending_for`: by side, the paths at which that side's edits need not be in the result."""
+    try:
+        wrong = faults(merged)
+    except (LookupError, AttributeError, TypeError) as error:
+        wrong = [f"a field that every object of its class has is missing or another one: {error!r}"]
+    if wrong:
+        raise Broken(f"{law}: sound", "; ".join(wrong))
+    for side, other in (SIDES, SIDES[::-1]):
+        three = [versions[name] for name in ("base", side, other)]
+        for fact in facts.lost(*three, merged):
+            if not facts.is_covered(fact, *three, pending_for[side]):
+                raise Broken(f"{law}: lost", f"{side}: {fact}; pending: {list(pending_for[side])}")
+
+
+def settle(law, merger, versions, pending, choose):
+    """Settles what is pending in two rounds, and looks for all that was chosen."""
+    choices = {}
+    for _ in range(2):
+        # What was chosen and is pending again contradicts another choice.
+        choices.update({path: "base" if path in choices else choose(path) for path in pending})
+        merged, pending = merger.merge("base", "left", "right", choices=choices)
+        if not pending:
+            break
+    else:
+        raise Broken(f"{law}: rounds", f"pending {pending} with the choices {choices}")
+    check_edits(law, versions, merged, {side: [path for path, chosen in choices.items() if chosen != side]
+                                        for side in SIDES})
+    for path, chosen in choices.items():
+        if chosen == "base" and path[0] in versions["base"] and not stands_as_in_base(versions["base"], merged, path):
+            raise Broken(f"{law}: base", f"{path} isn't as in base")
+
+
+def stands_as_in_base(base, merged, path):
+    """Whether a thing has the parts that it has in base, and a field its value."""
+    if len(path) == 1:
+        return set(whole(base, path[0])) == set(whole(merged, path[0]))
+    values = [scene[path[0]].fields if path[0] in scene else None for scene in (base, merged)]
+    for key in path[2:]:
+        values = [value.get(key) if isinstance(value, dict) else None for value in values]
+    return values[0] is None or values[0] == values[1]
+
+
+def _without_order(value):
+    if isinstance(value, list):
+        return sorted(map(_without_order, value), key=repr)
+    if isinstance(value, Object):
+        return value.name, value.stripped, _without_order(value.fields)
+    return {key: _without_order(below) for key, below in value.items()} if isinstance(value, dict) else value
+
+
+def check_swapped(merger, versions, merged, pending):
+    if (versions["left"].keys() & versions["right"].keys()) - versions["base"].keys():
+        return  # Left's values stand in an object that both added until somebody chooses.
+    swapped, swapped_pending = merger.merge("base", "right", "left")
+    different = [file_id for file_id in merged.keys() | swapped.keys()
+                 if _without_order(merged.get(file_id)) != _without_order(swapped.get(file_id))]
+    if different or len(pending) != len(swapped_pending):
+        raise Broken("swapped", f"{different} differ, {pending} is pending, and then {swapped_pending}")
+
+
+def check_trivial(merger, versions):
+    for names, wanted in ((("base", "left", "left"), "left"), (("base", "left", "base"), "left"),
+                          (("base", "base", "right"), "right")):
+        merged, pending = merger.merge(*names)
+        if pending or list(merged.items()) != list(versions[wanted].items()):
+            raise Broken("trivial", f"{' '.join(names)} isn't {wanted}; pending: {pending}")
+
+
+def check(merger, versions, rng, thorough):
+    """The laws for base, left and right, those about other merges only where `thorough` says so. Returns the number
+    of conflicts."""
+    for name, scene in versions.items():
+        (merger.folder / f"{name}.vexel").write_text(write(scene))
+    # As they come back, so that equal objects are the same ones.
+    versions = {name: parse(write(scene)) for name, scene in versions.items()}
+    assert not any(map(faults, versions.values())), [faults(scene) for scene in versions.values()]
+    merged, pending = merger.merge("base", "left", "right")
+    check_edits("merge", versions, merged, dict.fromkeys(SIDES, pending))
+    if thorough:
+        check_swapped(merger, versions, merged, pending)
+        check_trivial(merger, versions)
+    if pending:
+        for how in ("left", "right", "base"):
+            settle(f"all {how}", merger, versions, pending, lambda path, side=how: side)
+        settle("random", merger, versions, pending, lambda path: rng.choice(("left", "right", "base")))
+    return len(pending)
