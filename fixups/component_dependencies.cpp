@@ -26,14 +26,7 @@ class Lineages {
   // Of a component whose type is known; stays valid.
   const Lineage& Of(const Component& component) {
     Lineage& lineage = lineages_[component.type];
-    if (!lineage.empty()) return lineage;
-    const YAMLTypeInfo* type = component.type;
-    lineage.push_back(type->persistent_type_id);
-    for (int step = 0; step < kMostBases && type != nullptr; ++step) {
-      if (std::ranges::count(lineage, type->base_persistent_type_id) != 0) break;
-      lineage.push_back(type->base_persistent_type_id);
-      type = GetTypeInfoManager().GetTypeInfo(type->base_persistent_type_id);
-    }
+    if (lineage.empty()) lineage = LineageOf(*component.type);
     return lineage;
   }
 
@@ -226,6 +219,17 @@ std::vector<ComponentDependencyConflict> WithoutRepeats(
 }
 
 }  // namespace
+
+std::vector<const YAMLScalar*> LineageOf(const YAMLTypeInfo& info) {
+  std::vector<const YAMLScalar*> lineage = {info.persistent_type_id};
+  const YAMLTypeInfo* type = &info;
+  for (int step = 0; step < kMostBases && type != nullptr; ++step) {
+    if (std::ranges::count(lineage, type->base_persistent_type_id) != 0) break;
+    lineage.push_back(type->base_persistent_type_id);
+    type = GetTypeInfoManager().GetTypeInfo(type->base_persistent_type_id);
+  }
+  return lineage;
+}
 
 std::vector<ComponentDependencyConflict> FindComponentDependencyConflicts(const YAMLMapping& merged,
                                                                           const YAMLMapping& left,

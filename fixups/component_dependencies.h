@@ -3,6 +3,7 @@
 #include <vector>
 
 #include "merge/component_dependency_conflict.h"
+#include "yaml/type_info.h"
 #include "yaml/yaml_mapping.h"
 
 namespace vexel_yaml {
@@ -13,5 +14,8 @@ namespace vexel_yaml {
 std::vector<ComponentDependencyConflict> FindComponentDependencyConflicts(const YAMLMapping& merged,
                                                                           const YAMLMapping& left,
                                                                           const YAMLMapping& right);
+
+/// A class and those that it derives from, nearest first, as far as type information tells.
+std::vector<const YAMLScalar*> LineageOf(const YAMLTypeInfo& type);
 
 }  // namespace vexel_yaml

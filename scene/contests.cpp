@@ -5,6 +5,7 @@
 #include <unordered_set>
 
 #include "diff/merge_tree_visitor.h"
+#include "fixups/component_dependencies.h"
 #include "fixups/engine_keys.h"
 #include "scene/holders.h"
 #include "scene/object_links.h"
@@ -25,11 +26,13 @@ struct Deeds {
   FileIDs moved_in;
   // The objects elsewhere that refer to it now.
   FileIDs referring;
+  // The components that it added, and that require what was deleted.
+  FileIDs requiring;
   // The transforms and instances that it moved out.
   FileIDs moved_out;
 
   bool IsEmpty() const {
-    return edited.empty() && additions.empty() && moved_in.empty() && referring.empty();
+    return edited.empty() && additions.empty() && moved_in.empty() && referring.empty() && requiring.empty();
   }
 };
 
@@ -61,6 +64,26 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
   return targets;
 }
 
+const YAMLTypeInfo* TypeIn(const VexelObjects& objects, const YAMLScalar* file_id) {
+  const YAMLScalar* class_id = GetMappingPath(objects, file_id, YAMLScalar::classIDPlaceHolderName);
+  return class_id == nullptr ? nullptr : GetTypeInfoManager().GetTypeInfo(class_id);
+}
+
+// The first component that a game object lists and that is of a type, null where there is none.
+const YAMLScalar* FindComponent(const VexelObjects& objects, const YAMLScalar* game_object,
+                                const YAMLScalar* type_id) {
+  const YAMLMapping* body = GetBody(objects.Get(game_object));
+  const YAMLScalar* component = nullptr;
+  if (body == nullptr) return component;
+  VisitReferences(const_cast<YAMLNode*>(body->Get(YAMLScalar::mComponent)), [&](YAMLMapping& reference) {
+    const YAMLTypeInfo* type = TypeIn(objects, GetLocalTarget(&reference));
+    if (component == nullptr && type != nullptr && std::ranges::count(LineageOf(*type), type_id) != 0) {
+      component = GetLocalTarget(&reference);
+    }
+  });
+  return component;
+}
+
 // Finds what the side that deleted nothing of it did to each thing that the other one deleted.
 class DeedSearch {
  public:
@@ -68,6 +91,7 @@ class DeedSearch {
       : base_(edits.versions.base),
         other_(edits.Version(OtherSide(deleter))),
         changes_(edits.Changes(OtherSide(deleter))),
+        kept_(edits.Version(deleter)),
         deleted_(edits.Deleted(deleter)),
         holders_(other_, Joined(changes_.added, edits.Changes(deleter).removed)) {}
 
@@ -87,6 +111,7 @@ class DeedSearch {
     for (const FileIDs* file_ids : {&changes_.changed, &changes_.added}) {
       for (const YAMLScalar* file_id : *file_ids) LookAtReferences(file_id);
     }
+    for (const YAMLScalar* file_id : changes_.added) LookAtRequirements(file_id);
     return std::move(deeds_);
   }
 
@@ -137,9 +162,23 @@ class DeedSearch {
     }
   }
 
+  void LookAtRequirements(const YAMLScalar* file_id) {
+    const YAMLTypeInfo* type = TypeIn(other_, file_id);
+    const YAMLScalar* game_object = ReadLinks(other_.Get(file_id)).owner;
+    if (type == nullptr || game_object == nullptr || Reached(file_id) != Deletions::kNone) return;
+    for (const YAMLScalar* required : type->requires_types) {
+      if (FindComponent(kept_, game_object, required) != nullptr) continue;
+      const YAMLScalar* provider = FindComponent(base_, game_object, required);
+      const size_t deletion = provider == nullptr ? Deletions::kNone : deleted_.Find(provider);
+      if (deletion != Deletions::kNone) AddOnce(deeds_[deletion].requiring, file_id);
+    }
+  }
+
   const VexelObjects& base_;
   const VexelObjects& other_;
   const SideChanges& changes_;
+  // What the side that deleted has.
+  const VexelObjects& kept_;
   const Deletions& deleted_;
   const Holders holders_;
   std::map<size_t, Deeds> deeds_;
@@ -151,12 +190,12 @@ Contest MakeDeletionContest(const SceneEdits& edits, SceneSide deleter, size_t d
   Contest contest;
   contest.path = {thing};
   FileIDs shown = Joined(edited, deeds.additions);
-  shown = Joined(Joined(shown, deeds.moved_in), deeds.referring);
+  shown = Joined(Joined(shown, deeds.moved_in), Joined(deeds.referring, deeds.requiring));
   const Operation* removal = YAMLAlloc<RemoveOperation>::create(true);
   const Operation* edit = EditsInShort(edits, OtherSide(deleter), shown);
   contest.left = deleter == SceneSide::kLeft ? removal : edit;
   contest.right = deleter == SceneSide::kLeft ? edit : removal;
-  contest.deleted = {deleter, deletion, std::move(objects), deeds.additions, deeds.moved_in};
+  contest.deleted = {deleter, deletion, std::move(objects), deeds.additions, deeds.moved_in, deeds.requiring};
   return contest;
 }
 
@@ -186,7 +225,8 @@ void AddDeletionContests(const SceneEdits& edits, SceneSide deleter, size_t dele
     });
   };
   const bool only_moved_out = !parts.empty() && deeds.additions.empty() && deeds.moved_in.empty() &&
-                              deeds.referring.empty() && std::ranges::all_of(deeds.edited, lies_in_part);
+                              deeds.referring.empty() && deeds.requiring.empty() &&
+                              std::ranges::all_of(deeds.edited, lies_in_part);
   if (!only_moved_out) {
     contests.push_back(MakeDeletionContest(edits, deleter, deletion, deleted.thing, deleted.objects, deeds,
                                            Joined(deeds.moved_out, deeds.edited)));
@@ -272,6 +312,16 @@ Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node) {
   if (!versions.base.HasKey(node)) contest.type = ConflictType::kBothAdd;
   contest.left = father_edit(versions.left);
   contest.right = father_edit(versions.right);
+  return contest;
+}
+
+Contest MakeRequirementContest(const SceneEdits& edits, SceneSide deleter, const YAMLScalar* component) {
+  const Operation* addition = EditsInShort(edits, OtherSide(deleter), {component});
+  Contest contest;
+  contest.path = {component};
+  contest.left = deleter == SceneSide::kLeft ? nullptr : addition;
+  contest.right = deleter == SceneSide::kLeft ? addition : nullptr;
+  contest.deleted = {deleter, Deletions::kNone, {}, {component}, {}, {}};
   return contest;
 }
 

@@ -46,7 +46,7 @@ struct Contest {
   /// One side deleted the thing, and the other did something to it.
   struct Deleted {
     SceneSide by;
-    /// The place in that side's deletions.
+    /// The place in that side's deletions; kNone for a component that lost what it requires.
     size_t deletion;
     /// The objects that the contest is about. Fewer than the deletion has where the other side moved a part
     /// of it out, and did nothing else to it: the rest follows.
@@ -55,6 +55,8 @@ struct Contest {
     std::vector<const YAMLScalar*> additions;
     /// The transforms and prefab instances that the other side moved below it.
     std::vector<const YAMLScalar*> moved_in;
+    /// The components that the other side added elsewhere in the same game object, and that require this one.
+    std::vector<const YAMLScalar*> requiring;
   };
   std::optional<Deleted> deleted;
 
@@ -67,9 +69,11 @@ struct Contest {
 /// Finds them, circles aside, in no particular order.
 std::vector<Contest> FindContests(const SceneEdits& edits);
 
-/// A contest about the father of a transform or prefab instance that both sides have. `others`: what the
-/// other side did where only one moved it.
+/// A contest about the father of a transform or prefab instance that both sides have.
 Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node);
+
+/// A contest about a component that one side added, and that requires what the other side deleted.
+Contest MakeRequirementContest(const SceneEdits& edits, SceneSide deleter, const YAMLScalar* component);
 
 /// Where the father of an object stands: the path of the reference.
 FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object);

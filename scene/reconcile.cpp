@@ -1,4 +1,5 @@
 #include <algorithm>
+#include <iterator>
 #include <unordered_map>
 #include <unordered_set>
 #include <utility>
@@ -27,7 +28,8 @@ bool Places(const Contest& contest, const YAMLScalar* node) {
 bool Removes(const Contest& contest, const SceneEdits& edits, const YAMLScalar* file_id) {
   if (!contest.deleted) return false;
   const Contest::Deleted& deleted = *contest.deleted;
-  return edits.Deleted(deleted.by).Find(file_id) == deleted.deletion ||
+  const size_t deletion = edits.Deleted(deleted.by).Find(file_id);
+  return (deletion != Deletions::kNone && deletion == deleted.deletion) ||
          std::ranges::find(deleted.additions, file_id) != deleted.additions.end();
 }
 
@@ -44,7 +46,7 @@ class Reconciliation {
   void Run() {
     do {
       plan_.Follow(contests_);
-    } while (FixMissingFather() || FixCircle());
+    } while (FixMissingFather() || FixCircle() || AddRequirements());
   }
 
  private:
@@ -157,6 +159,22 @@ class Reconciliation {
     return true;
   }
 
+  // A component that requires another one is contested in its turn once that is to go.
+  bool AddRequirements() {
+    std::vector<Contest> added;
+    for (const Contest& contest : contests_) {
+      if (!contest.deleted || contest.deleted->deletion == Deletions::kNone) continue;
+      for (const YAMLScalar* component : contest.deleted->requiring) {
+        if (plan_.Has(contest.path.front()) || !required_.insert(component).second) continue;
+        added.push_back(MakeRequirementContest(edits_, contest.deleted->by, component));
+        Decide(resolver_, added.back());
+      }
+    }
+    std::ranges::move(added, std::back_inserter(contests_));
+    SortContests();
+    return !added.empty();
+  }
+
   // The nodes of one circle of fathers, empty where there is none. Every node is walked over once.
   FileIDs FindCircle() const {
     std::unordered_set<const YAMLScalar*> safe;
@@ -217,6 +235,8 @@ class Reconciliation {
   ScenePlan& plan_;
   FileIDs nodes_;
   size_t circles_ = 0;
+  // The components whose requirements are contests already.
+  std::unordered_set<const YAMLScalar*> required_;
 };
 
 }  // namespace

@@ -65,7 +65,7 @@ void ScenePlan::Follow(const std::vector<Contest>& contests) {
   std::set<std::pair<SceneSide, size_t>> contested;
   std::map<std::pair<SceneSide, size_t>, std::vector<const Contest*>> deletions;
   for (const Contest& contest : contests) {
-    if (!contest.deleted) continue;
+    if (!contest.deleted || contest.deleted->deletion == Deletions::kNone) continue;
     deletions[{contest.deleted->by, contest.deleted->deletion}].push_back(&contest);
     contested.insert({contest.deleted->by, contest.deleted->deletion});
   }
