@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <map>
+#include <unordered_map>
 #include <unordered_set>
 
 #include "diff/merge_tree_visitor.h"
@@ -18,27 +19,24 @@ namespace {
 
 using FileIDs = std::vector<const YAMLScalar*>;
 
-// What the other side did to one deleted thing.
-struct Deeds {
-  // The objects in which it did it, in the order in which they were found.
-  FileIDs edited;
-  FileIDs additions;
-  FileIDs moved_in;
-  // The objects elsewhere that refer to it now.
-  FileIDs referring;
-  // The components that it added, and that require what was deleted.
-  FileIDs requiring;
-  // The transforms and instances that it moved out.
-  FileIDs moved_out;
-
-  bool IsEmpty() const {
-    return edited.empty() && additions.empty() && moved_in.empty() && referring.empty() && requiring.empty();
-  }
+// One thing that the other side did to something deleted.
+struct Deed {
+  enum class Kind : uint8_t { kEdited, kMovedOut, kAdded, kMovedIn, kRefers, kRequires };
+  Kind kind;
+  // The object in which it did it.
+  const YAMLScalar* file_id;
+  // The deleted object that this concerns.
+  const YAMLScalar* object;
 };
 
-// For objects that are gone through one after the other.
-void AddOnce(FileIDs& file_ids, const YAMLScalar* file_id) {
-  if (file_ids.empty() || file_ids.back() != file_id) file_ids.push_back(file_id);
+using Deeds = std::vector<Deed>;
+
+FileIDs ObjectsOf(const Deeds& deeds, Deed::Kind kind) {
+  FileIDs file_ids;
+  for (const Deed& deed : deeds) {
+    if (deed.kind == kind) file_ids.push_back(deed.file_id);
+  }
+  return file_ids;
 }
 
 FileIDs Joined(const FileIDs& a, const FileIDs& b) {
@@ -95,17 +93,16 @@ class DeedSearch {
         deleted_(edits.Deleted(deleter)),
         holders_(other_, Joined(changes_.added, edits.Changes(deleter).removed)) {}
 
+  // By the places of the deletions.
   std::map<size_t, Deeds> Search() {
     for (const YAMLScalar* file_id : changes_.added) {
-      const size_t deletion = Reached(file_id);
-      if (deletion != Deletions::kNone) deeds_[deletion].additions.push_back(file_id);
+      Add(Deed::Kind::kAdded, file_id, Reached(file_id));
     }
     for (const YAMLScalar* file_id : changes_.changed) {
-      const size_t deletion = deleted_.Find(file_id);
-      if (deletion == Deletions::kNone) {
+      if (deleted_.Find(file_id) == Deletions::kNone) {
         LookAtMove(file_id);
       } else {
-        LookAtEdit(file_id, deletion);
+        LookAtEdit(file_id);
       }
     }
     for (const FileIDs* file_ids : {&changes_.changed, &changes_.added}) {
@@ -116,61 +113,68 @@ class DeedSearch {
   }
 
  private:
-  // The deletion that an object is a part of or, as an addition, hangs on.
-  size_t Reached(const YAMLScalar* file_id) const {
+  // `object`: null for none.
+  void Add(Deed::Kind kind, const YAMLScalar* file_id, const YAMLScalar* object) {
+    if (object != nullptr) deeds_[deleted_.Find(object)].push_back({kind, file_id, object});
+  }
+
+  // The deleted object that an object is or, as an addition, hangs on; null for none.
+  const YAMLScalar* Reached(const YAMLScalar* file_id) const {
     std::unordered_set<const YAMLScalar*> passed;
-    for (const YAMLScalar* step = file_id; step != nullptr && passed.insert(step).second;
-         step = holders_.Get(step)) {
-      const size_t deletion = deleted_.Find(step);
-      if (deletion != Deletions::kNone) return deletion;
+    const YAMLScalar* step = file_id;
+    while (step != nullptr && deleted_.Find(step) == Deletions::kNone) {
+      step = passed.insert(step).second ? holders_.Get(step) : nullptr;
     }
-    return Deletions::kNone;
+    return step;
   }
 
   void LookAtMove(const YAMLScalar* file_id) {
     const YAMLScalar* father = FatherIn(other_, file_id);
-    if (father == nullptr || father == FatherIn(base_, file_id)) return;
-    const size_t deletion = Reached(father);
-    if (deletion != Deletions::kNone) deeds_[deletion].moved_in.push_back(file_id);
+    if (father != nullptr && father != FatherIn(base_, file_id)) {
+      Add(Deed::Kind::kMovedIn, file_id, Reached(father));
+    }
   }
 
-  void LookAtEdit(const YAMLScalar* file_id, size_t deletion) {
+  void LookAtEdit(const YAMLScalar* file_id) {
     const YAMLNode* edited = other_.Get(file_id);
     const YAMLScalar* father = FatherIn(other_, file_id);
     if (father != FatherIn(base_, file_id)) {
+      const size_t deletion = deleted_.Find(file_id);
       const YAMLScalar* thing = deleted_.Get()[deletion].thing;
       const bool is_thing = file_id == thing || ReadLinks(edited).owner == thing;
-      if (!is_thing && (father == nullptr || Reached(father) != deletion)) {
-        deeds_[deletion].moved_out.push_back(file_id);
-      } else {
-        deeds_[deletion].edited.push_back(file_id);
-      }
+      const YAMLScalar* reached = father == nullptr ? nullptr : Reached(father);
+      const bool is_inside = reached != nullptr && deleted_.Find(reached) == deletion;
+      Add(is_thing || is_inside ? Deed::Kind::kEdited : Deed::Kind::kMovedOut, file_id, file_id);
+    } else if (IsEdited(file_id, base_.Get(file_id), edited)) {
+      Add(Deed::Kind::kEdited, file_id, file_id);
     }
-    if (IsEdited(file_id, base_.Get(file_id), edited)) AddOnce(deeds_[deletion].edited, file_id);
   }
 
   void LookAtReferences(const YAMLScalar* file_id) {
     if (deleted_.Get().empty()) return;
     std::unordered_set<const YAMLScalar*> known;
     bool has_looked = false;
+    const YAMLScalar* reached = Reached(file_id);
     for (const YAMLScalar* target : OwnTargets(other_.Get(file_id))) {
       const size_t deletion = deleted_.Find(target);
-      if (deletion == Deletions::kNone || Reached(file_id) == deletion) continue;
+      if (deletion == Deletions::kNone || (reached != nullptr && deleted_.Find(reached) == deletion))
+        continue;
       if (!has_looked) known = OwnTargets(base_.Get(file_id));
       has_looked = true;
-      if (!known.contains(target)) AddOnce(deeds_[deletion].referring, file_id);
+      if (!known.contains(target)) Add(Deed::Kind::kRefers, file_id, target);
     }
   }
 
   void LookAtRequirements(const YAMLScalar* file_id) {
     const YAMLTypeInfo* type = TypeIn(other_, file_id);
     const YAMLScalar* game_object = ReadLinks(other_.Get(file_id)).owner;
-    if (type == nullptr || game_object == nullptr || Reached(file_id) != Deletions::kNone) return;
+    if (type == nullptr || game_object == nullptr || Reached(file_id) != nullptr) return;
     for (const YAMLScalar* required : type->requires_types) {
       if (FindComponent(kept_, game_object, required) != nullptr) continue;
       const YAMLScalar* provider = FindComponent(base_, game_object, required);
-      const size_t deletion = provider == nullptr ? Deletions::kNone : deleted_.Find(provider);
-      if (deletion != Deletions::kNone) AddOnce(deeds_[deletion].requiring, file_id);
+      if (provider != nullptr && deleted_.Find(provider) != Deletions::kNone) {
+        Add(Deed::Kind::kRequires, file_id, provider);
+      }
     }
   }
 
@@ -185,17 +189,21 @@ class DeedSearch {
 };
 
 Contest MakeDeletionContest(const SceneEdits& edits, SceneSide deleter, size_t deletion,
-                            const YAMLScalar* thing, FileIDs objects, const Deeds& deeds,
-                            const FileIDs& edited) {
-  Contest contest;
-  contest.path = {thing};
-  FileIDs shown = Joined(edited, deeds.additions);
-  shown = Joined(Joined(shown, deeds.moved_in), Joined(deeds.referring, deeds.requiring));
+                            const YAMLScalar* thing, FileIDs objects, const Deeds& deeds) {
+  FileIDs shown;
+  for (const Deed& deed : deeds) shown.push_back(deed.file_id);
   const Operation* removal = YAMLAlloc<RemoveOperation>::create(true);
   const Operation* edit = EditsInShort(edits, OtherSide(deleter), shown);
+  Contest contest;
+  contest.path = {thing};
   contest.left = deleter == SceneSide::kLeft ? removal : edit;
   contest.right = deleter == SceneSide::kLeft ? edit : removal;
-  contest.deleted = {deleter, deletion, std::move(objects), deeds.additions, deeds.moved_in, deeds.requiring};
+  contest.deleted = {deleter,
+                     deletion,
+                     std::move(objects),
+                     ObjectsOf(deeds, Deed::Kind::kAdded),
+                     ObjectsOf(deeds, Deed::Kind::kMovedIn),
+                     ObjectsOf(deeds, Deed::Kind::kRequires)};
   return contest;
 }
 
@@ -218,28 +226,25 @@ std::vector<std::pair<const YAMLScalar*, FileIDs>> MovedOutParts(const VexelObje
 void AddDeletionContests(const SceneEdits& edits, SceneSide deleter, size_t deletion, const Deeds& deeds,
                          std::vector<Contest>& contests) {
   const Deletion& deleted = edits.Deleted(deleter).Get()[deletion];
-  const auto parts = MovedOutParts(edits.versions.base, deeds.moved_out, deleted.objects);
-  const auto lies_in_part = [&](const YAMLScalar* file_id) {
-    return std::ranges::any_of(parts, [&](const auto& part) {
-      return std::ranges::find(part.second, file_id) != part.second.end();
-    });
-  };
-  const bool only_moved_out = !parts.empty() && deeds.additions.empty() && deeds.moved_in.empty() &&
-                              deeds.referring.empty() && deeds.requiring.empty() &&
-                              std::ranges::all_of(deeds.edited, lies_in_part);
-  if (!only_moved_out) {
-    contests.push_back(MakeDeletionContest(edits, deleter, deletion, deleted.thing, deleted.objects, deeds,
-                                           Joined(deeds.moved_out, deeds.edited)));
+  const auto parts =
+      MovedOutParts(edits.versions.base, ObjectsOf(deeds, Deed::Kind::kMovedOut), deleted.objects);
+  std::unordered_map<const YAMLScalar*, size_t> part_of;
+  for (size_t i = 0; i < parts.size(); ++i) {
+    for (const YAMLScalar* file_id : parts[i].second) part_of.emplace(file_id, i);
+  }
+  const bool is_all_in_parts =
+      std::ranges::all_of(deeds, [&](const Deed& deed) { return part_of.contains(deed.object); });
+  if (!is_all_in_parts) {
+    contests.push_back(MakeDeletionContest(edits, deleter, deletion, deleted.thing, deleted.objects, deeds));
     return;
   }
-  for (const auto& [node, objects] : parts) {
+  std::vector<Deeds> deeds_of_parts(parts.size());
+  for (const Deed& deed : deeds) deeds_of_parts[part_of.at(deed.object)].push_back(deed);
+  for (size_t i = 0; i < parts.size(); ++i) {
+    const auto& [node, objects] = parts[i];
     const YAMLScalar* owner = ReadLinks(edits.versions.base.Get(node)).owner;
-    FileIDs edited = {node};
-    for (const YAMLScalar* file_id : deeds.edited) {
-      if (std::ranges::find(objects, file_id) != objects.end()) AddOnce(edited, file_id);
-    }
     contests.push_back(MakeDeletionContest(edits, deleter, deletion, owner == nullptr ? node : owner, objects,
-                                           Deeds(), edited));
+                                           deeds_of_parts[i]));
   }
 }
 
@@ -330,7 +335,6 @@ std::vector<Contest> FindContests(const SceneEdits& edits) {
   for (const SceneSide deleter : {SceneSide::kLeft, SceneSide::kRight}) {
     if (edits.Deleted(deleter).Get().empty()) continue;
     for (const auto& [deletion, deeds] : DeedSearch(edits, deleter).Search()) {
-      if (deeds.IsEmpty() && deeds.moved_out.empty()) continue;
       AddDeletionContests(edits, deleter, deletion, deeds, contests);
     }
   }

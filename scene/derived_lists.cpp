@@ -120,16 +120,18 @@ class ListMaker {
   }
 
   ListVersions ReadVersions(const Concerned& place) const {
-    const auto& objects = plan_.GetObjects();
-    const auto planned = objects.find(place.file_id);
-    if (planned != objects.end()) {
-      const ListVersion version(plan_.Version(planned->second), place.file_id, place.key);
-      return {version, version, version};
-    }
     const SceneVersions& versions = edits_.versions;
     return {ListVersion(versions.base, place.file_id, place.key),
             ListVersion(versions.left, place.file_id, place.key),
             ListVersion(versions.right, place.file_id, place.key)};
+  }
+
+  // Where the plan takes the object from one version, its order counts alone.
+  ListVersions InPlan(const Concerned& place, const ListVersions& versions) const {
+    const auto planned = plan_.GetObjects().find(place.file_id);
+    if (planned == plan_.GetObjects().end()) return versions;
+    const ListVersion version(plan_.Version(planned->second), place.file_id, place.key);
+    return {version, version, version};
   }
 
   bool HangsAt(const YAMLScalar* file_id, const Concerned& place) const {
@@ -184,17 +186,18 @@ class ListMaker {
 
   // Nothing where the engine arrives at the same list.
   std::optional<DerivedList> MakeList(const Concerned& place) {
-    const ListVersions versions = ReadVersions(place);
+    const ListVersions all = ReadVersions(place);
+    const ListVersions versions = InPlan(place, all);
     const ObjectLinks links = ReadLinks(Somewhere(place.file_id));
     const auto& [base, left, right] = versions;
     if (links.is_stripped || (left.list == nullptr && right.list == nullptr)) return std::nullopt;
-    const FileIDs order = Ordered(place, links.body_key, versions, Members(place, versions));
+    const FileIDs order = Ordered(place, links.body_key, versions, Members(place, all));
     // (But for the brackets of an empty list, which it would keep.)
     const bool keeps_style = base.targets.empty() == order.empty();
     if (keeps_style && left.targets == base.targets && order == right.targets) return std::nullopt;
     if (keeps_style && right.targets == base.targets && order == left.targets) return std::nullopt;
     OwnedNodePtr<YAMLSequence> list(YAMLAlloc<YAMLSequence>::create(order.empty()));
-    for (const YAMLScalar* target : order) list->Append(MakeEntry(target, place.key, versions));
+    for (const YAMLScalar* target : order) list->Append(MakeEntry(target, place.key, all));
     list->RebuildHash(false);
     return DerivedList{place.file_id, links.body_key, place.key, std::move(list)};
   }

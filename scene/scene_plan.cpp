@@ -22,6 +22,18 @@ Source SourceOf(const Contest& contest) {
 
 }  // namespace
 
+ScenePlan::ScenePlan(const SceneEdits& edits) : edits_(edits) {
+  const VexelObjects& base = edits.versions.base;
+  for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
+    for (const YAMLScalar* node : edits.Changes(side).changed) {
+      const YAMLScalar* father = FatherIn(base, node);
+      const size_t deletion = father == nullptr ? Deletions::kNone : edits.Deleted(side).Find(father);
+      if (deletion == Deletions::kNone || FatherIn(edits.Version(OtherSide(side)), node) != father) continue;
+      taken_out_[{side, deletion}].push_back(node);
+    }
+  }
+}
+
 const VexelObjects& ScenePlan::Version(Source source) const {
   switch (source) {
     case Source::kLeft:
@@ -91,7 +103,7 @@ void ScenePlan::FollowUncontested(SceneSide deleter,
     if (contested.contains({deleter, i})) continue;
     for (const YAMLScalar* file_id : deletions[i].objects) {
       const bool touched = edits_.Changes(OtherSide(deleter)).Changed(file_id);
-      if (is_kept || touched) objects_[file_id] = is_kept ? SourceOf(OtherSide(deleter)) : Source::kNone;
+      if (is_kept || touched) objects_[file_id] = is_kept ? KeptSource(deleter, file_id) : Source::kNone;
     }
   }
 }
@@ -104,17 +116,36 @@ void ScenePlan::FollowRest(const std::vector<const Contest*>& parts) {
       kept_.contains({deleted.by, deleted.deletion}) ||
       std::ranges::any_of(parts, [](const Contest* part) { return SourceOf(*part) == Source::kBase; });
   for (const YAMLScalar* file_id : edits_.Deleted(deleted.by).Get()[deleted.deletion].objects) {
-    objects_[file_id] = stays ? SourceOf(OtherSide(deleted.by)) : Source::kNone;
+    objects_[file_id] = stays ? KeptSource(deleted.by, file_id) : Source::kNone;
   }
 }
 
+// Of what both sides deleted, but of which something stays, base's.
+Source ScenePlan::KeptSource(SceneSide deleter, const YAMLScalar* file_id) const {
+  const Source source = SourceOf(OtherSide(deleter));
+  return Version(source).HasKey(file_id) ? source : Source::kBase;
+}
+
 void ScenePlan::FollowDeletion(const Contest& contest) {
+  const Contest::Deleted& deleted = *contest.deleted;
   const Source source = SourceOf(contest);
-  for (const YAMLScalar* file_id : contest.deleted->objects) objects_[file_id] = source;
-  if (source == SourceOf(OtherSide(contest.deleted->by))) return;
+  for (const YAMLScalar* file_id : deleted.objects) objects_[file_id] = source;
+  PutBack(contest);
+  if (source == SourceOf(OtherSide(deleted.by))) return;
   // Without what the other side made of it.
-  for (const YAMLScalar* file_id : contest.deleted->additions) objects_[file_id] = Source::kNone;
-  for (const YAMLScalar* node : contest.deleted->moved_in) fathers_[node] = Source::kBase;
+  for (const YAMLScalar* file_id : deleted.additions) objects_[file_id] = Source::kNone;
+  for (const YAMLScalar* node : deleted.moved_in) fathers_[node] = Source::kBase;
+}
+
+// What a side took out of a thing before it deleted that belongs to it as long as the thing is there.
+void ScenePlan::PutBack(const Contest& contest) {
+  const auto taken_out = taken_out_.find({contest.deleted->by, contest.deleted->deletion});
+  if (taken_out == taken_out_.end()) return;
+  const Deletion& deletion = edits_.Deleted(taken_out->first.first).Get()[taken_out->first.second];
+  if (contest.path.front() != deletion.thing) return;
+  for (const YAMLScalar* node : taken_out->second) {
+    if (Has(FatherIn(edits_.versions.base, node))) fathers_[node] = Source::kBase;
+  }
 }
 
 }  // namespace vexel_yaml

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <map>
 #include <set>
 #include <unordered_map>
 #include <utility>
@@ -16,7 +17,7 @@ class ScenePlan {
   enum class Source : uint8_t { kNone, kBase, kLeft, kRight };
 
   /// `edits` must outlive the plan.
-  explicit ScenePlan(const SceneEdits& edits) : edits_(edits) {}
+  explicit ScenePlan(const SceneEdits& edits);
 
   /// Starts again from these choices.
   void Follow(const std::vector<Contest>& contests);
@@ -44,9 +45,14 @@ class ScenePlan {
  private:
   void FollowDeletion(const Contest& contest);
   void FollowRest(const std::vector<const Contest*>& parts);
+  Source KeptSource(SceneSide deleter, const YAMLScalar* file_id) const;
+  void PutBack(const Contest& contest);
   void FollowUncontested(SceneSide deleter, const std::set<std::pair<SceneSide, size_t>>& contested);
 
   const SceneEdits& edits_;
+  // By deletions, the transforms and prefab instances that a side took out before, and that the other side
+  // left where they are.
+  std::map<std::pair<SceneSide, size_t>, std::vector<const YAMLScalar*>> taken_out_;
   std::set<std::pair<SceneSide, size_t>> kept_;
   std::set<const YAMLScalar*> uprooted_;
   std::unordered_map<const YAMLScalar*, Source> objects_;
