@@ -144,6 +144,7 @@ class DeedSearch {
       const bool is_thing = file_id == thing || ReadLinks(edited).owner == thing;
       const YAMLScalar* reached = father == nullptr ? nullptr : Reached(father);
       const bool is_inside = reached != nullptr && deleted_.Find(reached) == deletion;
+      if (!is_inside) Add(Deed::Kind::kMovedIn, file_id, reached);
       Add(is_thing || is_inside ? Deed::Kind::kEdited : Deed::Kind::kMovedOut, file_id, file_id);
     } else if (IsEdited(file_id, base_.Get(file_id), edited)) {
       Add(Deed::Kind::kEdited, file_id, file_id);

@@ -12,16 +12,20 @@ namespace vexel_yaml {
 namespace {
 
 using FileIDs = std::vector<const YAMLScalar*>;
+using Source = ScenePlan::Source;
 
 bool IsSettled(const Contest& contest) { return contest.resolution != MergeResolve::kConflict; }
 
+// Whether a contest is about an object itself.
+bool Decides(const Contest& contest, const YAMLScalar* node) {
+  if (!contest.deleted) return contest.node == node;
+  return std::ranges::find(contest.deleted->objects, node) != contest.deleted->objects.end();
+}
+
 // Whether a contest decides where an object hangs.
 bool Places(const Contest& contest, const YAMLScalar* node) {
-  if (!contest.deleted) return contest.node == node;
-  const auto holds = [&](const FileIDs& file_ids) {
-    return std::ranges::find(file_ids, node) != file_ids.end();
-  };
-  return holds(contest.deleted->moved_in) || holds(contest.deleted->objects);
+  return Decides(contest, node) || (contest.deleted && std::ranges::find(contest.deleted->moved_in, node) !=
+                                                           contest.deleted->moved_in.end());
 }
 
 // Whether a contest decides that an object is there.
@@ -46,7 +50,7 @@ class Reconciliation {
   void Run() {
     do {
       plan_.Follow(contests_);
-    } while (FixMissingFather() || FixCircle() || AddRequirements());
+    } while (FixExcluded() || FixMissingFather() || FixCircle() || AddRequirements());
   }
 
  private:
@@ -71,10 +75,31 @@ class Reconciliation {
     });
   }
 
+  // A thing stands without what was moved below it, while another choice wants that moved.
+  bool FixExcluded() {
+    for (Contest& contest : contests_) {
+      if (!contest.deleted || SourceOf(contest) == SourceOf(OtherSide(contest.deleted->by))) continue;
+      for (const YAMLScalar* node : contest.deleted->moved_in) {
+        const YAMLScalar* wanted = FatherIn(edits_.Version(OtherSide(contest.deleted->by)), node);
+        std::vector<Contest*> concerned;
+        bool is_excluded = false;
+        for (Contest& other : contests_) {
+          const bool moves = &other != &contest && Decides(other, node) && SourceOf(other) != Source::kNone &&
+                             FatherIn(plan_.Version(SourceOf(other)), node) == wanted;
+          is_excluded |= moves;
+          if (moves || &other == &contest) concerned.push_back(&other);
+        }
+        if (is_excluded && Retreat(concerned)) return true;
+      }
+    }
+    return false;
+  }
+
   bool FixMissingFather() {
     for (const YAMLScalar* node : nodes_) {
       const YAMLScalar* father = plan_.GetFather(node);
       if (father == nullptr || !plan_.Has(node) || plan_.Has(father)) continue;
+      if (AreBothWithout(father) && plan_.Restore(father)) return true;
       std::vector<Contest*> concerned;
       for (Contest& contest : contests_) {
         if (Places(contest, node) || Removes(contest, edits_, father)) concerned.push_back(&contest);
@@ -90,6 +115,11 @@ class Reconciliation {
     return false;
   }
 
+  bool AreBothWithout(const YAMLScalar* file_id) const {
+    return edits_.Deleted(SceneSide::kLeft).Find(file_id) != Deletions::kNone &&
+           edits_.Deleted(SceneSide::kRight).Find(file_id) != Deletions::kNone;
+  }
+
   bool WasThere(const YAMLScalar* file_id) const {
     const SceneVersions& versions = edits_.versions;
     return versions.base.HasKey(file_id) || versions.left.HasKey(file_id) || versions.right.HasKey(file_id);
@@ -100,10 +130,7 @@ class Reconciliation {
     bool is_kept = false;
     for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
       const size_t deletion = edits_.Deleted(side).Find(file_id);
-      if (deletion == Deletions::kNone || edits_.Deleted(OtherSide(side)).Find(file_id) != Deletions::kNone) {
-        continue;
-      }
-      is_kept |= plan_.Keep(side, deletion);
+      if (deletion != Deletions::kNone) is_kept |= plan_.Keep(side, deletion);
     }
     return is_kept;
   }

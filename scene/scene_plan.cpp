@@ -7,20 +7,15 @@
 
 namespace vexel_yaml {
 
-namespace {
-
 using Source = ScenePlan::Source;
 
 Source SourceOf(SceneSide side) { return side == SceneSide::kLeft ? Source::kLeft : Source::kRight; }
 
-// The version that a choice takes a thing from, which one side deleted.
 Source SourceOf(const Contest& contest) {
   if (contest.side == MergeResolve::kBase) return Source::kBase;
   const SceneSide chosen = contest.side == MergeResolve::kLeft ? SceneSide::kLeft : SceneSide::kRight;
   return contest.deleted && chosen == contest.deleted->by ? Source::kNone : SourceOf(chosen);
 }
-
-}  // namespace
 
 ScenePlan::ScenePlan(const SceneEdits& edits) : edits_(edits) {
   const VexelObjects& base = edits.versions.base;
@@ -32,6 +27,18 @@ ScenePlan::ScenePlan(const SceneEdits& edits) : edits_(edits) {
       taken_out_[{side, deletion}].push_back(node);
     }
   }
+}
+
+bool ScenePlan::Restore(const YAMLScalar* transform) {
+  const VexelObjects& base = edits_.versions.base;
+  const Deletions& deleted = edits_.Deleted(SceneSide::kLeft);
+  const YAMLScalar* owner = ReadLinks(base.Get(transform)).owner;
+  if (!restored_.insert(transform).second) return false;
+  for (const YAMLScalar* file_id : deleted.Get()[deleted.Find(transform)].objects) {
+    const bool belongs = file_id == owner || ReadLinks(base.Get(file_id)).owner == owner;
+    if (owner != nullptr && belongs) restored_.insert(file_id);
+  }
+  return true;
 }
 
 const VexelObjects& ScenePlan::Version(Source source) const {
@@ -90,6 +97,7 @@ void ScenePlan::Follow(const std::vector<Contest>& contests) {
   for (const Contest& contest : contests) {
     if (!contest.deleted) fathers_[contest.node] = SourceOf(contest);
   }
+  for (const YAMLScalar* file_id : restored_) objects_[file_id] = Source::kBase;
   for (const YAMLScalar* node : uprooted_) fathers_[node] = Source::kNone;
 }
 
@@ -103,7 +111,7 @@ void ScenePlan::FollowUncontested(SceneSide deleter,
     if (contested.contains({deleter, i})) continue;
     for (const YAMLScalar* file_id : deletions[i].objects) {
       const bool touched = edits_.Changes(OtherSide(deleter)).Changed(file_id);
-      if (is_kept || touched) objects_[file_id] = is_kept ? KeptSource(deleter, file_id) : Source::kNone;
+      if (is_kept || touched) objects_[file_id] = is_kept ? SourceOf(OtherSide(deleter)) : Source::kNone;
     }
   }
 }
@@ -116,14 +124,8 @@ void ScenePlan::FollowRest(const std::vector<const Contest*>& parts) {
       kept_.contains({deleted.by, deleted.deletion}) ||
       std::ranges::any_of(parts, [](const Contest* part) { return SourceOf(*part) == Source::kBase; });
   for (const YAMLScalar* file_id : edits_.Deleted(deleted.by).Get()[deleted.deletion].objects) {
-    objects_[file_id] = stays ? KeptSource(deleted.by, file_id) : Source::kNone;
+    objects_[file_id] = stays ? SourceOf(OtherSide(deleted.by)) : Source::kNone;
   }
-}
-
-// Of what both sides deleted, but of which something stays, base's.
-Source ScenePlan::KeptSource(SceneSide deleter, const YAMLScalar* file_id) const {
-  const Source source = SourceOf(OtherSide(deleter));
-  return Version(source).HasKey(file_id) ? source : Source::kBase;
 }
 
 void ScenePlan::FollowDeletion(const Contest& contest) {

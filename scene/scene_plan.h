@@ -26,6 +26,10 @@ class ScenePlan {
   /// Returns false where that was done before.
   bool Keep(SceneSide deleter, size_t deletion) { return kept_.insert({deleter, deletion}).second; }
 
+  /// Brings the owner of a transform back that both sides deleted, with its components, because something
+  /// that stays hangs on it. From now on. Returns false where that was done before.
+  bool Restore(const YAMLScalar* transform);
+
   /// Hangs a transform or prefab instance at the top, where nothing else is left to hang it on. From now on.
   void Uproot(const YAMLScalar* node) { uprooted_.insert(node); }
 
@@ -45,7 +49,6 @@ class ScenePlan {
  private:
   void FollowDeletion(const Contest& contest);
   void FollowRest(const std::vector<const Contest*>& parts);
-  Source KeptSource(SceneSide deleter, const YAMLScalar* file_id) const;
   void PutBack(const Contest& contest);
   void FollowUncontested(SceneSide deleter, const std::set<std::pair<SceneSide, size_t>>& contested);
 
@@ -54,6 +57,7 @@ class ScenePlan {
   // left where they are.
   std::map<std::pair<SceneSide, size_t>, std::vector<const YAMLScalar*>> taken_out_;
   std::set<std::pair<SceneSide, size_t>> kept_;
+  std::set<const YAMLScalar*> restored_;
   std::set<const YAMLScalar*> uprooted_;
   std::unordered_map<const YAMLScalar*, Source> objects_;
   std::unordered_map<const YAMLScalar*, Source> fathers_;
@@ -64,6 +68,12 @@ class ScenePlan {
 /// that would form a circle. Afterwards `plan` follows them, and every object in it hangs on one that it has.
 void Reconcile(const SceneEdits& edits, const RecordingConflictResolver& resolver,
                std::vector<Contest>& contests, ScenePlan& plan);
+
+/// The version of a side.
+ScenePlan::Source SourceOf(SceneSide side);
+
+/// The version that a choice takes its thing from; kNone where the thing goes.
+ScenePlan::Source SourceOf(const Contest& contest);
 
 /// What stands at a contest: what the user chose, else what the default side says.
 void Decide(const RecordingConflictResolver& resolver, Contest& contest);
