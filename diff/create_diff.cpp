@@ -2,6 +2,7 @@
 #include <memory>
 #include <vector>
 
+#include "diff/mergeable_mapping.h"
 #include "diff/yaml_mapping_diff.h"
 #include "diff/yaml_sequence_diff.h"
 #include "rules/path_step.h"
@@ -23,17 +24,6 @@ bool IsMergeable(const FieldPath& path, const YAMLNode* node) {
 Operation* DiffScalars(const FieldPath& path, const YAMLScalar& from, const YAMLScalar& to) {
   if (AreSameScalars(path, from, to)) return nullptr;
   return YAMLAlloc<ChangeOperation>::create(&to);
-}
-
-// Whether two edits of one mapping may be merged field by field. Values written in braces, such as vectors,
-// are units unless they are references.
-bool IsMergeableMapping(const FieldPath& path, const YAMLMapping& from, const YAMLMapping& to) {
-  bool matched = false;
-  const bool by_content = YAMLSequenceRemapper::IsMergeablePath(path, &to, matched);
-  if (matched) return by_content;
-  if (const ExclusionPathInfo* rule = YAMLSequenceRemapper::FindExclusion(path)) return rule->mergeable;
-  if (!from.IsFlow() && !to.IsFlow()) return true;
-  return from.HasKey(YAMLScalar::fileID) || to.HasKey(YAMLScalar::fileID);
 }
 
 // The fields of a script object belong to its script: with another script they are other fields.

@@ -1,26 +1,12 @@
 #include <algorithm>
 
 #include "diff/yaml_mapping_diff.h"
-#include "merge/conflict_resolver.h"
+#include "merge/replaced_path.h"
 #include "yaml/yaml_alloc.h"
 
 namespace vexel_yaml {
 
 namespace {
-
-// Sets another path for its own lifetime.
-class ReplacedPath {
- public:
-  ReplacedPath(ConflictResolver& resolver, FieldPath path)
-      : resolver_(resolver), saved_(resolver.ExchangePath(std::move(path))) {}
-  ReplacedPath(const ReplacedPath&) = delete;
-  ReplacedPath& operator=(const ReplacedPath&) = delete;
-  ~ReplacedPath() { resolver_.ExchangePath(std::move(saved_)); }
-
- private:
-  ConflictResolver& resolver_;
-  FieldPath saved_;
-};
 
 const ChangeSequenceOperation* MergeKeyOrders(const ChangeSequenceOperation* left,
                                               const ChangeSequenceOperation* right,

@@ -1,6 +1,6 @@
 #include <utility>
 
-#include "rules/yaml_sequence_remapper.h"
+#include "rules/element_keys.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_mapping.h"
 
@@ -13,31 +13,21 @@ const YAMLScalar* FindScalar(const YAMLNode* node, const FieldPath& path) {
   return found == nullptr ? nullptr : found->AsScalar();
 }
 
-// Reads the elements' keys. Where the first key path leads to a file ID the element is a reference, and a
-// guid beside the file ID is part of its key: one file ID means different objects in different assets.
-class KeyReader {
- public:
-  explicit KeyReader(const std::vector<FieldPath>& key_paths) : key_paths_(key_paths) {
-    if (key_paths.empty() || key_paths[0].empty() || key_paths[0].back() != YAMLScalar::fileID) return;
-    guid_path_ = key_paths[0];
-    guid_path_.back() = YAMLScalar::guid;
-  }
-
-  // Null where the element has no key.
-  const YAMLScalar* Read(const YAMLNode* element) const {
-    auto values = YAMLSequenceRemapper::GetUniqueMappingValues(key_paths_, element);
-    if (values.empty()) return nullptr;
-    const YAMLScalar* guid = guid_path_.empty() ? nullptr : FindScalar(element, guid_path_);
-    if (guid != nullptr) values.push_back(guid);
-    return YAMLSequenceRemapper::CollapseKeyElementValues(values);
-  }
-
- private:
-  const std::vector<FieldPath>& key_paths_;
-  FieldPath guid_path_;
-};
-
 }  // namespace
+
+ElementKeyReader::ElementKeyReader(const std::vector<FieldPath>& key_paths) : key_paths_(key_paths) {
+  if (key_paths.empty() || key_paths[0].empty() || key_paths[0].back() != YAMLScalar::fileID) return;
+  guid_path_ = key_paths[0];
+  guid_path_.back() = YAMLScalar::guid;
+}
+
+const YAMLScalar* ElementKeyReader::Read(const YAMLNode* element) const {
+  auto values = YAMLSequenceRemapper::GetUniqueMappingValues(key_paths_, element);
+  if (values.empty()) return nullptr;
+  const YAMLScalar* guid = guid_path_.empty() ? nullptr : FindScalar(element, guid_path_);
+  if (guid != nullptr) values.push_back(guid);
+  return YAMLSequenceRemapper::CollapseKeyElementValues(values);
+}
 
 const YAMLNode* YAMLSequenceRemapper::GetYAMLNodeFieldByPath(const YAMLNode* node, const FieldPath& path) {
   for (const YAMLScalar* component : path) {
@@ -80,7 +70,7 @@ const YAMLScalar* YAMLSequenceRemapper::CollapseKeyElementValues(
 
 bool YAMLSequenceRemapper::FindUniqueIndexes(const std::vector<FieldPath>& key_paths,
                                              const YAMLSequence& sequence, KeyIndexes& indexes) {
-  const KeyReader reader(key_paths);
+  const ElementKeyReader reader(key_paths);
   indexes.reserve(sequence.Size());
   for (const YAMLNode* element : sequence.GetItems()) {
     const YAMLScalar* key = reader.Read(element);
@@ -114,7 +104,7 @@ YAMLSequenceRemapper* YAMLSequenceRemapper::FindMapping(const FieldPath& path, c
 YAMLSequenceRemapper* YAMLSequenceRemapper::FindIdMapping(const std::vector<FieldPath>& key_paths,
                                                           const YAMLSequence& source,
                                                           const YAMLSequence& target, bool keep_identity) {
-  const KeyReader reader(key_paths);
+  const ElementKeyReader reader(key_paths);
   KeyIndexes target_indexes;
   target_indexes.reserve(target.Size());
   for (size_t i = 0; i < target.Size(); ++i) {

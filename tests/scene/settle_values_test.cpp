@@ -1,0 +1,173 @@
+#include "scene/settle_values.h"
+
+#include <gtest/gtest.h>
+
+#include "diff/yaml_mapping_diff.h"
+#include "tests/support/yaml_text.h"
+
+namespace vexel_yaml {
+namespace {
+
+constexpr auto kBase = MergeResolve::kBase;
+constexpr auto kLeft = MergeResolve::kLeft;
+constexpr auto kRight = MergeResolve::kRight;
+
+bool IsChildren(const FieldPath& path) { return path.back()->GetText() == "m_Children"; }
+
+// One field f of one script, merged; conflicts show up behind it with the rest of their paths. A "-" stands
+// for a version without it.
+class Field {
+ public:
+  explicit Field(const std::string& rules = "") : rules_(rules) {}
+
+  std::string Merge(const std::string& base, const std::string& left, const std::string& right,
+                    MergeResolve side = kBase) const {
+    const ScopedRules rules(rules_);
+    const auto b = SceneOf(base), l = SceneOf(left), r = SceneOf(right);
+    RecordingConflictResolver resolver(side);
+    const YAMLScalar* id = YAMLScalar::one;
+    {
+      const ResolverPathStep step(resolver, id);
+      SettleValues(*b->Get(id)->AsMapping(), *l->Get(id)->AsMapping(), *r->Get(id)->AsMapping(), IsChildren,
+                   resolver);
+    }
+    YAMLMappingDiff::Merge(*YAMLMappingDiff::Diff(*b, *l), *YAMLMappingDiff::Diff(*b, *r), resolver)
+        ->Apply(*b);
+    const YAMLNode* field = b->Get(id)->AsMapping()->First()->AsMapping()->Get(YAMLScalar::Lookup("f"));
+    return (field == nullptr ? "-" : field->GetYAMLString()) + Conflicts(resolver);
+  }
+
+  // The same with the sides exchanged.
+  std::string Mirrored(const std::string& base, const std::string& left, const std::string& right,
+                       MergeResolve side = kBase) const {
+    return Merge(base, right, left, side == kLeft ? kRight : side == kRight ? kLeft : kBase);
+  }
+
+ private:
+  static std::unique_ptr<VexelObjects> SceneOf(const std::string& value) {
+    return ObjectsFromText("--- !v!114 &1\nC:\n  a: 0\n" + (value == "-" ? "" : "  f: " + value + "\n"));
+  }
+
+  static std::string Conflicts(const RecordingConflictResolver& resolver) {
+    std::string text;
+    for (const auto& record : resolver.GetRecords()) {
+      if (record.resolution == MergeResolve::kConflict) text += " !" + PathToString(record.path).substr(4);
+    }
+    return text;
+  }
+
+  const std::string rules_;
+};
+
+// Expects a result for each side that a conflict may be settled with, both ways round.
+void ExpectConflict(const Field& field, const std::string& base, const std::string& left,
+                    const std::string& right, const std::string& at, const std::string& settled_left,
+                    const std::string& settled_right, const std::string& settled_base) {
+  const std::pair<MergeResolve, std::string> cases[] = {
+      {kLeft, settled_left}, {kRight, settled_right}, {kBase, settled_base}};
+  for (const auto& [side, expected] : cases) {
+    EXPECT_EQ(field.Merge(base, left, right, side), expected + " !" + at);
+    EXPECT_EQ(field.Mirrored(base, left, right, side), expected + " !" + at);
+  }
+}
+
+TEST(SettleValues, ARemovalAgainstAnEditIsAConflict) {
+  ExpectConflict(Field(), "1", "2", "-", "f", "2", "-", "1");
+  ExpectConflict(Field(), "{fileID: 1, a: 1}", "-", "{fileID: 1, a: 2}", "f", "-", "{fileID: 1, a: 2}",
+                 "{fileID: 1, a: 1}");
+  ExpectConflict(Field(), "[1]", "[1, 2]", "-", "f", "[1, 2]", "-", "[1]");
+  ExpectConflict(Field(), "{fileID: 1}", "4", "{fileID: 2}", "f", "4", "{fileID: 2}", "{fileID: 1}");
+  EXPECT_EQ(Field().Merge("1", "-", "-"), "-");
+}
+
+TEST(SettleValues, TheSameEditIsTakenOnceAndAReorderIsNone) {
+  const Field plain("[arrays]\nplain *.C.f\n");
+  for (const Field& field : {Field(), plain}) {
+    EXPECT_EQ(field.Merge("[1]", "[1, 3]", "[1, 3]"), "[1, 3]");
+    EXPECT_EQ(field.Merge("[1, 2, 3]", "[3, 1, 2]", "[3, 1, 2]"), "[3, 1, 2]");
+    EXPECT_EQ(field.Merge("[1]", "[1, 2, 3]", "[1, 3]"), "[1, 2, 3]");
+    EXPECT_EQ(field.Merge("[{a: 1, b: 2}, 3]", "[{b: 2, a: 1}, 3]", "[{a: 1, b: 4}, 3]"),
+              "[{a: 1, b: 4}, 3]");
+    EXPECT_EQ(field.Merge("[{a: 1, b: 4}, 3]", "[{a: 1, b: 2}, 3]", "[{b: 2, a: 1}, 3, 5]"),
+              "[{a: 1, b: 2}, 3, 5]");
+  }
+  EXPECT_EQ(Field().Merge("{fileID: 1, b: 2}", "{b: 2, fileID: 1}", "{fileID: 1}"), "{fileID: 1}");
+  EXPECT_EQ(Field().Merge("{fileID: 1, b: 2}", "{b: 2, fileID: 1}", "{b: 3, fileID: 1}"),
+            "{b: 3, fileID: 1}");
+  EXPECT_EQ(Field().Merge("{fileID: 1, b: 2}", "{fileID: 4, b: 2, c: 5}", "{fileID: 4, b: 3}"),
+            "{fileID: 4, b: 3, c: 5}");
+}
+
+TEST(SettleValues, TwoAdditionsBecomeOne) {
+  const Field field;
+  EXPECT_EQ(field.Merge("-", "{fileID: 1, a: 1}", "{fileID: 1, b: 2}"), "{fileID: 1, a: 1, b: 2}");
+  const std::string a = "{fileID: 6}", b = "{fileID: 7}";
+  EXPECT_EQ(field.Merge("-", a, b), a + " !f.fileID");
+  EXPECT_EQ(field.Merge("-", a, b, kLeft), a + " !f.fileID");
+  EXPECT_EQ(field.Merge("-", a, b, kRight), b + " !f.fileID");
+  EXPECT_EQ(field.Merge("-", "{x: 1, y: 1}", "{x: 1, y: 2}", kRight), "{x: 1, y: 2} !f");
+  EXPECT_EQ(field.Merge("-", "[1, 2]", "[1, 3]"), "[1, 2] !f");
+}
+
+TEST(SettleValues, ElementsWithKeysAreMergedFieldByField) {
+  const Field field;
+  const std::string base = "[{fileID: 5, a: 1, b: 1}, {fileID: 6}, {fileID: 7}]";
+  EXPECT_EQ(field.Merge(base, "[{fileID: 6}, {fileID: 7}, {fileID: 5, a: 2, b: 1}]",
+                        "[{fileID: 5, a: 1, b: 2}, {fileID: 8}, {fileID: 7}]"),
+            "[{fileID: 7}, {fileID: 5, a: 2, b: 2}, {fileID: 8}]");
+  ExpectConflict(field, base, "[{fileID: 6}, {fileID: 7}]", "[{fileID: 5, a: 2, b: 1}, {fileID: 6}]", "f.0",
+                 "[{fileID: 6}]", "[{fileID: 5, a: 2, b: 1}, {fileID: 6}]",
+                 "[{fileID: 5, a: 1, b: 1}, {fileID: 6}]");
+  ExpectConflict(field, base, "[{fileID: 5, a: 2, b: 1}, {fileID: 6}]",
+                 "[{fileID: 5, a: 3, b: 4}, {fileID: 6}]", "f.0.a", "[{fileID: 5, a: 2, b: 4}, {fileID: 6}]",
+                 "[{fileID: 5, a: 3, b: 4}, {fileID: 6}]", "[{fileID: 5, a: 1, b: 4}, {fileID: 6}]");
+  EXPECT_EQ(
+      field.Merge("[{fileID: 5}]", "[{fileID: 6, a: 1}, {fileID: 5}]", "[{fileID: 5}, {fileID: 6, a: 2}]"),
+      "[{fileID: 6, a: 1}, {fileID: 5}] !f.+0.a");
+  EXPECT_EQ(
+      field.Merge("[{fileID: 5, l: [0, 0]}]", "[{fileID: 5, l: [0]}]", "[{fileID: 5, l: [0, 0], m: 1}]"),
+      "[{fileID: 5, l: [0], m: 1}]");
+}
+
+TEST(SettleValues, ElementsWithoutKeysAreKnownByTheirPlace) {
+  const Field field;
+  ExpectConflict(field, "[1, 2]", "[1, 3]", "[1, 4]", "f.1", "[1, 3]", "[1, 4]", "[1, 2]");
+  ExpectConflict(field, "[1, {n: 2, w: 3}, 9]", "[1, {n: 2, w: 4}, 9, 7]", "[8, 1, {n: 5, w: 3}, 9]", "f.1",
+                 "[8, 1, {n: 2, w: 4}, 9, 7]", "[8, 1, {n: 5, w: 3}, 9, 7]", "[8, 1, {n: 2, w: 3}, 9, 7]");
+  ExpectConflict(field, "[1, 2, 3]", "[1, 3]", "[1, 4, 3]", "f.1", "[1, 3]", "[1, 4, 3]", "[1, 2, 3]");
+  EXPECT_EQ(field.Merge("[1, 2, 3]", "[1, 5, 3]", "[2, 1, 3]"), "[5, 1, 3]");
+  EXPECT_EQ(field.Merge("[1, 2]", "[9, 2]", "[9, 1]"), "[9, 9]") << "right removes 2 and adds 9";
+}
+
+TEST(SettleValues, TwoReordersAreAConflictWhereTheOrderMeansSomething) {
+  ExpectConflict(Field(), "[1, 2, 3]", "[3, 1, 2]", "[2, 1, 3]", "f", "[3, 1, 2]", "[2, 1, 3]", "[1, 2, 3]");
+  EXPECT_EQ(Field().Merge("[1, 2, 3]", "[3, 1, 2]", "[1, 2, 3, 4]"), "[3, 4, 1, 2]");
+  EXPECT_EQ(Field("[arrays]\nset *.C.f k\n")
+                .Merge("[{k: 1}, {k: 2}, {k: 3}]", "[{k: 3}, {k: 1}, {k: 2}]", "[{k: 2}, {k: 1}, {k: 3}]"),
+            "[{k: 3}, {k: 1}, {k: 2}]");
+}
+
+TEST(SettleValues, WhatCantBeLinedUpIsOneConflict) {
+  const auto expect = [](const std::string& rules, const std::string& base, const std::string& left,
+                         const std::string& right) {
+    ExpectConflict(Field(rules), base, left, right, "f", left, right, base);
+  };
+  expect("[exclusions]\nexclude *.C.f\n", "[1, 2, 3]", "[2, 3]", "[1, 2]");
+  expect("", "[1, 2, 3]", "[1, 4, 5, 3]", "[1, 6, 3]");
+  expect("", "[1, 2, 3, 4]", "[1, 5, 6, 4]", "[1, 2, 7, 4]");
+  expect("", "[0, 0]", "[0]", "[0, 0, 7]");
+  expect("", "[0, 5, 0]", "[5, 0, 0]", "[0, 0]");
+}
+
+TEST(SettleValues, EqualElementsAreNoProblemWhereTheyStandStill) {
+  EXPECT_EQ(Field().Merge("[0, 0, 1]", "[7, 0, 0, 1]", "[0, 0, 1, 8]"), "[7, 0, 0, 1, 8]");
+  EXPECT_EQ(Field().Merge("[0, 0, 9, 0, 0]", "[0, 9, 0, 0]", "[0, 0, 9, 0, 5]"), "[0, 9, 0, 5]");
+  EXPECT_EQ(Field().Merge("[0, 0]", "[0, 0, 1]", "[0, 0, 2]"), "[0, 0, 1, 2]");
+  EXPECT_EQ(Field().Merge("[0, 0]", "[0]", "[0, 0]"), "[0]");
+  EXPECT_EQ(Field().Merge("[0, 0]", "[0, 0]", "[0, 0, 0]"), "[0, 0, 0]");
+  EXPECT_EQ(Field().Merge("{fileID: 1, l: [0, 0]}", "{fileID: 1, l: [0]}", "{fileID: 2, l: [0, 0]}"),
+            "{fileID: 2, l: [0]}");
+}
+
+}  // namespace
+}  // namespace vexel_yaml
