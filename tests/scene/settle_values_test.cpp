@@ -3,26 +3,24 @@
 #include <gtest/gtest.h>
 
 #include "diff/yaml_mapping_diff.h"
+#include "scene/same_fields.h"
 #include "tests/support/yaml_text.h"
 
 namespace vexel_yaml {
 namespace {
 
-constexpr auto kBase = MergeResolve::kBase;
-constexpr auto kLeft = MergeResolve::kLeft;
-constexpr auto kRight = MergeResolve::kRight;
+using enum MergeResolve;
 
 bool IsChildren(const FieldPath& path) { return path.back()->GetText() == "m_Children"; }
 
 // One field f of one script, merged; conflicts show up behind it with the rest of their paths. A "-" stands
 // for a version without it.
-class Field {
- public:
-  explicit Field(const std::string& rules = "") : rules_(rules) {}
+struct Field {
+  std::string rules;
 
   std::string Merge(const std::string& base, const std::string& left, const std::string& right,
                     MergeResolve side = kBase) const {
-    const ScopedRules rules(rules_);
+    const ScopedRules scoped(rules);
     const auto b = SceneOf(base), l = SceneOf(left), r = SceneOf(right);
     RecordingConflictResolver resolver(side);
     const YAMLScalar* id = YAMLScalar::one;
@@ -34,41 +32,29 @@ class Field {
     YAMLMappingDiff::Merge(*YAMLMappingDiff::Diff(*b, *l), *YAMLMappingDiff::Diff(*b, *r), resolver)
         ->Apply(*b);
     const YAMLNode* field = b->Get(id)->AsMapping()->First()->AsMapping()->Get(YAMLScalar::Lookup("f"));
-    return (field == nullptr ? "-" : field->GetYAMLString()) + Conflicts(resolver);
-  }
-
-  // The same with the sides exchanged.
-  std::string Mirrored(const std::string& base, const std::string& left, const std::string& right,
-                       MergeResolve side = kBase) const {
-    return Merge(base, right, left, side == kLeft ? kRight : side == kRight ? kLeft : kBase);
-  }
-
- private:
-  static std::unique_ptr<VexelObjects> SceneOf(const std::string& value) {
-    return ObjectsFromText("--- !v!114 &1\nC:\n  a: 0\n" + (value == "-" ? "" : "  f: " + value + "\n"));
-  }
-
-  static std::string Conflicts(const RecordingConflictResolver& resolver) {
-    std::string text;
+    std::string text = field == nullptr ? "-" : field->GetYAMLString();
     for (const auto& record : resolver.GetRecords()) {
-      if (record.resolution == MergeResolve::kConflict) text += " !" + PathToString(record.path).substr(4);
+      if (record.resolution == kConflict) text += " !" + PathToString(record.path).substr(4);
     }
     return text;
   }
 
-  const std::string rules_;
+  static std::unique_ptr<VexelObjects> SceneOf(const std::string& value) {
+    return ObjectsFromText("--- !v!114 &1\nC:\n  a: 0\n" + (value == "-" ? "" : "  f: " + value + "\n"));
+  }
 };
 
 // Expects a result for each side that a conflict may be settled with, both ways round.
 void ExpectConflict(const Field& field, const std::string& base, const std::string& left,
                     const std::string& right, const std::string& at, const std::string& settled_left,
                     const std::string& settled_right, const std::string& settled_base) {
-  const std::pair<MergeResolve, std::string> cases[] = {
-      {kLeft, settled_left}, {kRight, settled_right}, {kBase, settled_base}};
-  for (const auto& [side, expected] : cases) {
+  const auto expect = [&](MergeResolve side, MergeResolve mirrored, const std::string& expected) {
     EXPECT_EQ(field.Merge(base, left, right, side), expected + " !" + at);
-    EXPECT_EQ(field.Mirrored(base, left, right, side), expected + " !" + at);
-  }
+    EXPECT_EQ(field.Merge(base, right, left, mirrored), expected + " !" + at);
+  };
+  expect(kLeft, kRight, settled_left);
+  expect(kRight, kLeft, settled_right);
+  expect(kBase, kBase, settled_base);
 }
 
 TEST(SettleValues, ARemovalAgainstAnEditIsAConflict) {
@@ -77,11 +63,10 @@ TEST(SettleValues, ARemovalAgainstAnEditIsAConflict) {
                  "{fileID: 1, a: 1}");
   ExpectConflict(Field(), "[1]", "[1, 2]", "-", "f", "[1, 2]", "-", "[1]");
   ExpectConflict(Field(), "{fileID: 1}", "4", "{fileID: 2}", "f", "4", "{fileID: 2}", "{fileID: 1}");
-  EXPECT_EQ(Field().Merge("1", "-", "-"), "-");
 }
 
 TEST(SettleValues, TheSameEditIsTakenOnceAndAReorderIsNone) {
-  const Field plain("[arrays]\nplain *.C.f\n");
+  const Field plain{"[arrays]\nplain *.C.f\n"};
   for (const Field& field : {Field(), plain}) {
     EXPECT_EQ(field.Merge("[1]", "[1, 3]", "[1, 3]"), "[1, 3]");
     EXPECT_EQ(field.Merge("[1, 2, 3]", "[3, 1, 2]", "[3, 1, 2]"), "[3, 1, 2]");
@@ -91,7 +76,6 @@ TEST(SettleValues, TheSameEditIsTakenOnceAndAReorderIsNone) {
     EXPECT_EQ(field.Merge("[{a: 1, b: 4}, 3]", "[{a: 1, b: 2}, 3]", "[{b: 2, a: 1}, 3, 5]"),
               "[{a: 1, b: 2}, 3, 5]");
   }
-  EXPECT_EQ(Field().Merge("{fileID: 1, b: 2}", "{b: 2, fileID: 1}", "{fileID: 1}"), "{fileID: 1}");
   EXPECT_EQ(Field().Merge("{fileID: 1, b: 2}", "{b: 2, fileID: 1}", "{b: 3, fileID: 1}"),
             "{b: 3, fileID: 1}");
   EXPECT_EQ(Field().Merge("{fileID: 1, b: 2}", "{fileID: 4, b: 2, c: 5}", "{fileID: 4, b: 3}"),
@@ -101,10 +85,8 @@ TEST(SettleValues, TheSameEditIsTakenOnceAndAReorderIsNone) {
 TEST(SettleValues, TwoAdditionsBecomeOne) {
   const Field field;
   EXPECT_EQ(field.Merge("-", "{fileID: 1, a: 1}", "{fileID: 1, b: 2}"), "{fileID: 1, a: 1, b: 2}");
-  const std::string a = "{fileID: 6}", b = "{fileID: 7}";
-  EXPECT_EQ(field.Merge("-", a, b), a + " !f.fileID");
-  EXPECT_EQ(field.Merge("-", a, b, kLeft), a + " !f.fileID");
-  EXPECT_EQ(field.Merge("-", a, b, kRight), b + " !f.fileID");
+  EXPECT_EQ(field.Merge("-", "{fileID: 6}", "{fileID: 7}"), "{fileID: 6} !f.fileID");
+  EXPECT_EQ(field.Merge("-", "{fileID: 6}", "{fileID: 7}", kRight), "{fileID: 7} !f.fileID");
   EXPECT_EQ(field.Merge("-", "{x: 1, y: 1}", "{x: 1, y: 2}", kRight), "{x: 1, y: 2} !f");
   EXPECT_EQ(field.Merge("-", "[1, 2]", "[1, 3]"), "[1, 2] !f");
 }
@@ -142,20 +124,27 @@ TEST(SettleValues, ElementsWithoutKeysAreKnownByTheirPlace) {
 TEST(SettleValues, TwoReordersAreAConflictWhereTheOrderMeansSomething) {
   ExpectConflict(Field(), "[1, 2, 3]", "[3, 1, 2]", "[2, 1, 3]", "f", "[3, 1, 2]", "[2, 1, 3]", "[1, 2, 3]");
   EXPECT_EQ(Field().Merge("[1, 2, 3]", "[3, 1, 2]", "[1, 2, 3, 4]"), "[3, 4, 1, 2]");
-  EXPECT_EQ(Field("[arrays]\nset *.C.f k\n")
-                .Merge("[{k: 1}, {k: 2}, {k: 3}]", "[{k: 3}, {k: 1}, {k: 2}]", "[{k: 2}, {k: 1}, {k: 3}]"),
+  EXPECT_EQ(Field{"[arrays]\nset *.C.f k\n"}.Merge("[{k: 1}, {k: 2}, {k: 3}]", "[{k: 3}, {k: 1}, {k: 2}]",
+                                                   "[{k: 2}, {k: 1}, {k: 3}]"),
             "[{k: 3}, {k: 1}, {k: 2}]");
+}
+
+TEST(SettleValues, WhatOthersSettleIsLeftAlone) {
+  const auto merge = [](const std::string& base) {
+    return Field().Merge(base, "{fileID: 1, m_Children: [2]}", "{fileID: 1, m_Children: [3]}");
+  };
+  EXPECT_EQ(merge("{fileID: 1, m_Children: [1]}"), "{fileID: 1, m_Children: [2, 3]}") << "as the engine does";
+  EXPECT_EQ(merge("-"), "{fileID: 1, m_Children: [2]}");
 }
 
 TEST(SettleValues, WhatCantBeLinedUpIsOneConflict) {
   const auto expect = [](const std::string& rules, const std::string& base, const std::string& left,
                          const std::string& right) {
-    ExpectConflict(Field(rules), base, left, right, "f", left, right, base);
+    ExpectConflict(Field{rules}, base, left, right, "f", left, right, base);
   };
   expect("[exclusions]\nexclude *.C.f\n", "[1, 2, 3]", "[2, 3]", "[1, 2]");
   expect("", "[1, 2, 3]", "[1, 4, 5, 3]", "[1, 6, 3]");
   expect("", "[1, 2, 3, 4]", "[1, 5, 6, 4]", "[1, 2, 7, 4]");
-  expect("", "[0, 0]", "[0]", "[0, 0, 7]");
   expect("", "[0, 5, 0]", "[5, 0, 0]", "[0, 0]");
 }
 
@@ -164,9 +153,22 @@ TEST(SettleValues, EqualElementsAreNoProblemWhereTheyStandStill) {
   EXPECT_EQ(Field().Merge("[0, 0, 9, 0, 0]", "[0, 9, 0, 0]", "[0, 0, 9, 0, 5]"), "[0, 9, 0, 5]");
   EXPECT_EQ(Field().Merge("[0, 0]", "[0, 0, 1]", "[0, 0, 2]"), "[0, 0, 1, 2]");
   EXPECT_EQ(Field().Merge("[0, 0]", "[0]", "[0, 0]"), "[0]");
-  EXPECT_EQ(Field().Merge("[0, 0]", "[0, 0]", "[0, 0, 0]"), "[0, 0, 0]");
   EXPECT_EQ(Field().Merge("{fileID: 1, l: [0, 0]}", "{fileID: 1, l: [0]}", "{fileID: 2, l: [0, 0]}"),
             "{fileID: 2, l: [0]}");
+}
+
+TEST(HaveSameFields, OrderOfKeysAndLastDigitsAreNoEdits) {
+  const ScopedRules rules("[comparisons]\nfloat *.Transform.*.x 0.0001\nfloat *.Transform.*.*.x 0.0001\n");
+  const auto are_same = [](const char* a, const char* b) {
+    FieldPath path = PathFromText("4.Transform.m_Field");
+    return HaveSameFields(path, ValueFromText(a).get(), ValueFromText(b).get());
+  };
+  EXPECT_TRUE(are_same("{a: 1, b: {c: 2, d: 3}}", "{b: {d: 3, c: 2}, a: 1}"));
+  EXPECT_TRUE(are_same("[{x: 1, y: 2}, [2]]", "[{y: 2, x: 1.000001}, [2]]"));
+  EXPECT_FALSE(are_same("{x: 1, y: 2}", "{x: 1, y: 2.000001}"));
+  EXPECT_FALSE(are_same("{x: 1}", "{x: 1, y: 2}"));
+  EXPECT_FALSE(are_same("[1, 2]", "[2, 1]"));
+  EXPECT_FALSE(are_same("[]", "{}"));
 }
 
 }  // namespace

@@ -11,42 +11,32 @@
 namespace vexel_yaml {
 namespace {
 
-constexpr const char* kRules = R"([arrays]
-set *.GameObject.m_Component *.fileID
-set *.Transform.m_Children fileID
-plain *.GameObject.m_Tags
-[exclusions]
-exclude *.MonoBehaviour.targets
-)";
+constexpr const char* kRules =
+    "[arrays]\nset *.GameObject.m_Component *.fileID\nplain *.GameObject.m_Tags\n"
+    "[exclusions]\nexclude *.MonoBehaviour.targets\n";
 
 bool IsNobodysPlace(const FieldPath& /*path*/) { return false; }
 
-YAMLMapping* ObjectOf(VexelObjects& scene, const YAMLScalar* file_id) {
-  YAMLNode* object = scene.Get(file_id);
-  return object == nullptr ? nullptr : object->AsMapping();
-}
-
-std::unique_ptr<VexelObjects> Copy(const VexelObjects& scene) {
-  return std::unique_ptr<VexelObjects>(scene.Clone());
-}
+using Scene = std::unique_ptr<VexelObjects>;
 
 // Settles copies of three versions, object by object, and merges them.
-std::unique_ptr<VexelObjects> Merged(const VexelObjects& base, const VexelObjects& left,
-                                     const VexelObjects& right, RecordingConflictResolver& resolver) {
-  const auto b = Copy(base), l = Copy(left), r = Copy(right);
+Scene Merged(const VexelObjects& base, const VexelObjects& left, const VexelObjects& right,
+             RecordingConflictResolver& resolver) {
+  Scene b(base.Clone());
+  const Scene l(left.Clone()), r(right.Clone());
   SceneVersions versions = {*b, *l, *r};
   for (const auto& [file_id, object] : left) {
-    YAMLMapping *in_base = ObjectOf(*b, file_id), *in_right = ObjectOf(*r, file_id);
-    if (in_right == nullptr) continue;
+    if (!right.HasKey(file_id)) continue;
     const ResolverPathStep step(resolver, file_id);
-    if (in_base == nullptr) {
+    if (!base.HasKey(file_id)) {
       SettleAddedObject(versions, file_id, IsNobodysPlace, resolver);
     } else {
-      SettleValues(*in_base, *ObjectOf(*l, file_id), *in_right, IsNobodysPlace, resolver);
+      SettleValues(*b->Get(file_id)->AsMapping(), *l->Get(file_id)->AsMapping(),
+                   *r->Get(file_id)->AsMapping(), IsNobodysPlace, resolver);
     }
   }
   YAMLMappingDiff::Merge(*YAMLMappingDiff::Diff(*b, *l), *YAMLMappingDiff::Diff(*b, *r), resolver)->Apply(*b);
-  return Copy(*b);
+  return b;
 }
 
 TEST(SettlingLaws, NoEditIsLostAndEqualSidesGiveThatSide) {
@@ -58,12 +48,12 @@ TEST(SettlingLaws, NoEditIsLostAndEqualSidesGiveThatSide) {
     const SceneTriple triple = RandomTriple(seed);
     const VexelObjects &base = *triple.base, &left = *triple.left, &right = *triple.right;
     RecordingConflictResolver resolver(MergeResolve::kBase), equal(MergeResolve::kBase);
-    const auto merged = Merged(base, left, right, resolver);
+    const Scene merged = Merged(base, left, right, resolver);
     size_t excused = 0;
     EXPECT_FALSE(IsAnythingLost(base, left, right, *merged, resolver, &excused));
     EXPECT_FALSE(IsAnythingLost(base, right, left, *merged, resolver, &excused));
     EXPECT_EQ(excused, 0U);
-    const auto same = Merged(base, left, left, equal);
+    const Scene same = Merged(base, left, left, equal);
     EXPECT_FALSE(equal.HasPendingConflicts());
     EXPECT_EQ(Content(same.get()), Content(&left));
     for (const auto& [file_id, object] : left) EXPECT_TRUE(same->Get(file_id)->HasSameContent(*object));
