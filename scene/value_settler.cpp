@@ -42,9 +42,11 @@ bool AreAll(Kind kind, const ThreeValues& values) {
   return is_one(values.base) && is_one(values.left) && is_one(values.right);
 }
 
+// Where all three versions have a mapping.
 ThreeMappings MappingsAt(const ThreeMappings& versions, const YAMLScalar* key) {
-  return {*versions.base.GetRef(key).AsMapping(), *versions.left.GetRef(key).AsMapping(),
-          *versions.right.GetRef(key).AsMapping()};
+  return {static_cast<YAMLMapping&>(versions.base.GetRef(key)),
+          static_cast<YAMLMapping&>(versions.left.GetRef(key)),
+          static_cast<YAMLMapping&>(versions.right.GetRef(key))};
 }
 
 ThreeValues ValuesAt(const ThreeMappings& versions, const YAMLScalar* key) {
