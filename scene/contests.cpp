@@ -263,6 +263,13 @@ bool IsFatherContested(const SceneEdits& edits, const YAMLScalar* node) {
   return left != base && right != base;
 }
 
+bool IsOwnerContested(const SceneEdits& edits, const YAMLScalar* component) {
+  const ObjectLinks left = ReadLinks(edits.versions.left.Get(component));
+  const ObjectLinks right = ReadLinks(edits.versions.right.Get(component));
+  return !left.is_stripped && !right.is_stripped && left.body_key == right.body_key &&
+         left.owner != right.owner && left.owner != nullptr && right.owner != nullptr;
+}
+
 }  // namespace
 
 SceneEdits::SceneEdits(const SceneVersions& scene)
@@ -303,21 +310,43 @@ const Operation* EditsInShort(const SceneEdits& edits, SceneSide side, const Fil
   return MergeTreeCloneVisitor::Clone(whole);
 }
 
+namespace {
+
+// What a side did to one reference, null for nothing. A copy.
+const Operation* ReferenceEdit(FieldPath path, const YAMLNode* base, const YAMLNode* side) {
+  const Operation* operation = CreateDiffOperation(path, base, side);
+  return operation == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(operation);
+}
+
+const YAMLNode* OwnerReference(const YAMLNode* object) {
+  const YAMLMapping* body = GetBody(object);
+  return body == nullptr ? nullptr : body->Get(YAMLScalar::mGameObject);
+}
+
+}  // namespace
+
 Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node) {
   const SceneVersions& versions = edits.versions;
-  const auto father_edit = [&](const VexelObjects& side) -> const Operation* {
-    FieldPath path = FatherPath(node, side.Get(node));
-    const Operation* operation =
-        CreateDiffOperation(path, GetFatherReference(versions.base.Get(node)),
-                            GetFatherReference(const_cast<VexelObjects&>(side).Get(node)));
-    return operation == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(operation);
-  };
+  const YAMLNode* base = GetFatherReference(versions.base.Get(node));
   Contest contest;
   contest.path = FatherPath(node, versions.left.Get(node));
   contest.node = node;
   if (!versions.base.HasKey(node)) contest.type = ConflictType::kBothAdd;
-  contest.left = father_edit(versions.left);
-  contest.right = father_edit(versions.right);
+  contest.left = ReferenceEdit(contest.path, base, GetFatherReference(versions.left.Get(node)));
+  contest.right = ReferenceEdit(contest.path, base, GetFatherReference(versions.right.Get(node)));
+  return contest;
+}
+
+Contest MakeOwnerContest(const SceneEdits& edits, const YAMLScalar* component) {
+  const YAMLNode* left = edits.versions.left.Get(component);
+  const YAMLNode* right = edits.versions.right.Get(component);
+  Contest contest;
+  contest.path = {component, ReadLinks(left).body_key, YAMLScalar::mGameObject};
+  contest.type = ConflictType::kBothAdd;
+  contest.node = component;
+  contest.is_about_owner = true;
+  contest.left = ReferenceEdit(contest.path, nullptr, OwnerReference(left));
+  contest.right = ReferenceEdit(contest.path, nullptr, OwnerReference(right));
   return contest;
 }
 
@@ -346,6 +375,8 @@ std::vector<Contest> FindContests(const SceneEdits& edits) {
       if ((right.Changed(node) || right.Added(node)) && IsFatherContested(edits, node)) {
         contests.push_back(MakeFatherContest(edits, node));
       }
+      if (right.Added(node) && IsOwnerContested(edits, node))
+        contests.push_back(MakeOwnerContest(edits, node));
     }
   }
   return contests;

@@ -60,8 +60,10 @@ struct Contest {
   };
   std::optional<Deleted> deleted;
 
-  /// Else the transform or prefab instance whose father is contested.
+  /// Else the object of which it is contested where it hangs, or, of one that both sides added, what it is a
+  /// part of.
   const YAMLScalar* node = nullptr;
+  bool is_about_owner = false;
   /// Contests of one number are about one circle of fathers; 0 for none.
   size_t circle = 0;
 };
@@ -71,6 +73,9 @@ std::vector<Contest> FindContests(const SceneEdits& edits);
 
 /// A contest about the father of a transform or prefab instance that both sides have.
 Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node);
+
+/// A contest about what an object that both sides added is a part of.
+Contest MakeOwnerContest(const SceneEdits& edits, const YAMLScalar* component);
 
 /// A contest about a component that one side added, and that requires what the other side deleted.
 Contest MakeRequirementContest(const SceneEdits& edits, SceneSide deleter, const YAMLScalar* component);

@@ -92,7 +92,10 @@ class ListMaker {
     if (links.is_stripped) return;
     if (links.kind == Kind::kGameObject) At(file_id, YAMLScalar::mComponent);
     const bool is_part = links.kind == Kind::kComponent || links.kind == Kind::kTransform;
-    if (is_part && links.owner != nullptr) At(links.owner, YAMLScalar::mComponent).members.push_back(file_id);
+    if (is_part && links.owner != nullptr) {
+      At(links.owner, YAMLScalar::mComponent);
+      At(plan_.GetOwner(file_id), YAMLScalar::mComponent).members.push_back(file_id);
+    }
     if (links.kind == Kind::kTransform) {
       At(file_id, ChildrenKey());
       for (const VexelObjects* version :
@@ -136,8 +139,8 @@ class ListMaker {
 
   bool HangsAt(const YAMLScalar* file_id, const Concerned& place) const {
     if (!plan_.Has(file_id)) return false;
+    if (place.key == YAMLScalar::mComponent) return plan_.GetOwner(file_id) == place.file_id;
     const ObjectLinks links = ReadLinks(Somewhere(file_id));
-    if (place.key == YAMLScalar::mComponent) return links.owner == place.file_id;
     const YAMLScalar* father = plan_.GetFather(file_id);
     // The root of a prefab instance hangs where the instance does.
     return (links.is_stripped && father != nullptr ? plan_.GetFather(father) : father) == place.file_id;

@@ -18,7 +18,7 @@ bool IsSettled(const Contest& contest) { return contest.resolution != MergeResol
 
 // Whether a contest is about an object itself.
 bool Decides(const Contest& contest, const YAMLScalar* node) {
-  if (!contest.deleted) return contest.node == node;
+  if (!contest.deleted) return contest.node == node && !contest.is_about_owner;
   return std::ranges::find(contest.deleted->objects, node) != contest.deleted->objects.end();
 }
 

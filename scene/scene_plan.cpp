@@ -78,9 +78,20 @@ const YAMLScalar* ScenePlan::GetFather(const YAMLScalar* node) const {
   return left != FatherIn(versions.base, node) ? left : FatherIn(versions.right, node);
 }
 
+const YAMLScalar* ScenePlan::GetOwner(const YAMLScalar* file_id) const {
+  const auto owner = owners_.find(file_id);
+  if (owner != owners_.end()) return ReadLinks(Version(owner->second).Get(file_id)).owner;
+  const SceneVersions& versions = edits_.versions;
+  for (const VexelObjects* version : {&versions.base, &versions.left, &versions.right}) {
+    if (version->HasKey(file_id)) return ReadLinks(version->Get(file_id)).owner;
+  }
+  return nullptr;
+}
+
 void ScenePlan::Follow(const std::vector<Contest>& contests) {
   objects_.clear();
   fathers_.clear();
+  owners_.clear();
   std::set<std::pair<SceneSide, size_t>> contested;
   std::map<std::pair<SceneSide, size_t>, std::vector<const Contest*>> deletions;
   for (const Contest& contest : contests) {
@@ -95,7 +106,7 @@ void ScenePlan::Follow(const std::vector<Contest>& contests) {
     if (contest.deleted) FollowDeletion(contest);
   }
   for (const Contest& contest : contests) {
-    if (!contest.deleted) fathers_[contest.node] = SourceOf(contest);
+    if (!contest.deleted) (contest.is_about_owner ? owners_ : fathers_)[contest.node] = SourceOf(contest);
   }
   for (const YAMLScalar* file_id : restored_) objects_[file_id] = Source::kBase;
   for (const YAMLScalar* node : uprooted_) fathers_[node] = Source::kNone;

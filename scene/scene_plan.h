@@ -39,10 +39,16 @@ class ScenePlan {
   /// What it hangs on there; null at the top.
   const YAMLScalar* GetFather(const YAMLScalar* node) const;
 
+  /// What an object is a part of there, null for none.
+  const YAMLScalar* GetOwner(const YAMLScalar* file_id) const;
+
   /// The objects that are taken from one version, or dropped, whatever the others say.
   const std::unordered_map<const YAMLScalar*, Source>& GetObjects() const { return objects_; }
   /// The transforms and prefab instances whose father is one version's; kNone hangs them at the top.
   const std::unordered_map<const YAMLScalar*, Source>& GetFathers() const { return fathers_; }
+
+  /// The objects whose owner is one side's.
+  const std::unordered_map<const YAMLScalar*, Source>& GetOwners() const { return owners_; }
 
   const VexelObjects& Version(Source source) const;
 
@@ -61,6 +67,7 @@ class ScenePlan {
   std::set<const YAMLScalar*> uprooted_;
   std::unordered_map<const YAMLScalar*, Source> objects_;
   std::unordered_map<const YAMLScalar*, Source> fathers_;
+  std::unordered_map<const YAMLScalar*, Source> owners_;
 };
 
 /// Settles the contests among themselves: choices that exclude one another are carried out in the order of

@@ -48,6 +48,7 @@ class PlanExecution {
     CopyFathers();
     TakeObjects();
     SetFathers();
+    SetOwners();
     for (const DerivedList& list : lists) Set(list);
   }
 
@@ -90,6 +91,18 @@ class PlanExecution {
         father->CloneInto(*reference);
         version->Get(node)->RebuildHash(false);
       }
+    }
+  }
+
+  // Both sides have these objects, and base doesn't.
+  void SetOwners() {
+    for (const auto& [file_id, source] : plan_.GetOwners()) {
+      const YAMLMapping* chosen = GetBody(plan_.Version(source).Get(file_id));
+      VexelObjects& other = source == Source::kLeft ? versions_.right : versions_.left;
+      YAMLMapping* body = GetBody(other.Get(file_id));
+      if (chosen == nullptr || body == nullptr) continue;
+      SetEntry(*body, YAMLScalar::mGameObject, chosen->Get(YAMLScalar::mGameObject)->Clone());
+      other.Get(file_id)->RebuildHash(false);
     }
   }
 
