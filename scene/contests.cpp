@@ -95,8 +95,9 @@ class DeedSearch {
 
   // By the places of the deletions.
   std::map<size_t, Deeds> Search() {
+    // Of what both sides added it is contested where it hangs.
     for (const YAMLScalar* file_id : changes_.added) {
-      Add(Deed::Kind::kAdded, file_id, Reached(file_id));
+      if (!kept_.HasKey(file_id)) Add(Deed::Kind::kAdded, file_id, Reached(file_id));
     }
     for (const YAMLScalar* file_id : changes_.changed) {
       if (deleted_.Find(file_id) == Deletions::kNone) {

@@ -6,6 +6,7 @@
 #include "scene/derived_lists.h"
 #include "scene/object_links.h"
 #include "scene/scene_plan.h"
+#include "scene/settle_values.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_sequence.h"
 
@@ -148,6 +149,30 @@ void Record(std::vector<Contest>& contests, RecordingConflictResolver& resolver)
   }
 }
 
+// Each object that is in all three versions, or that both sides added. Where things hang, and the lists that
+// follow from that, are settled.
+void SettleContents(SceneVersions versions, const FileIDs& touched, RecordingConflictResolver& resolver) {
+  const HandsOff is_settled = [](const FieldPath& path) {
+    return path.back() == ChildrenKey() || path.back() == YAMLScalar::mComponent ||
+           path.back() == YAMLScalar::mFather || path.back() == YAMLScalar::mTransformParent;
+  };
+  for (const YAMLScalar* file_id : touched) {
+    YAMLNode* left = versions.left.Get(file_id);
+    YAMLNode* right = versions.right.Get(file_id);
+    if (left == nullptr || right == nullptr || left->AsMapping() == nullptr ||
+        right->AsMapping() == nullptr) {
+      continue;
+    }
+    const ResolverPathStep step(resolver, file_id);
+    YAMLNode* base = versions.base.Get(file_id);
+    if (base == nullptr) {
+      SettleAddedObject(versions, file_id, is_settled, resolver);
+    } else if (base->AsMapping() != nullptr) {
+      SettleValues(*base->AsMapping(), *left->AsMapping(), *right->AsMapping(), is_settled, resolver);
+    }
+  }
+}
+
 SettledScene WhatToCheck(const SceneEdits& edits) {
   SettledScene settled;
   std::unordered_set<const YAMLScalar*> seen;
@@ -175,12 +200,14 @@ SettledScene WhatToCheck(const SceneEdits& edits) {
 SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver) {
   const SceneEdits edits(versions);
   SettledScene settled = WhatToCheck(edits);
-  if (edits.changes[0].IsEmpty() || edits.changes[1].IsEmpty()) return settled;
-  std::vector<Contest> contests = FindContests(edits);
-  ScenePlan plan(edits);
-  Reconcile(edits, resolver, contests, plan);
-  PlanExecution(versions, plan).Execute(MakeDerivedLists(edits, plan, resolver));
-  Record(contests, resolver);
+  if (!edits.changes[0].IsEmpty() && !edits.changes[1].IsEmpty()) {
+    std::vector<Contest> contests = FindContests(edits);
+    ScenePlan plan(edits);
+    Reconcile(edits, resolver, contests, plan);
+    PlanExecution(versions, plan).Execute(MakeDerivedLists(edits, plan, resolver));
+    Record(contests, resolver);
+  }
+  SettleContents(versions, settled.touched, resolver);
   return settled;
 }
 
