@@ -1,7 +1,9 @@
 #include "scene/contests.h"
 
 #include <algorithm>
+#include <iterator>
 #include <map>
+#include <stdexcept>
 #include <unordered_map>
 #include <unordered_set>
 
@@ -158,9 +160,10 @@ class DeedSearch {
     bool has_looked = false;
     const YAMLScalar* reached = Reached(file_id);
     for (const YAMLScalar* target : OwnTargets(other_.Get(file_id))) {
-      const size_t deletion = deleted_.Find(target);
-      if (deletion == Deletions::kNone || (reached != nullptr && deleted_.Find(reached) == deletion))
-        continue;
+      if (deleted_.Find(target) == Deletions::kNone) continue;
+      // What was added to a thing comes and goes with it; a part of it may have been moved out, though.
+      const bool is_inside = reached != nullptr && deleted_.Find(reached) == deleted_.Find(target);
+      if (is_inside && reached != file_id) continue;
       if (!has_looked) known = OwnTargets(base_.Get(file_id));
       has_looked = true;
       if (!known.contains(target)) Add(Deed::Kind::kRefers, file_id, target);
@@ -225,6 +228,7 @@ std::vector<std::pair<const YAMLScalar*, FileIDs>> MovedOutParts(const VexelObje
   return outermost;
 }
 
+// A part that was moved out is contested by itself, and the rest where something was done to it.
 void AddDeletionContests(const SceneEdits& edits, SceneSide deleter, size_t deletion, const Deeds& deeds,
                          std::vector<Contest>& contests) {
   const Deletion& deleted = edits.Deleted(deleter).Get()[deletion];
@@ -234,20 +238,25 @@ void AddDeletionContests(const SceneEdits& edits, SceneSide deleter, size_t dele
   for (size_t i = 0; i < parts.size(); ++i) {
     for (const YAMLScalar* file_id : parts[i].second) part_of.emplace(file_id, i);
   }
-  const bool is_all_in_parts =
-      std::ranges::all_of(deeds, [&](const Deed& deed) { return part_of.contains(deed.object); });
-  if (!is_all_in_parts) {
-    contests.push_back(MakeDeletionContest(edits, deleter, deletion, deleted.thing, deleted.objects, deeds));
-    return;
-  }
-  std::vector<Deeds> deeds_of_parts(parts.size());
-  for (const Deed& deed : deeds) deeds_of_parts[part_of.at(deed.object)].push_back(deed);
+  const auto place_of = [&](const YAMLScalar* file_id) {
+    const auto found = part_of.find(file_id);
+    return found == part_of.end() ? parts.size() : found->second;
+  };
+  // The rest is the last one.
+  std::vector<Deeds> deeds_at(parts.size() + 1);
+  for (const Deed& deed : deeds) deeds_at[place_of(deed.object)].push_back(deed);
   for (size_t i = 0; i < parts.size(); ++i) {
     const auto& [node, objects] = parts[i];
     const YAMLScalar* owner = ReadLinks(edits.versions.base.Get(node)).owner;
-    contests.push_back(MakeDeletionContest(edits, deleter, deletion, owner == nullptr ? node : owner, objects,
-                                           deeds_of_parts[i]));
+    contests.push_back(
+        MakeDeletionContest(edits, deleter, deletion, owner == nullptr ? node : owner, objects, deeds_at[i]));
   }
+  if (deeds_at.back().empty()) return;
+  FileIDs rest;
+  std::ranges::copy_if(deleted.objects, std::back_inserter(rest),
+                       [&](const YAMLScalar* file_id) { return !part_of.contains(file_id); });
+  contests.push_back(
+      MakeDeletionContest(edits, deleter, deletion, deleted.thing, std::move(rest), deeds_at.back()));
 }
 
 bool IsFatherContested(const SceneEdits& edits, const YAMLScalar* node) {
@@ -269,6 +278,16 @@ bool IsOwnerContested(const SceneEdits& edits, const YAMLScalar* component) {
   const ObjectLinks right = ReadLinks(edits.versions.right.Get(component));
   return !left.is_stripped && !right.is_stripped && left.body_key == right.body_key &&
          left.owner != right.owner && left.owner != nullptr && right.owner != nullptr;
+}
+
+// What a side did at one place, null for nothing.
+const Operation* Edit(FieldPath path, const YAMLNode* base, const YAMLNode* side) {
+  try {
+    return CreateDiffOperation(path, base, side);
+  } catch (const std::length_error&) {
+    // A list whose elements can't be told apart is shown as a whole, with what it is a part of.
+    return YAMLAlloc<ChangeOperation>::create(side);
+  }
 }
 
 }  // namespace
@@ -302,10 +321,11 @@ FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object) {
 const Operation* EditsInShort(const SceneEdits& edits, SceneSide side, const FileIDs& objects) {
   auto* diff = YAMLAlloc<YAMLMappingDiff>::create();
   for (const YAMLScalar* file_id : objects) {
-    FieldPath path = {file_id};
-    const Operation* operation =
-        CreateDiffOperation(path, edits.versions.base.Get(file_id), edits.Version(side).Get(file_id));
-    if (operation != nullptr && !diff->HasKey(file_id)) diff->Add(file_id, operation);
+    const YAMLNode* edited = edits.Version(side).Get(file_id);
+    if (diff->HasKey(file_id)) continue;
+    if (const Operation* edit = Edit({file_id}, edits.versions.base.Get(file_id), edited)) {
+      diff->Add(file_id, edit);
+    }
   }
   const Operation* whole = YAMLAlloc<ChangeMappingOperation>::create(diff, true);
   return MergeTreeCloneVisitor::Clone(whole);
@@ -313,10 +333,10 @@ const Operation* EditsInShort(const SceneEdits& edits, SceneSide side, const Fil
 
 namespace {
 
-// What a side did to one reference, null for nothing. A copy.
-const Operation* ReferenceEdit(FieldPath path, const YAMLNode* base, const YAMLNode* side) {
-  const Operation* operation = CreateDiffOperation(path, base, side);
-  return operation == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(operation);
+// A copy.
+const Operation* ReferenceEdit(const FieldPath& path, const YAMLNode* base, const YAMLNode* side) {
+  const Operation* edit = Edit(path, base, side);
+  return edit == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(edit);
 }
 
 const YAMLNode* OwnerReference(const YAMLNode* object) {

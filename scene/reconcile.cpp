@@ -50,7 +50,7 @@ class Reconciliation {
   void Run() {
     do {
       plan_.Follow(contests_);
-    } while (FixExcluded() || FixMissingFather() || FixCircle() || AddRequirements());
+    } while (FixExcluded() || FixMissingOwner() || FixMissingFather() || FixCircle() || AddRequirements());
   }
 
  private:
@@ -111,6 +111,16 @@ class Reconciliation {
       if (Retreat(concerned)) return true;
       plan_.Uproot(node);
       return true;
+    }
+    return false;
+  }
+
+  // Of what both sides added, one of them to something that the other deleted.
+  bool FixMissingOwner() {
+    for (Contest& contest : contests_) {
+      if (!contest.is_about_owner || !plan_.Has(contest.node)) continue;
+      const YAMLScalar* owner = plan_.GetOwner(contest.node);
+      if (!plan_.Has(owner) && (KeepDeleted(owner) || Retreat({&contest}))) return true;
     }
     return false;
   }
