@@ -23,6 +23,7 @@
 #include "rules/setup.h"
 #include "rules/yaml_sequence_remapper.h"
 #include "scene/safe_merge.h"
+#include "scene/unmatched_choices.h"
 #include "yaml/write_objects.h"
 
 namespace vexel_yaml {
@@ -101,6 +102,7 @@ class MergeRun {
     SafeMergeResult result = SafeMerge(documents_, resolver_, {.threads = threads_}, timer_);
     merged_ = std::move(result.merged);
     breaks_dependency_ = result.breaks_dependency;
+    for (const std::string& line : DescribeUnmatchedChoices(resolver_, *merged_)) WriteErrorLine(line);
   }
 
   void OutputConflicts() {

@@ -51,6 +51,7 @@ def merge_commands(folder, programs, files, prefix=""):
     vexel = [programs.merge]
     made = {
         "merge": (vexel + ["merge", "-h", "--fallback", "none", *files, out], (0, 2, 3)),
+        "safe": (vexel + ["merge", "--safe", "-h", "--fallback", "none", *files, out], (0, 2, 3)),
         "strip": (vexel + ["strip", "-h", base, left, out], (0,)),
         "diff": (vexel + ["diff", "-h", base, left, out], (0,)),
         "report": ([programs.report, "-o", out, *files], (0,)),
@@ -112,6 +113,7 @@ ALL = [
     Row("merge-cpu", "the same, user and system time", ONE_PERCENT, 0.6, "merge", "git", what="cpu"),
     Row("merge-floor", "merge / text floor", ONE_PERCENT, 2.0, "merge", "text floor"),
     Row("merge-memory", "peak memory / size of the three inputs", ONE_PERCENT, 1.5, "merge", "inputs", what="memory"),
+    Row("safe", "merge --safe / merge", ONE_PERCENT, 1.3, "safe", "merge"),
     Row("strip", "strip / text floor of two files", ONE_PERCENT, 2.5, "strip", "text floor of two"),
     Row("diff", "diff / text floor of two files", ONE_PERCENT, 2.5, "diff", "text floor of two"),
     Row("report", "vexel-merge-report / merge", ONE_PERCENT, 1.5, "report", "merge"),

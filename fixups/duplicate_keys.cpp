@@ -51,12 +51,16 @@ bool ObjectHoldsDuplicateKeys(const YAMLMapping& object) {
 
 }  // namespace
 
+void ThrowDuplicateKeys(const std::string& path, const YAMLScalar* object) {
+  throw YAMLError("Cannot perform this operation on a YAML file with duplicate keys: file '" + path +
+                  "', object " + object->GetText());
+}
+
 void RefuseDuplicateKeys(const VexelObjects& objects, const std::string& path) {
   for (const YAMLScalar* file_id : objects.GetObjectsWithDuplicateKeys()) {
     const YAMLMapping* object = GetSubmapping(objects, file_id);
     if (object == nullptr || !ObjectHoldsDuplicateKeys(*object)) continue;
-    throw YAMLError("Cannot perform this operation on a YAML file with duplicate keys: file '" + path +
-                    "', object " + file_id->GetText());
+    ThrowDuplicateKeys(path, file_id);
   }
 }
 

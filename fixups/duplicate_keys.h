@@ -11,4 +11,7 @@ namespace vexel_yaml {
 /// object.
 void RefuseDuplicateKeys(const VexelObjects& objects, const std::string& path);
 
+/// Throws that YAMLError for an object.
+[[noreturn]] void ThrowDuplicateKeys(const std::string& path, const YAMLScalar* object);
+
 }  // namespace vexel_yaml

@@ -60,6 +60,25 @@ size_t RecordingConflictResolver::FindResolution(const YAMLScalar* first, const 
   return match == found->second.end() ? resolutions_.size() : *match;
 }
 
+std::vector<FieldPath> RecordingConflictResolver::FindUnmatchedPatterns() const {
+  std::vector<bool> matched(resolutions_.size(), false);
+  if (!resolutions_.empty()) {
+    for (const Record& record : records_) {
+      for (const YAMLScalar* first : {FirstOf(record.path), YAMLScalar::star}) {
+        const auto found = resolutions_by_first_.find(first);
+        if (found == resolutions_by_first_.end()) continue;
+        for (const size_t place : found->second)
+          matched[place] = matched[place] || Matches(place, record.path);
+      }
+    }
+  }
+  std::vector<FieldPath> unmatched;
+  for (size_t i = 0; i < resolutions_.size(); ++i) {
+    if (!matched[i]) unmatched.push_back(resolutions_[i].pattern);
+  }
+  return unmatched;
+}
+
 MergeResolve RecordingConflictResolver::FindResolution(const FieldPath& path) const {
   if (resolutions_.empty()) return MergeResolve::kAutomatic;
   const size_t first = std::min(FindResolution(FirstOf(path), path), FindResolution(YAMLScalar::star, path));

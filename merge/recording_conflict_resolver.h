@@ -50,6 +50,9 @@ class RecordingConflictResolver final : public ConflictResolver {
   const std::vector<Record>& GetRecords() const { return records_; }
   const std::vector<RecordResolve>& GetResolutions() const { return resolutions_; }
 
+  /// The patterns that fit no record, in their own order.
+  std::vector<FieldPath> FindUnmatchedPatterns() const;
+
   const Operation* OnValueAdded(const AddOperation* operation, ConflictType type) override;
   const Operation* OnValueChanged(const ChangeOperation* operation, ConflictType type) override;
   const Operation* OnValueRemoved(const RemoveOperation* operation, ConflictType type) override;

@@ -5,10 +5,12 @@
 #include "fixups/post_process.h"
 #include "fixups/state_machine_transitions.h"
 #include "merge/conflict_record_file.h"
+#include "platform/error_channel.h"
 #include "platform/hinted_error.h"
 #include "platform/thread.h"
 #include "rules/setup.h"
 #include "scene/safe_merge.h"
+#include "scene/unmatched_choices.h"
 
 namespace vexel_yaml {
 
@@ -45,6 +47,8 @@ Merged MergeValues(MergedFiles& files, TimerStat& timer) {
 Merged MergeScenes(MergedFiles& files, TimerStat& timer) {
   files.settled = files.read.Copy();
   SafeMergeResult result = SafeMerge(*files.settled, files.resolver, {.keep_comparable = true}, timer);
+  const std::vector<std::string> unmatched = DescribeUnmatchedChoices(files.resolver, *result.merged);
+  for (const std::string& line : unmatched) WriteErrorLine(line);
   return {std::move(result.unrepaired), std::move(result.repaired)};
 }
 

@@ -26,6 +26,7 @@ SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& 
   CheckMergedScene(settled, *result.merged, resolver);
   result.breaks_dependency = ReportBrokenDependencies(*result.merged, left, right, resolver);
   if (options.keep_comparable) result.repaired.reset(result.merged->Clone());
+  documents.repeated_keys.Restore(*result.merged);
   TransitionsToMappings(*result.merged);
   return result;
 }

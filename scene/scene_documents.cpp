@@ -1,5 +1,8 @@
 #include "scene/scene_documents.h"
 
+#include "platform/error_channel.h"
+#include "scene/damaged_side.h"
+
 namespace vexel_yaml {
 
 std::unique_ptr<SceneDocuments> SceneDocuments::Copy() const {
@@ -8,15 +11,22 @@ std::unique_ptr<SceneDocuments> SceneDocuments::Copy() const {
   left.CopyTo(copy->left);
   right.CopyTo(copy->right);
   copy->renumbered = renumbered;
+  copy->repeated_keys = repeated_keys;
   return copy;
 }
 
 void ReadScenes(const std::string& base_path, const std::string& left_path, const std::string& right_path,
                 SceneDocuments& documents, bool threads, TimerStat& timer) {
-  ReadMergeDocuments(base_path, left_path, right_path, documents, threads, timer);
+  const std::vector<FileToRead> files = {{"Read base", base_path, documents.base},
+                                         {"Read left", left_path, documents.left},
+                                         {"Read right", right_path, documents.right}};
+  ReadFiles(files, threads, timer, Losses::kRefused);
   TimerStat step(timer, "Creating mappings");
   TimerStat preprocessing(step, "Preprocess mappings");
+  documents.repeated_keys.MakeUnique(files);
   documents.renumbered = PrepareForDiff(documents.base, documents.left, documents.right);
+  documents.repeated_keys.Renumber(documents.renumbered);
+  for (const std::string& line : DescribeDamage(files)) WriteErrorLine(line);
 }
 
 }  // namespace vexel_yaml

@@ -19,9 +19,10 @@ std::string_view ScalarText(const yaml_node_t* node) {
 
 }  // namespace
 
-DocumentConverter::DocumentConverter(yaml_document_t& document, size_t first_line)
+DocumentConverter::DocumentConverter(yaml_document_t& document, size_t first_line, bool keeps_equal_pairs)
     : document_(document),
       first_line_(first_line),
+      keeps_equal_pairs_(keeps_equal_pairs),
       open_(static_cast<size_t>(document.nodes.top - document.nodes.start)) {}
 
 YAMLNode* DocumentConverter::Convert(yaml_node_t* node) {
@@ -63,7 +64,11 @@ YAMLNode* DocumentConverter::YAMLDocNodeToMapping(const yaml_node_t* node) {
     hash = YAMLNode::Combine(hash, key->GetHash());
     hash = YAMLNode::Combine(hash, value->GetHash());
     hash = YAMLNode::Combine(hash, static_cast<uint32_t>(pair - begin));
-    mapping->Append(key, value.get());
+    if (keeps_equal_pairs_) {
+      mapping->AppendRepeated(key, value.get());
+    } else {
+      mapping->Append(key, value.get());
+    }
     value.release();
   }
   found_duplicate_keys_ |= mapping->HasDuplicateKeys();

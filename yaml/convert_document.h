@@ -15,8 +15,9 @@ class DocumentConverter {
  public:
   static constexpr size_t kDeepest = 1000;
 
-  /// `first_line`: what to add to libyaml's line numbers.
-  DocumentConverter(yaml_document_t& document, size_t first_line);
+  /// `first_line`: what to add to libyaml's line numbers. `keeps_equal_pairs`: whether a pair that is
+  /// repeated with an equal value stays, as a repeated key.
+  DocumentConverter(yaml_document_t& document, size_t first_line, bool keeps_equal_pairs);
 
   /// The tree below `node`, owned by the caller. Repeated keys follow the rules of YAMLMapping; a pair whose
   /// key is no scalar is left out. Throws YAMLError "YAML alias contains itself" or
@@ -40,6 +41,7 @@ class DocumentConverter {
 
   yaml_document_t& document_;
   const size_t first_line_;
+  const bool keeps_equal_pairs_;
   // By node id: whether the node is being converted, that is, stands above the current one.
   std::vector<bool> open_;
   size_t depth_ = 0;

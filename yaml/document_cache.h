@@ -71,6 +71,12 @@ class SharedDocuments {
 /// What the readers of several versions of one asset share while they read.
 class DocumentCache {
  public:
+  /// `keeps_equal_pairs`: whether a pair that is repeated with an equal value stays, as a repeated key,
+  /// rather than being dropped.
+  explicit DocumentCache(bool keeps_equal_pairs = false) : keeps_equal_pairs_(keeps_equal_pairs) {}
+
+  bool KeepsEqualPairs() const { return keeps_equal_pairs_; }
+
   const std::shared_ptr<KeptTexts>& GetTexts() const { return texts_; }
 
   /// The shared documents, which are those of the first reader that asks, and whose text must be kept. Null
@@ -82,6 +88,7 @@ class DocumentCache {
   size_t Enter() { return readers_.fetch_add(1); }
 
  private:
+  const bool keeps_equal_pairs_;
   std::shared_ptr<KeptTexts> texts_ = std::make_shared<KeptTexts>();
   std::atomic<size_t> readers_ = 0;
   Mutex mutex_;

@@ -105,11 +105,10 @@ void RefusePseudoKeys(const YAMLMapping& object) {
   for (const YAMLMapping::Slot& slot : object) refuse(slot);
 }
 
-void Convert(LoadedDocument& document, size_t dropped_lines, std::string_view first_line, bool stripped,
-             ReadObject& result) {
+void Convert(LoadedDocument& document, DocumentConverter converter, std::string_view first_line,
+             bool stripped, ReadObject& result) {
   const yaml_node_t* root = document.GetRoot();
   if (root->type != YAML_MAPPING_NODE) throw YAMLError("The object is not a mapping");
-  DocumentConverter converter(document.Get(), dropped_lines);
   result.object = converter.Convert(document.GetRoot())->AsMapping();
   result.holds_duplicate_keys = converter.FoundDuplicateKeys();
   RefusePseudoKeys(*result.object);
@@ -133,8 +132,8 @@ size_t CountLines(std::string_view text) { return static_cast<size_t>(std::range
 
 // Only what libyaml needs, and little of it: it gets the directives again with every document, and a header
 // of some megabytes before a million small ones would take hours.
-DocumentReader::DocumentReader(std::string_view header, const char* first_line)
-    : file_begin_(first_line), counted_to_(first_line) {
+DocumentReader::DocumentReader(std::string_view header, const char* first_line, bool keeps_equal_pairs)
+    : file_begin_(first_line), counted_to_(first_line), keeps_equal_pairs_(keeps_equal_pairs) {
   constexpr size_t kMostDirectives = 1024;
   for (size_t begin = 0; begin < header.size();) {
     const size_t line_end = header.find('\n', begin);
@@ -178,7 +177,8 @@ bool DocumentReader::ReadChunk(bool last, bool stripped, ReadObject& result, siz
   try {
     if (!loaded.Load(chunk_)) return false;
     loaded.CheckEnd(last);
-    Convert(loaded, dropped_lines_, FirstLine(), stripped, result);
+    Convert(loaded, DocumentConverter(loaded.Get(), dropped_lines_, keeps_equal_pairs_), FirstLine(),
+            stripped, result);
   } catch (const YAMLError&) {
     problem_line = loaded.GetProblemLine();
     throw;

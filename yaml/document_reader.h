@@ -25,9 +25,9 @@ struct ReadObject {
 class DocumentReader {
  public:
   /// The directives of `header` stand in front of every document. Lines are counted from `first_line`, where
-  /// the file begins.
+  /// the file begins. `keeps_equal_pairs` is for the converter.
   /// Throws YAMLError "YAML directives are longer than 1024 bytes".
-  DocumentReader(std::string_view header, const char* first_line);
+  DocumentReader(std::string_view header, const char* first_line, bool keeps_equal_pairs);
 
   /// Reads one document of the file. `last`: no other follows in it. Returns false when libyaml can't start.
   /// Throws std::bad_alloc, and YAMLError with the 1-based line and the object in its hint.
@@ -43,6 +43,7 @@ class DocumentReader {
   const char* file_begin_;
   const char* counted_to_;
   size_t counted_lines_ = 0;
+  const bool keeps_equal_pairs_;
   std::string directives_;
   // Of the header: how many there are in the directives, and how many were left out.
   size_t kept_lines_ = 0;

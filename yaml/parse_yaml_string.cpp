@@ -17,8 +17,8 @@ class FileReader {
  public:
   const AssetText& GetText() const { return text_; }
 
-  explicit FileReader(std::string_view file)
-      : text_(file), documents_(text_.GetHeader(), file.data()), objects_(Count()) {}
+  explicit FileReader(std::string_view file, bool keeps_equal_pairs = false)
+      : text_(file), documents_(text_.GetHeader(), file.data(), keeps_equal_pairs), objects_(Count()) {}
 
   bool ReadAll() {
     for (size_t i = 0; i < Count(); ++i) {
@@ -134,9 +134,10 @@ bool ParseYAMLString(std::string_view text, VexelObjects& objects) {
 bool ParseYAMLText(FileText text, VexelObjects& objects, DocumentCache& cache) {
   KeptTexts& texts = *cache.GetTexts();
   objects.KeepTexts(cache.GetTexts());
+  objects.SetEndsInLineBreak(text.View().ends_with('\n'));
   const size_t reader = cache.Enter();
   const std::string_view view = text.View();
-  FileReader file(view);
+  FileReader file(view, cache.KeepsEqualPairs());
   bool is_first = false;
   SharedDocuments* shared = cache.Share(file.GetText().GetHeader(), file.GetText().GetDocuments(), is_first);
   // The others look at it while this one reads.

@@ -32,15 +32,21 @@ void ReadOnThreads(const std::vector<FileToRead>& files, DocumentCache& cache, T
 
 }  // namespace
 
-void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer) {
-  DocumentCache cache;
+void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer, Losses losses) {
+  DocumentCache cache(losses == Losses::kRefused);
   if (threads) {
     ReadOnThreads(files, cache, timer);
   } else {
     for (const FileToRead& file : files) ReadingThreadFunction(file, cache, timer);
   }
   // Not before: the order of the lines must not depend on which thread was faster.
-  for (const FileToRead& file : files) ReportSkippedKeys(file.path, file.objects);
+  for (const FileToRead& file : files) {
+    if (losses == Losses::kRefused) {
+      RefuseSkippedKeys(file.path, file.objects);
+    } else {
+      ReportSkippedKeys(file.path, file.objects);
+    }
+  }
 }
 
 }  // namespace vexel_yaml

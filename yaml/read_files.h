@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -15,9 +16,14 @@ struct FileToRead {
   VexelObjects& objects;
 };
 
+/// What becomes of what mappings can't hold. Reported: keys that are no scalars are left out, with a line on
+/// standard error for each, and so are pairs that are repeated with equal values. Refused: a key that is no
+/// scalar makes a YAMLError that names file and object, and equal pairs stay, as repeated keys.
+enum class Losses : uint8_t { kReported, kRefused };
+
 /// Reads the files, each on a thread of its own if `threads`. Where several fail, the first one's exception
-/// is thrown, after all have ended. Keys that had to be left out are reported, a line each, on standard
-/// error.
-void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer);
+/// is thrown, after all have ended.
+void ReadFiles(const std::vector<FileToRead>& files, bool threads, TimerStat& timer,
+               Losses losses = Losses::kReported);
 
 }  // namespace vexel_yaml

@@ -57,4 +57,11 @@ void ReportSkippedKeys(const std::string& path, const VexelObjects& objects) {
   }
 }
 
+void RefuseSkippedKeys(const std::string& path, const VexelObjects& objects) {
+  if (objects.GetSkippedKeys().empty()) return;
+  const VexelObjects::SkippedKey& key = objects.GetSkippedKeys().front();
+  throw YAMLError("A key is not a scalar: file '" + path + "', object " + key.file_id->GetText(),
+                  "see line " + std::to_string(key.line));
+}
+
 }  // namespace vexel_yaml

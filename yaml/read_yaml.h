@@ -29,4 +29,7 @@ void ReadYAMLPath(const std::string& path, VexelObjects& objects, DocumentCache*
 /// Reports the keys of a file that had to be left out, a line each, on standard error.
 void ReportSkippedKeys(const std::string& path, const VexelObjects& objects);
 
+/// Throws YAMLError for the first of them, with its line in the hint.
+void RefuseSkippedKeys(const std::string& path, const VexelObjects& objects);
+
 }  // namespace vexel_yaml

@@ -44,6 +44,10 @@ class VexelObjects final : public YAMLMapping {
     objects_with_duplicate_keys_.push_back(file_id);
   }
 
+  /// Whether the file's last line had an end. Only known of files that were read with a cache.
+  bool EndsInLineBreak() const { return ends_in_line_break_; }
+  void SetEndsInLineBreak(bool ends) { ends_in_line_break_ = ends; }
+
   /// Whether an object's header line must be one that can be read again. Where both sides changed it, a
   /// version for a text merge tool has it blanked.
   enum class Headers : uint8_t { kComplete, kAsTheyAre };
@@ -74,6 +78,7 @@ class VexelObjects final : public YAMLMapping {
   std::string tag_prefix_ = "tag:vexel.com,2011:";
   std::vector<SkippedKey> skipped_keys_;
   std::vector<const YAMLScalar*> objects_with_duplicate_keys_;
+  bool ends_in_line_break_ = true;
 };
 
 }  // namespace vexel_yaml

@@ -99,9 +99,21 @@ void YAMLMapping::Append(const YAMLScalar* key, YAMLNode* value) {
   const size_t present = FindSlot(key);
   if (present == kNotFound) {
     AddSlot(key, value);
-    return;
+  } else if (!slots_[present].value->EqualsByContent(value)) {
+    StartDuplicates(key, value);
   }
-  if (slots_[present].value->EqualsByContent(value)) return;
+}
+
+void YAMLMapping::AppendRepeated(const YAMLScalar* key, YAMLNode* value) {
+  Unfold();
+  if (!duplicates_ && FindSlot(key) != kNotFound) {
+    StartDuplicates(key, value);
+  } else {
+    Append(key, value);
+  }
+}
+
+void YAMLMapping::StartDuplicates(const YAMLScalar* key, YAMLNode* value) {
   CloseGaps();
   auto duplicates = std::make_unique<std::vector<Slot>>();
   duplicates->reserve(slots_.size() + 1);
@@ -260,6 +272,14 @@ void YAMLMapping::CloneInto(YAMLMapping& target) const {
     target.slots_.push_back({slot.key, slot.value->AsScalar() ? slot.value : slot.value->Clone()});
   }
   target.BuildIndex();
+}
+
+std::vector<YAMLMapping::Slot> YAMLMapping::TakePairs() {
+  Unfold();
+  CloseGaps();
+  std::vector<Slot> pairs = duplicates_ ? std::move(*duplicates_) : std::move(slots_);
+  ForgetPairs();
+  return pairs;
 }
 
 void YAMLMapping::ForgetPairs() {

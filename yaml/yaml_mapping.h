@@ -75,6 +75,9 @@ class YAMLMapping : public YAMLNode {
   /// where memory ran out the mapping is as it was.
   void Append(const YAMLScalar* key, YAMLNode* value);
 
+  /// The same, but a pair whose key is present starts duplicate-key mode whatever its value.
+  void AppendRepeated(const YAMLScalar* key, YAMLNode* value);
+
   /// Keyed. Adds a pair at the end. Throws "Cannot add existing key in YAMLMapping".
   void Insert(const YAMLScalar* key, YAMLNode* value);
 
@@ -124,6 +127,10 @@ class YAMLMapping : public YAMLNode {
   /// Frees every value. Duplicate-key mode stays.
   void Clear();
 
+  /// Takes all pairs out, in order, and returns them with their values to the caller; works in duplicate-key
+  /// mode and ends it.
+  std::vector<Slot> TakePairs();
+
   /// Empties the mapping without freeing any value: for one that only showed values of others.
   void ForgetPairs();
 
@@ -149,6 +156,7 @@ class YAMLMapping : public YAMLNode {
   YAMLNode* Find(const YAMLScalar* key) const;
   size_t FindSlot(const YAMLScalar* key) const;
   void AddSlot(const YAMLScalar* key, YAMLNode* value);
+  void StartDuplicates(const YAMLScalar* key, YAMLNode* value);
   void IndexSlot(size_t slot);
   void CloseGaps();
   void BuildIndex();
