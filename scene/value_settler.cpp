@@ -60,6 +60,18 @@ std::vector<const YAMLScalar*> KeysOf(const YAMLMapping& mapping) {
   return keys;
 }
 
+// Puts the keys that stand in base into its order. Others keep their places.
+void PutIntoOrder(const std::vector<const YAMLScalar*>& base, std::vector<const YAMLScalar*>& keys) {
+  const std::unordered_set<const YAMLScalar*> all(keys.begin(), keys.end());
+  const std::unordered_set<const YAMLScalar*> in_base(base.begin(), base.end());
+  auto next = base.begin();
+  for (const YAMLScalar*& key : keys) {
+    if (!in_base.contains(key)) continue;
+    while (!all.contains(*next)) ++next;
+    key = *next++;
+  }
+}
+
 }  // namespace
 
 bool ValueSettler::AreSame(const YAMLNode* a, const YAMLNode* b) { return HaveSameFields(path_, a, b); }
@@ -76,15 +88,22 @@ MergeResolve ValueSettler::Decide(ConflictType type, const ThreeValues& values) 
 }
 
 void ValueSettler::SettleEntries(const ThreeMappings& versions) {
-  const ThreeOrders<const YAMLScalar*> orders = {KeysOf(versions.base), KeysOf(versions.left),
-                                                 KeysOf(versions.right)};
+  ThreeOrders<const YAMLScalar*> orders = {KeysOf(versions.base), KeysOf(versions.left),
+                                           KeysOf(versions.right)};
+  const bool is_everywhere_same = orders.base == orders.left && orders.base == orders.right;
+  // Another order is no edit: where the other side did something, it is not taken.
+  if (!is_everywhere_same && orders.left != orders.right && !AreEqual(&versions.base, &versions.left) &&
+      !AreEqual(&versions.base, &versions.right)) {
+    PutIntoOrder(orders.base, orders.left);
+    PutIntoOrder(orders.base, orders.right);
+  }
   std::unordered_set<const YAMLScalar*> settled;
   for (const auto* keys : {&orders.base, &orders.left, &orders.right}) {
     for (const YAMLScalar* key : *keys) {
       if (settled.insert(key).second) SettleEntry(versions, key);
     }
   }
-  if (orders.base == orders.left && orders.base == orders.right) return;
+  if (is_everywhere_same) return;
   const auto order = MergeOrder(orders, settled, MergeResolve::kLeft).order;
   for (YAMLMapping* version : {&versions.base, &versions.left, &versions.right}) version->Reorder(order);
 }
