@@ -12,7 +12,7 @@ SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& 
   SettledScene settled;
   {
     TimerStat step(timer, "Settling the scene");
-    settled = SettleScene({base, left, right}, resolver);
+    settled = SettleScene({base, left, right}, resolver, options.threads);
   }
   DiffPair diffs;
   {

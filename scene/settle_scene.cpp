@@ -3,6 +3,7 @@
 #include <iostream>
 #include <unordered_map>
 
+#include "platform/thread.h"
 #include "scene/derived_lists.h"
 #include "scene/object_links.h"
 #include "scene/scene_plan.h"
@@ -173,7 +174,7 @@ void SettleContents(SceneVersions versions, const FileIDs& touched, RecordingCon
   }
 }
 
-SettledScene WhatToCheck(const SceneEdits& edits) {
+SettledScene WhatToCheck(const SceneEdits& edits, bool threads) {
   SettledScene settled;
   std::unordered_set<const YAMLScalar*> seen;
   const auto add = [&](const FileIDs& file_ids, bool is_vanishing) {
@@ -188,18 +189,29 @@ SettledScene WhatToCheck(const SceneEdits& edits) {
     add(changes.added, true);
   }
   const SceneVersions& versions = edits.versions;
-  for (const VexelObjects* version : {&versions.base, &versions.left, &versions.right}) {
+  std::vector<SceneFault> in_left;
+  const auto check_left = [&] { in_left = CheckScene(versions.left, settled.touched); };
+  Thread thread;
+  if (threads) {
+    thread.Start(check_left);
+  } else {
+    check_left();
+  }
+  for (const VexelObjects* version : {&versions.base, &versions.right}) {
     for (SceneFault& fault : CheckScene(*version, settled.touched))
       settled.known_faults.insert(std::move(fault));
   }
+  if (threads) thread.Join();
+  thread.CheckForExceptions();
+  for (SceneFault& fault : in_left) settled.known_faults.insert(std::move(fault));
   return settled;
 }
 
 }  // namespace
 
-SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver) {
+SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver, bool threads) {
   const SceneEdits edits(versions);
-  SettledScene settled = WhatToCheck(edits);
+  SettledScene settled = WhatToCheck(edits, threads);
   if (!edits.changes[0].IsEmpty() && !edits.changes[1].IsEmpty()) {
     std::vector<Contest> contests = FindContests(edits);
     ScenePlan plan(edits);

@@ -23,8 +23,9 @@ struct SettledScene {
 /// Settles whatever the engine can't decide place by place: what happens to things that one side deleted and
 /// the other edited, where objects hang, the lists that follow from that, and values that both sides edited.
 /// Conflicts are recorded; what is decided stands in all three versions alike afterwards. A choice that can't
-/// be carried out is pending again, and a line on standard error says why.
-SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver);
+/// be carried out is pending again, and a line on standard error says why. `threads`: looks at the versions
+/// side by side.
+SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver, bool threads);
 
 /// Repairs what the merge broke in a merged scene and has one repair, and records everything else as pending,
 /// with a line on standard error that says what is broken.
