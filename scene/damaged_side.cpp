@@ -22,13 +22,17 @@ struct Side {
 size_t CountMissing(const VexelObjects& base, const VexelObjects& side) {
   size_t missing = 0;
   auto next = side.begin();
+  const auto stands_next = [&](const YAMLScalar* key) { return next != side.end() && (*next).key == key; };
   for (const Slot& slot : base) {
-    // Mostly the objects stand in one order.
-    if (next != side.end() && (*next).key == slot.key) {
-      ++next;
-    } else if (!side.HasKey(slot.key)) {
-      ++missing;
+    // Mostly the objects stand in one order, and new ones here and there.
+    if (!stands_next(slot.key)) {
+      if (!side.HasKey(slot.key)) {
+        ++missing;
+        continue;
+      }
+      while (next != side.end() && !base.HasKey((*next).key)) ++next;
     }
+    if (stands_next(slot.key)) ++next;
   }
   return missing;
 }
