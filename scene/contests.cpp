@@ -280,7 +280,6 @@ bool IsOwnerContested(const SceneEdits& edits, const YAMLScalar* component) {
          left.owner != right.owner && left.owner != nullptr && right.owner != nullptr;
 }
 
-// What a side did at one place, null for nothing.
 const Operation* Edit(FieldPath path, const YAMLNode* base, const YAMLNode* side) {
   try {
     return CreateDiffOperation(path, base, side);
@@ -288,6 +287,12 @@ const Operation* Edit(FieldPath path, const YAMLNode* base, const YAMLNode* side
     // A list whose elements can't be told apart is shown as a whole, with what it is a part of.
     return YAMLAlloc<ChangeOperation>::create(side);
   }
+}
+
+// What a side did at one place, null for nothing. A copy, since what stands there may change.
+const Operation* CopyOfEdit(const FieldPath& path, const YAMLNode* base, const YAMLNode* side) {
+  const Operation* edit = Edit(path, base, side);
+  return edit == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(edit);
 }
 
 }  // namespace
@@ -318,26 +323,20 @@ FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object) {
   return path;
 }
 
+const Operation* EditInShort(const SceneEdits& edits, SceneSide side, const YAMLScalar* file_id) {
+  return CopyOfEdit({file_id}, edits.versions.base.Get(file_id), edits.Version(side).Get(file_id));
+}
+
 const Operation* EditsInShort(const SceneEdits& edits, SceneSide side, const FileIDs& objects) {
   auto* diff = YAMLAlloc<YAMLMappingDiff>::create();
   for (const YAMLScalar* file_id : objects) {
-    const YAMLNode* edited = edits.Version(side).Get(file_id);
     if (diff->HasKey(file_id)) continue;
-    if (const Operation* edit = Edit({file_id}, edits.versions.base.Get(file_id), edited)) {
-      diff->Add(file_id, edit);
-    }
+    if (const Operation* edit = EditInShort(edits, side, file_id)) diff->Add(file_id, edit);
   }
-  const Operation* whole = YAMLAlloc<ChangeMappingOperation>::create(diff, true);
-  return MergeTreeCloneVisitor::Clone(whole);
+  return YAMLAlloc<ChangeMappingOperation>::create(diff, true);
 }
 
 namespace {
-
-// A copy.
-const Operation* ReferenceEdit(const FieldPath& path, const YAMLNode* base, const YAMLNode* side) {
-  const Operation* edit = Edit(path, base, side);
-  return edit == nullptr ? nullptr : MergeTreeCloneVisitor::Clone(edit);
-}
 
 const YAMLNode* OwnerReference(const YAMLNode* object) {
   const YAMLMapping* body = GetBody(object);
@@ -353,8 +352,8 @@ Contest MakeFatherContest(const SceneEdits& edits, const YAMLScalar* node) {
   contest.path = FatherPath(node, versions.left.Get(node));
   contest.node = node;
   if (!versions.base.HasKey(node)) contest.type = ConflictType::kBothAdd;
-  contest.left = ReferenceEdit(contest.path, base, GetFatherReference(versions.left.Get(node)));
-  contest.right = ReferenceEdit(contest.path, base, GetFatherReference(versions.right.Get(node)));
+  contest.left = CopyOfEdit(contest.path, base, GetFatherReference(versions.left.Get(node)));
+  contest.right = CopyOfEdit(contest.path, base, GetFatherReference(versions.right.Get(node)));
   return contest;
 }
 
@@ -366,8 +365,8 @@ Contest MakeOwnerContest(const SceneEdits& edits, const YAMLScalar* component) {
   contest.type = ConflictType::kBothAdd;
   contest.node = component;
   contest.is_about_owner = true;
-  contest.left = ReferenceEdit(contest.path, nullptr, OwnerReference(left));
-  contest.right = ReferenceEdit(contest.path, nullptr, OwnerReference(right));
+  contest.left = CopyOfEdit(contest.path, nullptr, OwnerReference(left));
+  contest.right = CopyOfEdit(contest.path, nullptr, OwnerReference(right));
   return contest;
 }
 

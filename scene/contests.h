@@ -86,7 +86,10 @@ FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object);
 /// The father of an object in one version, null at the top and for an object that the version lacks.
 const YAMLScalar* FatherIn(const VexelObjects& objects, const YAMLScalar* node);
 
-/// What one side did to some objects, as one operation on the file. A copy.
+/// What one side did to an object, null for nothing. A copy.
+const Operation* EditInShort(const SceneEdits& edits, SceneSide side, const YAMLScalar* file_id);
+
+/// The same for some objects, as one operation on the file.
 const Operation* EditsInShort(const SceneEdits& edits, SceneSide side,
                               const std::vector<const YAMLScalar*>& objects);
 

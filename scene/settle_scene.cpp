@@ -140,7 +140,37 @@ class PlanExecution {
   std::unordered_map<const YAMLScalar*, OwnedNodePtr<YAMLMapping>> fathers_;
 };
 
-void Record(std::vector<Contest>& contests, RecordingConflictResolver& resolver) {
+using Records = std::vector<RecordingConflictResolver::Record>;
+
+// What the plan takes or drops together with the things that are contested, so that people can be told. To be
+// made before the versions change.
+Records WhatGoesAlong(const SceneEdits& edits, const ScenePlan& plan, const std::vector<Contest>& contests) {
+  std::unordered_set<const YAMLScalar*> recorded;
+  for (const Contest& contest : contests) recorded.insert(contest.path.front());
+  Records records;
+  const auto look_at = [&](const YAMLScalar* file_id, SceneSide deleter) {
+    const auto planned = plan.GetObjects().find(file_id);
+    if (planned == plan.GetObjects().end() || !recorded.insert(file_id).second) return;
+    const bool is_left = deleter == SceneSide::kLeft;
+    if (planned->second == Source::kNone) {
+      const ConflictType removal = is_left ? ConflictType::kLeftRemoves : ConflictType::kRightRemoves;
+      records.push_back({{file_id}, removal, MergeResolve::kAutomatic, nullptr, nullptr});
+    } else if (planned->second == SourceOf(OtherSide(deleter)) &&
+               edits.Changes(OtherSide(deleter)).Changed(file_id)) {
+      const Operation* edit = EditInShort(edits, OtherSide(deleter), file_id);
+      const ConflictType change = is_left ? ConflictType::kRightChanges : ConflictType::kLeftChanges;
+      records.push_back(
+          {{file_id}, change, MergeResolve::kAutomatic, is_left ? nullptr : edit, is_left ? edit : nullptr});
+    }
+  };
+  for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
+    for (const YAMLScalar* file_id : edits.Changes(side).removed) look_at(file_id, side);
+    for (const YAMLScalar* file_id : edits.Changes(side).added) look_at(file_id, OtherSide(side));
+  }
+  return records;
+}
+
+void Record(std::vector<Contest>& contests, const Records& along, RecordingConflictResolver& resolver) {
   for (Contest& contest : contests) {
     if (!contest.reason.empty()) {
       std::cerr << PathToString(contest.path) << " is pending again: " << contest.reason << '\n';
@@ -148,6 +178,7 @@ void Record(std::vector<Contest>& contests, RecordingConflictResolver& resolver)
     resolver.AddRecord(
         {std::move(contest.path), contest.type, contest.resolution, contest.left, contest.right});
   }
+  for (const RecordingConflictResolver::Record& record : along) resolver.AddRecord(record);
 }
 
 // Each object that is in all three versions, or that both sides added. Where things hang, and the lists that
@@ -216,8 +247,9 @@ SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolve
     std::vector<Contest> contests = FindContests(edits);
     ScenePlan plan(edits);
     Reconcile(edits, resolver, contests, plan);
+    const Records along = WhatGoesAlong(edits, plan, contests);
     PlanExecution(versions, plan).Execute(MakeDerivedLists(edits, plan, resolver));
-    Record(contests, resolver);
+    Record(contests, along, resolver);
   }
   SettleContents(versions, settled.touched, resolver);
   return settled;
