@@ -64,6 +64,26 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
   return targets;
 }
 
+FileIDs ChildrenOf(const YAMLNode* object) {
+  FileIDs children;
+  const YAMLMapping* body = GetBody(object);
+  if (body == nullptr) return children;
+  VisitReferences(const_cast<YAMLNode*>(body->Get(ChildrenKey())),
+                  [&](YAMLMapping& reference) { children.push_back(GetLocalTarget(&reference)); });
+  return children;
+}
+
+// Whether the children that both have stand in another order.
+bool AreChildrenReordered(const YAMLNode* base, const YAMLNode* side) {
+  FileIDs before = ChildrenOf(base);
+  FileIDs after = ChildrenOf(side);
+  const std::unordered_set<const YAMLScalar*> in_before(before.begin(), before.end());
+  const std::unordered_set<const YAMLScalar*> in_after(after.begin(), after.end());
+  std::erase_if(before, [&](const YAMLScalar* child) { return !in_after.contains(child); });
+  std::erase_if(after, [&](const YAMLScalar* child) { return !in_before.contains(child); });
+  return before != after;
+}
+
 const YAMLTypeInfo* TypeIn(const VexelObjects& objects, const YAMLScalar* file_id) {
   const YAMLScalar* class_id = GetMappingPath(objects, file_id, YAMLScalar::classIDPlaceHolderName);
   return class_id == nullptr ? nullptr : GetTypeInfoManager().GetTypeInfo(class_id);
@@ -149,7 +169,8 @@ class DeedSearch {
       const bool is_inside = reached != nullptr && deleted_.Find(reached) == deletion;
       if (!is_inside) Add(Deed::Kind::kMovedIn, file_id, reached);
       Add(is_thing || is_inside ? Deed::Kind::kEdited : Deed::Kind::kMovedOut, file_id, file_id);
-    } else if (IsEdited(file_id, base_.Get(file_id), edited)) {
+    } else if (IsEdited(file_id, base_.Get(file_id), edited) ||
+               AreChildrenReordered(base_.Get(file_id), edited)) {
       Add(Deed::Kind::kEdited, file_id, file_id);
     }
   }
