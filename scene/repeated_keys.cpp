@@ -35,6 +35,15 @@ bool IsTransitions(const Place& place) {
          place[1] == StateMachineTransitionsKey();
 }
 
+template <typename Function>
+void ForEachPair(const YAMLMapping& mapping, Function function) {
+  if (mapping.HasDuplicateKeys()) {
+    for (const YAMLMapping::Slot& slot : mapping.GetDuplicatePairs()) function(slot);
+  } else {
+    for (const YAMLMapping::Slot& slot : mapping) function(slot);
+  }
+}
+
 // One object in all versions, while its pairs get their own keys.
 class ObjectPairs {
  public:
@@ -82,15 +91,6 @@ class ObjectPairs {
   MadeUpKeys TakeMadeUpKeys() { return std::move(made_up_); }
 
  private:
-  template <typename Function>
-  static void ForEachPair(const YAMLMapping& mapping, Function function) {
-    if (mapping.HasDuplicateKeys()) {
-      for (const YAMLMapping::Slot& slot : mapping.GetDuplicatePairs()) function(slot);
-    } else {
-      for (const YAMLMapping::Slot& slot : mapping) function(slot);
-    }
-  }
-
   // The texts of all scalars in it. In record files a path ends at a blank, and its parts at dots.
   static void AppendIdentity(const YAMLNode& node, std::string& identity) {
     if (const YAMLScalar* scalar = node.AsScalar()) {
@@ -148,10 +148,10 @@ void Restore(YAMLNode& node, const MadeUpKeys& made_up) {
   YAMLMapping* mapping = node.AsMapping();
   if (mapping == nullptr) return;
   bool has_own_keys = false;
-  for (const YAMLMapping::Slot& slot : *mapping) {
+  ForEachPair(*mapping, [&](const YAMLMapping::Slot& slot) {
     Restore(*slot.value, made_up);
     has_own_keys |= made_up.contains(slot.key);
-  }
+  });
   if (!has_own_keys) return;
   for (const YAMLMapping::Slot& slot : mapping->TakePairs()) {
     const auto found = made_up.find(slot.key);

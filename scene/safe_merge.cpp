@@ -26,8 +26,9 @@ SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& 
   CheckMergedScene(settled, *result.merged, resolver);
   result.breaks_dependency = ReportBrokenDependencies(*result.merged, left, right, resolver);
   if (options.keep_comparable) result.repaired.reset(result.merged->Clone());
-  documents.repeated_keys.Restore(*result.merged);
+  // In this order: making mappings of the transitions copies what they hold.
   TransitionsToMappings(*result.merged);
+  documents.repeated_keys.Restore(*result.merged);
   return result;
 }
 
