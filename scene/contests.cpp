@@ -117,9 +117,9 @@ class DeedSearch {
 
   // By the places of the deletions.
   std::map<size_t, Deeds> Search() {
-    // Of what both sides added it is contested where it hangs.
+    // What both sides added, the one that deleted too, only refers to it: it comes and goes by itself.
     for (const YAMLScalar* file_id : changes_.added) {
-      if (!kept_.HasKey(file_id)) Add(Deed::Kind::kAdded, file_id, Reached(file_id));
+      Add(kept_.HasKey(file_id) ? Deed::Kind::kRefers : Deed::Kind::kAdded, file_id, Reached(file_id));
     }
     for (const YAMLScalar* file_id : changes_.changed) {
       if (deleted_.Find(file_id) == Deletions::kNone) {

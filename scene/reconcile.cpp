@@ -104,12 +104,8 @@ class Reconciliation {
       for (Contest& contest : contests_) {
         if (Places(contest, node) || Removes(contest, edits_, father)) concerned.push_back(&contest);
       }
-      const bool is_contested = std::ranges::any_of(
-          concerned, [&](const Contest* contest) { return Removes(*contest, edits_, father); });
-      if (!is_contested && KeepDeleted(father)) return true;
-      if (!is_contested && !WasThere(father)) continue;
-      if (Retreat(concerned)) return true;
-      plan_.Uproot(node);
+      if (!WasThere(father)) continue;
+      if (!BringBack(father, concerned)) plan_.Uproot(node);
       return true;
     }
     return false;
@@ -120,9 +116,21 @@ class Reconciliation {
     for (Contest& contest : contests_) {
       if (!contest.is_about_owner || !plan_.Has(contest.node)) continue;
       const YAMLScalar* owner = plan_.GetOwner(contest.node);
-      if (!plan_.Has(owner) && (KeepDeleted(owner) || Retreat({&contest}))) return true;
+      if (plan_.Has(owner)) continue;
+      std::vector<Contest*> concerned;
+      for (Contest& other : contests_) {
+        if (&other == &contest || Removes(other, edits_, owner)) concerned.push_back(&other);
+      }
+      if (BringBack(owner, concerned)) return true;
     }
     return false;
+  }
+
+  // Whether what something is to hang on could be brought back, or that something elsewhere.
+  bool BringBack(const YAMLScalar* file_id, const std::vector<Contest*>& concerned) {
+    const bool is_contested = std::ranges::any_of(
+        concerned, [&](const Contest* contest) { return Removes(*contest, edits_, file_id); });
+    return (!is_contested && KeepDeleted(file_id)) || Retreat(concerned);
   }
 
   bool AreBothWithout(const YAMLScalar* file_id) const {
