@@ -3,7 +3,7 @@
 import itertools
 from collections import Counter
 
-from scene import NONE, is_unit, owners, target_of
+from scene import NONE, is_unit, owners, target_of, whole
 
 DERIVED = {"m_Children", "m_Component"}  # The other ends of m_Father and m_GameObject.
 
@@ -55,6 +55,11 @@ def order_lost(base, side, other, merged):
                for n, a in enumerate(common) for b in common[n + 1:])
 
 
+def _children_reordered(before, after):
+    lists = [item.fields.get("m_Children", []) for item in (before, after)]
+    return [child for child in lists[0] if child in lists[1]] != [child for child in lists[1] if child in lists[0]]
+
+
 def lost(base, side, other, merged):
     """Every edit from `base` to `side` that `merged` doesn't show, as (object, path, value)."""
     for file_id in base.keys() | side.keys():
@@ -66,7 +71,8 @@ def lost(base, side, other, merged):
                 yield file_id, (name,), None
         elif before is None or before is not mine:
             if after is None:
-                if before is None or before.fields != mine.fields:
+                if before is None or _children_reordered(before, mine) or any(
+                        _missing((name,), before.fields, mine.fields, None, None)):
                     yield file_id, (name,), mine.fields
                 continue
             for path, value in _missing((name,), *(item and item.fields for item in items)):
@@ -84,8 +90,9 @@ def is_covered(fact, base, side, other, pending):
     things = {part for version in (base, side, other) for part in owners(version, file_id)}
     if value is None and len(path) == 1:
         # A deletion is one act with what it took along, and with what the other side put there.
-        top = [part for part in owners(base, file_id) if part not in side][-1]
-        things |= {part for version in (base, other) for part in version if top in owners(version, part)}
+        for deleted in (version for version in (side, other) if file_id not in version):
+            top = [part for part in owners(base, file_id) if part not in deleted][-1]
+            things |= {*whole(base, top), *whole(other, top)}
     old = base[file_id].fields if file_id in base else {}
     for key in path[1:]:
         old = _get(old, key)

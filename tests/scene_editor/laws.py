@@ -7,7 +7,7 @@ from pathlib import Path
 import yaml
 
 import facts
-from scene import Object, parse, whole, write
+from scene import Object, owners, parse, whole, write
 from soundness import faults
 
 SIDES = ("left", "right")
@@ -71,15 +71,16 @@ def settle(law, merger, versions, pending, choose):
     check_edits(law, versions, merged, {side: [path for path, chosen in choices.items() if chosen != side]
                                         for side in SIDES})
     for path, chosen in choices.items():
-        if chosen == "base" and path[0] in versions["base"] and not stands_as_in_base(versions["base"], merged, path):
+        if chosen == "base" and path[0] in versions["base"] and not stands_as_in_base(versions, merged, path):
             raise Broken(f"{law}: base", f"{path} isn't as in base")
 
 
-def stands_as_in_base(base, merged, path):
-    """Whether a thing has the parts that it has in base, and a field its value."""
+def stands_as_in_base(versions, merged, path):
+    """Whether a field has its value, and a thing its parts but those that somebody moved out."""
     if len(path) == 1:
-        return set(whole(base, path[0])) == set(whole(merged, path[0]))
-    values = [scene[path[0]].fields if path[0] in scene else None for scene in (base, merged)]
+        moved = {part for side in SIDES for part in versions[side] if path[0] not in owners(versions[side], part)}
+        return set(whole(versions["base"], path[0])) - moved == set(whole(merged, path[0])) - moved
+    values = [scene[path[0]].fields if path[0] in scene else None for scene in (versions["base"], merged)]
     for key in path[2:]:
         values = [value.get(key) if isinstance(value, dict) else None for value in values]
     return values[0] is None or values[0] == values[1]
