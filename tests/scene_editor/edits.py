@@ -2,6 +2,7 @@
 follow, and references to what is gone are cleared."""
 
 import hashlib
+import pickle
 
 from scene import NONE, Object, local_references, owner_of, owners, target_of, transform_of, whole
 
@@ -206,15 +207,20 @@ class Editor:
         items.insert(self._index(items), items.pop(self._index(items)))
 
 
-def build(*series):
-    """The scene after series of edits, which are pairs of a kind and a number."""
-    scene = {"1": Object(104, "RenderSettings", {"m_Fog": "1", "m_Sun": NONE}, False)}
-    for kind, number in [edit for edits in series for edit in edits]:
+def _edited(scene, series):
+    for kind, number in series:
         try:
             getattr(Editor(scene, number), kind)()
         except ValueError:
             pass
     return scene
+
+
+def build(base, left, right):
+    """The three scenes after series of edits, which are pairs of a kind and a number."""
+    start = _edited({"1": Object(104, "RenderSettings", {"m_Fog": "1", "m_Sun": NONE}, False)}, base)
+    return {"base": start, **{name: _edited(pickle.loads(pickle.dumps(start)), series)
+                              for name, series in (("left", left), ("right", right))}}
 
 
 def make_triple(rng, edit_count):

@@ -1,5 +1,6 @@
 """What must hold for every merge of three sound scenes, whatever was edited."""
 
+import itertools
 import re
 import subprocess
 from pathlib import Path
@@ -76,10 +77,13 @@ def settle(law, merger, versions, pending, choose):
 
 
 def stands_as_in_base(versions, merged, path):
-    """Whether a field has its value, and a thing its parts but those that somebody moved out."""
+    """Whether a field has its value, and a thing its parts, apart from what somebody moved out, with all below it."""
     if len(path) == 1:
-        moved = {part for side in SIDES for part in versions[side] if path[0] not in owners(versions[side], part)}
-        return set(whole(versions["base"], path[0])) - moved == set(whole(merged, path[0])) - moved
+        top, sides = path[0], [versions[side] for side in SIDES]
+        moved = {part for side in sides for part in side if top not in owners(side, part)}
+        parts = [{part for part in whole(scene, top) if moved.isdisjoint(
+            itertools.takewhile(top.__ne__, owners(scene, part)))} for scene in (versions["base"], merged)]
+        return parts[0] == parts[1]
     values = [scene[path[0]].fields if path[0] in scene else None for scene in (versions["base"], merged)]
     for key in path[2:]:
         values = [value.get(key) if isinstance(value, dict) else None for value in values]
@@ -115,10 +119,11 @@ def check_trivial(merger, versions):
 def check(merger, versions, rng, thorough):
     """The laws for base, left and right, those about other merges only where `thorough` says so. Returns the number
     of conflicts."""
-    for name, scene in versions.items():
-        (merger.folder / f"{name}.vexel").write_text(write(scene))
+    texts = {name: write(scene) for name, scene in versions.items()}
+    for name, text in texts.items():
+        (merger.folder / f"{name}.vexel").write_text(text)
     # As they come back, so that equal objects are the same ones.
-    versions = {name: parse(write(scene)) for name, scene in versions.items()}
+    versions = {name: parse(text) for name, text in texts.items()}
     assert not any(map(faults, versions.values())), [faults(scene) for scene in versions.values()]
     merged, pending = merger.merge("base", "left", "right")
     check_edits("merge", versions, merged, dict.fromkeys(SIDES, pending))
