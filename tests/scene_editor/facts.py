@@ -5,6 +5,7 @@ from collections import Counter
 
 from scene import NONE, is_unit, owners, target_of, whole
 
+HANGS_ON = {"m_Father", "m_TransformParent", "m_GameObject"}
 DERIVED = {"m_Children", "m_Component"}  # The other ends of m_Father and m_GameObject.
 
 
@@ -88,7 +89,8 @@ def is_covered(fact, base, side, other, pending):
     """Whether a pending path is the place of the edit, one inside it, or a thing that it is about."""
     file_id, path, value = fact
     things = {part for version in (base, side, other) for part in owners(version, file_id)}
-    if value is None and len(path) == 1:
+    deletes = value is None and len(path) == 1
+    if deletes:
         # A deletion is one act with what it took along, and with what the other side put there.
         for deleted in (version for version in (side, other) if file_id not in version):
             top = [part for part in owners(base, file_id) if part not in deleted][-1]
@@ -101,5 +103,9 @@ def is_covered(fact, base, side, other, pending):
         return True  # The editor cleared the reference, since its object was deleted.
     things |= {part for target in targets for version in (base, side, other) for part in owners(version, target)}
     place = (file_id, *itertools.takewhile(lambda key: not key.startswith("#"), path))
-    return any(thing in things if not below else
-               all(a == b for a, b in zip(place, (thing, *below))) for thing, *below in pending)
+    for thing, *below in pending:
+        # Where a thing hangs is a part of what becomes of the thing above.
+        if thing in things and (not below or deletes and not HANGS_ON.isdisjoint(below)) or \
+                below and all(a == b for a, b in zip(place, (thing, *below))):
+            return True
+    return False
