@@ -1,5 +1,4 @@
 #include <algorithm>
-#include <iostream>
 
 #include "scene/object_links.h"
 #include "scene/settle_scene.h"
@@ -66,8 +65,7 @@ class ReferenceRepair {
 
 }  // namespace
 
-void CheckMergedScene(const SettledScene& settled, VexelObjects& merged,
-                      RecordingConflictResolver& resolver) {
+void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver) {
   const bool has_lost = std::ranges::any_of(
       settled.vanishing, [&](const YAMLScalar* file_id) { return !merged.HasKey(file_id); });
   if (has_lost) {
@@ -76,7 +74,8 @@ void CheckMergedScene(const SettledScene& settled, VexelObjects& merged,
   }
   for (SceneFault& fault : CheckScene(merged, settled.touched)) {
     if (settled.known_faults.contains(fault)) continue;
-    std::cerr << fault.file_id->GetText() << ' ' << fault.text << ": please repair this object by hand\n";
+    settled.notes.push_back(fault.file_id->GetText() + ' ' + fault.text +
+                            ": please repair this object by hand");
     resolver.AddRecord(
         {{fault.file_id}, ConflictType::kBothChange, MergeResolve::kConflict, nullptr, nullptr});
   }

@@ -1,31 +1,13 @@
 #pragma once
 
-#include <array>
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "merge/recording_conflict_resolver.h"
-#include "scene/deletions.h"
-#include "scene/scene_versions.h"
-#include "scene/side_changes.h"
+#include "scene/scene_edits.h"
 
 namespace vexel_yaml {
-
-/// Three versions of a scene, and what each side did to it.
-struct SceneEdits {
-  explicit SceneEdits(const SceneVersions& versions);
-
-  const VexelObjects& Version(SceneSide side) const {
-    return side == SceneSide::kLeft ? versions.left : versions.right;
-  }
-  const SideChanges& Changes(SceneSide side) const { return changes[static_cast<size_t>(side)]; }
-  const Deletions& Deleted(SceneSide side) const { return deletions[static_cast<size_t>(side)]; }
-
-  SceneVersions versions;
-  std::array<SideChanges, 2> changes;
-  std::array<Deletions, 2> deletions;
-};
 
 /// An edit of one side against one of the other that only a person can settle, as a whole.
 struct Contest {
@@ -82,9 +64,6 @@ Contest MakeRequirementContest(const SceneEdits& edits, SceneSide deleter, const
 
 /// Where the father of an object stands: the path of the reference.
 FieldPath FatherPath(const YAMLScalar* node, const YAMLNode* object);
-
-/// The father of an object in one version, null at the top and for an object that the version lacks.
-const YAMLScalar* FatherIn(const VexelObjects& objects, const YAMLScalar* node);
 
 /// What one side did to an object, null for nothing. A copy.
 const Operation* EditInShort(const SceneEdits& edits, SceneSide side, const YAMLScalar* file_id);

@@ -115,6 +115,15 @@ ObjectLinks ReadLinks(const YAMLNode* object) {
   return links;
 }
 
+const YAMLScalar* FatherIn(const VexelObjects& objects, const YAMLScalar* node) {
+  const YAMLNode* object = objects.Get(node);
+  const FoldedObject* folded = GetFolded(object);
+  if (folded != nullptr && folded->father != nullptr) {
+    return IsNullReference(folded->father) ? nullptr : folded->father;
+  }
+  return ReadLinks(object).father;
+}
+
 YAMLMapping* GetFatherReference(YAMLNode* object) {
   YAMLMapping* body = GetBody(object);
   if (body == nullptr) return nullptr;

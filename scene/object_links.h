@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <functional>
 
-#include "yaml/yaml_mapping.h"
+#include "yaml/vexel_objects.h"
 
 namespace vexel_yaml {
 
@@ -31,6 +31,9 @@ struct ObjectLinks {
 
 /// Reads them off an object. `object` may be null, which says nothing.
 ObjectLinks ReadLinks(const YAMLNode* object);
+
+/// The father of an object in one version, null at the top and for an object that the version lacks.
+const YAMLScalar* FatherIn(const VexelObjects& objects, const YAMLScalar* node);
 
 /// The fields of an object, null where it has none.
 const YAMLMapping* GetBody(const YAMLNode* object);

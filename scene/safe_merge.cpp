@@ -24,6 +24,7 @@ SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& 
   TimerStat step(timer, "Post process merged changes");
   if (options.keep_comparable) result.unrepaired.reset(result.merged->Clone());
   CheckMergedScene(settled, *result.merged, resolver);
+  result.notes = std::move(settled.notes);
   result.breaks_dependency = ReportBrokenDependencies(*result.merged, left, right, resolver);
   if (options.keep_comparable) result.repaired.reset(result.merged->Clone());
   // In this order: making mappings of the transitions copies what they hold.

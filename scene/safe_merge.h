@@ -1,6 +1,8 @@
 #pragma once
 
 #include <memory>
+#include <string>
+#include <vector>
 
 #include "merge/recording_conflict_resolver.h"
 #include "platform/timer_stat.h"
@@ -21,6 +23,8 @@ struct SafeMergeResult {
   /// The same in the form of the versions, before and after the repairs; null unless asked for.
   std::unique_ptr<VexelObjects> unrepaired;
   std::unique_ptr<VexelObjects> repaired;
+  /// Lines for people: choices that could not be carried out, and what is broken.
+  std::vector<std::string> notes;
   /// Whether a broken component dependency is pending.
   bool breaks_dependency = false;
 };

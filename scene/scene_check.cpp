@@ -5,7 +5,6 @@
 #include <unordered_set>
 #include <utility>
 
-#include "scene/contests.h"
 #include "scene/object_links.h"
 #include "yaml/yaml_sequence.h"
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <set>
+#include <string>
 #include <unordered_set>
 #include <vector>
 
@@ -18,17 +19,19 @@ struct SettledScene {
   std::unordered_set<const YAMLScalar*> vanishing;
   /// What was broken in some version already.
   std::set<SceneFault> known_faults;
+  /// Lines for people: why a choice of theirs is pending again.
+  std::vector<std::string> notes;
 };
 
 /// Settles whatever the engine can't decide place by place: what happens to things that one side deleted and
 /// the other edited, where objects hang, the lists that follow from that, and values that both sides edited.
 /// Conflicts are recorded; what is decided stands in all three versions alike afterwards. A choice that can't
-/// be carried out is pending again, and a line on standard error says why. `threads`: looks at the versions
+/// be carried out is pending again, and noted. `threads`: looks at the versions
 /// side by side.
 SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver, bool threads);
 
-/// Repairs what the merge broke in a merged scene and has one repair, and records everything else as pending,
-/// with a line on standard error that says what is broken.
-void CheckMergedScene(const SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver);
+/// Repairs what the merge broke in a merged scene and has one repair; records and notes everything else as
+/// pending.
+void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver);
 
 }  // namespace vexel_yaml
