@@ -81,18 +81,25 @@ class Reconciliation {
       if (!contest.deleted || SourceOf(contest) == SourceOf(OtherSide(contest.deleted->by))) continue;
       for (const YAMLScalar* node : contest.deleted->moved_in) {
         const YAMLScalar* wanted = FatherIn(edits_.Version(OtherSide(contest.deleted->by)), node);
-        std::vector<Contest*> concerned;
-        bool is_excluded = false;
         for (Contest& other : contests_) {
           const bool moves = &other != &contest && Decides(other, node) && SourceOf(other) != Source::kNone &&
                              FatherIn(plan_.Version(SourceOf(other)), node) == wanted;
-          is_excluded |= moves;
-          if (moves || &other == &contest) concerned.push_back(&other);
+          if (moves && SettleExcluded(contest, other)) return true;
         }
-        if (is_excluded && Retreat(concerned)) return true;
       }
     }
     return false;
+  }
+
+  // What is settled goes first, of two the first one. Returns whether something changed.
+  static bool SettleExcluded(Contest& thing, Contest& move) {
+    if (IsSettled(thing) && IsSettled(move)) {
+      const bool is_thing_first = &thing < &move;
+      return Retreat({is_thing_first ? &thing : &move, is_thing_first ? &move : &thing});
+    }
+    if (!IsSettled(move)) return StepBack(move);
+    thing.side = thing.deleted->by == SceneSide::kLeft ? MergeResolve::kRight : MergeResolve::kLeft;
+    return true;
   }
 
   bool FixMissingFather() {
