@@ -1,8 +1,10 @@
+#include "yaml/emit_yaml.h"
+
 #include <yaml.h>
 
 #include <new>
-#include <string>
 
+#include "yaml/write_written_style.h"
 #include "yaml/yaml_error.h"
 #include "yaml/yaml_mapping.h"
 #include "yaml/yaml_scalar.h"
@@ -66,11 +68,16 @@ void RemoveLast(std::string& text, char character) {
 
 }  // namespace
 
-std::string YAMLNode::GetYAMLString() const {
-  std::string text = Emission().Emit(*this);
+std::string EmitWithLibyaml(const YAMLNode& node) {
+  std::string text = Emission().Emit(node);
   RemoveLast(text, '\n');
   RemoveLast(text, '\r');
   return text;
+}
+
+std::string YAMLNode::GetYAMLString() const {
+  std::string text;
+  return WriteInWrittenStyle(*this, text) ? text : EmitWithLibyaml(*this);
 }
 
 int YAMLScalar::PopulateDocument(yaml_document_s* document) const {

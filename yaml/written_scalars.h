@@ -6,18 +6,56 @@
 
 #include "yaml/written_style_characters.h"
 
-/// Values in quotes in the written style. Each function is given where the value begins and where its line
-/// does, and returns where the value ends, behind its last quote, or null where libyaml might write the value
-/// otherwise. All rely on a line break before the end of the text.
+/// Keys and values in the written style. All functions rely on a line break or a null character at the end of
+/// the text.
 namespace vexel_yaml::written_style {
 
 // libyaml breaks a line at a blank, and a collection in brackets before an entry, beyond this column.
 inline constexpr ptrdiff_t kBestWidth = 80;
+// A longer key is written as "? key".
+inline constexpr ptrdiff_t kLongestKey = 128;
+
+inline bool EndsWord(char c) { return c == ' ' || c == '\n' || c == '\0'; }
+
+/// Steps over a key that is written without quotes; false where none starts.
+inline bool StepOverKey(const char*& at) {
+  if (!Is(*at, kKey) || *at == '-' || *at == '.' || *at == '>') return false;
+  const char* begin = at;
+  while (Is(*at, kKey)) ++at;
+  return at - begin <= kLongestKey;
+}
+
+/// Steps over the first character of a plain value; false where it means something.
+inline bool StepOverPlainStart(const char*& at) {
+  if (*at == '-') {
+    if (!Is(at[1], kFlow) || at[1] == '-') return false;
+  } else if (!Is(*at, kFirst)) {
+    return false;
+  }
+  if (at[0] == '.' && at[1] == '.') return false;
+  ++at;
+  return true;
+}
+
+/// Where a plain value on a line of its own has its next blank, its end, or a character that is none of it.
+inline const char* SkipPlainWord(const char* at) {
+  for (;; ++at) {
+    while (Is(*at, kBlock)) ++at;
+    if (*at != ':' || EndsWord(at[1])) return at;
+  }
+}
+
+/// Whether the blank at `at` may stand inside a plain value: before another one, before a comment and at the
+/// end it would mean something else.
+inline bool IsInsidePlain(const char* at) { return *at == ' ' && !EndsWord(at[1]) && at[1] != '#'; }
+
 /// Whether the blank at `at` stays one: not at the end of the line, nor where the line would be broken.
 inline bool IsPlainBlank(const char* at, const char* line) {
   return at[1] != '\n' && at - line <= kBestWidth;
 }
 
+/// A value in quotes. This and the functions below are given where the value begins and where its line does,
+/// and return where it ends, behind its last quote, or null where libyaml might write the value otherwise.
 /// `step` goes over one character other than a blank.
 template <typename Step>
 const char* SkipQuoted(const char* at, const char* line, Step step) {

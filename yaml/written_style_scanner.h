@@ -12,8 +12,6 @@
 
 namespace vexel_yaml::written_style {
 
-// A longer key is written as "? key".
-inline constexpr ptrdiff_t kLongestKey = 128;
 // Far from every limit on nesting.
 inline constexpr ptrdiff_t kWidestIndent = 200;
 // Mappings with more keys are rare, and looking for repeated ones would get slow.
@@ -104,10 +102,11 @@ class StyleScanner {
 
   // A key with its colon.
   bool ScanKey(std::string_view& key) {
-    if (!Is(*at_, kKey) || *at_ == '-' || *at_ == '.' || *at_ == '>') return false;
-    key = TakeWhile(kKey);
+    const char* begin = at_;
+    if (!StepOverKey(at_)) return false;
+    key = View(begin, at_);
     // The names that stand for what the header line says.
-    if (key.size() > kLongestKey || key.starts_with("MERGE_") || *at_ != ':') return false;
+    if (key.starts_with("MERGE_") || *at_ != ':') return false;
     ++at_;
     return true;
   }
@@ -251,7 +250,7 @@ class StyleScanner {
 
   bool ScanPlain() {
     const char* begin = at_;
-    if (!ScanPlainStart()) return false;
+    if (!StepOverPlainStart(at_)) return false;
     const char* end = nullptr;
     do {
       if (!ScanPlainLine()) return false;
@@ -262,16 +261,10 @@ class StyleScanner {
   }
 
   bool ScanPlainLine() {
-    for (;;) {
-      while (Is(*at_, kBlock)) ++at_;
+    for (;; ++at_) {
+      at_ = SkipPlainWord(at_);
       if (*at_ == '\n') break;
-      if (*at_ == ' ') {
-        // Before another blank or a comment it would mean something else.
-        if (at_[1] == ' ' || at_[1] == '#' || !IsPlainBlank(at_, line_)) return false;
-      } else if (*at_ != ':' || at_[1] == ' ' || at_[1] == '\n') {
-        return false;
-      }
-      ++at_;
+      if (!IsInsidePlain(at_) || !IsPlainBlank(at_, line_)) return false;
     }
     ++at_;
     return true;
@@ -303,18 +296,6 @@ class StyleScanner {
     return true;
   }
 
-  // Steps over the first character, unless it means something.
-  bool ScanPlainStart() {
-    if (*at_ == '-') {
-      if (!Is(at_[1], kFlow) || at_[1] == '-') return false;
-    } else if (!Is(*at_, kFirst)) {
-      return false;
-    }
-    if (at_[0] == '.' && at_[1] == '.') return false;
-    ++at_;
-    return true;
-  }
-
   // "{}", "[]", "{key: value, key: value}" or "[value, value]" with plain values.
   bool ScanFlow() {
     const bool is_mapping = *at_++ == '{';
@@ -330,7 +311,7 @@ class StyleScanner {
       if (at_[-1] == ',' && !Take(" ")) return false;
       if (is_mapping && !ScanFlowKey()) return false;
       const char* value = at_;
-      if (!ScanPlainStart()) return false;
+      if (!StepOverPlainStart(at_)) return false;
       TakeWhile(kFlow);
       sink_.Scalar(View(value, at_), ScalarStyle::kPlain);
       if (*at_ == close) break;
