@@ -40,13 +40,26 @@ def versions_of(text, in_conflict):
     return text, with_layer(text, 0, 20), with_layer(text, 0 if in_conflict else -1, 21)
 
 
-def merges(count, in_conflict, folder, programs, _rows):
-    """`count` changed scenes, merged by git's text merge in one repository and by our driver in another."""
+def drivers(programs, in_conflict):
+    """Drivers that show what a merge costs whatever is merged, in the form that ours has."""
+    end = f"; exit {int(in_conflict)}; }}; f %O %A %B"
+    copy = f'"$2" "$1" "$3" "$2"{end}'
+    return {"shell": f"f() {{ true{end}",
+            "copy": f"f() {{ {programs.least_work} {copy}",
+            "ask": f"f() {{ {programs.least_work} --ask-git {copy}",
+            "ask thrice": f"f() {{ {programs.least_work} --ask-git --ask-git --ask-git {copy}"}
+
+
+def merges(count, in_conflict, folder, programs, rows):
+    """`count` changed scenes, merged by git's text merge in one repository and by another driver in each other."""
     scenes = [versions_of(scene_text(programs, folder, seed), in_conflict) for seed in range(count)]
+    least = drivers(programs, in_conflict)
     commands = {}
-    for name, patterns in (("text", None), ("vexel", "*.vexel")):
+    for name in dict.fromkeys(name for row in rows for name in row.commands()):
         repository = folder / name
-        make_repository(repository, programs, patterns)
+        make_repository(repository, programs, None if name == "text" else "*.vexel")
+        if name in least:
+            git(repository, "config", "merge.vexel.driver", least[name])
         for side, branch in enumerate(("main", "theirs", "ours")):
             if side:
                 git(repository, "checkout", "-q", "-b", branch, "main")
@@ -83,14 +96,17 @@ def log(count, folder, programs, _rows):
     git(repository, "reset", "-q", "--hard", "main")
 
     def show(*options):
-        return run(["git", "log", "-p", *options, "main", "--", "scene.vexel"], folder=repository)
+        return run(["git", *options, "main", "--", "scene.vexel"], folder=repository)
 
-    def show_with_empty_cache():
+    def show_with_empty_cache(*options):
         for note in git(repository, "for-each-ref", "--format=%(refname)", "refs/notes/textconv/").split():
             git(repository, "update-ref", "-d", os.fsdecode(note))
-        return show()
+        return show(*options)
 
-    return {"plain": lambda: show("--no-textconv"), "first": show_with_empty_cache, "later": show}
+    cat = ("-c", "diff.vexel.textconv=cat", "log", "-p")
+    return {"plain": lambda: show("log", "-p", "--no-textconv"),
+            "first": lambda: show_with_empty_cache("log", "-p"), "later": lambda: show("log", "-p"),
+            "first with cat": lambda: show_with_empty_cache(*cat), "later with cat": lambda: show(*cat)}
 
 
 def file_of_commit(name, text, time):

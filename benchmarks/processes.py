@@ -27,6 +27,7 @@ class Programs:
         self.git_helper = str(build / "app/vexel-merge-git")
         self.make_scene = str(build / "benchmarks/make_scene")
         self.text_floor = str(build / "benchmarks/text_floor")
+        self.least_work = str(build / "benchmarks/least_work")
         self.libyaml_floor = str(build / "benchmarks/libyaml_floor")
         for path in vars(self).values():
             if not os.access(path, os.X_OK):

@@ -22,7 +22,7 @@ class Row:
     name: str
     text: str
     setting: Setting
-    target: float
+    target: float | None  # none for a limit: what nobody can do without
     ours: str
     theirs: str = ""  # a figure without a reference is given as it is
     what: str = "wall"
@@ -56,6 +56,7 @@ def merge_commands(folder, programs, files, prefix=""):
         "diff": (vexel + ["diff", "-h", base, left, out], (0,)),
         "report": ([programs.report, "-o", out, *files], (0,)),
         "git": (["git", "merge-file", "-p", left, base, right], range(128)),
+        "least": ([programs.least_work, "--sync", out, *files], (0,)),
         "text floor": ([programs.text_floor, out, *files], (0,)),
         "text floor of two": ([programs.text_floor, out, base, left], (0,)),
         "libyaml floor": ([programs.libyaml_floor, out, *files], (0,)),
@@ -129,14 +130,22 @@ ALL = [
     Row("memory-1M", "1,000,000 objects: peak memory / size of the three inputs", LARGEST, 1.5, "merge", "inputs",
         what="memory"),
     Row("prefab", "prefab of 10 objects: merge / git merge-file", PREFAB, 1.3, "merge", "git"),
+    Row("prefab-least", "limit: read three files, write one, wait for the disk", PREFAB, None, "least", "git"),
     Row("list-keyed", "100,000 elements with keys, moved and edited: time an element / at 10,000", KEYED, 1.5,
         "100000 merge", "10000 merge", scale=10),
     Row("list-equal", "10,000 equal elements without keys: seconds", EQUAL, 3, "10000 merge"),
     Row("list-unequal", "10,000 unequal elements without keys, all edited: seconds", UNEQUAL, 3, "10000 merge"),
     Row("git-merge", "git merge of 200 scenes: ms a file more than git's own", GIT_MERGE, 6, "vexel", "text",
         less=1000 / 200),
+    *(Row(f"git-merge-{name}", f"limit: a driver that is {what}", GIT_MERGE, None, name, "text", less=1000 / 200)
+      for name, what in (("shell", "a shell only"), ("copy", "a shell and a program that copies"),
+                         ("ask", "the same, and asks git once"))),
     Row("git-conflicts", "the same, all with conflicts", GIT_CONFLICTS, 10, "vexel", "text", less=1000 / 200),
+    Row("git-conflicts-ask", "limit: a driver that copies, and asks git three times", GIT_CONFLICTS, None, "ask thrice",
+        "text", less=1000 / 200),
     Row("git-log-first", "git log -p of 1,000 versions, first time / without textconv", GIT_LOG, 5, "first",
         "plain"),
+    Row("git-log-cat", "limit: the same with cat as textconv", GIT_LOG, None, "first with cat", "plain"),
     Row("git-log", "git log -p of 1,000 versions, later / without textconv", GIT_LOG, 1.5, "later", "plain"),
+    Row("git-log-later-cat", "limit: the same with cat as textconv", GIT_LOG, None, "later with cat", "plain"),
 ]
