@@ -3,6 +3,7 @@
 
 #include "fuzz/support.h"
 #include "merge/conflict_record_file.h"
+#include "platform/thread.h"
 #include "yaml/read_yaml.h"
 #include "yaml/yaml_error.h"
 
@@ -10,18 +11,33 @@ using namespace vexel_yaml;
 
 namespace {
 
-// All that a user would get to see of a merge: the file and the records, or the error.
-std::string Merge(const std::vector<std::string>& texts, DocumentCache* cache) try {
-  VexelObjects versions[3];
-  for (size_t i = 0; i < std::size(versions); ++i) {
-    if (cache == nullptr) {
+enum class Way : uint8_t { kRead, kFolded, kFoldedOnThreads };
+
+void ReadVersions(const std::vector<std::string>& texts, Way way, VexelObjects* versions) {
+  DocumentCache cache;
+  std::vector<Thread> readers(texts.size());
+  for (size_t i = 0; i < texts.size(); ++i) {
+    const auto read = [&, i] { ParseYAMLText(FileText(texts[i]), versions[i], cache); };
+    if (way == Way::kRead) {
       ParseYAMLString(texts[i], versions[i]);
+    } else if (way == Way::kFolded) {
+      read();
     } else {
-      ParseYAMLText(FileText(texts[i]), versions[i], *cache);
+      readers[i].Start(read);
     }
   }
+  if (way != Way::kFoldedOnThreads) return;
+  for (Thread& reader : readers) reader.Join();
+  for (Thread& reader : readers) reader.CheckForExceptions();
+}
+
+// All that a user would get to see of a merge: the file and the records, or the error.
+std::string Merge(const std::vector<std::string>& texts, Way way) try {
+  VexelObjects versions[3];
+  ReadVersions(texts, way, versions);
   RecordingConflictResolver resolver(MergeResolve::kBase);
-  const auto merged = fuzz::Merge(versions[0], versions[1], versions[2], resolver);
+  const auto merged =
+      fuzz::Merge(versions[0], versions[1], versions[2], resolver, way == Way::kFoldedOnThreads);
   std::ostringstream records;
   OutputConflictRecords(records, resolver, true);
   return fuzz::Written(*merged) + records.str();
@@ -35,12 +51,14 @@ std::string Merge(const std::vector<std::string>& texts, DocumentCache* cache) t
 
 }  // namespace
 
-// A merge gives the same whether what stands in all versions is taken apart or not.
+// A merge gives the same whether what stands in all versions is taken apart or not, on one thread or on
+// several.
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   fuzz::SetUp();
   std::vector<std::string> texts = fuzz::SplitTexts(data, size, 3);
   for (std::string& text : texts) text = fuzz::WithDirectives(text);
-  DocumentCache cache;
-  fuzz::Require(Merge(texts, &cache) == Merge(texts, nullptr), "folded objects are merged like others");
+  const std::string expected = Merge(texts, Way::kRead);
+  fuzz::Require(Merge(texts, Way::kFolded) == expected, "folded objects are merged like others");
+  fuzz::Require(Merge(texts, Way::kFoldedOnThreads) == expected, "threads merge like one");
   return 0;
 }

@@ -82,11 +82,11 @@ const Example& GetExample() {
 }
 
 std::unique_ptr<VexelObjects> Merge(VexelObjects& base, VexelObjects& left, VexelObjects& right,
-                                    RecordingConflictResolver& resolver) {
+                                    RecordingConflictResolver& resolver, bool threads) {
   for (const VexelObjects* version : {&base, &left, &right}) RefuseDuplicateKeys(*version, "input");
   PrepareForDiff(base, left, right);
   TimerStat silent("", nullptr);
-  const DiffPair diffs = CreateDiffPair({base, left}, {base, right}, false, silent);
+  const DiffPair diffs = CreateDiffPair({base, left}, {base, right}, threads, silent);
   std::unique_ptr<VexelObjects> merged = MergeIntoCopy(base, diffs, resolver, silent);
   PostProcessMergeOnly(*merged, left, right, resolver);
   return merged;

@@ -27,9 +27,10 @@ std::string WithDirectives(const std::string& documents);
 /// The text of all objects as it would be written to a file.
 std::string Written(VexelObjects& objects);
 
-/// What a merge of base, left and right comes to, repairs included. Throws YAMLError.
+/// What a merge of base, left and right comes to, repairs included; compared on two threads if `threads`.
+/// Throws YAMLError.
 std::unique_ptr<VexelObjects> Merge(VexelObjects& base, VexelObjects& left, VexelObjects& right,
-                                    RecordingConflictResolver& resolver);
+                                    RecordingConflictResolver& resolver, bool threads = false);
 
 /// A scene of a few objects and two edits of it, among them lists, references and a conflict: what rules,
 /// records and type information are tried on. Read once; whoever changes one works on a copy.
