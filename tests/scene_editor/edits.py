@@ -231,5 +231,5 @@ def make_triple(rng, edit_count):
     base = draw(BUILDING, rng.randint(4, 40), 1)
     left, right = (draw(EDITING, rng.randint(1, edit_count), first) for first in (1000, 2000))
     if rng.random() < 0.2:
-        right.insert(rng.randint(0, len(right)), rng.choice(left))
+        right = left[:rng.randint(1, len(left))] + right  # As after a cherry-pick.
     return base, left, right

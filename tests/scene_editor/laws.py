@@ -71,23 +71,34 @@ def settle(law, merger, versions, pending, choose):
         raise Broken(f"{law}: rounds", f"pending {pending} with the choices {choices}")
     check_edits(law, versions, merged, {side: [path for path, chosen in choices.items() if chosen != side]
                                         for side in SIDES})
-    for path, chosen in choices.items():
-        if chosen == "base" and path[0] in versions["base"] and not stands_as_in_base(versions, merged, path):
+    for path in choices:
+        # Choices for other things may bring something in or take something out.
+        if set(choices.values()) == {"base"} and not stands_as_in_base(versions, merged, path):
             raise Broken(f"{law}: base", f"{path} isn't as in base")
+
+
+def value_at(scene, path):
+    value = scene[path[0]].fields if path[0] in scene else None
+    for key in path[2:]:
+        value = value.get(key) if isinstance(value, dict) else None
+    return value
 
 
 def stands_as_in_base(versions, merged, path):
     """Whether a field has its value, and a thing its parts, apart from what somebody moved out, with all below it."""
+    if path[0] not in versions["base"]:
+        return True
     if len(path) == 1:
         top, sides = path[0], [versions[side] for side in SIDES]
         moved = {part for side in sides for part in side if top not in owners(side, part)}
         parts = [{part for part in whole(scene, top) if moved.isdisjoint(
             itertools.takewhile(top.__ne__, owners(scene, part)))} for scene in (versions["base"], merged)]
         return parts[0] == parts[1]
-    values = [scene[path[0]].fields if path[0] in scene else None for scene in (versions["base"], merged)]
-    for key in path[2:]:
-        values = [value.get(key) if isinstance(value, dict) else None for value in values]
-    return values[0] is None or values[0] == values[1]
+    before, left, right, after = (value_at(scene, path) for scene in (*versions.values(), merged))
+    if isinstance(before, list):  # Its order is what the choice is about; what only one side added is there, too.
+        before, after = ([item for item in one if item in two] for one, two in ((before, after), (after, before)))
+    # Where moves no longer form a circle after another choice, nothing was left to choose between.
+    return before is None or before == after or before in (left, right)
 
 
 def _without_order(value):
@@ -99,8 +110,8 @@ def _without_order(value):
 
 
 def check_swapped(merger, versions, merged, pending):
-    if (versions["left"].keys() & versions["right"].keys()) - versions["base"].keys():
-        return  # Left's values stand in an object that both added until somebody chooses.
+    if any(value_at(versions["base"], path) is None for path in pending):
+        return  # Left's value stands where both added one until somebody chooses.
     swapped, swapped_pending = merger.merge("base", "right", "left")
     different = [file_id for file_id in merged.keys() | swapped.keys()
                  if _without_order(merged.get(file_id)) != _without_order(swapped.get(file_id))]
