@@ -71,9 +71,10 @@ def settle(law, merger, versions, pending, choose):
         raise Broken(f"{law}: rounds", f"pending {pending} with the choices {choices}")
     check_edits(law, versions, merged, {side: [path for path, chosen in choices.items() if chosen != side]
                                         for side in SIDES})
-    for path in choices:
-        # Choices for other things may bring something in or take something out.
-        if set(choices.values()) == {"base"} and not stands_as_in_base(versions, merged, path):
+    for path, chosen in choices.items():
+        # Choices for other things may bring something into a thing, or take something out.
+        compared = chosen == "base" and (len(path) > 1 or len(set(choices.values())) == 1)
+        if compared and not stands_as_in_base(versions, merged, path):
             raise Broken(f"{law}: base", f"{path} isn't as in base")
 
 
