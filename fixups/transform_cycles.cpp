@@ -1,10 +1,10 @@
 #include "fixups/transform_cycles.h"
 
-#include <stdexcept>
 #include <unordered_set>
 #include <vector>
 
 #include "fixups/engine_keys.h"
+#include "platform/hinted_error.h"
 
 namespace vexel_yaml {
 
@@ -16,8 +16,13 @@ constexpr int kDeepestHierarchy = 100;
 bool IsInCycle(const TransformParents& parents, const YAMLScalar* transform) {
   const YAMLScalar* current = transform;
   for (int steps = 0; steps < kDeepestHierarchy; ++steps) {
-    current = parents.GetParent(current);
-    if (current == nullptr) throw std::runtime_error("Cannot find transform parent for fileID");
+    const YAMLScalar* const parent = parents.GetParent(current);
+    if (parent == nullptr) {
+      throw HintedError("Cannot find transform parent for fileID", "on the way up from object " +
+                                                                       transform->GetText() + ", object " +
+                                                                       current->GetText() + " is missing");
+    }
+    current = parent;
     if (IsNullReference(current)) return false;
     if (current == transform) return true;
   }
@@ -28,7 +33,8 @@ void Break(const FileIDMap& objects, TransformParents& parents, ConflictResolver
            const YAMLScalar* transform) {
   const YAMLMapping* object = objects.Find(transform);
   if (object == nullptr) {
-    throw std::runtime_error("Cannot find transform mapping from fileID while breaking cycle.");
+    throw HintedError("Cannot find transform mapping from fileID while breaking cycle.",
+                      "object " + transform->GetText() + " is missing");
   }
   resolver.OnTransformCycleDetected(transform, object, transform);
   parents.Detach(transform);
@@ -79,7 +85,8 @@ void BreakTransformCycles(YAMLMapping& merged, TransformParents& parents, Confli
   const FileIDMap objects = CollectFileIDMap(merged);
   for (const YAMLScalar* transform : resolver.GetMergedTransforms()) {
     if (!objects.Contains(transform)) {
-      throw std::runtime_error("Cannot find transform mapping from fileID while looking for cycles.");
+      throw HintedError("Cannot find transform mapping from fileID while looking for cycles.",
+                        "object " + transform->GetText() + " is missing");
     }
     if (IsInCycle(parents, transform)) Break(objects, parents, resolver, transform);
   }
