@@ -72,7 +72,17 @@ const YAMLMapping* ObjectNames::Body(const YAMLScalar* file_id) const {
   return nullptr;
 }
 
+std::string ObjectNames::GetScriptGuid(const YAMLScalar* file_id) const {
+  static const YAMLScalar* const script_key = YAMLScalar::Lookup("m_Script");
+  const YAMLNode* script = Field(Body(file_id), script_key);
+  return script == nullptr ? std::string() : TextOf(Field(script->AsMapping(), YAMLScalar::guid));
+}
+
 std::string ObjectNames::GetClass(const YAMLScalar* file_id) const {
+  if (!script_classes_.empty()) {
+    const auto found = script_classes_.find(GetScriptGuid(file_id));
+    if (found != script_classes_.end()) return found->second;
+  }
   for (const VexelObjects* version : versions_) {
     const YAMLMapping* object = GetSubmapping(*version, file_id);
     if (object == nullptr || object->HasDuplicateKeys()) continue;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <map>
 #include <string>
 #include <unordered_map>
 #include <vector>
@@ -16,8 +17,14 @@ class ObjectNames {
  public:
   explicit ObjectNames(std::vector<const VexelObjects*> versions) : versions_(std::move(versions)) {}
 
-  /// The object's class, such as "Light"; empty for an unknown object.
+  /// The object's class, such as "Light", or that of its script; empty for an unknown object.
   std::string GetClass(const YAMLScalar* file_id) const;
+
+  /// The guid of the script that the object is an instance of; empty for any other object.
+  std::string GetScriptGuid(const YAMLScalar* file_id) const;
+
+  /// Makes the instances of these scripts, by guid, go by their classes.
+  void SetScriptClasses(std::map<std::string, std::string> classes) { script_classes_ = std::move(classes); }
 
   /// The name that the object itself has; empty for none.
   std::string GetOwnName(const YAMLScalar* file_id) const;
@@ -43,6 +50,7 @@ class ObjectNames {
 
   std::vector<const VexelObjects*> versions_;
   std::unordered_map<const YAMLScalar*, std::string> paths_;
+  std::map<std::string, std::string> script_classes_;
 };
 
 /// The file ID of a reference within the file, null for any other value and for a reference to nothing.

@@ -1,0 +1,244 @@
+#include "report/conflict_names.h"
+
+#include <algorithm>
+#include <sstream>
+
+#include "diff/yaml_diff_output.h"
+#include "diff/yaml_mapping_diff.h"
+#include "diff/yaml_sequence_diff.h"
+#include "fixups/engine_keys.h"
+#include "report/override_names.h"
+#include "report/record_patterns.h"
+#include "report/report_model.h"
+#include "report/value_text.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using Record = RecordingConflictResolver::Record;
+
+constexpr size_t kMostOfValue = 60;
+constexpr size_t kMostOfField = 100;
+constexpr size_t kMostKeys = 3;
+
+bool IsIndex(const std::string& text) {
+  return !text.empty() && std::ranges::all_of(text, [](char c) { return c >= '0' && c <= '9'; });
+}
+
+// The fields on the way from an object's body to a place in it.
+std::string FieldText(const FieldPath& path) {
+  std::string text;
+  for (size_t i = 2; i < path.size(); ++i) {
+    const std::string component = path[i]->GetText();
+    if (i > 2 && IsIndex(component)) {
+      text += "[" + component + "]";
+    } else {
+      text += (text.empty() ? "" : ".") + component;
+    }
+  }
+  return Shortened(OnOneLine(text), kMostOfField);
+}
+
+std::string KeysText(const YAMLMappingDiff& diff) {
+  std::string text;
+  size_t count = 0;
+  for (const YAMLMappingDiff::Entry& entry : diff.GetEntries()) {
+    if (entry.key->IsPseudoKey() || ++count > kMostKeys) continue;
+    text += (text.empty() ? "" : ", ") + entry.key->GetText();
+  }
+  if (count > kMostKeys) text += " and " + std::to_string(count - kMostKeys) + " more";
+  return text;
+}
+
+// The fields of an object: it has one entry, which is its body.
+const YAMLMappingDiff& BodyDiff(const YAMLMappingDiff& object) {
+  if (object.GetEntries().size() != 1) return object;
+  const Operation* body = object.GetEntries().front().operation;
+  if (body == nullptr || body->GetKind() != Operation::Kind::kChangeMapping) return object;
+  return *static_cast<const ChangeMappingOperation*>(body)->GetDiff();
+}
+
+std::string MappingText(const YAMLMappingDiff& diff) {
+  const std::string keys = KeysText(diff);
+  return keys.empty() ? "reorders it" : "edits " + keys;
+}
+
+std::string ListText(const ChangeSequenceOperation& operation) {
+  size_t added = 0;
+  for (const auto& [index, edit] : operation.GetDiff()->GetEntries()) {
+    if (edit != nullptr && edit->GetKind() == Operation::Kind::kAdd) ++added;
+  }
+  const size_t edited = operation.GetDiff()->GetEntries().size() - added;
+  if (added == 0 && edited == 0) return "removes from it or reorders it";
+  const std::string adds = "adds " + std::to_string(added);
+  const std::string edits = "edits " + std::to_string(edited);
+  return added == 0 ? edits + " of it" : edited == 0 ? adds + " to it" : adds + " to it, " + edits + " of it";
+}
+
+std::string FullText(const Operation* operation) {
+  if (operation == nullptr) return {};
+  std::ostringstream text;
+  YAMLDiffOutput out(text, 1);
+  operation->Output(out);
+  return std::move(text).str();
+}
+
+class ConflictNamer {
+ public:
+  ConflictNamer(const RecordingConflictResolver& resolver, const VexelObjects& base, const VexelObjects& left,
+                const VexelObjects& right)
+      : patterns_(resolver), base_(base), left_(left), right_(right), names_({&right, &left, &base}) {}
+
+  void FindScripts(const std::vector<const Record*>& records, const ScriptSearch& search) {
+    std::set<std::string> guids;
+    for (const Record* record : records) {
+      std::string guid = names_.GetScriptGuid(record->path.front());
+      if (!guid.empty()) guids.insert(std::move(guid));
+    }
+    if (!guids.empty()) names_.SetScriptClasses(search(guids));
+  }
+
+  NamedConflict Name(const Record& record) {
+    const FieldPath& path = record.path;
+    NamedConflict conflict = {patterns_.For(record), ObjectText(path.front()), {}, {}, {}, {}};
+    const auto overridden = OverrideAt(record, base_, left_, right_);
+    if (overridden) {
+      conflict.name += " > " + overridden->name;
+    } else if (path.size() > 2) {
+      conflict.name += " > " + FieldText(path);
+    }
+    const YAMLNode* base_value = overridden ? overridden->base_value : ValueAt(path);
+    if (path.size() > 1 && base_value != nullptr) conflict.was = WasText(*base_value);
+    conflict.theirs = SideText(record, record.left, true);
+    conflict.ours = SideText(record, record.right, false);
+    conflict.edits = conflict.was + '\n' + FullText(record.left) + '\n' + FullText(record.right);
+    return conflict;
+  }
+
+ private:
+  // The object, and its class where the path to it doesn't say it all.
+  std::string ObjectText(const YAMLScalar* file_id) {
+    const std::string path = OnOneLine(names_.GetPath(file_id));
+    const std::string class_name = OnOneLine(names_.GetClass(file_id));
+    if (path.empty())
+      return (class_name.empty() ? "object" : class_name) + " " + OnOneLine(file_id->GetText());
+    return class_name.empty() || class_name == "GameObject" ? path : path + " > " + class_name;
+  }
+
+  // Of a place that no list is on the way to: the index in a path is none of base's.
+  const YAMLNode* ValueAt(const FieldPath& path) const {
+    const YAMLNode* node = &base_;
+    for (const YAMLScalar* component : path) {
+      const YAMLMapping* mapping = node->AsMapping();
+      if (mapping == nullptr || mapping->HasDuplicateKeys()) return nullptr;
+      node = mapping->Get(component);
+      if (node == nullptr) return nullptr;
+    }
+    return node;
+  }
+
+  std::string WasText(const YAMLNode& value) {
+    const std::string text = OnOneLine(ValueText(&value, names_, kMostOfValue));
+    return value.AsScalar() == nullptr && text.ends_with(kEllipsis) ? std::string() : text;
+  }
+
+  std::string SideText(const Record& record, const Operation* operation, bool is_left) {
+    const std::string_view dependency = DependencyText(record);
+    if (!dependency.empty() && IsLeftType(record.type) == is_left) return std::string(dependency);
+    if (record.type == ConflictType::kTransformCycle) return "moves it into a circle";
+    if (operation == nullptr) return "leaves it";
+    switch (operation->GetKind()) {
+      case Operation::Kind::kRemove:
+        return "removes it";
+      case Operation::Kind::kAdd:
+        if (record.path.size() == 1) return "adds it";
+        return "adds " + NewValueText(record, static_cast<const AddOperation*>(operation)->GetValue());
+      case Operation::Kind::kChange:
+        return NewValueText(record, static_cast<const ChangeOperation*>(operation)->GetValue());
+      case Operation::Kind::kChangeMapping: {
+        const YAMLMappingDiff& diff = *static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
+        if (record.path.size() > 1) return OnOneLine(MappingText(diff));
+        const std::string parts = PartsText(diff, names_.GetPath(record.path.front()));
+        return OnOneLine(parts.empty() ? MappingText(BodyDiff(diff)) : parts);
+      }
+      case Operation::Kind::kChangeSequence:
+        return ListText(*static_cast<const ChangeSequenceOperation*>(operation));
+    }
+    return {};
+  }
+
+  // What was done to the objects that an object consists of, where the diff is by file IDs; empty for one by
+  // the object's class.
+  std::string PartsText(const YAMLMappingDiff& diff, const std::string& path) {
+    std::string text;
+    size_t count = 0;
+    for (const YAMLMappingDiff::Entry& entry : diff.GetEntries()) {
+      if (!IsIndex(entry.key->GetText()) || entry.operation == nullptr || ++count > kMostKeys) continue;
+      const bool is_inside = names_.GetPath(entry.key) == path && !path.empty();
+      std::string name =
+          is_inside ? names_.GetClass(entry.key) : Shortened(names_.Describe(entry.key), kMostOfValue);
+      // What is gone with the rest of it has no name any more.
+      if (name.empty()) name = "object " + entry.key->GetText();
+      text += text.empty() ? "" : ", ";
+      if (entry.operation->GetKind() == Operation::Kind::kChangeMapping) {
+        const auto* change = static_cast<const ChangeMappingOperation*>(entry.operation);
+        text += MappingText(BodyDiff(*change->GetDiff())) + " of " + name;
+      } else {
+        text += (entry.operation->GetKind() == Operation::Kind::kRemove ? "removes " : "adds ") + name;
+      }
+    }
+    return count > kMostKeys ? text + " and " + std::to_string(count - kMostKeys) + " more" : text;
+  }
+
+  std::string NewValueText(const Record& record, const YAMLNode* value) {
+    std::string text = OnOneLine(ValueText(value, names_, kMostOfValue));
+    if (record.path.back() != YAMLScalar::fileID || value->AsScalar() == nullptr) return text;
+    const std::string target = OnOneLine(names_.Describe(value->AsScalar()));
+    return target.empty() ? text : text + " (" + Shortened(target, kMostOfValue) + ")";
+  }
+
+  const RecordPatterns patterns_;
+  const VexelObjects& base_;
+  const VexelObjects& left_;
+  const VexelObjects& right_;
+  ObjectNames names_;
+};
+
+// Two lamps of one name can stand beside one another.
+void TellApart(std::vector<NamedConflict>& conflicts) {
+  std::map<std::string, size_t> counts;
+  for (const NamedConflict& conflict : conflicts) ++counts[conflict.name];
+  for (NamedConflict& conflict : conflicts) {
+    if (counts[conflict.name] > 1) conflict.name += " (" + conflict.place + ")";
+  }
+}
+
+std::string WithName(std::string_view side, std::string_view name) {
+  return name.empty() ? std::string(side) : std::string(side) + " (" + std::string(name) + ")";
+}
+
+}  // namespace
+
+std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver, const VexelObjects& base,
+                                         const VexelObjects& left, const VexelObjects& right,
+                                         const ScriptSearch& search) {
+  std::vector<const Record*> pending;
+  for (const Record& record : resolver.GetRecords()) {
+    if (record.resolution == MergeResolve::kConflict) pending.push_back(&record);
+  }
+  ConflictNamer namer(resolver, base, left, right);
+  namer.FindScripts(pending, search);
+  std::vector<NamedConflict> conflicts;
+  for (const Record* record : pending) conflicts.push_back(namer.Name(*record));
+  TellApart(conflicts);
+  return conflicts;
+}
+
+std::string ConflictLine(const NamedConflict& conflict, std::string_view theirs, std::string_view ours) {
+  return conflict.name + ": " + (conflict.was.empty() ? "" : "was " + conflict.was + ", ") +
+         WithName("theirs", theirs) + " " + conflict.theirs + ", " + WithName("ours", ours) + " " +
+         conflict.ours;
+}
+
+}  // namespace vexel_yaml

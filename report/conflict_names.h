@@ -1,0 +1,43 @@
+#pragma once
+
+#include <functional>
+#include <map>
+#include <set>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "merge/recording_conflict_resolver.h"
+#include "report/object_names.h"
+
+namespace vexel_yaml {
+
+/// A conflict that nobody has settled, in the words of the people who are in it.
+struct NamedConflict {
+  /// A pattern for its path, and for no other.
+  std::string place;
+  /// Such as "Level01/Lamp Post > Light > m_Intensity"; no other one of the list has the same.
+  std::string name;
+  /// Base's value; empty where there was none, or none that fits into a line.
+  std::string was;
+  /// What each side did, such as "4" or "removes it".
+  std::string theirs;
+  std::string ours;
+  /// Base's value and both edits in full, by which the same conflict is known when it comes again.
+  std::string edits;
+};
+
+/// The classes of scripts by the guids that objects refer to them with; those that aren't found are missing.
+using ScriptClasses = std::map<std::string, std::string>;
+using ScriptSearch = std::function<ScriptClasses(const std::set<std::string>& guids)>;
+
+/// The pending conflicts of a merge of these versions, in the order of its records. Where scripts are among
+/// them, `search` is asked once.
+std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver, const VexelObjects& base,
+                                         const VexelObjects& left, const VexelObjects& right,
+                                         const ScriptSearch& search);
+
+/// The conflict in one line; the sides' own names stand in brackets where they have some.
+std::string ConflictLine(const NamedConflict& conflict, std::string_view theirs, std::string_view ours);
+
+}  // namespace vexel_yaml
