@@ -6,6 +6,7 @@ set -euo pipefail
 source "$(dirname "${BASH_SOURCE[0]}")/support/end_to_end.sh"
 
 config="$project/integrations/subversion/config"
+export PATH="$project/integrations/subversion:$PATH"
 mkdir -p "$HOME/.subversion" && cp "$config" "$HOME/.subversion/config"
 for page in docs/subversion.md README.md; do check "$page shows the set-up" shows "$project/$page" "$config"; done
 # As on a machine that has no other merge tool; what this one has would open a window or the terminal.
@@ -25,7 +26,7 @@ svn checkout -q "$url/branches/wide" "$work/branch"
 # conflict for Subversion, which then starts the program; edits of neighbouring lines it would merge itself.
 lamp() {
   scene "$1" "$2"
-  printf -- '--- !v!114 &%s\nMonoBehaviour:\n  m_GameObject: {fileID: 10}\n' "${@:3}"
+  printf -- '--- !v!114 &%s\nMonoBehaviour:\n  speed: 1\n' "${@:3}"
 }
 save() { # save FOLDER INTENSITY RANGE FILE_ID...: edit the scene there and commit
   lamp "${@:2}" >"$work/$1/$file" && svn commit -q -m "$*" "$work/$1"
@@ -58,7 +59,7 @@ check "nobody can commit it" refuses svn commit -q -m early 2>/dev/null
 check "mine is kept" cmp "$file.mine" <(lamp 7 40 23 21 22)
 
 versions=("$file".r[0-9]* "$file".mine)
-settle() { VexelYAMLMerge merge -h --force --fallback none "$@" "${versions[@]}" "$file" >/dev/null; }
+settle() { VexelYAMLMerge merge -h --force --safe --fallback none "$@" "${versions[@]}" "$file" >/dev/null; }
 check "merging by hand leaves the conflict" refuses settle -o "$work/records.txt"
 check "but the engine can open the result" has 5 60 23 21 22
 echo "right 11.Light.m_Intensity" >>"$work/records.txt"
