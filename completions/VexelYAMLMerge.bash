@@ -108,6 +108,12 @@ _vexel_merge_report() {
   _vexel_files vexel prefab meta
 }
 
+_vexel_revisions() {
+  local items
+  mapfile -t items < <(git for-each-ref --format='%(refname:short)' refs/heads refs/tags refs/remotes 2>/dev/null)
+  _vexel_offer_quoted HEAD "${items[@]}"
+}
+
 # The files that resolve is for, as they are called from the current folder.
 _vexel_unmerged() { git ls-files --unmerged -z :/ 2>/dev/null | tr '\0' '\n' | cut -f 2- | sort -u; }
 
@@ -115,7 +121,7 @@ _vexel_merge_git() {
   local cur prev word items=()
   _vexel_words
   if [[ "$COMP_CWORD" -eq 1 ]]; then
-    _vexel_offer enable disable status resolve report --version --help
+    _vexel_offer enable disable status resolve check preview report --version --help
     return
   fi
   case "${COMP_WORDS[1]} $prev" in
@@ -136,7 +142,7 @@ _vexel_merge_git() {
       ;;
     "resolve "*)
       if [[ "$cur" == -* && " ${COMP_WORDS[*]:0:COMP_CWORD} " != *" -- "* ]]; then
-        _vexel_offer --left --right --base --path --force --
+        _vexel_offer --theirs --left --ours --right --base --path --force --
       else
         compopt -o filenames
         mapfile -t items < <(_vexel_unmerged)
@@ -150,10 +156,16 @@ _vexel_merge_git() {
       elif [[ "$cur" == -* ]]; then
         _vexel_offer -o --
       else
-        mapfile -t items < <(git for-each-ref --format='%(refname:short)' refs/heads refs/tags refs/remotes 2>/dev/null)
-        _vexel_offer_quoted HEAD "${items[@]}"
+        _vexel_revisions
       fi
       ;;
+    "check "*)
+      case "$cur" in
+        -*) _vexel_offer --staged --conflicts -- ;;
+        *) _vexel_revisions ;;
+      esac
+      ;;
+    "preview "*) _vexel_revisions ;;
   esac
 }
 

@@ -3,17 +3,21 @@
 #include <exception>
 #include <iostream>
 #include <new>
+#include <set>
 #include <sstream>
 
 #include "fixups/post_process.h"
+#include "git/script_classes.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
 #include "merge/conflict_record_file.h"
 #include "platform/file_error.h"
 #include "platform/thread.h"
 #include "report/merged_files.h"
+#include "report/record_patterns.h"
 #include "report/value_text.h"
 #include "rules/setup.h"
+#include "scene/safe_merge.h"
 #include "yaml/write_objects.h"
 
 namespace vexel_yaml {
@@ -54,6 +58,18 @@ void LoadRulesAndTypes(const MergeSettings& settings) {
   if (failure) std::rethrow_exception(failure);
 }
 
+// The objects that a diff is about, as people call them; a game object is one with its components.
+std::vector<std::string> EditedObjects(const YAMLMappingDiff& diff, ObjectNames& names) {
+  std::vector<std::string> objects;
+  std::set<std::string> known;
+  for (const YAMLMappingDiff::Entry& entry : diff.GetEntries()) {
+    std::string name = names.GetPath(entry.key);
+    if (name.empty()) name = names.GetClass(entry.key) + " " + entry.key->GetText();
+    if (known.insert(name).second) objects.push_back(std::move(name));
+  }
+  return objects;
+}
+
 void Replace(std::string& text, const std::string& name, const std::string& by) {
   for (size_t at = 0; (at = text.find(name, at)) != std::string::npos; at += by.size()) {
     text.replace(at, name.size(), by);
@@ -74,13 +90,21 @@ void SayMessages(std::string messages, const AssetVersions& versions) {
 
 bool AssetVersions::HasAsset() const { return IsAsset(right) || IsAsset(left) || IsAsset(base); }
 
-void AssetMerge::Read() {
-  is_read_ = true;
+void AssetMerge::Read(bool is_safe) {
+  is_read_safe_ = is_safe;
+  read_failure_ = nullptr;
+  documents_ = std::make_unique<SceneDocuments>();
+  const auto& [asset, base, left, right] = versions_;
   const CapturedErrors captured;
   try {
     TimerStat silent("", nullptr);
-    threads_ = AreWorthThreads({versions_.base, versions_.left, versions_.right});
-    ReadMergeDocuments(versions_.base, versions_.left, versions_.right, documents_, threads_, silent);
+    threads_ = AreWorthThreads({base, left, right});
+    if (is_safe) {
+      ReadScenes(base, left, right, *documents_, threads_, silent);
+    } else {
+      ReadMergeDocuments(base, left, right, *documents_, threads_, silent);
+      PrepareForDiff(documents_->base, documents_->left, documents_->right);
+    }
   } catch (...) {
     read_failure_ = std::current_exception();
   }
@@ -88,37 +112,65 @@ void AssetMerge::Read() {
 }
 
 int AssetMerge::Merge(const MergeSettings& settings, const Decisions* decisions) {
-  TimerStat silent("", nullptr);
   // What is wrong with these is told first.
   LoadRulesAndTypes(settings);
   if (read_failure_) std::rethrow_exception(read_failure_);
-  PrepareForDiff(documents_.base, documents_.left, documents_.right);
-  diffs_ = CreateDiffPair({documents_.base, documents_.left}, {documents_.base, documents_.right}, threads_,
-                          silent);
-  if (decisions != nullptr) {
-    std::istringstream stream(decisions->text);
-    try {
-      InputConflictRecords(stream, resolver_);
-    } catch (const YAMLError& error) {
-      throw DecisionError(Shown(decisions->record) + ": " + OnOneLine(error.what()));
-    }
+  const auto& [base, left, right] = static_cast<const MergeDocuments&>(*documents_);
+  if (!settings.is_safe || lists_edits_) {
+    TimerStat silent("", nullptr);
+    diffs_ = CreateDiffPair({base, left}, {base, right}, threads_, silent);
   }
-  merged_ = MergeIntoCopy(documents_.base, diffs_, resolver_, silent);
-  const bool breaks_dependency = PostProcess(*merged_, documents_.left, documents_.right, resolver_);
+  if (lists_edits_) {
+    ObjectNames names({&right, &left, &base});
+    edits_ = {EditedObjects(*diffs_.left, names), EditedObjects(*diffs_.right, names)};
+  }
+  if (decisions != nullptr) TakeDecisions(*decisions);
+  const bool breaks_dependency = settings.is_safe ? MergeScenes() : MergeValues();
   std::ostringstream text;
   WriteObjects(*merged_, text, threads_);
   text_ = std::move(text).str();
   if (!resolver_.HasPendingConflicts()) return kMerged;
-  conflicts_ = ListConflicts(resolver_);
   return breaks_dependency ? kBrokenDependencies : kConflicts;
 }
 
+void AssetMerge::TakeDecisions(const Decisions& decisions) {
+  std::istringstream stream(decisions.text);
+  try {
+    InputConflictRecords(stream, resolver_);
+  } catch (const YAMLError& error) {
+    std::string mistake = OnOneLine(error.what());
+    Replace(mistake, "(left,right,base)", "(theirs, ours or base)");
+    Replace(mistake, "should be left,right or base", "should be theirs, ours or base");
+    throw DecisionError(Shown(decisions.record) + ": " + mistake);
+  }
+}
+
+bool AssetMerge::MergeScenes() {
+  TimerStat silent("", nullptr);
+  SafeMergeResult result = SafeMerge(*documents_, resolver_, {.threads = threads_}, silent);
+  merged_ = std::move(result.merged);
+  return result.breaks_dependency;
+}
+
+bool AssetMerge::MergeValues() {
+  TimerStat silent("", nullptr);
+  merged_ = MergeIntoCopy(documents_->base, diffs_, resolver_, silent);
+  return PostProcess(*merged_, documents_->left, documents_->right, resolver_);
+}
+
 int AssetMerge::Run(const MergeSettings& settings, const Decisions* decisions) {
+  const int status = RunQuietly(settings, decisions);
+  SayMessages();
+  return status;
+}
+
+int AssetMerge::RunQuietly(const MergeSettings& settings, const Decisions* decisions) {
   if (IsEmpty(versions_.base)) {
-    Complain("both sides have added " + versions_.asset + ", so there is no base to merge it with");
+    messages_ =
+        "error: both sides have added " + Shown(versions_.asset) + ", so there is no base to merge it with";
     return kFailed;
   }
-  if (!is_read_) Read();
+  if (is_read_safe_ != settings.is_safe) Read(settings.is_safe);
   const std::string prefix = "Cannot merge file '" + versions_.base + "': ";
   std::string failure;
   int status = kFailed;
@@ -139,8 +191,31 @@ int AssetMerge::Run(const MergeSettings& settings, const Decisions* decisions) {
     }
     messages_ += captured.Text();
   }
-  SayMessages(messages_ + failure, versions_);
+  messages_ += failure;
   return status;
+}
+
+void AssetMerge::SayMessages() const { vexel_yaml::SayMessages(messages_, versions_); }
+
+const std::vector<NamedConflict>& AssetMerge::GetConflicts() {
+  if (!conflicts_) {
+    conflicts_ =
+        NameConflicts(resolver_, documents_->base, documents_->left, documents_->right, FindScriptClasses);
+  }
+  return *conflicts_;
+}
+
+std::map<std::string, std::string> AssetMerge::GetChoices() const {
+  const RecordPatterns patterns(resolver_);
+  std::map<std::string, std::string> choices;
+  for (const RecordingConflictResolver::Record& record : resolver_.GetRecords()) {
+    const char* word = record.resolution == MergeResolve::kLeft    ? "left"
+                       : record.resolution == MergeResolve::kRight ? "right"
+                       : record.resolution == MergeResolve::kBase  ? "base"
+                                                                   : nullptr;
+    if (word != nullptr) choices.emplace(patterns.For(record), word);
+  }
+  return choices;
 }
 
 std::string AssetMerge::GetRecord() const {
@@ -149,17 +224,8 @@ std::string AssetMerge::GetRecord() const {
   return std::move(out).str();
 }
 
-void SayConflicts(const std::string& asset, const std::vector<ListedConflict>& conflicts) {
-  const std::string name = Shown(asset);
-  for (const ListedConflict& conflict : conflicts) {
-    std::cerr << "CONFLICT " << name << ": " << conflict.place << ": left " << conflict.left << ", right "
-              << conflict.right << '\n';
-  }
-  std::cerr.flush();
-}
-
-std::string Count(const std::vector<ListedConflict>& conflicts) {
-  return conflicts.size() == 1 ? "1 conflict" : std::to_string(conflicts.size()) + " conflicts";
+std::string CountOfConflicts(size_t number) {
+  return number == 1 ? "1 conflict" : std::to_string(number) + " conflicts";
 }
 
 }  // namespace vexel_yaml

@@ -1,15 +1,17 @@
 #pragma once
 
 #include <exception>
+#include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "fixups/three_way_merge.h"
 #include "git/settings.h"
 #include "merge/recording_conflict_resolver.h"
-#include "report/conflict_list.h"
+#include "report/conflict_names.h"
+#include "scene/scene_documents.h"
 
 namespace vexel_yaml {
 
@@ -29,8 +31,8 @@ struct Decisions {
   std::string record;
 };
 
-/// Merges the versions of an asset as `VexelYAMLMerge merge --force` does, in this process, with conflicts to
-/// base. The documents live as long as the object.
+/// Merges the versions of an asset as `VexelYAMLMerge merge --force --safe` does, or without `--safe` where
+/// the settings say so, in this process, with conflicts to base. The documents live as long as the object.
 class AssetMerge {
  public:
   explicit AssetMerge(AssetVersions versions) : versions_(std::move(versions)) {}
@@ -40,45 +42,65 @@ class AssetMerge {
   static constexpr int kConflicts = 2;
   static constexpr int kBrokenDependencies = 3;
 
-  /// Reads the versions, which takes no settings: a part of `Run` for which there may be time before that.
-  /// What goes wrong is kept for `Run`.
-  void Read();
+  /// Reads the versions for a safe merge, which takes no settings: a part of `Run` for which there may be
+  /// time before that. What goes wrong is kept for `Run`.
+  void Read() { Read(true); }
 
   /// Returns one of these. What went wrong has been said, with the asset's own name for those of the
   /// versions. To be called once. All merges of a process have the same settings.
   int Run(const MergeSettings& settings, const Decisions* decisions = nullptr);
 
+  /// The same without a word, which `SayMessages` has then.
+  int RunQuietly(const MergeSettings& settings, const Decisions* decisions = nullptr);
+  void SayMessages() const;
+
+  /// Lets `GetEdits` tell which objects each side has edited. To be called before the merge.
+  void ListEdits() { lists_edits_ = true; }
+  struct Edits {
+    std::vector<std::string> theirs;
+    std::vector<std::string> ours;
+  };
+  const Edits& GetEdits() const { return edits_; }
+
   /// The merged asset.
   const std::string& GetText() const { return text_; }
-  /// What is pending.
-  const std::vector<ListedConflict>& GetConflicts() const { return conflicts_; }
+  bool HasConflicts() const { return resolver_.HasPendingConflicts(); }
+  /// What is pending. It takes time to name it, which only the first call does.
+  const std::vector<NamedConflict>& GetConflicts();
+  /// What has been chosen, as a word of a record file, by the conflict's place.
+  std::map<std::string, std::string> GetChoices() const;
   /// The record file's text.
   std::string GetRecord() const;
 
  private:
+  void Read(bool is_safe);
   int Merge(const MergeSettings& settings, const Decisions* decisions);
+  void TakeDecisions(const Decisions& decisions);
+  /// Both return whether a broken component dependency is pending.
+  bool MergeScenes();
+  bool MergeValues();
 
   const AssetVersions versions_;
-  bool is_read_ = false;
+  /// Whether what has been read is for a safe merge; nothing before that.
+  std::optional<bool> is_read_safe_;
   bool threads_ = false;
   std::exception_ptr read_failure_;
   // What was written to standard error.
   std::string messages_;
-  MergeDocuments documents_;
+  std::unique_ptr<SceneDocuments> documents_;
   DiffPair diffs_;
   std::unique_ptr<VexelObjects> merged_;
   RecordingConflictResolver resolver_{MergeResolve::kBase};
   std::string text_;
-  std::vector<ListedConflict> conflicts_;
+  std::optional<std::vector<NamedConflict>> conflicts_;
+  bool lists_edits_ = false;
+  Edits edits_;
 };
 
 /// Says what a program or a merge has said about the versions, with the asset's own name.
 void SayMessages(std::string messages, const AssetVersions& versions);
 
-/// Says each conflict of the asset in a line.
-void SayConflicts(const std::string& asset, const std::vector<ListedConflict>& conflicts);
-
 /// Such as "1 conflict".
-std::string Count(const std::vector<ListedConflict>& conflicts);
+std::string CountOfConflicts(size_t number);
 
 }  // namespace vexel_yaml

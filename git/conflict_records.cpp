@@ -6,10 +6,12 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <sstream>
+#include <optional>
 
+#include "git/conflict_messages.h"
 #include "git/folder_lock.h"
 #include "git/git_call.h"
+#include "git/index_state.h"
 #include "git/marked_block.h"
 #include "git/name_in_use.h"
 #include "git/path_names.h"
@@ -23,6 +25,7 @@ namespace vexel_yaml {
 namespace {
 
 constexpr std::string_view kSuffix = ".vexel-conflicts";
+constexpr std::string_view kEntrySuffix = ".path";
 constexpr std::string_view kHeading = "Conflict handling:";
 
 // Whether it still looks like one, also after somebody has taken one of the two lines out.
@@ -43,17 +46,32 @@ bool IsForUs(const std::string& path) {
   return tracked.status == 0 && tracked.output.empty();
 }
 
-std::string RecordText(const std::string& asset, const AssetMerge& merge) {
+std::string WithName(const std::string& side, const std::string& name) {
+  return name.empty() ? side : side + " (" + name + ")";
+}
+
+std::string RecordText(const RecordEntry& entry, const AssetMerge& merge) {
   std::string text =
-      "# What is in conflict in " + Escaped(asset) +
-      ". Left is \"theirs\", right is \"ours\".\n"
+      "# What is in conflict in " + Escaped(entry.asset) + ". Left is " +
+      WithName("theirs", entry.names.theirs) + ", right is " + WithName("ours", entry.names.ours) +
+      ".\n"
       "# To settle a conflict, take the \"#\" off its line at the end, and leave one of the three "
       "words. Then:\n"
       "#   " +
-      ResolveCall(asset) + "\n" + merge.GetRecord();
-  for (const ListedConflict& conflict : merge.GetConflicts())
-    text += "# left|right|base " + conflict.place + "\n";
+      ResolveCall(entry.asset) + "\n" + merge.GetRecord();
+  for (const RecordedConflict& conflict : entry.conflicts) {
+    if (!conflict.is_settled) text += "# " + conflict.text + "\n# theirs|ours|base " + conflict.place + "\n";
+  }
   return text;
+}
+
+// A line of decisions in the words of record files.
+std::string InWordsOfRecords(const std::string& line) {
+  for (const auto& [word, meant] :
+       {std::pair<std::string, std::string>("theirs ", "left "), {"ours ", "right "}}) {
+    if (line.starts_with(word)) return meant + line.substr(word.size());
+  }
+  return line;
 }
 
 }  // namespace
@@ -63,7 +81,7 @@ ConflictRecords::ConflictRecords(const Repository& repository)
 
 ConflictRecords::Places ConflictRecords::PlacesFor(const std::string& asset) const {
   const std::string kept = folder_ + "/" + HashedPath(asset);
-  return {"./" + asset + std::string(kSuffix), kept + std::string(kSuffix), kept + ".path"};
+  return {"./" + asset + std::string(kSuffix), kept + std::string(kSuffix), kept + std::string(kEntrySuffix)};
 }
 
 std::string ConflictRecords::Find(const std::string& asset) const {
@@ -73,19 +91,34 @@ std::string ConflictRecords::Find(const std::string& asset) const {
   return IsFile(places.kept) ? places.kept : std::string();
 }
 
-std::string ConflictRecords::RecordedHash(const std::string& asset) const {
-  const std::vector<std::string> lines = Pieces(TextOf(PlacesFor(asset).entry), '\n');
-  return lines.size() < 2 ? std::string() : lines[1];
+RecordEntry ConflictRecords::Entry(const std::string& asset) const {
+  return ReadEntry(PlacesFor(asset).entry);
 }
 
-std::string ConflictRecords::Leave(const std::string& asset, const AssetMerge& merge,
+std::vector<RecordEntry> ConflictRecords::Entries() const {
+  std::vector<RecordEntry> entries;
+  std::error_code error;
+  for (const auto& file : std::filesystem::directory_iterator(folder_, error)) {
+    if (file.path().extension() != kEntrySuffix) continue;
+    entries.push_back(ReadEntry(file.path().string()));
+    // A crash has left it without its text.
+    if (!entries.back().asset.empty()) continue;
+    entries.pop_back();
+    unlink(std::filesystem::path(file.path()).replace_extension(kSuffix).c_str());
+    unlink(file.path().c_str());
+  }
+  std::ranges::sort(entries, {}, &RecordEntry::asset);
+  return entries;
+}
+
+std::string ConflictRecords::Leave(RecordEntry entry, const AssetMerge& merge,
                                    const std::function<std::string()>& hash,
                                    const MergeSettings& settings) const {
-  const std::string text = RecordText(asset, merge);
+  const std::string text = RecordText(entry, merge);
   std::string record;
   {
     const FolderLock lock(repository_);
-    record = Place(asset, text, hash, !settings.has_other_hooks);
+    record = Place(std::move(entry), text, hash, !settings.has_other_hooks);
   }
   if (record.empty()) return record;
   // The record is there all the same.
@@ -98,21 +131,28 @@ std::string ConflictRecords::Leave(const std::string& asset, const AssetMerge& m
 }
 
 // Remembered first, so that no record is there that nobody removes.
-std::string ConflictRecords::Place(const std::string& asset, const std::string& text,
+std::string ConflictRecords::Place(RecordEntry entry, const std::string& text,
                                    const std::function<std::string()>& hash, bool may_use_hook) const {
-  const Places places = PlacesFor(asset);
-  const std::string name = asset + std::string(kSuffix);
+  const Places places = PlacesFor(entry.asset);
+  const std::string name = entry.asset + std::string(kSuffix);
+  const bool is_beside = entry.CountPending() > 0;
   // Git answers while the files are looked at.
-  NameInUse in_use(repository_, name);
+  std::optional<NameInUse> in_use;
+  if (is_beside) in_use.emplace(repository_, name);
   const bool is_ours = IsFile(places.entry) && IsRecord(places.beside);
   const bool is_free = access(places.beside.c_str(), F_OK) != 0;
-  const bool is_for_us = IsPlain(name) && !in_use.Get();
+  const bool is_for_us = IsPlain(name) && (!in_use || !in_use->Get());
   // The first version had a list of this name.
   if (IsFile(folder_)) unlink(folder_.c_str());
   if (mkdir(folder_.c_str(), 0777) != 0 && !IsFolder(folder_)) return {};
-  if (!PutFile(places.entry, QuotedPath(asset) + "\n" + hash() + "\n")) return {};
-  if (may_use_hook) PlaceHook(repository_);
+  entry.hash = hash();
+  if (!WriteEntry(places.entry, entry)) return {};
+  if (may_use_hook) PlaceHooks(repository_);
   if (!PutFile(places.kept, text)) return {};
+  if (!is_beside) {
+    if (is_ours && IsForUs(name)) unlink(places.beside.c_str());
+    return places.kept;
+  }
   if ((is_ours || is_free) && is_for_us && MakeFoldersFor(places.beside) && PutFile(places.beside, text)) {
     return places.beside;
   }
@@ -126,37 +166,49 @@ void ConflictRecords::Remove(const std::string& asset) const {
   unlink(places.entry.c_str());
 }
 
-void ConflictRecords::Sweep() const {
+void ConflictRecords::Sweep(bool is_committed) const {
   if (!IsFolder(folder_)) return;
   const FolderLock lock(repository_);
   if (repository_.IsLocked()) return;
-  const auto unmerged = UnmergedBelow({}, false);
-  if (!unmerged) return;
-  std::error_code error;
-  for (const auto& file : std::filesystem::directory_iterator(folder_, error)) {
-    if (file.path().extension() != ".path") continue;
-    const std::vector<std::string> lines = Pieces(TextOf(file.path().string()), '\n');
-    if (lines.empty()) {
-      // A crash has left it without its text.
-      unlink(std::filesystem::path(file.path()).replace_extension(kSuffix).c_str());
-      unlink(file.path().c_str());
-      continue;
-    }
-    const std::string asset = UnquotedPath(lines.front());
-    if (!std::ranges::binary_search(*unmerged, asset)) Remove(asset);
+  const auto paths = PathsInConflict();
+  if (!paths) return;
+  const std::vector<RecordEntry> entries = Entries();
+  std::vector<std::string> staged;
+  for (const RecordEntry& entry : entries) {
+    if (!is_committed && paths->staged.contains(entry.asset)) staged.push_back(entry.asset);
   }
-  RemoveHook();
+  const auto blobs = IndexBlobs(staged);
+  if (!blobs) return;
+  for (const RecordEntry& entry : entries) {
+    if (paths->unmerged.contains(entry.asset)) continue;
+    const auto blob = blobs->find(entry.asset);
+    const bool is_staged = !is_committed && paths->staged.contains(entry.asset);
+    if (!is_staged || blob == blobs->end() || blob->second != entry.hash) {
+      Remove(entry.asset);
+    } else if (entry.CountPending() > 0 && !entry.is_told) {
+      TellStaged(entry);
+    }
+  }
+  RemoveHooks();
 }
 
-// With the last record of this work tree: the hook goes, unless another one has a record.
-void ConflictRecords::RemoveHook() const {
+void ConflictRecords::TellStaged(RecordEntry entry) const {
+  Say("warning: " + entry.asset + " is staged as the merge left it, with base's values at " +
+      CountOfConflicts(entry.CountPending()) +
+      " that nobody has settled; to settle: " + ResolveCall(entry.asset));
+  entry.is_told = true;
+  WriteEntry(PlacesFor(entry.asset).entry, entry);
+}
+
+// With the last record of this work tree: the hooks go, unless another one has a record.
+void ConflictRecords::RemoveHooks() const {
   std::error_code error;
   for (const auto& file : std::filesystem::directory_iterator(folder_, error)) {
     // What a killed process has left is no record.
     if (file.path().filename().string().starts_with(".vexel-")) unlink(file.path().c_str());
   }
   if (rmdir(folder_.c_str()) != 0 || HaveAny()) return;
-  if (GitQuietly({"config", "--get", "core.hooksPath"}).status != 0) TakeHookAway(repository_);
+  if (GitQuietly({"config", "--get", "core.hooksPath"}).status != 0) TakeHooksAway(repository_);
 }
 
 bool ConflictRecords::HaveAny() const {
@@ -168,27 +220,22 @@ bool ConflictRecords::HaveAny() const {
   return false;
 }
 
-std::string ResolveCall(const std::string& asset) {
-  return (asset.starts_with('-') ? "vexel-merge-git resolve -- " : "vexel-merge-git resolve ") +
-         Typeable(asset);
-}
-
 std::string ShownRecord(std::string_view record) {
   if (record.starts_with("./")) record.remove_prefix(2);
   return std::string(record);
 }
 
-std::string DecidedIn(const std::string& record) {
+std::string DecidedIn(const std::string& record, const std::vector<std::string>& first) {
   std::vector<std::string> lines = Pieces(TextOf(record), '\n');
   const auto last = std::find_if(lines.rbegin(), lines.rend(), [](const std::string& line) {
     return line == kHeading || line == std::string(kHeading) + '\r';
   });
-  std::string text;
-  for (auto line = lines.begin(); line != lines.end(); ++line) {
-    if (last != lines.rend() && line >= last.base() - 1) text += *line;
-    text += '\n';
-  }
-  if (last == lines.rend()) text += std::string(kHeading) + '\n';
+  // The number of lines above the heading.
+  const size_t above = last == lines.rend() ? lines.size() : static_cast<size_t>(lines.rend() - last) - 1;
+  std::string text(above - std::min(above, first.size()), '\n');
+  text += std::string(kHeading) + '\n';
+  for (const std::string& line : first) text += line + '\n';
+  for (size_t i = above + 1; i < lines.size(); ++i) text += InWordsOfRecords(lines[i]) + '\n';
   return text;
 }
 

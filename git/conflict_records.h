@@ -6,12 +6,15 @@
 #include <vector>
 
 #include "git/asset_merge.h"
+#include "git/record_entry.h"
 #include "git/repository.h"
 
 namespace vexel_yaml {
 
-/// The records of conflicts that lie beside the assets: written by the merge driver, read by resolve, removed
-/// as soon as their conflict is gone. All paths are from the top folder, which is the current one.
+/// The records of conflicts that lie beside the assets: written by the merge driver, read by resolve. They
+/// stay as long as their conflict is there, or is settled or staged as the merge left it, and not committed:
+/// until then, minds can be changed. One without a conflict is kept in git's folder alone. All paths are from
+/// the top folder, which is the current one.
 ///
 /// Only what is remembered in git's folder is ours: a file of such a name that the repository tracks, or that
 /// somebody else has put there, is neither read nor written. Then, and where the name would be too long or
@@ -28,19 +31,24 @@ class ConflictRecords {
   /// Whether the record is the one in git's folder.
   bool IsKept(const std::string& record) const { return record.starts_with(folder_ + "/"); }
 
-  /// The blob of the asset as the merge left it, to see whether somebody has edited it since; empty for none.
-  std::string RecordedHash(const std::string& asset) const;
+  /// What is remembered of this asset; the entry's asset is empty where it has no record.
+  RecordEntry Entry(const std::string& asset) const;
 
-  /// Makes a record of the merge and returns its path; empty where it can't. `hash` tells the blob that the
-  /// merge has left, as late as it is wanted.
-  std::string Leave(const std::string& asset, const AssetMerge& merge,
-                    const std::function<std::string()>& hash, const MergeSettings& settings) const;
+  /// Of all assets that have a record.
+  std::vector<RecordEntry> Entries() const;
+
+  /// Makes a record of the merge and returns its path; empty where it can't. `entry` is what is to be
+  /// remembered, but for its blob: `hash` tells that as late as it is wanted.
+  std::string Leave(RecordEntry entry, const AssetMerge& merge, const std::function<std::string()>& hash,
+                    const MergeSettings& settings) const;
 
   void Remove(const std::string& asset) const;
 
-  /// Removes the records whose files are no longer unmerged. While git holds the index, a merge may be at
-  /// work whose records are there before its conflicts: what it leaves can be swept when it is done.
-  void Sweep() const;
+  /// Removes the records that have done their duty, and says which files are staged as a merge left them,
+  /// undecided, once. While git holds the index, a merge may be at work whose records are there before its
+  /// conflicts: what it leaves can be swept when it is done. `is_committed`: what is staged is committed,
+  /// too.
+  void Sweep(bool is_committed = false) const;
 
   /// Whether any work tree of this repository has a record.
   bool HaveAny() const;
@@ -49,28 +57,27 @@ class ConflictRecords {
   struct Places {
     std::string beside;
     std::string kept;
-    std::string entry;  ///< What is remembered: the asset's path and the blob, a line each.
+    std::string entry;
   };
   Places PlacesFor(const std::string& asset) const;
   /// Returns the record's path; empty where it can't.
-  std::string Place(const std::string& asset, const std::string& text,
-                    const std::function<std::string()>& hash, bool may_use_hook) const;
-  void RemoveHook() const;
+  std::string Place(RecordEntry entry, const std::string& text, const std::function<std::string()>& hash,
+                    bool may_use_hook) const;
+  void TellStaged(RecordEntry entry) const;
+  void RemoveHooks() const;
 
   const Repository& repository_;
   std::string folder_;
 };
-
-/// The command that settles the conflicts in this file.
-std::string ResolveCall(const std::string& asset);
 
 /// The path as people write it.
 std::string ShownRecord(std::string_view record);
 
 /// What a record's last section says, which is the one that people edit. What stands above comes from the
 /// sides of the merge, and whatever it looks like, it decides nothing. Lines keep their numbers. A section
-/// that somebody has removed decides nothing, but can be added to.
-std::string DecidedIn(const std::string& record);
+/// that somebody has removed decides nothing, but can be added to. The lines of `first` come before all
+/// others, and so count first.
+std::string DecidedIn(const std::string& record, const std::vector<std::string>& first = {});
 
 /// Keeps records out of git's sight: they are for one person on one machine. Returns whether that changed
 /// anything. Throws CommandError where it can't.

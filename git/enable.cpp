@@ -153,6 +153,15 @@ class Configuration {
   const SetupPlaces& places_;
 };
 
+// Git's list of changes alone would tell.
+void TellAttributes() {
+  const std::string state = Git({"status", "--porcelain", "--", ".gitattributes"}).output;
+  if (state.empty() || state.starts_with("??")) return;
+  Tell(std::string(".gitattributes is tracked, and has ") + (IsFile(".gitattributes") ? "changed" : "gone") +
+       ": commit that if your colleagues are to merge scenes as text again, or else: git checkout "
+       ".gitattributes");
+}
+
 // A file that the configuration includes may have the last word.
 void CheckEffect(const std::string& key, const std::string& value) {
   if (Line(Git({"config", "--get", key})) == value) return;
@@ -215,7 +224,8 @@ int RunDisable(const std::vector<std::string>& arguments) {
     const Repository repository;
     const ConflictRecords records(repository);
     records.Sweep();
-    if (records.HaveAny()) throw CommandError("conflicts are left: settle them or abort the merge first");
+    if (records.HaveAny())
+      throw CommandError("a merge is not done: settle its conflicts and commit it, or abort it first");
   }
   if (!IsFile(places.state.GetPath())) {
     Tell("Nothing to undo in " + places.Where() + ".");
@@ -228,14 +238,20 @@ int RunDisable(const std::vector<std::string>& arguments) {
     if (IsPlain(places.attributes)) attributes.Restore();
     const std::string exclude = ExcludeFile(Repository());
     if (!exclude.empty()) MarkedBlock(exclude, "exclude", places.state).Restore();
-    // What git has kept of textconv.
-    GitQuietly({"update-ref", "-d", "refs/notes/textconv/vexel"});
+    TellAttributes();
   }
+  // What git has kept of textconv, also where that was set for all repositories.
+  GitQuietly({"update-ref", "-d", "refs/notes/textconv/vexel"});
   Configuration(places).Restore();
   unlink(places.state.GetPath().c_str());
   for (const char* suffix : {"before", "after", "attributes", "exclude"})
     unlink(places.state.Beside(suffix).c_str());
   Tell("Undone in " + places.Where() + ".");
+  if (places.is_global) {
+    Tell(
+        "In other repositories, git keeps what it has shown of scenes: git update-ref -d "
+        "refs/notes/textconv/vexel");
+  }
   if (Line(Git({"config", "--get", "merge.vexel.driver"})).find("vexel-merge-git") != std::string::npos) {
     Tell("It is still set for all your repositories: see 'vexel-merge-git disable --global'.");
   }

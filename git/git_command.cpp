@@ -5,7 +5,9 @@
 #include <iostream>
 #include <string_view>
 
+#include "git/check.h"
 #include "git/merge_driver.h"
+#include "git/preview.h"
 #include "git/report_pages.h"
 #include "git/resolve.h"
 #include "git/setup.h"
@@ -25,7 +27,9 @@ constexpr std::string_view kUsage =
     R"(usage: vexel-merge-git enable [--global] [--patterns '*.vexel *.prefab *.meta']
        vexel-merge-git disable [--global]
        vexel-merge-git status
-       vexel-merge-git resolve [--left | --right | --base] [--path <pattern>] [--force] [--] <file>...
+       vexel-merge-git resolve [--theirs | --ours | --base] [--path <pattern>] [--force] [--] <file>...
+       vexel-merge-git check [--conflicts] [--staged | <commit> | [--] <file>...]
+       vexel-merge-git preview <branch>
        vexel-merge-git report [-o <file>] [<merge commit>] [-- <path>...]
        vexel-merge-git --version | --help
 
@@ -35,15 +39,19 @@ constexpr std::string_view kUsage =
   status     say what is set, and whether the programs are found
   resolve    merge conflicting files (of folders, all below) once more, with what their records say
              or, where a side is named, with that side's values; stage those in which nothing is left
+  check      say which conflicts nobody has settled, and which scenes are broken: of the conflicts
+             at hand, in what is staged, or in a commit; status 1 where there are some
+  preview    say what merging a branch would do, and who collides with whom; nothing is written
   report     write a page for each file that shows what both sides did and what came out:
              of the conflicts at hand, or of a merge commit
 
-  Left is "theirs", right is "ours". The record of a conflict lies beside the file, as
-  <file>.vexel-conflicts.
+  Theirs (--left, too) is what is merged, ours (--right) is where you stand; in a rebase, theirs
+  are your own commits. The record of a conflict lies beside the file, as <file>.vexel-conflicts.
 )";
 
 // What people call; git and the hook call the others.
-constexpr std::array<std::string_view, 5> kCommands = {"enable", "disable", "status", "resolve", "report"};
+constexpr std::array<std::string_view, 7> kCommands = {"enable", "disable", "status", "resolve",
+                                                       "check",  "preview", "report"};
 
 int RunCommand(const std::string& command, const Arguments& arguments) {
   const bool is_for_people = std::ranges::find(kCommands, command) != kCommands.end();
@@ -61,7 +69,9 @@ int RunCommand(const std::string& command, const Arguments& arguments) {
   if (command == "textconv") return RunTextconv(arguments);
   if (command == "mergetool") return RunMergetool(arguments);
   if (command == "resolve") return RunResolve(arguments);
-  if (command == "sweep") return RunSweep();
+  if (command == "sweep") return RunSweep(arguments);
+  if (command == "check") return RunCheck(arguments);
+  if (command == "preview") return RunPreview(arguments);
   if (command == "report") return RunReportPages(arguments);
   if (command == "enable") return RunEnable(arguments);
   if (command == "disable") return RunDisable(arguments);

@@ -4,7 +4,9 @@
 #include <unistd.h>
 
 #include "git/asset_merge.h"
+#include "git/conflict_messages.h"
 #include "git/conflict_records.h"
+#include "git/decision_memory.h"
 #include "git/git_call.h"
 #include "git/repository.h"
 #include "git/settings.h"
@@ -39,25 +41,45 @@ class DriverRun {
     keeps_records_ = !is_ancestor_ && repository_.IsChanging();
     const bool is_ours = versions_.HasAsset();
     // Kept until the process ends: giving three scenes back node by node takes as long as merging them.
-    AssetMerge& merge = *new AssetMerge(versions_);
-    if (is_ours) merge.Read();
+    merge_ = new AssetMerge(versions_);
+    if (is_ours) merge_->Read();
     settings_ = query.Get();
     if (!is_ours) {
       RemoveRecord();
       return MergeAsText();
     }
-    int status = merge.Run(settings_);
-    if (status != AssetMerge::kFailed && !PutFile(versions_.right, merge.GetText())) {
+    int status = merge_->Run(settings_);
+    if (status > AssetMerge::kFailed && !is_ancestor_) status = DecideAsBefore(status);
+    if (status != AssetMerge::kFailed && !PutFile(versions_.right, merge_->GetText())) {
       Complain("cannot write the merged " + versions_.asset);
       status = AssetMerge::kFailed;
     }
     if (status == AssetMerge::kFailed) return LeaveUnmerged();
-    if (status == AssetMerge::kMerged) {
+    const bool is_to_confirm = status == AssetMerge::kMerged && !entry_.conflicts.empty() && keeps_records_ &&
+                               !settings_.stages_remembered;
+    if (status == AssetMerge::kMerged && !is_to_confirm) {
       RemoveRecord();
     } else if (!is_ancestor_) {
-      TellConflicts(merge);
+      TellConflicts();
     }
-    return status;
+    return is_to_confirm ? AssetMerge::kConflicts : status;
+  }
+
+  // Names the conflicts, and merges once more with what was decided when they came before.
+  int DecideAsBefore(int status) {
+    entry_ = {versions_.asset, {}, FindSideNames(repository_), {}, false};
+    entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, {});
+    if (!settings_.remembers_decisions) return status;
+    const std::vector<std::string> lines = DecisionMemory(repository_).Recall(entry_.conflicts);
+    if (lines.empty()) return status;
+    auto* again = new AssetMerge(versions_);
+    const Decisions decisions = {DecidedIn({}, lines), {}};
+    const int new_status = again->RunQuietly(settings_, &decisions);
+    if (new_status == AssetMerge::kFailed) return status;
+    merge_ = again;
+    entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
+    Say(CountOfConflicts(lines.size()) + " of " + versions_.asset + " settled as before");
+    return new_status;
   }
 
   void RemoveRecord() {
@@ -88,26 +110,29 @@ class DriverRun {
   }
 
   // The merge goes on whatever fails here.
-  void TellConflicts(const AssetMerge& merge) {
-    SayConflicts(versions_.asset, merge.GetConflicts());
+  void TellConflicts() {
+    SayConflicts(versions_.asset, entry_.conflicts);
     try {
-      if (keeps_records_) LeaveRecord(merge);
+      if (keeps_records_) LeaveRecord();
     } catch (const FileError& error) {
       Complain("cannot write the record of " + versions_.asset + ": " + error.what());
     }
   }
 
-  void LeaveRecord(const AssetMerge& merge) {
+  void LeaveRecord() {
     // Git answers while it is asked other things.
-    Program hash(HashCall(versions_.asset, merge.GetText()));
+    Program hash(HashCall(versions_.asset, merge_->GetText()));
     const std::string record = records_.Leave(
-        versions_.asset, merge, [&] { return Line(hash.Wait()); }, settings_);
+        entry_, *merge_, [&] { return Line(hash.Wait()); }, settings_);
     if (record.empty()) {
       Complain("cannot write the record of " + versions_.asset);
-      return;
+    } else if (entry_.CountPending() > 0) {
+      Say(CountOfConflicts(entry_.CountPending()) + ", listed in " + ShownRecord(record) +
+          "; to settle: " + ResolveCall(versions_.asset));
+    } else {
+      Say("To take it so, 'git add' " + versions_.asset +
+          "; to settle otherwise: " + ResolveCall(versions_.asset));
     }
-    Say(Count(merge.GetConflicts()) + ", listed in " + ShownRecord(record) +
-        "; to settle: " + ResolveCall(versions_.asset));
   }
 
   const AssetVersions versions_;
@@ -117,6 +142,8 @@ class DriverRun {
   const ConflictRecords records_{repository_};
   MergeSettings settings_;
   bool keeps_records_ = false;
+  AssetMerge* merge_ = nullptr;
+  RecordEntry entry_;
 };
 
 void CloseStandardError() {

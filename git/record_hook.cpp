@@ -2,6 +2,9 @@
 
 #include <unistd.h>
 
+#include <array>
+#include <string_view>
+
 #include "git/shown_text.h"
 #include "git/work_files.h"
 #include "platform/executable_path.h"
@@ -10,40 +13,62 @@ namespace vexel_yaml {
 
 namespace {
 
+struct Hook {
+  std::string_view name;
+  std::string_view command;
+  std::string_view purpose;
+};
+
+// Git commits what a rebase has stopped for without asking the hook that is meant for that, but not without
+// the one for messages.
+constexpr std::array<Hook, 4> kHooks = {{
+    {"post-index-change", "sweep",
+     "removes the records of conflicts that are gone, and with the last one this hook"},
+    {"post-commit", "sweep --committed", "removes the records of conflicts that are committed"},
+    {"pre-commit", "check --staged --conflicts",
+     "stops a commit of what nobody has settled; goes with the last record"},
+    {"prepare-commit-msg", "check --staged --conflicts --in-rebase",
+     "does so in a rebase, where git asks no other hook"},
+}};
+
 // Empty where what is there is not the repository's.
-std::string HookPath(const Repository& repository) {
+std::string HookPath(const Repository& repository, const Hook& hook) {
   const std::string folder = repository.CommonPath("hooks");
-  return IsLink(folder) ? std::string() : folder + "/post-index-change";
+  return IsLink(folder) ? std::string() : folder + "/" + std::string(hook.name);
 }
 
-bool IsOurs(const std::string& hook) {
-  return !IsLink(hook) && IsFile(hook) && TextOf(hook).find("vexel-merge-git sweep") != std::string::npos;
+std::string Mark(const Hook& hook) { return "# vexel-merge-git " + std::string(hook.command) + ": "; }
+
+bool IsOurs(const std::string& path, const Hook& hook) {
+  return !IsLink(path) && IsFile(path) && TextOf(path).find(Mark(hook)) != std::string::npos;
 }
 
-std::string HookText() {
+std::string HookText(const Hook& hook) {
   const std::string self = ShellQuoted(ExecutablePath());
-  return "#!/bin/sh\n"
-         "# vexel-merge-git sweep: removes the records of conflicts that are gone, and with the last one "
-         "this "
-         "hook.\n"
-         "if [ -x " +
-         self + " ]; then exec " + self + " sweep; fi\n";
+  return "#!/bin/sh\n" + Mark(hook) + std::string(hook.purpose) + ".\n" + "if [ -x " + self +
+         " ]; then exec " + self + " " + std::string(hook.command) + "; fi\n";
+}
+
+void PlaceHook(const std::string& path, const Hook& hook) {
+  const std::string text = HookText(hook);
+  const bool is_there = IsLink(path) || access(path.c_str(), F_OK) == 0;
+  if (is_there && (!IsOurs(path, hook) || TextOf(path) == text)) return;
+  if (MakeFoldersFor(path)) PutFile(path, text, 0777);
 }
 
 }  // namespace
 
-void PlaceHook(const Repository& repository) {
-  const std::string hook = HookPath(repository);
-  if (hook.empty()) return;
-  const std::string text = HookText();
-  const bool is_there = IsLink(hook) || access(hook.c_str(), F_OK) == 0;
-  if (is_there && (!IsOurs(hook) || TextOf(hook) == text)) return;
-  if (MakeFoldersFor(hook)) PutFile(hook, text, 0777);
+void PlaceHooks(const Repository& repository) {
+  for (const Hook& hook : kHooks) {
+    if (const std::string path = HookPath(repository, hook); !path.empty()) PlaceHook(path, hook);
+  }
 }
 
-void TakeHookAway(const Repository& repository) {
-  const std::string hook = HookPath(repository);
-  if (!hook.empty() && IsOurs(hook)) unlink(hook.c_str());
+void TakeHooksAway(const Repository& repository) {
+  for (const Hook& hook : kHooks) {
+    const std::string path = HookPath(repository, hook);
+    if (!path.empty() && IsOurs(path, hook)) unlink(path.c_str());
+  }
 }
 
 }  // namespace vexel_yaml

@@ -4,13 +4,13 @@
 
 namespace vexel_yaml {
 
-/// Git tells nobody that a merge was aborted, or a file added by hand, but it has a hook for every change of
-/// the index. Ours is there only as long as a record is, and never in place of another one. Neither is of any
-/// use where git calls hooks of another folder.
+/// Git tells nobody that a merge was aborted, or a file added by hand, but it has hooks for every change of
+/// the index and for commits. Ours are there only as long as a record is, and never in place of others. None
+/// of them is of any use where git calls hooks of another folder.
 
-/// Puts the hook in its place, where that is free, and brings it up to date.
-void PlaceHook(const Repository& repository);
+/// Puts the hooks in their places, where these are free, and brings them up to date.
+void PlaceHooks(const Repository& repository);
 
-void TakeHookAway(const Repository& repository);
+void TakeHooksAway(const Repository& repository);
 
 }  // namespace vexel_yaml

@@ -8,6 +8,7 @@
 #include "git/asset_merge.h"
 #include "git/conflict_records.h"
 #include "git/git_call.h"
+#include "git/merged_commits.h"
 #include "git/path_names.h"
 #include "git/repository.h"
 #include "git/settings.h"
@@ -46,48 +47,6 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   return parsed;
 }
 
-// The two sides of a merge commit, and what they come from.
-struct MergedCommits {
-  std::string commit;
-  std::string base;
-  std::string ours;
-  std::string theirs;
-};
-
-MergedCommits FindMerged(const std::string& name) {
-  const ProgramResult found = Git({"rev-parse", "--verify", "--quiet", name + "^{commit}"});
-  if (found.status != 0) throw CommandError("'" + name + "' is not a commit");
-  MergedCommits merged = {Line(found), {}, {}, {}};
-  const Paths parents = Pieces(Line(Git({"rev-list", "--parents", "-n", "1", merged.commit})), ' ');
-  if (parents.size() != 3) throw CommandError(merged.commit + " is not a merge of two commits");
-  merged.ours = parents[1];
-  merged.theirs = parents[2];
-  const ProgramResult base = Git({"merge-base", merged.ours, merged.theirs});
-  if (base.status != 0) throw CommandError("the parents of " + merged.commit + " have no common ancestor");
-  merged.base = Line(base);
-  return merged;
-}
-
-// Sorted.
-Paths Changed(const std::string& from, const std::string& to, const Paths& paths) {
-  ProgramCall call = GitCall({"diff", "-z", "--name-only", "--no-relative", "--no-renames", from, to, "--"});
-  call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
-  call.with = {"GIT_LITERAL_PATHSPECS=1"};
-  Paths changed = Pieces(RunProgram(call).output, '\0');
-  std::ranges::sort(changed);
-  return changed;
-}
-
-Paths ChangedOnBothSides(const MergedCommits& merged, const Paths& paths) {
-  const Paths in_ours = Changed(merged.base, merged.ours, paths);
-  const Paths in_theirs = Changed(merged.base, merged.theirs, paths);
-  Paths both;
-  std::ranges::set_intersection(in_ours, in_theirs, std::back_inserter(both));
-  return both;
-}
-
-std::string Short(const std::string& commit) { return Line(Git({"rev-parse", "--short", commit})); }
-
 // Made pages, one asset after the other.
 class PageMaker {
  public:
@@ -100,6 +59,7 @@ class PageMaker {
     if (!(merged_ ? WriteMerged(asset, versions) : WriteUnmerged(asset, versions))) return false;
     const std::string target = page_.empty() ? DefaultPage(asset) : page_;
     Paths call = {GetDataFilesDir() + "vexel-merge-report", "--rules", settings_.rules};
+    if (settings_.is_safe) call.emplace_back("--safe");
     if (!settings_.type_info.empty()) call.insert(call.end(), {"--typeInfo", settings_.type_info});
     // What is settled in the record of the conflict at hand shows as settled.
     const std::string record = merged_ ? std::string() : records_.Find(asset);
@@ -108,7 +68,7 @@ class PageMaker {
       call.insert(call.end(), {"-i", "decided"});
     }
     std::string title = asset;
-    if (merged_) title += ", the parents of " + Short(merged_->commit) + " merged anew";
+    if (merged_) title += ", the parents of " + ShortHash(merged_->commit) + " merged anew";
     call.insert(call.end(), {"-o", target, "--title", title, versions.base, versions.left, versions.right});
     // From their folder, since the page shows the paths that were given.
     const ProgramResult result = RunProgram(
@@ -123,20 +83,13 @@ class PageMaker {
 
  private:
   bool WriteMerged(const std::string& asset, AssetVersions& versions) {
-    scratch_.Clear();
-    versions = {asset, "base " + Short(merged_->base), "left " + Short(merged_->theirs),
-                "right " + Short(merged_->ours)};
-    const bool is_there = Write(merged_->base, versions.base, asset) &&
-                          Write(merged_->theirs, versions.left, asset) &&
-                          Write(merged_->ours, versions.right, asset);
+    const bool is_there = WriteVersions(*merged_, asset, scratch_, versions);
     if (!is_there) Say(asset + ": not in all three versions, so there is nothing to compare");
+    // By their names, as the page shows them.
+    for (std::string* version : {&versions.base, &versions.left, &versions.right}) {
+      *version = version->substr(version->rfind('/') + 1);
+    }
     return is_there;
-  }
-
-  bool Write(const std::string& commit, const std::string& name, const std::string& asset) {
-    const ProgramResult version = GitQuietly({"cat-file", "--filters", commit + ":" + asset});
-    if (version.status == 0) scratch_.Write(name, version.output);
-    return version.status == 0;
   }
 
   bool WriteUnmerged(const std::string& asset, AssetVersions& versions) {

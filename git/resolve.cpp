@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <set>
 
+#include "git/conflict_messages.h"
+#include "git/decision_memory.h"
 #include "git/git_call.h"
 #include "git/repository.h"
 #include "git/settle.h"
@@ -15,14 +17,20 @@ namespace vexel_yaml {
 
 namespace {
 
-// The options; what is left in `files` names files.
+// The side that an option names, as a word of a record; empty for another option.
+std::string SideNamedBy(const std::string& option) {
+  if (option == "--left" || option == "--theirs") return "left";
+  if (option == "--right" || option == "--ours") return "right";
+  return option == "--base" ? "base" : "";
+}
+
+// The options, which may stand anywhere before "--"; all else goes to `files`.
 Choice Parse(const std::vector<std::string>& arguments, std::vector<std::string>& files) {
   Choice choice;
-  auto argument = arguments.begin();
-  for (; argument != arguments.end() && argument->starts_with('-'); ++argument) {
-    if (*argument == "--left" || *argument == "--right" || *argument == "--base") {
-      if (!choice.side.empty()) throw WrongUsage("only one of --left, --right and --base can be given");
-      choice.side = argument->substr(2);
+  for (auto argument = arguments.begin(); argument != arguments.end(); ++argument) {
+    if (const std::string side = SideNamedBy(*argument); !side.empty()) {
+      if (!choice.side.empty()) throw WrongUsage("only one of --theirs, --ours and --base can be given");
+      choice.side = side;
     } else if (*argument == "--path") {
       if (++argument == arguments.end()) throw WrongUsage("--path needs a value");
       choice.pattern = *argument;
@@ -31,17 +39,28 @@ Choice Parse(const std::vector<std::string>& arguments, std::vector<std::string>
     } else if (*argument == "--force") {
       choice.force = true;
     } else if (*argument == "--") {
-      ++argument;
+      files.insert(files.end(), argument + 1, arguments.end());
       break;
-    } else {
+    } else if (argument->starts_with('-')) {
       throw WrongUsage("unknown option '" + *argument + "'");
+    } else {
+      files.push_back(*argument);
     }
   }
-  files.assign(argument, arguments.end());
   if (files.empty()) throw WrongUsage("resolve needs a file");
   if (!choice.pattern.empty() && choice.side.empty())
-    throw WrongUsage("--path goes with --left, --right or --base");
+    throw WrongUsage("--path goes with --theirs, --ours or --base");
   return choice;
+}
+
+// The file of this name that was in conflict before it was staged.
+std::vector<std::string> StagedConflict(const std::string& pathspec) {
+  const ProgramResult found = Git({"ls-files", "-z", "--resolve-undo", "--full-name", "--", pathspec});
+  std::set<std::string> paths;
+  for (const std::string& entry : Pieces(found.output, '\0'))
+    paths.insert(entry.substr(entry.find('\t') + 1));
+  return paths.size() == 1 ? std::vector<std::string>(paths.begin(), paths.end())
+                           : std::vector<std::string>();
 }
 
 // The conflicts of ours that somebody means who names a path, from here or, as git prints it, from the top.
@@ -50,6 +69,11 @@ std::vector<std::string> NamedConflicts(const std::string& path, const std::stri
     std::vector<std::string> named =
         OursAmong(UnmergedBelow({magic + path}).value_or(std::vector<std::string>()), top);
     if (!named.empty()) return named;
+  }
+  // One that is settled and staged can be settled otherwise, if it is meant for sure.
+  for (const char* magic : {":(literal)", ":(top,literal)"}) {
+    const std::vector<std::string> staged = OursAmong(StagedConflict(magic + path), top);
+    if (!staged.empty()) return staged;
   }
   return {};
 }
@@ -64,38 +88,65 @@ bool Stage(const std::string& asset) {
   return PutAsset(asset, checked_out.output) && Git(add).status == 0;
 }
 
-// Resolves a file, and stages it if nothing is left. Returns whether that is so.
-bool ResolveAsset(const std::string& asset, const SettleContext& general, ScratchFolder& scratch) {
-  const StageFiles stages(asset);
-  AssetVersions versions;
-  if (!stages.Write(scratch, versions)) return false;
-  if (!versions.HasAsset()) {
-    Complain(asset + " was merged as text: edit it, and 'git add' it");
-    return false;
+class Resolving {
+ public:
+  Resolving(const Repository& repository, const MergeSettings& settings, const Choice& choice)
+      : repository_(repository), settings_(settings), choice_(choice) {}
+
+  // Resolves a file, and stages it if nothing is left. Returns whether that is so.
+  bool Resolve(const std::string& asset) {
+    StageFiles stages(asset);
+    AssetVersions versions;
+    if (!stages.Write(scratch_, versions)) return false;
+    if (!versions.HasAsset()) {
+      Complain(asset + " was merged as text: edit it, and 'git add' it");
+      return false;
+    }
+    Settlement settlement =
+        Settle(versions, {records_, settings_, choice_, names_, [&] { return stages.AreSame(); }});
+    if (settlement.status == AssetMerge::kFailed) return false;
+    if (settings_.remembers_decisions) {
+      DecisionMemory(repository_).Remember(settlement.entry.conflicts, settlement.merge->GetChoices());
+    }
+    return settlement.status == AssetMerge::kMerged ? Finish(settlement) : LeaveRest(settlement, stages);
   }
-  SettleContext context = general;
-  context.is_same_conflict = [&] { return stages.AreSame(); };
-  AssetMerge merge(versions);
-  const int status = Settle(versions, context, merge);
-  if (status == AssetMerge::kFailed) return false;
-  if (status == AssetMerge::kMerged) {
+
+  void Sweep() const { records_.Sweep(); }
+
+ private:
+  // Its record stays, in case that somebody changes their mind before the commit.
+  bool Finish(const Settlement& settlement) {
+    const std::string& asset = settlement.entry.asset;
+    LeaveRecord(settlement);
     if (!Stage(asset)) return false;
-    context.records.Remove(asset);
     Tell("Resolved " + asset);
     return true;
   }
+
   // What is settled already counts when the rest is settled in the engine.
-  if (!PutAsset(asset, merge.GetText())) return false;
-  if (context.records
-          .Leave(
-              asset, merge, [&] { return HashOfAsset(asset); }, context.settings)
-          .empty()) {
-    Complain("cannot write the record of " + asset);
+  bool LeaveRest(const Settlement& settlement, StageFiles& stages) {
+    const std::string& asset = settlement.entry.asset;
+    if (!PutAsset(asset, settlement.merge->GetText()) || !stages.Unstage()) return false;
+    LeaveRecord(settlement);
+    Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset + ":");
+    SayConflicts(asset, settlement.entry.conflicts);
+    return false;
   }
-  Say(Count(merge.GetConflicts()) + " left in " + asset + ":");
-  SayConflicts(asset, merge.GetConflicts());
-  return false;
-}
+
+  void LeaveRecord(const Settlement& settlement) {
+    const std::string& asset = settlement.entry.asset;
+    const std::string record = records_.Leave(
+        settlement.entry, *settlement.merge, [&] { return HashOfAsset(asset); }, settings_);
+    if (record.empty()) Complain("cannot write the record of " + asset);
+  }
+
+  const Repository& repository_;
+  const MergeSettings& settings_;
+  const Choice& choice_;
+  const SideNames names_ = FindSideNames(repository_);
+  const ConflictRecords records_{repository_};
+  ScratchFolder scratch_{repository_};
+};
 
 // A copy of the work tree's file, beside it where that can be.
 void KeepEdited(const std::string& asset, std::string_view text, const Repository& repository) {
@@ -126,20 +177,17 @@ int RunResolve(const std::vector<std::string>& arguments) {
   GoToTop();
   const MergeSettings settings = SettingsQuery().Get();
   const Repository repository;
-  const ConflictRecords records(repository);
-  {
-    ScratchFolder scratch(repository);
-    for (const std::string& asset : assets) {
-      try {
-        if (!ResolveAsset(asset, {records, settings, choice}, scratch)) is_done = false;
-      } catch (const FileError& error) {
-        // The others can be settled all the same.
-        Complain(error.what());
-        is_done = false;
-      }
+  Resolving resolving(repository, settings, choice);
+  for (const std::string& asset : assets) {
+    try {
+      if (!resolving.Resolve(asset)) is_done = false;
+    } catch (const FileError& error) {
+      // The others can be settled all the same.
+      Complain(error.what());
+      is_done = false;
     }
   }
-  records.Sweep();
+  resolving.Sweep();
   return is_done ? 0 : 1;
 }
 
@@ -151,30 +199,28 @@ int RunMergetool(const std::vector<std::string>& arguments) {
   const ConflictRecords records(repository);
   const std::string start = TextOf("./" + asset);
   const AssetVersions versions = {asset, arguments[0], arguments[2], arguments[1]};
-  AssetMerge merge(versions);
-  const int status = Settle(versions, {records, settings, Choice()}, merge);
+  const SideNames names = FindSideNames(repository);
+  const Settlement settlement = Settle(versions, {records, settings, Choice(), names});
+  const int status = settlement.status;
   if (status != AssetMerge::kMerged && IsFile("./" + asset)) {
     // Git puts the old file back where we fail.
     const std::string text = TextOf("./" + asset);
     if (text != start) KeepEdited(asset, text, repository);
   }
-  if (status == AssetMerge::kMerged) records.Remove(asset);
-  if (status == AssetMerge::kConflicts || status == AssetMerge::kBrokenDependencies) {
-    if (records
-            .Leave(
-                asset, merge, [&] { return records.RecordedHash(asset); }, settings)
-            .empty()) {
-      Complain("cannot write the record of " + asset);
-    }
-    Say(Count(merge.GetConflicts()) + " left in " + asset);
-  }
-  return status == AssetMerge::kBrokenDependencies ? AssetMerge::kConflicts : status;
+  if (status == AssetMerge::kFailed) return status;
+  const bool is_merged = status == AssetMerge::kMerged;
+  const std::string hash = is_merged ? HashOfAsset(asset) : records.Entry(asset).hash;
+  const std::string record = records.Leave(
+      settlement.entry, *settlement.merge, [&] { return hash; }, settings);
+  if (record.empty()) Complain("cannot write the record of " + asset);
+  if (!is_merged) Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset);
+  return is_merged ? AssetMerge::kMerged : AssetMerge::kConflicts;
 }
 
-int RunSweep() {
+int RunSweep(const std::vector<std::string>& arguments) {
   GoToTop();
   const Repository repository;
-  ConflictRecords(repository).Sweep();
+  ConflictRecords(repository).Sweep(!arguments.empty() && arguments.front() == "--committed");
   return 0;
 }
 

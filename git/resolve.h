@@ -13,7 +13,8 @@ int RunResolve(const std::vector<std::string>& arguments);
 /// restores the file where this fails.
 int RunMergetool(const std::vector<std::string>& arguments);
 
-/// Removes the records of conflicts that are gone, from any folder of the work tree: what the hook calls.
-int RunSweep();
+/// Removes the records of conflicts that are gone, from any folder of the work tree, and with "--committed"
+/// those of what is staged, too: what hooks call.
+int RunSweep(const std::vector<std::string>& arguments);
 
 }  // namespace vexel_yaml

@@ -10,6 +10,12 @@ namespace vexel_yaml {
 struct MergeSettings {
   std::string rules = "auto";
   std::string type_info;
+  /// Whether scenes are merged as scenes, and not only value by value.
+  bool is_safe = true;
+  /// Whether decisions are remembered for the next time that the same conflict comes, and whether nothing is
+  /// left to confirm then.
+  bool remembers_decisions = false;
+  bool stages_remembered = false;
   /// Whether git calls other hooks than those of the repository.
   bool has_other_hooks = false;
 };

@@ -1,7 +1,9 @@
 #include "git/settle.h"
 
 #include <algorithm>
+#include <vector>
 
+#include "git/conflict_messages.h"
 #include "git/git_call.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
@@ -11,18 +13,7 @@ namespace vexel_yaml {
 
 namespace {
 
-// The record, which is made where the asset has none (any more), with nothing settled; empty where it can't.
-std::string RecordOf(const AssetVersions& versions, const SettleContext& context) {
-  std::string record = context.records.Find(versions.asset);
-  if (!record.empty()) return record;
-  AssetMerge merge(versions);
-  if (merge.Run(context.settings) == AssetMerge::kFailed) return {};
-  record = context.records.Leave(
-      versions.asset, merge, [&] { return Line(RunProgram(HashCall(versions.asset, merge.GetText()))); },
-      context.settings);
-  if (record.empty()) Complain("cannot write the record of " + versions.asset);
-  return record;
-}
+constexpr int kMostMerges = 3;
 
 // Whether a place fits a pattern, component by component. As texts: as numbers, two file IDs of 19 digits may
 // be equal.
@@ -34,36 +25,18 @@ bool Fits(const std::string& place, const std::string& pattern) {
                             [](const std::string& w, const std::string& g) { return w == "*" || w == g; });
 }
 
-// Adds a decision for each pending conflict whose place fits, since a pattern in the record itself would also
-// decide about places that only one side has changed. False where none fits, which has been said.
-bool ChooseSide(const AssetMerge& merge, const Choice& choice, const std::string& asset,
-                std::string& decided) {
-  if (merge.GetConflicts().empty()) return true;
-  bool found = false;
-  for (const ListedConflict& conflict : merge.GetConflicts()) {
-    if (!Fits(conflict.place, choice.pattern)) continue;
-    decided += choice.side + " " + conflict.place + "\n";
-    found = true;
+// The decisions that a choice makes about these places, as lines of a record.
+std::vector<std::string> Chosen(const Choice& choice, const std::vector<std::string>& places) {
+  std::vector<std::string> lines;
+  for (const std::string& place : places) {
+    if (Fits(place, choice.pattern)) lines.push_back(choice.side + " " + place);
   }
-  if (!found) Complain("no conflict in " + asset + " fits '" + choice.pattern + "'");
-  return found;
+  return lines;
 }
 
 bool HasMarkers(const std::string& asset) {
   const std::string text = TextOf("./" + asset);
   return text.starts_with("<<<<<<< ") || text.find("\n<<<<<<< ") != std::string::npos;
-}
-
-// Whether somebody has changed the asset since it was merged, which has been said.
-bool IsEdited(const std::string& asset, const SettleContext& context) {
-  if (context.choice.force || !FileExists("./" + asset)) return false;
-  if (HashOfAsset(asset) == context.records.RecordedHash(asset)) return false;
-  if (HasMarkers(asset)) {
-    Complain(asset + " was merged as text; say --force to merge it anew, and lose what was edited since");
-  } else {
-    Complain(asset + " was edited after the merge; 'git add' it as it is, or say --force to lose the edits");
-  }
-  return true;
 }
 
 // Also of a name with blanks, while the editor may be a command with arguments.
@@ -74,30 +47,127 @@ bool Edit(const std::string& record) {
   return RunProgram({.arguments = {"sh", "-c", command, "sh", record}, .returns_output = false}).status == 0;
 }
 
-// What the user decides, in `decided`. False where there is nothing to go by, which has been said.
-bool Decide(const AssetVersions& versions, const SettleContext& context, const std::string& record,
-            Decisions& decided) {
-  const std::string& asset = versions.asset;
-  decided.record = ShownRecord(record);
-  if (!context.choice.side.empty()) {
-    decided.text = DecidedIn(record);
-    AssetMerge merge(versions);
-    if (merge.Run(context.settings, &decided) == AssetMerge::kFailed) return false;
-    return ChooseSide(merge, context.choice, asset, decided.text);
+// One file on its way to being settled.
+class Settling {
+ public:
+  Settling(const AssetVersions& versions, const SettleContext& context)
+      : versions_(versions), context_(context), choice_(context.choice) {}
+
+  Settlement Run() {
+    if (!FindStart() || IsEdited()) return {};
+    const bool is_merged = choice_.side.empty() ? MergeEdited() : MergeWithSide();
+    if (!is_merged) return {};
+    entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
+    return {status_, std::move(merge_), std::move(entry_)};
   }
-  if (!Edit(record)) {
-    Complain("the editor failed; nothing is merged");
+
+ private:
+  // The record, which is made where the asset has none (any more), with nothing settled. Where that fails,
+  // a choice can still be what the merge needs.
+  bool FindStart() {
+    const std::string& asset = versions_.asset;
+    record_ = context_.records.Find(asset);
+    entry_ = context_.records.Entry(asset);
+    if (!record_.empty()) return true;
+    entry_ = {asset, {}, context_.names, {}, false};
+    AssetMerge merge(versions_);
+    if (merge.RunQuietly(context_.settings) == AssetMerge::kFailed) {
+      if (!choice_.side.empty() && !choice_.pattern.empty()) {
+        entry_.hash = HashOf(TextOf(versions_.right));
+        has_failed_ = true;
+        return true;
+      }
+      merge.SayMessages();
+      Say("To take a side at the object that is in the way: " +
+          ResolveCall(asset, "resolve --theirs --path <object>"));
+      return false;
+    }
+    entry_.hash = HashOf(merge.GetText());
+    entry_.conflicts = ConflictsAfter(merge, asset, entry_.names, {});
+    if (!choice_.side.empty()) return true;
+    record_ = context_.records.Leave(
+        entry_, merge, [&] { return entry_.hash; }, context_.settings);
+    if (record_.empty()) Complain("cannot write the record of " + asset);
+    return !record_.empty();
+  }
+
+  std::string HashOf(std::string text) const {
+    return Line(RunProgram(HashCall(versions_.asset, std::move(text))));
+  }
+
+  // Whether somebody has changed the asset since it was merged, which has been said.
+  bool IsEdited() const {
+    const std::string& asset = versions_.asset;
+    if (choice_.force || !FileExists("./" + asset) || HashOfAsset(asset) == entry_.hash) return false;
+    if (HasMarkers(asset)) {
+      Complain(asset + " was merged as text; say --force to merge it anew, and lose what was edited since");
+    } else {
+      Complain(asset +
+               " was edited after the merge; 'git add' it as it is, or say --force to lose the edits");
+    }
+    return true;
+  }
+
+  bool Merge(const std::string& decided) {
+    const Decisions decisions = {decided, ShownRecord(record_)};
+    merge_ = std::make_unique<AssetMerge>(versions_);
+    status_ = merge_->Run(context_.settings, &decisions);
+    return status_ != AssetMerge::kFailed;
+  }
+
+  bool MergeEdited() {
+    if (!Edit(record_)) {
+      Complain("the editor failed; nothing is merged");
+      return false;
+    }
+    const std::string decided = DecidedIn(record_);
+    // Who looks at the scene in the engine while deciding may save it there.
+    if (!context_.is_same_conflict()) {
+      context_.records.Remove(versions_.asset);
+      Complain(versions_.asset + " is no longer in the conflict that it was in when the editor was opened");
+      return false;
+    }
+    return !IsEdited() && Merge(decided);
+  }
+
+  // Only at conflicts, since a pattern in the record itself would also decide about places that only one side
+  // has changed.
+  bool MergeWithSide() {
+    std::vector<std::string> places;
+    // Whoever says no more than a side means the rest, or all where nothing is left.
+    const bool is_rest = choice_.pattern.empty() && entry_.CountPending() > 0;
+    for (const RecordedConflict& conflict : entry_.conflicts) {
+      if (!is_rest || !conflict.is_settled) places.push_back(conflict.place);
+    }
+    std::vector<std::string> chosen = Chosen(choice_, places);
+    if (has_failed_) chosen.push_back(choice_.side + " " + choice_.pattern);
+    for (int merges = 1;; ++merges) {
+      if (!Merge(DecidedIn(record_, chosen))) return false;
+      std::vector<std::string> pending;
+      for (const NamedConflict& conflict : merge_->GetConflicts()) pending.push_back(conflict.place);
+      bool is_new = false;
+      for (const std::string& line : Chosen(choice_, pending)) {
+        if (std::ranges::find(chosen, line) != chosen.end()) continue;
+        chosen.push_back(line);
+        is_new = true;
+      }
+      if (!is_new || merges == kMostMerges) break;
+    }
+    if (!chosen.empty() || (status_ == AssetMerge::kMerged && choice_.pattern.empty())) return true;
+    Complain("no conflict in " + versions_.asset + " fits '" + choice_.pattern + "'");
     return false;
   }
-  decided.text = DecidedIn(record);
-  // Who looks at the scene in the engine while deciding may save it there.
-  if (!context.is_same_conflict()) {
-    context.records.Remove(asset);
-    Complain(asset + " is no longer in the conflict that it was in when the editor was opened");
-    return false;
-  }
-  return !IsEdited(asset, context);
-}
+
+  const AssetVersions& versions_;
+  const SettleContext& context_;
+  const Choice& choice_;
+  std::string record_;
+  // Whether the merge has failed without a choice.
+  bool has_failed_ = false;
+  RecordEntry entry_;
+  std::unique_ptr<AssetMerge> merge_;
+  int status_ = AssetMerge::kFailed;
+};
 
 }  // namespace
 
@@ -111,20 +181,16 @@ bool PutAsset(const std::string& asset, std::string_view text) {
   return false;
 }
 
-int Settle(const AssetVersions& versions, const SettleContext& context, AssetMerge& merge) {
-  const std::string& asset = versions.asset;
-  if (!IsPlain(asset)) {
-    Complain(asset + " lies behind a symbolic link, or is one or a folder, in the work tree");
-    return AssetMerge::kFailed;
+Settlement Settle(const AssetVersions& versions, const SettleContext& context) {
+  if (IsPlain(versions.asset)) {
+    Settlement settlement = Settling(versions, context).Run();
+    if (settlement.status != AssetMerge::kMerged || PutAsset(versions.asset, settlement.merge->GetText())) {
+      return settlement;
+    }
+    return {};
   }
-  const std::string record = RecordOf(versions, context);
-  Decisions decided;
-  if (record.empty() || IsEdited(asset, context) || !Decide(versions, context, record, decided)) {
-    return AssetMerge::kFailed;
-  }
-  const int status = merge.Run(context.settings, &decided);
-  if (status == AssetMerge::kMerged && !PutAsset(asset, merge.GetText())) return AssetMerge::kFailed;
-  return status;
+  Complain(versions.asset + " lies behind a symbolic link, or is one or a folder, in the work tree");
+  return {};
 }
 
 }  // namespace vexel_yaml

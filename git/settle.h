@@ -1,6 +1,7 @@
 #pragma once
 
 #include <functional>
+#include <memory>
 #include <string>
 
 #include "git/asset_merge.h"
@@ -24,14 +25,27 @@ struct SettleContext {
   const ConflictRecords& records;
   const MergeSettings& settings;
   const Choice& choice;
+  const SideNames& names;
   /// Whether the file is still in the conflict that it was in, once an editor has been closed.
   std::function<bool()> is_same_conflict = [] { return true; };
 };
 
-/// Merges the file of the work tree once more, with what the user decides now. Returns the status of `merge`,
-/// which then holds the merge, and in the work tree, too, where nothing is pending. What went wrong has been
-/// said.
-int Settle(const AssetVersions& versions, const SettleContext& context, AssetMerge& merge);
+/// A merge with what somebody has decided.
+struct Settlement {
+  /// As of `merge`.
+  int status = AssetMerge::kFailed;
+  /// Null where it has failed.
+  std::unique_ptr<AssetMerge> merge;
+  /// What to remember of it, without the blob.
+  RecordEntry entry;
+};
+
+/// Merges the file of the work tree once more, with what the user decides now, and writes it there where
+/// nothing is pending. What went wrong has been said.
+///
+/// With a side, it takes as many merges as it takes until nothing fits any more, three at most: what hangs on
+/// a decision can be decided only once that counts.
+Settlement Settle(const AssetVersions& versions, const SettleContext& context);
 
 /// Writes the work tree's file. Returns whether it could; else it has said so.
 bool PutAsset(const std::string& asset, std::string_view text);

@@ -11,10 +11,16 @@
 
 namespace vexel_yaml {
 
-ScratchFolder::ScratchFolder(const Repository& repository) {
+ScratchFolder::ScratchFolder(const Repository& repository) { Make(repository.Path("vexel-merge.XXXXXX")); }
+
+ScratchFolder::ScratchFolder() {
+  Make((std::filesystem::temp_directory_path() / "vexel-merge.XXXXXX").string());
+}
+
+void ScratchFolder::Make(const std::string& pattern) {
   std::error_code error;
-  path_ = std::filesystem::absolute(repository.Path("vexel-merge.XXXXXX"), error).string();
-  if (!CreateTempFolder(path_)) throw CommandError("cannot write in " + repository.Path(""));
+  path_ = std::filesystem::absolute(pattern, error).string();
+  if (!CreateTempFolder(path_)) throw CommandError("cannot make a folder like " + pattern);
 }
 
 ScratchFolder::~ScratchFolder() {
@@ -35,10 +41,32 @@ void ScratchFolder::Clear() {
   files_.clear();
 }
 
-std::vector<StageFiles::Stage> StageFiles::Stages() const {
+StageFiles::StageFiles(const std::string& asset) : asset_(asset), stages_(Stages(false)) {
+  if (!stages_.empty()) return;
+  is_staged_ = true;
+  stages_ = Stages(true);
+}
+
+bool StageFiles::Unstage() {
+  if (!is_staged_) return true;
+  // Mode 0 takes away what is staged.
+  std::string lines =
+      "0 " + std::string(stages_.empty() ? 40 : stages_.front().blob.size(), '0') + "\t" + asset_ + '\0';
+  for (const Stage& stage : stages_) {
+    lines += stage.mode + " " + stage.blob + " " + stage.number + "\t" + asset_ + '\0';
+  }
+  ProgramCall call = GitCall({"update-index", "-z", "--index-info"});
+  call.input = std::move(lines);
+  if (RunProgram(call).status != 0) return false;
+  is_staged_ = false;
+  return true;
+}
+
+std::vector<StageFiles::Stage> StageFiles::Stages(bool is_staged) const {
   std::vector<Stage> stages;
+  const std::string which = is_staged ? "--resolve-undo" : "--unmerged";
   for (const std::string& entry :
-       Pieces(Git({"ls-files", "-z", "--unmerged", "--", ":(literal)" + asset_}).output, '\0')) {
+       Pieces(Git({"ls-files", "-z", which, "--", ":(literal)" + asset_}).output, '\0')) {
     const size_t end = entry.find('\t');
     // Not what lies below a folder of this name.
     if (end == std::string::npos || entry.substr(end + 1) != asset_) continue;

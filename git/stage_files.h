@@ -7,12 +7,15 @@
 
 namespace vexel_yaml {
 
-/// A folder for the versions of files, which goes with the process. In the repository, where nobody else
-/// looks and where there is as much room as the files themselves take.
+/// A folder for the versions of files, which goes with the process.
 class ScratchFolder {
  public:
+  /// In the repository, where nobody else looks and where there is as much room as the files themselves take.
   /// Throws CommandError where it can't be made.
   explicit ScratchFolder(const Repository& repository);
+
+  /// Among the system's temporary files. Throws CommandError where it can't be made.
+  ScratchFolder();
   ScratchFolder(const ScratchFolder&) = delete;
   ScratchFolder& operator=(const ScratchFolder&) = delete;
   ~ScratchFolder();
@@ -26,22 +29,27 @@ class ScratchFolder {
   void Clear();
 
  private:
+  void Make(const std::string& pattern);
+
   std::string path_;
   std::vector<std::string> files_;
 };
 
-/// The three stages of a file that is in conflict.
+/// The three stages of a file that is in conflict, or was until it was staged: git remembers them then.
 class StageFiles {
  public:
   /// Looks the stages up. The paths are from the top folder, which is the current one.
-  explicit StageFiles(const std::string& asset) : asset_(asset), stages_(Stages()) {}
+  explicit StageFiles(const std::string& asset);
 
   /// Writes them as files of the work tree, in which line ends are what the user has set. False where that
   /// are not three files, which has been said.
   bool Write(ScratchFolder& folder, AssetVersions& versions) const;
 
   /// Whether they are still the same.
-  bool AreSame() const { return Stages() == stages_; }
+  bool AreSame() const { return Stages(is_staged_) == stages_; }
+
+  /// Puts a file that was staged back in conflict. Returns whether it is in conflict now.
+  bool Unstage();
 
  private:
   struct Stage {
@@ -50,9 +58,10 @@ class StageFiles {
     std::string number;
     bool operator==(const Stage&) const = default;
   };
-  std::vector<Stage> Stages() const;
+  std::vector<Stage> Stages(bool is_staged) const;
 
   std::string asset_;
+  bool is_staged_ = false;
   std::vector<Stage> stages_;
 };
 

@@ -17,7 +17,9 @@ commit() { # commit BRANCH INTENSITY RANGE, on top of "start"
 merge_darker() { git checkout -q brighter && refuses git merge -q --no-edit darker >"$work/out" 2>"$work/err"; }
 is_unmerged() { [ "$(git status --porcelain | cut -c 1-2)" = UU ]; }
 # Nothing is left of us but what the repository had before.
-has_no_record() { [ ! -e "$record" ] && [ ! -e .git/vexel-merge-records ] && [ ! -e .git/hooks/post-index-change ]; }
+has_no_record() {
+  [ ! -e "$record" ] && [ ! -e .git/vexel-merge-records ] && ! grep -lq vexel-merge-git .git/hooks/* 2>/dev/null
+}
 # Permissions bind root, too, who has given up the power over them.
 as_owner=()
 if [[ $EUID == 0 ]]; then as_owner=(setpriv --bounding-set=-dac_override); fi
@@ -100,7 +102,8 @@ git reset -q --hard
 check "a conflict stops the merge" merge_darker
 check "the file is unmerged, and the record isn't seen" is_unmerged
 check "it can still be opened by the engine" cmp "$file" <(scene 2 10)
-check "git's messages name the place" grep -qF "$file: 11.Light.m_Intensity: left change to 1, right change to 5" "$work/err"
+check "git's messages name the place and the branch" \
+  grep -qFx "CONFLICT $file: Lamp > Light > m_Intensity: was 2, theirs (darker) 1, ours 5" "$work/err"
 check "the record names it, too" grep -qF "Left  11.Light.m_Intensity change to 1" "$record"
 cp "$record" "$work/record"
 git merge-tree --write-tree brighter wider >/dev/null
@@ -112,17 +115,21 @@ check "an aborted merge leaves no record" has_no_record
 check "the conflict comes again" merge_darker
 check "an editor that changes nothing settles nothing" refuses env GIT_EDITOR=true vexel-merge-git resolve "$file" 2>/dev/null
 check "the file is still unmerged" is_unmerged
-check "a mistake is named with its line" refuses env GIT_EDITOR="sed -i 's/^# left.right.base/up/'" \
+check "a mistake is named with its line" refuses env GIT_EDITOR="sed -i 's/^# theirs.ours.base/up/'" \
   vexel-merge-git resolve "$file" 2>"$work/err"
 check "in the record's own name" grep -q "^$file.*'up'.* on line [0-9]*$" "$work/err"
 cd Assets
-check "the editor's choice is merged" env GIT_EDITOR="sed -i 's/^up/right/'" vexel-merge-git resolve . >/dev/null
+check "the editor's choice is merged" env GIT_EDITOR="sed -i 's/^up/ours/'" vexel-merge-git resolve . >/dev/null
 cd ..
 check "it is right's value" value_is 5
 check "and staged" test -z "$(git ls-files -u)"
-check "the record is gone" has_no_record
+check "the record no longer lies beside it" test ! -e "$record"
+check "a mind can be changed" vexel-merge-git resolve "$file" --theirs >/dev/null
+check "it is left's value then" value_is 1
+git commit -q -m settled
+check "the record is gone with the commit" has_no_record
 check "there is nothing to resolve again" refuses vexel-merge-git resolve "$file" 2>/dev/null
-git reset -q --hard
+git reset -q --hard HEAD~
 
 merge_darker && chmod 444 "$file" && mkdir .git/vexel-merge.lock
 { sleep 2 && rmdir .git/vexel-merge.lock; } &
@@ -150,7 +157,7 @@ scene 3 10 >"$file"
 check "edits since the merge are not overwritten" refuses vexel-merge-git resolve --left "$file" 2>/dev/null
 check "they are still there" value_is 3
 git checkout -q -m -- "$file"
-check "nor those made while the editor is open" refuses env GIT_EDITOR="sed -i s/2/3/ '$file' && sed -i 's/^# left.right.base/left/'" \
+check "nor those made while the editor is open" refuses env GIT_EDITOR="sed -i s/2/3/ '$file' && sed -i 's/^# theirs.ours.base/left/'" \
   vexel-merge-git resolve "$file" 2>/dev/null
 check "they are there, too" value_is 3
 git add "$file"
@@ -160,11 +167,11 @@ git reset -q --hard
 merge_darker
 check "the page of a conflict is made" vexel-merge-git report >"$work/pages"
 check "it shows the conflict" grep -q 'data-kinds="[a-z ]*conflict' "$(cat "$work/pages")"
-check "git mergetool merges with the record" env GIT_EDITOR="sed -i 's/^# left.right.base/base/'" \
+check "git mergetool merges with the record" env GIT_EDITOR="sed -i 's/^# theirs.ours.base/base/'" \
   git -c mergetool.keepBackup=false mergetool -y -t vexel >/dev/null 2>&1
 check "it is base's value" value_is 2
-check "nothing is left of it" has_no_record
 git commit -q -m "Merge darker"
+check "nothing is left of it" has_no_record
 check "the page of a merge commit is made" vexel-merge-git report -o "$work/page.html" HEAD -- "$file" >/dev/null
 check "it names the file" grep -qF "Main Scene.vexel" "$work/page.html"
 check "a commit with one parent has no page" refuses vexel-merge-git report HEAD~ 2>/dev/null
@@ -253,18 +260,17 @@ commit_keys() { # commit_keys BRANCH VALUE SOLO
   printf -- "--- !v!108 &612873651265321735%s\nLight:\n  m_Range: $2\n" 1 2 >>"$file" && git commit -q -a -m "$1"
 }
 git reset -q --hard && commit_keys keys 3 3 && git branch -f start && commit_keys keys-left 7 7 && commit_keys keys-right 8 3
-git merge -q keys-left >/dev/null 2>&1 || first=$(grep -n -m 1 '^# left.right.base' "$record" | cut -d : -f 1)
-last=$(wc -l <"$record")
-check "each place has a line" test $((last - first)) -eq $((${#keys[@]} + 2))
-for ((line = first; line <= last; line++)); do
-  edit="sed -i -e '$line s/^# left.right.base/left/' -e 's/^# left.right.base/right/'"
+git merge -q keys-left >/dev/null 2>&1 || mapfile -t lines < <(grep -n '^# theirs.ours.base' "$record" | cut -d : -f 1)
+check "each place has a line" test ${#lines[@]} -eq $((${#keys[@]} + 3))
+for line in "${lines[@]}"; do
+  edit="sed -i -e '$line s/^# theirs.ours.base/left/' -e 's/^# theirs.ours.base/right/'"
   check "each line is read" env GIT_EDITOR="$edit" vexel-merge-git resolve "$file" >/dev/null
   check "line $line is for one place" test "$(grep -c ': 7}\?$' "$file")" -eq 2
   git hash-object "$file" >>"$work/results" && git checkout -q -m -- "$file" 2>/dev/null
 done
-check "and for no other line's" test "$(sort -u "$work/results" | wc -l)" -eq $((last - first + 1))
+check "and for no other line's" test "$(sort -u "$work/results" | wc -l)" -eq ${#lines[@]}
 vexel-merge-git resolve --left --path '6128736512653217351.*.*' "$file" >/dev/null 2>&1 || :
-check "a file ID is no number" test "$(grep -c '^# left.right.base' "$record")" -eq $((last - first))
+check "a file ID is no number" test "$(grep -c '^# theirs.ours.base' "$record")" -eq $((${#lines[@]} - 1))
 check "the rest is settled" vexel-merge-git resolve --right "$file" >/dev/null
 check "what only one side edited stays" test "$(grep -c ': 7$' "$file")" -eq 2
 

@@ -86,7 +86,7 @@ check "an aborted merge leaves nothing" is_clean
 check "no list and no hook either" test ! -e .git/vexel-merge-records -a ! -e .git/hooks/post-index-change
 git cherry-pick left >/dev/null 2>&1 || vexel-merge-git status >"$work/out"
 check "nor is one of theirs that git brings last" grep -q '^  its record is .git/' <(grep -A 1 dir/x.vexel "$work/out")
-GIT_EDITOR="sed -i 's/^# left.right.base/left/'" vexel-merge-git resolve dir/x.vexel >/dev/null 2>&1 || :
+GIT_EDITOR="sed -i 's/^# theirs.ours.base/theirs/'" vexel-merge-git resolve dir/x.vexel >/dev/null 2>&1 || :
 check "the record that is ours counts" grep -qFx '  m_Intensity: 1' dir/x.vexel
 cp -R .git/vexel-merge-records "$work" && git cherry-pick --abort
 cp -R "$work/vexel-merge-records" .git && touch .git/index.lock && vexel-merge-git status >/dev/null

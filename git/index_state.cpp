@@ -1,0 +1,70 @@
+#include "git/index_state.h"
+
+#include "git/git_call.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// A system has a limit for their length.
+constexpr size_t kMostArguments = 500;
+
+// Fields with blanks between them stand before a tab, and the path behind it.
+struct IndexLine {
+  std::vector<std::string> fields;
+  std::string path;
+};
+
+std::vector<IndexLine> IndexLines(const std::string& output) {
+  std::vector<IndexLine> lines;
+  for (const std::string& entry : Pieces(output, '\0')) {
+    const size_t end = entry.find('\t');
+    if (end != std::string::npos) lines.push_back({Pieces(entry.substr(0, end), ' '), entry.substr(end + 1)});
+  }
+  return lines;
+}
+
+}  // namespace
+
+std::optional<ConflictPaths> PathsInConflict() {
+  ProgramCall call = GitCall({"ls-files", "-z", "-t", "--unmerged", "--resolve-undo"});
+  call.without = {kIndexVariable};
+  const ProgramResult result = RunProgram(call);
+  if (result.status != 0) return std::nullopt;
+  ConflictPaths paths;
+  for (IndexLine& line : IndexLines(result.output)) {
+    (line.fields.front() == "U" ? paths.staged : paths.unmerged).insert(std::move(line.path));
+  }
+  return paths;
+}
+
+std::optional<std::map<std::string, std::string>> IndexBlobs(const std::vector<std::string>& paths) {
+  std::map<std::string, std::string> blobs;
+  if (paths.empty()) return blobs;
+  ProgramCall call = GitCall({"--literal-pathspecs", "ls-files", "-z", "--stage", "--"});
+  if (paths.size() <= kMostArguments) call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
+  call.without = {kIndexVariable};
+  const ProgramResult result = RunProgram(call);
+  if (result.status != 0) return std::nullopt;
+  for (const IndexLine& line : IndexLines(result.output)) {
+    if (line.fields.size() == 3 && line.fields[2] == "0") blobs[line.path] = line.fields[1];
+  }
+  return blobs;
+}
+
+std::map<std::string, std::string> StagedChanges() {
+  const ProgramResult result = GitQuietly({"diff-index", "--cached", "--raw", "-z", "--no-renames",
+                                           "--no-abbrev", "--no-relative", "HEAD", "--"});
+  std::map<std::string, std::string> blobs;
+  const std::vector<std::string> pieces = Pieces(result.output, '\0');
+  // Two modes, two blobs and a letter, then the path.
+  for (size_t i = 0; i + 1 < pieces.size(); i += 2) {
+    const std::vector<std::string> fields = Pieces(pieces[i], ' ');
+    if (fields.size() < 5) continue;
+    const bool is_file = fields[4] != "U" && fields[4] != "D" && fields[1].starts_with("100");
+    blobs[pieces[i + 1]] = is_file ? fields[3] : std::string();
+  }
+  return blobs;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,39 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "git/asset_merge.h"
+#include "git/stage_files.h"
+
+namespace vexel_yaml {
+
+/// Two commits that are merged, and what they come from, by their hashes.
+struct MergedCommits {
+  std::string commit;  ///< The merge; empty for one that isn't made.
+  std::string base;
+  std::string ours;
+  std::string theirs;
+};
+
+/// The merge commit of this name, and its parents. Throws CommandError for any other commit.
+MergedCommits FindMerged(const std::string& name);
+
+/// The hash of a commit that somebody names. Throws CommandError where there is none.
+std::string FindCommit(const std::string& name);
+
+/// The paths that one of two commits has otherwise than the other one, sorted; those below `paths`, or all.
+std::vector<std::string> ChangedPaths(const std::string& from, const std::string& to,
+                                      const std::vector<std::string>& paths);
+
+std::vector<std::string> ChangedOnBothSides(const MergedCommits& merged,
+                                            const std::vector<std::string>& paths);
+
+/// Writes the versions of a file, as files whose names say which they are. False where one has none.
+bool WriteVersions(const MergedCommits& merged, const std::string& asset, ScratchFolder& scratch,
+                   AssetVersions& versions);
+
+/// The commit as people write it.
+std::string ShortHash(const std::string& commit);
+
+}  // namespace vexel_yaml

@@ -1,0 +1,172 @@
+#!/usr/bin/env bash
+# What people see of conflicts when git merges, and how these are settled, remembered and kept out of commits:
+#   git_conflicts.sh PROGRAM
+set -euo pipefail
+# shellcheck source=tests/support/end_to_end.sh
+source "$(dirname "${BASH_SOURCE[0]}")/support/end_to_end.sh"
+export GIT_EDITOR=true
+
+file=Harbour.vexel
+guid=0123456789abcdef0123456789abcdef
+# harbour INTENSITY RANGE SPEED BOAT: a lamp with a script, and a boat that a prefab brings.
+harbour() {
+  cat <<SCENE
+%YAML 1.1
+%TAG !v! tag:vexel.com,2011:
+--- !v!1 &10
+GameObject:
+  m_Component:
+  - component: {fileID: 11}
+  - component: {fileID: 12}
+  - component: {fileID: 13}
+  m_Name: Lamp
+--- !v!4 &11
+Transform:
+  m_GameObject: {fileID: 10}
+  m_Children: []
+  m_Father: {fileID: 0}
+--- !v!108 &12
+Light:
+  m_GameObject: {fileID: 10}
+  m_Intensity: $1
+  m_Range: $2
+--- !v!114 &13
+MonoBehaviour:
+  m_GameObject: {fileID: 10}
+  m_Script: {fileID: 11500000, guid: $guid, type: 3}
+  speed: $3
+--- !v!1001 &20
+PrefabInstance:
+  m_Modification:
+    m_TransformParent: {fileID: 0}
+    m_Modifications:
+    - target: {fileID: 401, guid: 00000000000000000000000000000001, type: 3}
+      propertyPath: m_LocalPosition.x
+      value: $4
+      objectReference: {fileID: 0}
+SCENE
+}
+commit() { # commit BRANCH START HARBOUR...
+  git checkout -q -b "$1" "$2" && harbour "${@:3}" >"$file" && git commit -q -a -m "Work on $1"
+}
+says() { grep -qFx "$1" "$work/err"; }
+is_at() { cmp -s "$file" <(harbour "$@"); }
+has_nothing_of_ours() { [ ! -e .git/vexel-merge-records ] && ! grep -lq vexel-merge-git .git/hooks/*; }
+stops() { refuses "$@" >"$work/out" 2>"$work/err"; }
+
+git init -q -b main "$work/repository" && cd "$work/repository" && mkdir -p Code .git/hooks
+vexel-merge-git enable >/dev/null
+printf 'fileFormatVersion: 2\nguid: %s\n' "$guid" >Code/DoorOpener.cs.meta
+harbour 2 10 1 1 >"$file" && git add -A && git commit -q -m base && git branch start
+commit lights start 4 10 1 1
+commit doors lights 4 10 2 2
+commit bright start 9 10 1 1
+commit all bright 9 20 3 3
+git checkout -q --detach
+
+check "a preview tells of conflicts" stops vexel-merge-git preview doors
+check "and with whom" grep -qFx "  theirs, by Test: Lamp, PrefabInstance 20" "$work/out"
+check "it writes nothing" test -z "$(git status --porcelain)$(find .git -name 'vexel-merge.*' -type d)"
+check "a preview without conflicts is one" vexel-merge-git preview start >/dev/null
+
+check "a merge stops" stops git merge -q doors
+check "scripts go by their classes" says "CONFLICT $file: Lamp > DoorOpener > speed: was 1, theirs (doors) 2, ours 3"
+check "overrides by what they override" says \
+  "CONFLICT $file: PrefabInstance 20 > m_LocalPosition.x of 401: was 1, theirs (doors) 2, ours 3"
+git add "$file" 2>"$work/err"
+check "it is said that nothing is settled" grep -q "^warning: $file is staged .* at 3 conflicts" "$work/err"
+touch new && git add new 2>"$work/err"
+check "it is said once" test ! -s "$work/err"
+check "the commit is stopped" stops git commit -q -m early
+check "a check for scripts says so, too" stops vexel-merge-git check --staged
+check "one side's choice leaves the rest" stops vexel-merge-git resolve "$file" --theirs --path '*.Light.*'
+check "which the other side gets" vexel-merge-git resolve --ours "$file" >/dev/null
+check "a choice stays what it was" is_at 4 20 3 3
+check "it can be changed until the commit" vexel-merge-git resolve --base --path 13.MonoBehaviour.speed "$file" >/dev/null
+check "for that place alone" is_at 4 20 1 3
+harbour 4 20 7 7 >"$file" && git add "$file"
+check "what was edited since is not overwritten" stops vexel-merge-git resolve --ours "$file"
+check "what is edited can be committed" git commit -q -m merged
+check "nothing is left" has_nothing_of_ours
+check "the commit has no conflict" vexel-merge-git check HEAD
+git reset -q --hard all && git merge -q doors >/dev/null 2>&1 || git add "$file" 2>/dev/null
+check "whoever insists can commit" git commit -q --no-verify -m careless
+check "a build server finds it" stops vexel-merge-git check HEAD
+check "nothing is left of that either" has_nothing_of_ours
+git reset -q --hard all
+printf '#!/bin/sh\nexit 0\n' >.git/hooks/pre-commit && chmod +x .git/hooks/pre-commit && cp .git/hooks/pre-commit "$work/own"
+git merge -q doors >/dev/null 2>&1 || :
+check "somebody's own hook stays" cmp .git/hooks/pre-commit "$work/own"
+git merge --abort && rm .git/hooks/pre-commit
+
+# Scenes are merged as scenes.
+git checkout -q -b dark start && harbour 2 10 1 1 | sed '/&10$/,/speed/d' >"$file" && git commit -q -a -m dark
+check "what one side removes and the other edits is asked" stops git merge -q bright
+check "as one conflict, about the whole" says \
+  "CONFLICT $file: Lamp: theirs (bright) edits m_Intensity of Light, ours removes it"
+check "which is there until that is settled" is_at 2 10 1 1
+check "theirs brings all of it" vexel-merge-git resolve --theirs "$file" >/dev/null
+check "with their edit" is_at 9 10 1 1
+git reset -q --hard && git config vexel.safe false
+check "value by value, the removal wins" git merge -q --no-edit bright
+git config --unset vexel.safe && harbour 2 10 1 1 | sed '/component: {fileID: 12}/d' >"$file" && git add "$file"
+check "a broken scene is found when it is staged" stops vexel-merge-git check --staged
+check "it says where" grep -q "^error: $file is broken: .*Lamp" "$work/err"
+git commit -q -m broken
+check "in its commit as well" stops vexel-merge-git check HEAD
+git commit -q --allow-empty -m next
+check "and not in the next one" vexel-merge-git check HEAD
+
+# More conflicts than anybody reads, in two lamps of one name.
+git checkout -q -b many start && printf '  key%02d: 1\n' {1..12} >keys
+lamps() { harbour 2 10 1 1 && sed "s/: 1/: $1/" keys && printf -- '--- !v!1 &30\nGameObject:\n  m_Name: Lamp\n  m_Layer: %s\n' "$1"; }
+for value in 1 2 3; do
+  lamps "$value" | sed "s/m_Name: Lamp/&\n  m_Layer: $value/" >"$file" && git commit -q -a -m "$value" && git tag "v$value"
+  git checkout -q -B many v1
+done
+git checkout -q v3
+check "a merge of many conflicts stops" stops git merge -q v2
+check "ten are shown" test "$(grep -c "^CONFLICT $file" "$work/err")" -eq 10
+check "the rest is counted" grep -q "^\.\.\. and [0-9]* more: vexel-merge-git check '$file'$" "$work/err"
+check "the command shows all" stops vexel-merge-git check "$file"
+check "lamps of one name are told apart" test "$(grep -c 'Lamp > m_Layer ([13]0.GameObject.m_Layer): ' "$work/out")" -eq 2
+git merge --abort
+
+# In a rebase, "theirs" are one's own commits.
+git checkout -q doors
+check "a rebase stops" stops git rebase -q all
+check "it says whose is whose" says \
+  "CONFLICT $file: Lamp > Light > m_Intensity: was 2, theirs (\"Work on lights\" of doors, which is rebased) 4, ours (all, its new base) 9"
+git add "$file" 2>/dev/null
+check "it doesn't go on undecided" stops git rebase --continue
+git config rerere.enabled true
+check "a choice is made" vexel-merge-git resolve --ours "$file" >/dev/null
+check "the rebase stops at the next commit" stops git rebase --continue
+git rebase --abort
+check "an aborted rebase leaves nothing" has_nothing_of_ours
+check "the rebase stops again" stops git rebase -q all
+check "what was decided is remembered" says "1 conflict of $file settled as before"
+check "it is there" is_at 9 20 3 3
+git add "$file"
+check "the rebase goes on to the next commit" stops git rebase --continue
+check "only what is new is asked" test "$(grep -c '^CONFLICT Harbour' "$work/err")" -eq 2
+git rebase --abort
+find .git/vexel-merge-decisions -type f -exec touch -d '61 days ago' {} +
+git rebase -q all >/dev/null 2>&1 || vexel-merge-git resolve --theirs "$file" >/dev/null
+check "what is old is forgotten" test -z "$(find .git/vexel-merge-decisions -mtime +60)"
+git rebase --abort && git config --unset rerere.enabled
+
+git checkout -q all
+check "a series of picks stops" stops git cherry-pick start..doors
+check "it names the commit" grep -qF 'theirs ("Work on lights") 4, ours 9' "$work/err"
+git cherry-pick --abort
+harbour 3 20 3 3 >"$file" && git stash -q && harbour 5 20 3 3 >"$file" && git commit -q -a -m five
+check "a revert stops" stops git revert --no-edit bright
+check "it has both edits in its lines" grep -qF 'm_Intensity: was 9, theirs 2, ours 5' "$work/err"
+git revert --abort
+check "a stash stops" stops git stash pop
+check "it has both edits in its lines, too" grep -qF 'm_Intensity: was 9, theirs 3, ours 5' "$work/err"
+git reset -q --hard && vexel-merge-git disable >"$work/out"
+check "whoever gives up is told of the attributes" grep -q '^.gitattributes is tracked, and has gone: ' "$work/out"
+
+end_of_checks "people settle conflicts"
