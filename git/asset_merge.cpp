@@ -1,5 +1,6 @@
 #include "git/asset_merge.h"
 
+#include <algorithm>
 #include <exception>
 #include <iostream>
 #include <new>
@@ -14,6 +15,7 @@
 #include "platform/file_error.h"
 #include "platform/thread.h"
 #include "report/merged_files.h"
+#include "report/override_names.h"
 #include "report/record_patterns.h"
 #include "report/value_text.h"
 #include "rules/setup.h"
@@ -198,10 +200,18 @@ int AssetMerge::RunQuietly(const MergeSettings& settings, const Decisions* decis
 void AssetMerge::SayMessages() const { vexel_yaml::SayMessages(messages_, versions_); }
 
 const std::vector<NamedConflict>& AssetMerge::GetConflicts() {
-  if (!conflicts_) {
-    conflicts_ =
-        NameConflicts(resolver_, documents_->base, documents_->left, documents_->right, FindScriptClasses);
+  if (conflicts_) return *conflicts_;
+  // A safe merge changes what it has read, and an override is known by what both sides have made of it.
+  SceneDocuments unchanged;
+  const bool has_overrides = std::ranges::any_of(
+      resolver_.GetRecords(), [](const auto& record) { return IsInOverride(record.path); });
+  if (has_overrides) {
+    const CapturedErrors said_before;
+    TimerStat silent("", nullptr);
+    ReadScenes(versions_.base, versions_.left, versions_.right, unchanged, threads_, silent);
   }
+  const SceneDocuments& shown = has_overrides ? unchanged : *documents_;
+  conflicts_ = NameConflicts(resolver_, shown.base, shown.left, shown.right, FindScriptClasses);
   return *conflicts_;
 }
 

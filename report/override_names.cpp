@@ -79,11 +79,15 @@ const YAMLNode* BaseValue(const VexelObjects& base, const FieldPath& path, const
 
 }  // namespace
 
+bool IsInOverride(const FieldPath& path) {
+  return path.size() >= kFieldAt && path[kListLength - 1] == Key("m_Modifications");
+}
+
 std::optional<NamedOverride> OverrideAt(const RecordingConflictResolver::Record& record,
                                         const VexelObjects& base, const VexelObjects& left,
                                         const VexelObjects& right) {
   const FieldPath& path = record.path;
-  if (path.size() < kFieldAt || path[kListLength - 1] != Key("m_Modifications")) return std::nullopt;
+  if (!IsInOverride(path)) return std::nullopt;
   std::optional<std::string> name;
   for (const YAMLMapping* theirs : EntriesWith(left, path, record.left)) {
     for (const YAMLMapping* ours : EntriesWith(right, path, record.right)) {

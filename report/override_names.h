@@ -16,8 +16,12 @@ struct NamedOverride {
   const YAMLNode* base_value;
 };
 
-/// The override that a record is about. Nothing for a record about something else, or for one whose place in
-/// the list can't be told: its index is that of a merged list, which none of the versions has.
+/// Whether a record of this path is about one, or a part of it.
+bool IsInOverride(const FieldPath& path);
+
+/// The override that a record is about, in versions that still have what both sides made of it. Nothing for a
+/// record about something else, or for one whose place in the list can't be told: its index is that of a
+/// merged list, which none of the versions has.
 std::optional<NamedOverride> OverrideAt(const RecordingConflictResolver::Record& record,
                                         const VexelObjects& base, const VexelObjects& left,
                                         const VexelObjects& right);
