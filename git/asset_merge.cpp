@@ -150,6 +150,7 @@ void AssetMerge::TakeDecisions(const Decisions& decisions) {
 bool AssetMerge::MergeScenes() {
   TimerStat silent("", nullptr);
   SafeMergeResult result = SafeMerge(*documents_, resolver_, {.threads = threads_}, silent);
+  for (const std::string& note : result.notes) std::cerr << note << '\n';
   merged_ = std::move(result.merged);
   return result.breaks_dependency;
 }
