@@ -88,20 +88,23 @@ def lost(base, side, other, merged):
 def is_covered(fact, base, side, other, pending):
     """Whether a pending path is the place of the edit, one inside it, or a thing that it is about."""
     file_id, path, value = fact
-    things = {part for version in (base, side, other) for part in owners(version, file_id)}
+    three = (base, side, other)
+    things = {part for version in three for part in owners(version, file_id)}
     deletes = value is None and len(path) == 1
     if deletes:
         # A deletion is one act with what it took along, and with what the other side put there.
         for deleted in (version for version in (side, other) if file_id not in version):
             top = [part for part in owners(base, file_id) if part not in deleted][-1]
             things |= {*whole(base, top), *whole(other, top)}
+    # What it hung on may be elsewhere in another version.
+    things |= {part for thing in things for version in three for part in owners(version, thing)}
     old = base[file_id].fields if file_id in base else {}
     for key in path[1:]:
         old = _get(old, key)
     targets = [target for target in (target_of(value), value == NONE and target_of(old)) if target]
     if any(target not in side for target in targets):
         return True  # The editor cleared the reference, since its object was deleted.
-    things |= {part for target in targets for version in (base, side, other) for part in owners(version, target)}
+    things |= {part for target in targets for version in three for part in owners(version, target)}
     place = (file_id, *itertools.takewhile(lambda key: not key.startswith("#"), path))
     for thing, *below in pending:
         # Where a thing hangs is a part of what becomes of the thing above.

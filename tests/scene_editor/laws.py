@@ -60,14 +60,16 @@ def check_edits(law, versions, merged, pending_for):
 
 def settle(law, merger, versions, pending, choose):
     """Settles what is pending in two rounds, and looks for all that was chosen."""
-    choices = {}
-    for _ in range(2):
-        # What was chosen and is pending again contradicts another choice.
-        choices.update({path: "base" if path in choices else choose(path) for path in pending})
+    choices = {path: choose(path) for path in pending}
+    merged, pending = merger.merge("base", "left", "right", choices=choices)
+    # What is pending again contradicts another choice, and one of three must go with that.
+    again = pending
+    for side in ("base", *SIDES) if pending else ():
+        choices.update(dict.fromkeys(again, side))
         merged, pending = merger.merge("base", "left", "right", choices=choices)
         if not pending:
             break
-    else:
+    if pending:
         raise Broken(f"{law}: rounds", f"pending {pending} with the choices {choices}")
     check_edits(law, versions, merged, {side: [path for path, chosen in choices.items() if chosen != side]
                                         for side in SIDES})
