@@ -1,9 +1,9 @@
 #include "scene/contests.h"
 
 #include <algorithm>
-#include <iterator>
 #include <stdexcept>
 #include <unordered_map>
+#include <unordered_set>
 
 #include "diff/merge_tree_visitor.h"
 #include "scene/deeds.h"
@@ -46,51 +46,37 @@ Contest MakeDeletionContest(const SceneEdits& edits, SceneSide deleter, size_t d
   return contest;
 }
 
-// The parts that were moved out, each with what it consists of; none that lies in another one.
-std::vector<std::pair<const YAMLScalar*, FileIDs>> MovedOutParts(const VexelObjects& base,
-                                                                 const FileIDs& moved_out,
-                                                                 const FileIDs& objects) {
-  std::vector<std::pair<const YAMLScalar*, FileIDs>> parts;
-  for (const YAMLScalar* node : moved_out) parts.emplace_back(node, CollectBelow(base, node, objects));
-  std::vector<std::pair<const YAMLScalar*, FileIDs>> outermost;
-  for (const auto& part : parts) {
-    const bool is_inner = std::ranges::any_of(parts, [&](const auto& other) {
-      return other.first != part.first && std::ranges::find(other.second, part.first) != other.second.end();
-    });
-    if (!is_inner) outermost.push_back(part);
-  }
-  return outermost;
-}
-
-// A part that was moved out is contested by itself, and the rest where something was done to it.
+// A part that was moved out is contested by itself, unless it is in another one, and the rest where something
+// was done to it.
 void AddDeletionContests(const SceneEdits& edits, SceneSide deleter, size_t deletion, const Deeds& deeds,
                          std::vector<Contest>& contests) {
+  const VexelObjects& base = edits.versions.base;
   const Deletion& deleted = edits.Deleted(deleter).Get()[deletion];
-  const auto parts =
-      MovedOutParts(edits.versions.base, ObjectsOf(deeds, Deed::Kind::kMovedOut), deleted.objects);
-  std::unordered_map<const YAMLScalar*, size_t> part_of;
-  for (size_t i = 0; i < parts.size(); ++i) {
-    for (const YAMLScalar* file_id : parts[i].second) part_of.emplace(file_id, i);
+  std::unordered_set<const YAMLScalar*> moved_out;
+  for (const YAMLScalar* node : ObjectsOf(deeds, Deed::Kind::kMovedOut)) {
+    const YAMLScalar* owner = ReadLinks(base.Get(node)).owner;
+    moved_out.insert(owner == nullptr ? node : owner);
   }
-  const auto place_of = [&](const YAMLScalar* file_id) {
-    const auto found = part_of.find(file_id);
-    return found == part_of.end() ? parts.size() : found->second;
+  const auto part_of = FindTops(Holders(base, deleted.objects), deleted.objects, moved_out);
+  struct Part {
+    FileIDs objects;
+    Deeds deeds;
   };
-  // The rest is the last one.
-  std::vector<Deeds> deeds_at(parts.size() + 1);
-  for (const Deed& deed : deeds) deeds_at[place_of(deed.object)].push_back(deed);
-  for (size_t i = 0; i < parts.size(); ++i) {
-    const auto& [node, objects] = parts[i];
-    const YAMLScalar* owner = ReadLinks(edits.versions.base.Get(node)).owner;
-    contests.push_back(
-        MakeDeletionContest(edits, deleter, deletion, owner == nullptr ? node : owner, objects, deeds_at[i]));
+  // Null for the rest. In the order of base.
+  std::vector<const YAMLScalar*> things;
+  std::unordered_map<const YAMLScalar*, Part> parts;
+  for (const YAMLScalar* file_id : deleted.objects) {
+    const auto [part, is_new] = parts.try_emplace(part_of.at(file_id));
+    if (is_new) things.push_back(part->first);
+    part->second.objects.push_back(file_id);
   }
-  if (deeds_at.back().empty()) return;
-  FileIDs rest;
-  std::ranges::copy_if(deleted.objects, std::back_inserter(rest),
-                       [&](const YAMLScalar* file_id) { return !part_of.contains(file_id); });
-  contests.push_back(
-      MakeDeletionContest(edits, deleter, deletion, deleted.thing, std::move(rest), deeds_at.back()));
+  for (const Deed& deed : deeds) parts[part_of.at(deed.object)].deeds.push_back(deed);
+  for (const YAMLScalar* thing : things) {
+    Part& part = parts[thing];
+    if (part.deeds.empty()) continue;
+    contests.push_back(MakeDeletionContest(edits, deleter, deletion, thing == nullptr ? deleted.thing : thing,
+                                           std::move(part.objects), part.deeds));
+  }
 }
 
 bool IsFatherContested(const SceneEdits& edits, const YAMLScalar* node) {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <optional>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -24,6 +25,8 @@ struct Contest {
   MergeResolve side = MergeResolve::kBase;
   /// Why a choice of the user's could not be carried out.
   std::string reason;
+  /// The sides that were found not to stand beside other choices.
+  std::set<MergeResolve> excluded;
 
   /// One side deleted the thing, and the other did something to it.
   struct Deleted {

@@ -1,6 +1,7 @@
 #include "scene/deeds.h"
 
 #include <algorithm>
+#include <unordered_map>
 #include <unordered_set>
 
 #include "fixups/component_dependencies.h"
@@ -27,9 +28,10 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
   YAMLMapping* body = GetBody(const_cast<YAMLNode*>(object));
   if (body == nullptr) return targets;
   const YAMLMapping* father = GetFatherReference(const_cast<YAMLNode*>(object));
-  const YAMLScalar* owner = ReadLinks(object).owner;
+  const ObjectLinks links = ReadLinks(object);
+  const YAMLScalar* owner = links.owner;
   for (const auto& [key, value] : *body) {
-    if (key == ChildrenKey() || key == YAMLScalar::mComponent) continue;
+    if (IsLink({nullptr, nullptr, key}, links.kind)) continue;
     VisitReferences(value, [&](YAMLMapping& reference) {
       const YAMLScalar* target = GetLocalTarget(&reference);
       if (&reference != father && target != owner) targets.insert(target);
@@ -41,7 +43,7 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
 FileIDs ChildrenOf(const YAMLNode* object) {
   FileIDs children;
   const YAMLMapping* body = GetBody(object);
-  if (body == nullptr) return children;
+  if (body == nullptr || ReadLinks(object).kind != ObjectLinks::Kind::kTransform) return children;
   VisitReferences(const_cast<YAMLNode*>(body->Get(ChildrenKey())),
                   [&](YAMLMapping& reference) { children.push_back(GetLocalTarget(&reference)); });
   return children;
@@ -116,13 +118,26 @@ class DeedSearch {
   }
 
   // The deleted object that an object is or, as an addition, hangs on; null for none.
-  const YAMLScalar* Reached(const YAMLScalar* file_id) const {
-    std::unordered_set<const YAMLScalar*> passed;
+  const YAMLScalar* Reached(const YAMLScalar* file_id) {
+    FileIDs walk;
     const YAMLScalar* step = file_id;
-    while (step != nullptr && deleted_.Find(step) == Deletions::kNone) {
-      step = passed.insert(step).second ? holders_.Get(step) : nullptr;
+    const YAMLScalar* reached = nullptr;
+    while (step != nullptr) {
+      if (deleted_.Find(step) != Deletions::kNone) {
+        reached = step;
+        break;
+      }
+      // In a circle the walk meets itself, and has reached nothing.
+      const auto [known, is_new] = reached_.emplace(step, nullptr);
+      if (!is_new) {
+        reached = known->second;
+        break;
+      }
+      walk.push_back(step);
+      step = holders_.Get(step);
     }
-    return step;
+    for (const YAMLScalar* passed : walk) reached_[passed] = reached;
+    return reached;
   }
 
   void LookAtMove(const YAMLScalar* file_id) {
@@ -185,6 +200,8 @@ class DeedSearch {
   const VexelObjects& kept_;
   const Deletions& deleted_;
   const Holders holders_;
+  // Of what was asked already.
+  std::unordered_map<const YAMLScalar*, const YAMLScalar*> reached_;
   std::map<size_t, Deeds> deeds_;
 };
 

@@ -25,25 +25,24 @@ void Holders::Hold(const YAMLScalar* file_id, const YAMLScalar* holder) {
   if (holder != nullptr && holder != file_id && among_.contains(holder)) holders_.emplace(file_id, holder);
 }
 
-std::vector<const YAMLScalar*> CollectBelow(const VexelObjects& objects, const YAMLScalar* node,
-                                            const std::vector<const YAMLScalar*>& among) {
-  const Holders holders(objects, among);
-  const ObjectLinks links = ReadLinks(objects.Get(node));
-  const YAMLScalar* top = links.owner == nullptr ? node : links.owner;
-  std::unordered_map<const YAMLScalar*, bool> is_below = {{top, true}};
-  std::vector<const YAMLScalar*> below;
-  for (const YAMLScalar* file_id : among) {
+std::unordered_map<const YAMLScalar*, const YAMLScalar*> FindTops(
+    const Holders& holders, const std::vector<const YAMLScalar*>& objects,
+    const std::unordered_set<const YAMLScalar*>& tops) {
+  std::unordered_map<const YAMLScalar*, const YAMLScalar*> found;
+  for (const YAMLScalar* file_id : objects) {
     std::vector<const YAMLScalar*> walk;
     const YAMLScalar* step = file_id;
-    while (step != nullptr && is_below.emplace(step, false).second) {
+    while (step != nullptr && found.emplace(step, nullptr).second) {
       walk.push_back(step);
       step = holders.Get(step);
     }
-    const bool found = step != nullptr && is_below.at(step);
-    for (const YAMLScalar* passed : walk) is_below[passed] = found;
-    if (found || is_below.at(file_id)) below.push_back(file_id);
+    const YAMLScalar* top = step == nullptr ? nullptr : found.at(step);
+    for (auto passed = walk.rbegin(); passed != walk.rend(); ++passed) {
+      if (top == nullptr && tops.contains(*passed)) top = *passed;
+      found[*passed] = top;
+    }
   }
-  return below;
+  return found;
 }
 
 }  // namespace vexel_yaml

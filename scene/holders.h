@@ -25,9 +25,10 @@ class Holders {
   std::unordered_map<const YAMLScalar*, const YAMLScalar*> holders_;
 };
 
-/// The objects of `among` that belong to `node` (a transform or prefab instance) or hang below it, with the
-/// game objects and their components; in the order of `among`.
-std::vector<const YAMLScalar*> CollectBelow(const VexelObjects& objects, const YAMLScalar* node,
-                                            const std::vector<const YAMLScalar*>& among);
+/// For each of some objects the outermost one of `tops` on which it hangs in the end, itself included; null
+/// for none.
+std::unordered_map<const YAMLScalar*, const YAMLScalar*> FindTops(
+    const Holders& holders, const std::vector<const YAMLScalar*>& objects,
+    const std::unordered_set<const YAMLScalar*>& tops);
 
 }  // namespace vexel_yaml

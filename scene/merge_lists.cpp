@@ -18,7 +18,8 @@ const YAMLNode* ElementAt(const YAMLSequence& list, uint32_t index) {
 // have the same path.
 const YAMLScalar* NameOf(const AlignedElement& element) {
   const bool is_added = element.base == kNoIndex;
-  const std::string index = IntToString(static_cast<int>(is_added ? element.left : element.base));
+  const uint32_t added = element.left == kNoIndex ? element.right : element.left;
+  const std::string index = IntToString(static_cast<int>(is_added ? added : element.base));
   return YAMLScalar::Lookup(is_added ? "+" + index : index);
 }
 

@@ -145,6 +145,23 @@ void VisitReferences(YAMLNode* node, const std::function<void(YAMLMapping& refer
   }
 }
 
+bool IsLink(const FieldPath& path, ObjectLinks::Kind kind) {
+  switch (kind) {
+    case Kind::kTransform:
+      return path.size() == 3 &&
+             (path[2] == ChildrenKey() || path[2] == RootOrderKey() || path[2] == YAMLScalar::mFather);
+    case Kind::kGameObject:
+      return path.size() == 3 && path[2] == YAMLScalar::mComponent;
+    case Kind::kPrefabInstance:
+      return path.size() == 4 && path[2] == YAMLScalar::mModification &&
+             path[3] == YAMLScalar::mTransformParent;
+    case Kind::kComponent:
+    case Kind::kOther:
+      break;
+  }
+  return false;
+}
+
 const YAMLScalar* ChildrenKey() {
   static const YAMLScalar* const key = YAMLScalar::Lookup("m_Children");
   return key;

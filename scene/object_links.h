@@ -48,6 +48,11 @@ const YAMLScalar* GetLocalTarget(const YAMLNode* value);
 /// Calls `visit` with every reference to another object of the file at and below `node`.
 void VisitReferences(YAMLNode* node, const std::function<void(YAMLMapping& reference)>& visit);
 
+/// Whether what stands at `path`, which begins with a file ID, says where such an object hangs or follows
+/// from what other objects say: its father, its children or components, its place among its siblings. Fields
+/// of other objects may bear these names and mean anything.
+bool IsLink(const FieldPath& path, ObjectLinks::Kind kind);
+
 /// The keys of the lists that follow from what the listed objects say themselves.
 const YAMLScalar* ChildrenKey();
 /// The place among these, in files that say it twice.

@@ -29,12 +29,10 @@ bool Places(const Contest& contest, const YAMLScalar* node) {
 }
 
 // Whether a contest decides that an object is there.
-bool Removes(const Contest& contest, const SceneEdits& edits, const YAMLScalar* file_id) {
+bool Removes(const Contest& contest, const YAMLScalar* file_id) {
   if (!contest.deleted) return false;
-  const Contest::Deleted& deleted = *contest.deleted;
-  const size_t deletion = edits.Deleted(deleted.by).Find(file_id);
-  return (deletion != Deletions::kNone && deletion == deleted.deletion) ||
-         std::ranges::find(deleted.additions, file_id) != deleted.additions.end();
+  const FileIDs& additions = contest.deleted->additions;
+  return Decides(contest, file_id) || std::ranges::find(additions, file_id) != additions.end();
 }
 
 class Reconciliation {
@@ -77,6 +75,7 @@ class Reconciliation {
 
   // A thing stands without what was moved below it, while another choice wants that moved.
   bool FixExcluded() {
+    bool has_changed = false;
     for (Contest& contest : contests_) {
       if (!contest.deleted || SourceOf(contest) == SourceOf(OtherSide(contest.deleted->by))) continue;
       for (const YAMLScalar* node : contest.deleted->moved_in) {
@@ -84,11 +83,11 @@ class Reconciliation {
         for (Contest& other : contests_) {
           const bool moves = &other != &contest && Decides(other, node) && SourceOf(other) != Source::kNone &&
                              FatherIn(plan_.Version(SourceOf(other)), node) == wanted;
-          if (moves && SettleExcluded(contest, other)) return true;
+          if (moves) has_changed |= SettleExcluded(contest, other);
         }
       }
     }
-    return false;
+    return has_changed;
   }
 
   // What is settled goes first, of two the first one. Returns whether something changed.
@@ -97,9 +96,7 @@ class Reconciliation {
       const bool is_thing_first = &thing < &move;
       return Retreat({is_thing_first ? &thing : &move, is_thing_first ? &move : &thing});
     }
-    if (!IsSettled(move)) return StepBack(move);
-    thing.side = thing.deleted->by == SceneSide::kLeft ? MergeResolve::kRight : MergeResolve::kLeft;
-    return true;
+    return StepBack(IsSettled(move) ? thing : move);
   }
 
   bool FixMissingFather() {
@@ -109,7 +106,7 @@ class Reconciliation {
       if (AreBothWithout(father) && plan_.Restore(father)) return true;
       std::vector<Contest*> concerned;
       for (Contest& contest : contests_) {
-        if (Places(contest, node) || Removes(contest, edits_, father)) concerned.push_back(&contest);
+        if (Places(contest, node) || Removes(contest, father)) concerned.push_back(&contest);
       }
       if (!WasThere(father)) continue;
       if (!BringBack(father, concerned)) plan_.Uproot(node);
@@ -126,7 +123,7 @@ class Reconciliation {
       if (plan_.Has(owner)) continue;
       std::vector<Contest*> concerned;
       for (Contest& other : contests_) {
-        if (&other == &contest || Removes(other, edits_, owner)) concerned.push_back(&other);
+        if (&other == &contest || Removes(other, owner)) concerned.push_back(&other);
       }
       if (BringBack(owner, concerned)) return true;
     }
@@ -135,8 +132,8 @@ class Reconciliation {
 
   // Whether what something is to hang on could be brought back, or that something elsewhere.
   bool BringBack(const YAMLScalar* file_id, const std::vector<Contest*>& concerned) {
-    const bool is_contested = std::ranges::any_of(
-        concerned, [&](const Contest* contest) { return Removes(*contest, edits_, file_id); });
+    const bool is_contested =
+        std::ranges::any_of(concerned, [&](const Contest* contest) { return Removes(*contest, file_id); });
     return (!is_contested && KeepDeleted(file_id)) || Retreat(concerned);
   }
 
@@ -160,31 +157,38 @@ class Reconciliation {
     return is_kept;
   }
 
-  // Opens the last of the settled ones again, or, where none is, lets the last one that can stand otherwise
-  // do so. Returns whether there was one.
+  // Of several choices the first one in the order of records is carried out: the last one is opened again. Of
+  // one, those who haven't chosen make way. Returns whether something changed.
   static bool Retreat(const std::vector<Contest*>& concerned) {
-    for (auto contest = concerned.rbegin(); contest != concerned.rend(); ++contest) {
-      if (!IsSettled(**contest)) continue;
-      (*contest)->resolution = MergeResolve::kConflict;
-      StepBack(**contest);
-      (*contest)->reason = "this choice can't be carried out together with what stands at " +
-                           PathToString(Reason(concerned, **contest).path);
+    const auto settled =
+        std::ranges::count_if(concerned, [](Contest* contest) { return IsSettled(*contest); });
+    const auto makes_way = [](Contest* contest) { return !IsSettled(*contest) && StepBack(*contest); };
+    if (settled < 2 && std::ranges::any_of(concerned.rbegin(), concerned.rend(), makes_way)) return true;
+    const auto last = std::find_if(concerned.rbegin(), concerned.rend(),
+                                   [](Contest* contest) { return IsSettled(*contest); });
+    if (last == concerned.rend()) return false;
+    Contest& contest = **last;
+    contest.resolution = MergeResolve::kConflict;
+    StepBack(contest);
+    const auto other = std::ranges::find_if(concerned, [&](const Contest* c) { return c != &contest; });
+    contest.reason =
+        other == concerned.end()
+            ? "this choice can't be carried out, since something hangs on what it removes"
+            : "this choice can't be carried out together with what stands at " + PathToString((*other)->path);
+    return true;
+  }
+
+  // To the next version that may stand, base first. Returns false where there is none.
+  static bool StepBack(Contest& contest) {
+    contest.excluded.insert(contest.side);
+    // Base has none, where both added.
+    if (contest.type == ConflictType::kBothAdd) contest.excluded.insert(MergeResolve::kBase);
+    for (const MergeResolve side : {MergeResolve::kBase, MergeResolve::kLeft, MergeResolve::kRight}) {
+      if (contest.excluded.contains(side)) continue;
+      contest.side = side;
       return true;
     }
-    return std::ranges::any_of(concerned.rbegin(), concerned.rend(),
-                               [](Contest* contest) { return StepBack(*contest); });
-  }
-
-  static const Contest& Reason(const std::vector<Contest*>& concerned, const Contest& contest) {
-    const auto other = std::ranges::find_if(concerned, [&](const Contest* c) { return c != &contest; });
-    return other == concerned.end() ? contest : **other;
-  }
-
-  // To base or, where base has none, to the right side. Returns false where that stands already.
-  static bool StepBack(Contest& contest) {
-    const MergeResolve last =
-        contest.type == ConflictType::kBothAdd ? MergeResolve::kRight : MergeResolve::kBase;
-    return std::exchange(contest.side, last) != last;
+    return false;
   }
 
   bool FixCircle() {

@@ -61,10 +61,6 @@ void Record(std::vector<Contest>& contests, const Records& along, RecordingConfl
 // Each object that is in all three versions, or that both sides added. Where things hang, and the lists that
 // follow from that, are settled.
 void SettleContents(SceneVersions versions, const FileIDs& touched, RecordingConflictResolver& resolver) {
-  const HandsOff is_settled = [](const FieldPath& path) {
-    return path.back() == ChildrenKey() || path.back() == YAMLScalar::mComponent ||
-           path.back() == YAMLScalar::mFather || path.back() == YAMLScalar::mTransformParent;
-  };
   for (const YAMLScalar* file_id : touched) {
     YAMLNode* left = versions.left.Get(file_id);
     YAMLNode* right = versions.right.Get(file_id);
@@ -74,6 +70,11 @@ void SettleContents(SceneVersions versions, const FileIDs& touched, RecordingCon
     }
     const ResolverPathStep step(resolver, file_id);
     YAMLNode* base = versions.base.Get(file_id);
+    const ObjectLinks::Kind kind = ReadLinks(left).kind;
+    // (The places among siblings follow only where a list of children was made.)
+    const HandsOff is_settled = [kind](const FieldPath& path) {
+      return IsLink(path, kind) && path.back() != RootOrderKey();
+    };
     if (base == nullptr) {
       SettleAddedObject(versions, file_id, is_settled, resolver);
     } else if (base->AsMapping() != nullptr) {

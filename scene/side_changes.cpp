@@ -14,28 +14,25 @@ bool IsSame(const YAMLNode& a, const YAMLNode& b) {
   return GetFolded(&a) == nullptr && GetFolded(&b) == nullptr && a.EqualsByContent(&b);
 }
 
-bool IsDerived(const YAMLScalar* key) {
-  return key == ChildrenKey() || key == RootOrderKey() || key == YAMLScalar::mComponent ||
-         key == YAMLScalar::mFather || key == YAMLScalar::mTransformParent;
-}
-
-// Whether all but the derived fields of two mappings at `path` are the same.
-bool HaveSameOwnFields(FieldPath& path, const YAMLMapping& a, const YAMLMapping& b) {
+// Whether all but the links of two mappings at `path` are the same.
+bool HaveSameOwnFields(FieldPath& path, ObjectLinks::Kind kind, const YAMLMapping& a, const YAMLMapping& b) {
   const auto is_same_at = [&](const YAMLScalar* key) {
     path.push_back(key);
     const YAMLMapping* nested_a = a.Get(key) == nullptr ? nullptr : a.Get(key)->AsMapping();
     const YAMLMapping* nested_b = b.Get(key) == nullptr ? nullptr : b.Get(key)->AsMapping();
-    const bool holds_father = key == YAMLScalar::mModification && nested_a != nullptr && nested_b != nullptr;
-    const bool is_same = holds_father ? HaveSameOwnFields(path, *nested_a, *nested_b)
-                                      : HaveSameFields(path, a.Get(key), b.Get(key));
+    const bool holds_father = kind == ObjectLinks::Kind::kPrefabInstance && path.size() == 3 &&
+                              key == YAMLScalar::mModification && nested_a != nullptr && nested_b != nullptr;
+    const bool is_same =
+        IsLink(path, kind) || (holds_father ? HaveSameOwnFields(path, kind, *nested_a, *nested_b)
+                                            : HaveSameFields(path, a.Get(key), b.Get(key)));
     path.pop_back();
     return is_same;
   };
   for (const auto& [key, value] : a) {
-    if (!IsDerived(key) && !is_same_at(key)) return false;
+    if (!is_same_at(key)) return false;
   }
   for (const auto& [key, value] : b) {
-    if (!IsDerived(key) && !a.HasKey(key)) return false;
+    if (!a.HasKey(key) && !is_same_at(key)) return false;
   }
   return true;
 }
@@ -71,7 +68,7 @@ bool IsEdited(const YAMLScalar* file_id, const YAMLNode* base, const YAMLNode* s
     return !HaveSameFields(path, base, side);
   }
   path.push_back(links.body_key);
-  return !HaveSameOwnFields(path, *body, *edited);
+  return !HaveSameOwnFields(path, links.kind, *body, *edited);
 }
 
 }  // namespace vexel_yaml
