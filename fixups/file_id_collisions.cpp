@@ -2,13 +2,10 @@
 
 #include <algorithm>
 #include <string>
-#include <string_view>
 #include <unordered_map>
-#include <unordered_set>
 
+#include "fixups/reference_search.h"
 #include "fixups/state_machine_transitions.h"
-#include "platform/text_hash.h"
-#include "yaml/folded_object.h"
 #include "yaml/yaml_error.h"
 #include "yaml/yaml_sequence.h"
 
@@ -80,35 +77,22 @@ const YAMLScalar* FindFree(const YAMLScalar* file_id, const AllFileIDs& all) {
   throw YAMLError("Cannot create new fileID for conflicting fileID: " + file_id->GetText());
 }
 
-// Whether an object may refer to one of these. Of one that is folded its text tells, so that the others stay
-// so.
-bool MayReferTo(const std::unordered_set<std::string_view, TextHash>& file_ids, const YAMLNode& object) {
-  const FoldedObject* folded = GetFolded(&object);
-  if (folded == nullptr) return true;
-  constexpr std::string_view kReference = "fileID: ";
-  const std::string_view text = folded->text;
-  for (size_t at = text.find(kReference); at != std::string_view::npos; at = text.find(kReference, at)) {
-    at += kReference.size();
-    if (file_ids.contains(text.substr(at, text.find_first_of(",}\n", at) - at))) return true;
-  }
-  return false;
-}
-
 // The diff compares by hash, so an edited object's must be up to date.
 void Renumber(const std::vector<RenumberedObject>& renumbered, YAMLMapping& root) {
   Renumbering renumbering;
-  std::unordered_set<std::string_view, TextHash> old_ids;
+  std::vector<const YAMLScalar*> old_ids;
   for (const auto& [old_id, new_id] : renumbered) {
     renumbering.emplace(old_id, new_id);
-    old_ids.insert(old_id->GetText());
+    old_ids.push_back(old_id);
     root.ChangeKey(old_id, new_id);
     YAMLMapping* object = root.Get(new_id)->AsMapping();
     object->Change(YAMLScalar::fileIDPlaceHolderName, new_id->AsValue());
     object->RebuildHash(false);
   }
+  const ReferenceSearch search(old_ids);
   PreProcessRemapAddCollisionsVisitor visitor(renumbering);
   for (const auto& [file_id, object] : root) {
-    if (!MayReferTo(old_ids, *object)) continue;
+    if (!search.MayRefer(*object)) continue;
     object->Accept(visitor);
     if (visitor.TakeChanged()) object->RebuildHash(false);
   }

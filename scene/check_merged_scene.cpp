@@ -1,5 +1,9 @@
 #include <algorithm>
+#include <iterator>
+#include <vector>
 
+#include "fixups/reference_search.h"
+#include "platform/thread.h"
 #include "scene/object_links.h"
 #include "scene/settle_scene.h"
 #include "yaml/yaml_alloc.h"
@@ -65,12 +69,41 @@ class ReferenceRepair {
 
 }  // namespace
 
-void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver) {
-  const bool has_lost = std::ranges::any_of(
-      settled.vanishing, [&](const YAMLScalar* file_id) { return !merged.HasKey(file_id); });
-  if (has_lost) {
+namespace {
+
+// The objects that may refer to one of some others. Also those that nobody touched: a side may have left a
+// reference behind.
+std::vector<YAMLMapping::Slot> FindReferring(const ReferenceSearch& search, const VexelObjects& objects,
+                                             bool threads) {
+  std::vector<YAMLMapping::Slot> all;
+  all.reserve(objects.Size());
+  for (const YAMLMapping::Slot& slot : objects) all.push_back(slot);
+  const auto middle = all.begin() + static_cast<ptrdiff_t>(threads ? all.size() / 2 : 0);
+  const auto may_refer = [&](const YAMLMapping::Slot& slot) { return search.MayRefer(*slot.value); };
+  std::vector<YAMLMapping::Slot> referring;
+  std::vector<YAMLMapping::Slot> in_second_half;
+  Thread thread;
+  if (threads)
+    thread.Start([&] { std::copy_if(all.begin(), middle, std::back_inserter(referring), may_refer); });
+  std::copy_if(middle, all.end(), std::back_inserter(in_second_half), may_refer);
+  if (threads) thread.Join();
+  thread.CheckForExceptions();
+  referring.insert(referring.end(), in_second_half.begin(), in_second_half.end());
+  return referring;
+}
+
+}  // namespace
+
+void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver,
+                      bool threads) {
+  std::vector<const YAMLScalar*> lost;
+  std::ranges::copy_if(settled.vanishing, std::back_inserter(lost),
+                       [&](const YAMLScalar* file_id) { return !merged.HasKey(file_id); });
+  if (!lost.empty()) {
     ReferenceRepair repair(settled, merged, resolver);
-    for (const YAMLScalar* file_id : settled.touched) repair.Repair(file_id, merged.Get(file_id));
+    const ReferenceSearch search(lost);
+    for (const auto& [file_id, object] : FindReferring(search, merged, threads))
+      repair.Repair(file_id, object);
   }
   for (SceneFault& fault : CheckScene(merged, settled.touched)) {
     if (settled.known_faults.contains(fault)) continue;

@@ -1,5 +1,8 @@
 #include "scene/settle_scene.h"
 
+#include <algorithm>
+#include <iterator>
+
 #include "platform/thread.h"
 #include "scene/derived_lists.h"
 #include "scene/execute_plan.h"
@@ -83,6 +86,37 @@ void SettleContents(SceneVersions versions, const FileIDs& touched, RecordingCon
   }
 }
 
+// What is broken in each version, where an edit may have brought it into the merged scene.
+std::set<SceneFault> FindKnownFaults(const SceneEdits& edits, bool threads) {
+  const auto check_side = [&](SceneSide side) {
+    const SideChanges& changes = edits.Changes(side);
+    FileIDs file_ids = changes.changed;
+    file_ids.insert(file_ids.end(), changes.added.begin(), changes.added.end());
+    return CheckScene(edits.Version(side), file_ids);
+  };
+  std::vector<SceneFault> in_left;
+  Thread thread;
+  const auto check_left = [&] { in_left = check_side(SceneSide::kLeft); };
+  if (threads) {
+    thread.Start(check_left);
+  } else {
+    check_left();
+  }
+  std::set<SceneFault> faults;
+  const auto add = [&](const std::vector<SceneFault>& found) { faults.insert(found.begin(), found.end()); };
+  add(check_side(SceneSide::kRight));
+  // What one side removed or both changed may come back as base has it.
+  for (const SideChanges& changes : edits.changes) add(CheckScene(edits.versions.base, changes.removed));
+  FileIDs changed_by_both;
+  std::ranges::copy_if(edits.changes[0].changed, std::back_inserter(changed_by_both),
+                       [&](const YAMLScalar* file_id) { return edits.changes[1].Changed(file_id); });
+  add(CheckScene(edits.versions.base, changed_by_both));
+  if (threads) thread.Join();
+  thread.CheckForExceptions();
+  add(in_left);
+  return faults;
+}
+
 SettledScene WhatToCheck(const SceneEdits& edits, bool threads) {
   SettledScene settled;
   std::unordered_set<const YAMLScalar*> seen;
@@ -97,22 +131,7 @@ SettledScene WhatToCheck(const SceneEdits& edits, bool threads) {
     add(changes.changed, false);
     add(changes.added, true);
   }
-  const SceneVersions& versions = edits.versions;
-  std::vector<SceneFault> in_left;
-  const auto check_left = [&] { in_left = CheckScene(versions.left, settled.touched); };
-  Thread thread;
-  if (threads) {
-    thread.Start(check_left);
-  } else {
-    check_left();
-  }
-  for (const VexelObjects* version : {&versions.base, &versions.right}) {
-    for (SceneFault& fault : CheckScene(*version, settled.touched))
-      settled.known_faults.insert(std::move(fault));
-  }
-  if (threads) thread.Join();
-  thread.CheckForExceptions();
-  for (SceneFault& fault : in_left) settled.known_faults.insert(std::move(fault));
+  settled.known_faults = FindKnownFaults(edits, threads);
   return settled;
 }
 

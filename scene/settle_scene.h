@@ -32,6 +32,7 @@ SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolve
 
 /// Repairs what the merge broke in a merged scene and has one repair; records and notes everything else as
 /// pending.
-void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver);
+void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver,
+                      bool threads);
 
 }  // namespace vexel_yaml
