@@ -7,6 +7,7 @@
 
 #include "fixups/duplicate_keys.h"
 #include "fixups/engine_keys.h"
+#include "rules/path_step.h"
 #include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
@@ -17,18 +18,6 @@ using MadeUpKeys = std::unordered_map<const YAMLScalar*, const YAMLScalar*>;
 
 // The keys that lead to a mapping in its object, "*" for any element of a list.
 using Place = std::vector<const YAMLScalar*>;
-
-// Stands at one step below a place for its own lifetime.
-class PlaceStep {
- public:
-  PlaceStep(Place& place, const YAMLScalar* key) : place_(place) { place_.push_back(key); }
-  PlaceStep(const PlaceStep&) = delete;
-  PlaceStep& operator=(const PlaceStep&) = delete;
-  ~PlaceStep() { place_.pop_back(); }
-
- private:
-  Place& place_;
-};
 
 bool IsTransitions(const Place& place) {
   return place.size() == 2 && place[0] == AnimatorStateMachineKey() &&
@@ -50,7 +39,7 @@ class ObjectPairs {
   // What repeats keys, and which keys there are.
   void Collect(const YAMLNode& node) {
     if (const YAMLSequence* sequence = node.AsSequence()) {
-      const PlaceStep step(place_, YAMLScalar::star);
+      const PathStep step(place_, YAMLScalar::star);
       for (const YAMLNode* item : sequence->GetItems()) Collect(*item);
     }
     const YAMLMapping* mapping = node.AsMapping();
@@ -58,7 +47,7 @@ class ObjectPairs {
     if (mapping->HasDuplicateKeys() && !IsTransitions(place_)) repeating_.insert(place_);
     ForEachPair(*mapping, [&](const YAMLMapping::Slot& slot) {
       keys_.insert(slot.key);
-      const PlaceStep step(place_, slot.key);
+      const PathStep step(place_, slot.key);
       Collect(*slot.value);
     });
   }
@@ -71,14 +60,14 @@ class ObjectPairs {
 
   void MakeUnique(YAMLNode& node) {
     if (YAMLSequence* sequence = node.AsSequence()) {
-      const PlaceStep step(place_, YAMLScalar::star);
+      const PathStep step(place_, YAMLScalar::star);
       for (YAMLNode* item : sequence->GetItems()) MakeUnique(*item);
     }
     YAMLMapping* mapping = node.AsMapping();
     if (mapping == nullptr) return;
     // First, so that no "first" repeats keys.
     ForEachPair(*mapping, [&](const YAMLMapping::Slot& slot) {
-      const PlaceStep step(place_, slot.key);
+      const PathStep step(place_, slot.key);
       MakeUnique(*slot.value);
     });
     if (!repeating_.contains(place_)) return;
