@@ -16,7 +16,6 @@ namespace vexel_yaml {
 namespace {
 
 using FileIDs = std::vector<const YAMLScalar*>;
-
 using Deeds = std::vector<Deed>;
 
 FileIDs ObjectsOf(const Deeds& deeds, Deed::Kind kind) {

@@ -33,8 +33,8 @@ struct Contest {
     SceneSide by;
     /// The place in that side's deletions; kNone for a component that lost what it requires.
     size_t deletion;
-    /// The objects that the contest is about. Fewer than the deletion has where the other side moved a part
-    /// of it out, and did nothing else to it: the rest follows.
+    /// The objects that the contest is about: a part that the other side moved out, or what is left of the
+    /// deletion without these parts.
     std::vector<const YAMLScalar*> objects;
     /// What the other side added to the thing, with all below it.
     std::vector<const YAMLScalar*> additions;
@@ -49,8 +49,6 @@ struct Contest {
   /// part of.
   const YAMLScalar* node = nullptr;
   bool is_about_owner = false;
-  /// Contests of one number are about one circle of fathers; 0 for none.
-  size_t circle = 0;
 };
 
 /// Finds them, circles aside, in no particular order.

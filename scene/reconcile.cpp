@@ -262,7 +262,6 @@ class Reconciliation {
 
   // One side moved one, the other another: each contest shows both moves.
   void AddCircle(const FileIDs& moved) {
-    ++circles_;
     std::vector<Contest> added;
     MergeResolve chosen = MergeResolve::kConflict;
     for (const YAMLScalar* node : moved) {
@@ -271,7 +270,6 @@ class Reconciliation {
       std::erase(others, node);
       if (contest.left == nullptr) contest.left = EditsInShort(edits_, SceneSide::kLeft, others);
       if (contest.right == nullptr) contest.right = EditsInShort(edits_, SceneSide::kRight, others);
-      contest.circle = circles_;
       Decide(resolver_, contest);
       if (IsSettled(contest) && chosen == MergeResolve::kConflict) chosen = contest.resolution;
       added.push_back(std::move(contest));
@@ -290,7 +288,6 @@ class Reconciliation {
   std::vector<Contest>& contests_;
   ScenePlan& plan_;
   FileIDs nodes_;
-  size_t circles_ = 0;
   // The components whose requirements are contests already.
   std::unordered_set<const YAMLScalar*> required_;
 };

@@ -9,8 +9,6 @@
 #include "scene/object_links.h"
 #include "scene/scene_plan.h"
 #include "scene/settle_values.h"
-#include "yaml/yaml_alloc.h"
-#include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
 
@@ -18,7 +16,6 @@ namespace {
 
 using FileIDs = std::vector<const YAMLScalar*>;
 using Source = ScenePlan::Source;
-
 using Records = std::vector<RecordingConflictResolver::Record>;
 
 // What the plan takes or drops together with the things that are contested, so that people can be told. To be

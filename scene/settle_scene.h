@@ -26,8 +26,7 @@ struct SettledScene {
 /// Settles whatever the engine can't decide place by place: what happens to things that one side deleted and
 /// the other edited, where objects hang, the lists that follow from that, and values that both sides edited.
 /// Conflicts are recorded; what is decided stands in all three versions alike afterwards. A choice that can't
-/// be carried out is pending again, and noted. `threads`: looks at the versions
-/// side by side.
+/// be carried out is pending again, and noted. `threads`: looks at the versions side by side.
 SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver, bool threads);
 
 /// Repairs what the merge broke in a merged scene and has one repair; records and notes everything else as
