@@ -6,15 +6,12 @@ import json
 import subprocess
 import sys
 import tempfile
-import urllib.error
-import urllib.request
-from contextlib import contextmanager
 from pathlib import Path
+
+from browser import browser, expect
 
 # A name that would take the page over if it became markup in a text, an attribute or the script.
 HOSTILE = "</script><script>document.title='taken'</script><img src=x onerror=\"document.title='taken'\">'\""
-OPTIONS = ["--headless", "--no-sandbox", "--disable-gpu", "--disable-quic", "--no-first-run",
-           "--disable-background-networking", "--disable-component-update", "--disable-sync"]
 
 
 def scene(intensity, extent, lamps, name=HOSTILE):
@@ -29,52 +26,11 @@ def scene(intensity, extent, lamps, name=HOSTILE):
     return text + "".join(f"--- !v!108 &{lamp}\nLight:\n  m_Range: {lamp}\n" for lamp in lamps)
 
 
-class Page:
-    def __init__(self, session):
-        self.session = session
-
-    def call(self, command, **body):
-        request = urllib.request.Request(f"{self.session}/{command}", json.dumps(body).encode())
-        return json.load(urllib.request.urlopen(request, timeout=60))["value"]
-
-    def script(self, code, *arguments):
-        return self.call("execute/sync", script=code, args=arguments)
-
-    def element(self, selector):
-        return next(iter(self.call("element", using="css selector", value=selector).values()))
-
-    def click(self, selector):
-        self.call(f"element/{self.element(selector)}/click")
-
-    def type(self, selector, text):
-        self.call(f"element/{self.element(selector)}/value", text=text)
-
-    def shown(self):
-        """The file IDs of the objects that can be seen, and what the page says about their number."""
-        seen = self.script("return Array.from(document.querySelectorAll('section.object'))"
-                           ".filter(e => e.checkVisibility()).map(e => e.dataset.fileId).sort()")
-        return seen, self.script("return document.getElementById('shown').textContent")
-
-
-@contextmanager
-def browser(folder):
-    driver = subprocess.Popen(["chromedriver", "--port=0"], stdout=subprocess.PIPE, text=True)
-    try:
-        port = next(line for line in driver.stdout if "started successfully on port" in line).rstrip(".\n").split()[-1]
-        page = Page(f"http://127.0.0.1:{port}")
-        arguments = [*OPTIONS, f"--user-data-dir={folder}/profile"]
-        session = page.call("session", capabilities={"alwaysMatch": {"goog:chromeOptions": {"args": arguments}}})
-        page.session += f"/session/{session['sessionId']}"
-        yield page
-        urllib.request.urlopen(urllib.request.Request(page.session, method="DELETE"), timeout=60)
-    finally:
-        driver.kill()
-        driver.wait()
-
-
-def expect(what, got, wanted):
-    if got != wanted:
-        sys.exit(f"{what}: {got!r} instead of {wanted!r}")
+def shown(page):
+    """The file IDs of the objects that can be seen, and what the page says about their number."""
+    seen = page.script("return Array.from(document.querySelectorAll('section.object'))"
+                       ".filter(e => e.checkVisibility()).map(e => e.dataset.fileId).sort()")
+    return seen, page.script("return document.getElementById('shown').textContent")
 
 
 def main(reporter):
@@ -95,22 +51,22 @@ def main(reporter):
                               ".slice(0, 4).map(e => e.textContent.trim())")
             expect("base, left, right and result of the conflict", row, ["2", "3", "5", "2"])
 
-            expect("at first", page.shown(), (["12", "31", "32", "33"], "4 of 4 objects"))
+            expect("at first", shown(page), (["12", "31", "32", "33"], "4 of 4 objects"))
             page.click("input[name=kind][value=conflict]")
-            expect("conflicts", page.shown(), (["12"], "1 of 4 objects"))
+            expect("conflicts", shown(page), (["12"], "1 of 4 objects"))
             page.click("input[name=kind][value=removed]")
-            expect("conflicts and what was removed", page.shown(), (["12", "31"], "2 of 4 objects"))
+            expect("conflicts and what was removed", shown(page), (["12", "31"], "2 of 4 objects"))
             page.click("button[type=reset]")
-            expect("after the reset", page.shown()[1], "4 of 4 objects")
+            expect("after the reset", shown(page)[1], "4 of 4 objects")
             page.click("#side option[value=left]")
-            expect("left's changes", page.shown()[0], ["12", "32"])
+            expect("left's changes", shown(page)[0], ["12", "32"])
             page.click("#side option[value=both]")
-            expect("changes of both", page.shown()[0], ["12"])
+            expect("changes of both", shown(page)[0], ["12"])
             page.click("#side option[value=all]")
             page.type("#text", "LIGHT 33")
-            expect("a text, whatever its case", page.shown()[0], ["33"])
+            expect("a text, whatever its case", shown(page)[0], ["33"])
             page.type("#text", "nowhere")
-            expect("no object", page.shown()[1], "0 of 4 objects")
+            expect("no object", shown(page)[1], "0 of 4 objects")
             expect("and it is said", page.script("return document.getElementById('nothing').checkVisibility()"), True)
 
 
