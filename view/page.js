@@ -141,6 +141,7 @@ function say(text, {important = false, failure = false, row = null} = {}) {
 async function load(file, words = "") {
   const {cards: list, ...head} = await ask(file === undefined ? "state" : `state?file=${file}`);
   state = head;
+  if (state.mode === "review") state.names.result ??= state.names.theirs;
   cards.clear();
   fieldCounts = current = null;
   fresh = new Set();
@@ -177,13 +178,15 @@ function effects(changed, gone, chosen) {
   return found;
 }
 
-function sayEffects(words, {open, repaired, settled}) {
+function sayEffects(words, {open, repaired, settled}, refused, notes) {
   const also = [];
+  if (refused.length > 0) also.push("It can't be done together with what else was chosen.");
   if (open.length > 0) also.push(`This brought up ${plural(open.length, "other conflict")}.`);
   if (settled > 0) also.push(`${plural(settled, "other conflict")} ${settled === 1 ? "is" : "are"} settled by this, too.`);
   if (repaired.length > 0) also.push(`The merge repaired ${plural(repaired.length, "other place")}.`);
+  also.push(...notes.slice(0, 2));
   const counts = state.pending === 0 ? "Nothing is open any more: you can save." : `${state.pending} open.`;
-  const row = [...open, ...repaired][0] ?? null;
+  const row = [...refused, ...open, ...repaired][0] ?? null;
   say([words, ...also, counts].join(" "), {important: also.length > 0 || state.pending === 0, row});
 }
 
@@ -276,10 +279,15 @@ function choose(find, words) {
   act(async () => {
     const choices = find();
     if (choices.length === 0) return;
+    const {notes} = state;
+    const chosen = new Set(choices.map((choice) => choice.path));
     const body = {file: state.file, revision: state.revision, choices};
-    const found = applyChanges(await ask("choose", body), new Set(choices.map((choice) => choice.path)));
+    const found = applyChanges(await ask("choose", body), chosen);
     const [{choice}] = choices;
-    sayEffects(`${words}: ${choice === null ? "open again" : sideTitle(state.names, choice)}.`, found);
+    const refused = choice === null ? [] : allRows().filter((row) => row.pending && chosen.has(row.path));
+    const newNotes = state.notes.filter((note) => !notes.includes(note));
+    sayEffects(`${words}: ${choice === null ? "open again" : sideTitle(state.names, choice)}.`, found,
+      refused.map((row) => row.key), newNotes);
   });
 }
 
