@@ -8,6 +8,8 @@
 #include "fixups/engine_keys.h"
 #include "scene/holders.h"
 #include "scene/object_links.h"
+#include "scene/place_walk.h"
+#include "scene/same_fields.h"
 
 namespace vexel_yaml {
 
@@ -88,6 +90,7 @@ class DeedSearch {
         other_(edits.Version(OtherSide(deleter))),
         changes_(edits.Changes(OtherSide(deleter))),
         kept_(edits.Version(deleter)),
+        deleter_changes_(edits.Changes(deleter)),
         deleted_(edits.Deleted(deleter)),
         holders_(other_, Joined(changes_.added, edits.Changes(deleter).removed)) {}
 
@@ -106,6 +109,9 @@ class DeedSearch {
     }
     for (const FileIDs* file_ids : {&changes_.changed, &changes_.added}) {
       for (const YAMLScalar* file_id : *file_ids) LookAtReferences(file_id);
+    }
+    for (const YAMLScalar* file_id : changes_.changed) {
+      if (deleter_changes_.Changed(file_id)) LookAtEntries(file_id);
     }
     for (const YAMLScalar* file_id : changes_.added) LookAtRequirements(file_id);
     return std::move(deeds_);
@@ -180,6 +186,29 @@ class DeedSearch {
     }
   }
 
+  // An entry that the deleter took out of a list, and that this side edited, is a part of what it stands for.
+  void LookAtEntries(const YAMLScalar* file_id) {
+    const IsSought is_deleted = [&](const YAMLScalar* target) {
+      return deleted_.Find(target) != Deletions::kNone;
+    };
+    const auto look_at = [&](const ListPlace& list) {
+      if (list.other == nullptr) return;
+      for (const AlignedElement& element : list.elements) {
+        if (element.base == kNoIndex || element.left != kNoIndex || element.right == kNoIndex) continue;
+        const YAMLNode* entry = list.base.GetItems()[element.base];
+        const YAMLScalar* target = TargetOf(entry, is_deleted);
+        if (target == nullptr) continue;
+        list.path.push_back(YAMLScalar::Lookup(IntToString(static_cast<int>(element.base))));
+        const bool is_edited = !HaveSameFields(list.path, entry, list.other->GetItems()[element.right]);
+        list.path.pop_back();
+        if (is_edited) Add(Deed::Kind::kRefers, file_id, target);
+      }
+    };
+    PlaceWalk([](const YAMLMapping&, const YAMLMapping&) {}, look_at)
+        .Walk(file_id, base_.Get(file_id), const_cast<YAMLNode*>(kept_.Get(file_id)),
+              const_cast<YAMLNode*>(other_.Get(file_id)));
+  }
+
   void LookAtRequirements(const YAMLScalar* file_id) {
     const YAMLTypeInfo* type = TypeIn(other_, file_id);
     const YAMLScalar* game_object = ReadLinks(other_.Get(file_id)).owner;
@@ -198,6 +227,7 @@ class DeedSearch {
   const SideChanges& changes_;
   // What the side that deleted has.
   const VexelObjects& kept_;
+  const SideChanges& deleter_changes_;
   const Deletions& deleted_;
   const Holders holders_;
   // Of what was asked already.

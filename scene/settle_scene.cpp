@@ -7,6 +7,7 @@
 #include "scene/derived_lists.h"
 #include "scene/execute_plan.h"
 #include "scene/object_links.h"
+#include "scene/outside_places.h"
 #include "scene/scene_plan.h"
 #include "scene/settle_values.h"
 
@@ -142,7 +143,9 @@ SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolve
     ScenePlan plan(edits);
     Reconcile(edits, resolver, contests, plan);
     const Records along = WhatGoesAlong(edits, plan, contests);
+    const OutsidePlaces outside(edits, plan);
     ExecutePlan(plan, MakeDerivedLists(edits, plan, resolver), versions);
+    outside.Settle(versions);
     Record(contests, along, resolver, settled.notes);
   }
   SettleContents(versions, settled.touched, resolver);

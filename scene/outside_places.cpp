@@ -1,0 +1,148 @@
+#include "scene/outside_places.h"
+
+#include <algorithm>
+#include <map>
+
+#include "fixups/reference_search.h"
+#include "scene/object_links.h"
+#include "scene/place_walk.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using FileIDs = std::vector<const YAMLScalar*>;
+// Puts the entries of base that a list lacks back behind those that precede them there.
+bool BringBack(const ListPlace& list, const IsSought& is_sought) {
+  std::map<int64_t, std::vector<YAMLNode*>> behind;
+  int64_t previous = -1;
+  for (const AlignedElement& element : list.elements) {
+    if (element.base == kNoIndex) continue;
+    const YAMLNode* entry = list.base.GetItems()[element.base];
+    if (element.left != kNoIndex) {
+      previous = element.left;
+    } else if (TargetOf(entry, is_sought) != nullptr) {
+      behind[previous].push_back(entry->Clone());
+    }
+  }
+  if (behind.empty()) return false;
+  std::vector<YAMLNode*> items = behind[-1];
+  for (size_t index = 0; index < list.deleter.Size(); ++index) {
+    items.push_back(list.deleter.GetItems()[index]);
+    const std::vector<YAMLNode*>& followers = behind[static_cast<int64_t>(index)];
+    items.insert(items.end(), followers.begin(), followers.end());
+  }
+  list.deleter.SwapItems(std::move(items));
+  return true;
+}
+
+// Takes back what the other side did to entries of base that the deleter took out: from then on it is the
+// deleter alone that decides on them.
+bool Revert(const ListPlace& list, const IsSought& is_sought) {
+  bool is_changed = false;
+  for (const AlignedElement& element : list.elements) {
+    if (element.base == kNoIndex || element.left != kNoIndex || element.right == kNoIndex) continue;
+    const YAMLNode* before = list.base.GetItems()[element.base];
+    if (TargetOf(before, is_sought) == nullptr) continue;
+    list.other->Set(static_cast<int>(element.right), before->Clone())->Free();
+    is_changed = true;
+  }
+  return is_changed;
+}
+
+// Takes new entries out of the other side's list that are nothing but a reference. (Of others the reference
+// is cleared, and the rest stays.)
+bool TakeOut(const ListPlace& list, const IsSought& is_sought) {
+  std::vector<YAMLNode*> items = list.other->GetItems();
+  for (const AlignedElement& element : list.elements) {
+    if (element.base != kNoIndex || element.left != kNoIndex) continue;
+    YAMLNode*& entry = items[element.right];
+    const YAMLScalar* target = GetLocalTarget(entry);
+    if (target == nullptr || !is_sought(target)) continue;
+    entry->Free();
+    entry = nullptr;
+  }
+  if (std::erase(items, nullptr) == 0) return false;
+  list.other->SwapItems(std::move(items));
+  return true;
+}
+
+bool IsEmptyReference(const YAMLMapping& reference) {
+  return reference.Size() == 1 && reference.HasKey(YAMLScalar::fileID) &&
+         GetLocalTarget(&reference) == nullptr;
+}
+
+}  // namespace
+
+OutsidePlaces::OutsidePlaces(const SceneEdits& edits, const ScenePlan& plan) {
+  for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
+    const SideChanges& changes = edits.Changes(side);
+    const SideChanges& other_changes = edits.Changes(OtherSide(side));
+    Fate& fate = fates_[static_cast<size_t>(side)];
+    for (const YAMLScalar* file_id : changes.removed) {
+      if (other_changes.Removed(file_id)) continue;
+      fate.removed.push_back(file_id);
+      (plan.Has(file_id) ? fate.staying : fate.going).insert(file_id);
+      const auto planned = plan.GetObjects().find(file_id);
+      if (planned != plan.GetObjects().end() && planned->second == ScenePlan::Source::kBase) {
+        fate.as_in_base.insert(file_id);
+      }
+    }
+    for (const YAMLScalar* file_id : other_changes.added) {
+      if (!plan.Has(file_id)) fate.going.insert(file_id);
+    }
+    fate.changed_by_deleter = changes.changed;
+    fate.changed_by_other = other_changes.changed;
+  }
+}
+
+void OutsidePlaces::Settle(const SceneVersions& versions) const {
+  SettleFate(fates_[0], versions.base, versions.left, versions.right);
+  SettleFate(fates_[1], versions.base, versions.right, versions.left);
+}
+
+void OutsidePlaces::SettleFate(const Fate& fate, const VexelObjects& base, VexelObjects& deleter,
+                               VexelObjects& other) {
+  if (fate.staying.empty() && fate.going.empty()) return;
+  bool deleter_changed = false;
+  bool other_changed = false;
+  const IsSought stays = [&](const YAMLScalar* target) { return fate.staying.contains(target); };
+  const IsSought loses_edits = [&](const YAMLScalar* target) {
+    return fate.going.contains(target) || fate.as_in_base.contains(target);
+  };
+  const IsSought goes = [&](const YAMLScalar* target) { return fate.going.contains(target); };
+  PlaceWalk walk(
+      [&](const YAMLMapping& reference, YAMLMapping& now) {
+        if (!stays(GetLocalTarget(&reference)) || !IsEmptyReference(now)) return;
+        now.Clear();
+        reference.CloneInto(now);
+        deleter_changed = true;
+      },
+      [&](const ListPlace& list) {
+        deleter_changed |= BringBack(list, stays);
+        if (list.other == nullptr) return;
+        other_changed |= Revert(list, loses_edits);
+        other_changed |= TakeOut(list, goes);
+      });
+  const auto settle = [&](const YAMLScalar* file_id) {
+    YAMLNode* in_deleter = deleter.Get(file_id);
+    YAMLNode* in_other = other.Get(file_id);
+    deleter_changed = other_changed = false;
+    walk.Walk(file_id, base.Get(file_id), in_deleter, in_other);
+    if (deleter_changed) in_deleter->RebuildHash(false);
+    if (other_changed) in_other->RebuildHash(false);
+  };
+  const FileIDs going(fate.going.begin(), fate.going.end());
+  const ReferenceSearch was_there(fate.removed);
+  const ReferenceSearch is_to_go(going);
+  for (const YAMLScalar* file_id : fate.changed_by_deleter) {
+    const YAMLNode* object = base.Get(file_id);
+    if (object != nullptr && was_there.MayRefer(*object)) settle(file_id);
+  }
+  for (const YAMLScalar* file_id : fate.changed_by_other) {
+    const YAMLNode* object = other.Get(file_id);
+    if (object != nullptr && is_to_go.MayRefer(*object)) settle(file_id);
+  }
+}
+
+}  // namespace vexel_yaml
