@@ -59,9 +59,11 @@ class PreProcessRemapAddCollisionsVisitor final : public YAMLNodeVisitor {
   bool changed_ = false;
 };
 
-const YAMLScalar* ClassName(const YAMLMapping& root, const YAMLScalar* file_id) {
-  const YAMLMapping* object = root.Get(file_id)->AsMapping();
-  return object->FirstKey();
+// Whether two objects that both sides added are taken for the same one and merged into one.
+bool AreOne(const YAMLMapping& left, const YAMLMapping& right, SameObject same) {
+  if (left.FirstKey() != right.FirstKey()) return false;
+  const YAMLScalar* const mark = YAMLScalar::strippedPrefabPlaceHolderName;
+  return same == SameObject::kSameClass || left.HasKey(mark) == right.HasKey(mark);
 }
 
 // The first of the file IDs behind `file_id` that nothing uses.
@@ -121,11 +123,11 @@ ConflictingFileIDs CreateConflictingFileIDsRemapper(FileIDSet base, FileIDSet le
 }
 
 std::vector<RenumberedObject> RemapCollidingAddFileIDs(ConflictingFileIDs& ids, const YAMLMapping& left_root,
-                                                       YAMLMapping& right_root) {
+                                                       YAMLMapping& right_root, SameObject same) {
   std::vector<RenumberedObject> renumbered;
   for (const YAMLScalar* file_id : ids.conflicting) {
-    // Of one class, the two are taken for the same object and merged into one.
-    if (ClassName(left_root, file_id) == ClassName(right_root, file_id)) continue;
+    const YAMLNode* left = left_root.Get(file_id);
+    if (AreOne(*left->AsMapping(), *right_root.Get(file_id)->AsMapping(), same)) continue;
     renumbered.push_back({file_id, FindFree(file_id, ids.all)});
     ids.all.Insert(renumbered.back().new_id);
   }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <array>
+#include <cstdint>
 #include <set>
 #include <unordered_set>
 #include <vector>
@@ -64,11 +65,15 @@ FileIDSet PreProcess(YAMLMapping& root);
 
 ConflictingFileIDs CreateConflictingFileIDsRemapper(FileIDSet base, FileIDSet left, FileIDSet right);
 
-/// Gives every conflicting object of `right_root` that is of another class than left's a file ID of its own,
-/// which is in `ids.all` afterwards, and rewrites the references to it within the file. Hashes of edited
-/// objects are rebuilt. Returns these objects. Throws YAMLError "Cannot create new fileID for conflicting
-/// fileID: " + ID.
+/// When two objects that both sides added under one file ID are taken for one: where they are of one class,
+/// or only where both or none of them are stripped, too.
+enum class SameObject : uint8_t { kSameClass, kSameClassAndMark };
+
+/// Gives every conflicting object of `right_root` that isn't taken for left's a file ID of its own, which is
+/// in `ids.all` afterwards, and rewrites the references to it within the file. Hashes of edited objects are
+/// rebuilt. Returns these objects. Throws YAMLError "Cannot create new fileID for conflicting fileID: " + ID.
 std::vector<RenumberedObject> RemapCollidingAddFileIDs(ConflictingFileIDs& ids, const YAMLMapping& left_root,
-                                                       YAMLMapping& right_root);
+                                                       YAMLMapping& right_root,
+                                                       SameObject same = SameObject::kSameClass);
 
 }  // namespace vexel_yaml

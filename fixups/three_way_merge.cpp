@@ -15,12 +15,13 @@ void ReadMergeDocuments(const std::string& base_path, const std::string& left_pa
   for (const FileToRead& file : files) RefuseDuplicateKeys(file.objects, file.path);
 }
 
-std::vector<RenumberedObject> PrepareForDiff(VexelObjects& base, VexelObjects& left, VexelObjects& right) {
+std::vector<RenumberedObject> PrepareForDiff(VexelObjects& base, VexelObjects& left, VexelObjects& right,
+                                             SameObject same) {
   const FileIDSet in_base = PreProcess(base);
   const FileIDSet in_left = PreProcess(left);
   const FileIDSet in_right = PreProcess(right);
   ConflictingFileIDs ids = CreateConflictingFileIDsRemapper(in_base, in_left, in_right);
-  return RemapCollidingAddFileIDs(ids, left, right);
+  return RemapCollidingAddFileIDs(ids, left, right, same);
 }
 
 std::unique_ptr<VexelObjects> MergeIntoCopy(const VexelObjects& base, const DiffPair& diffs,

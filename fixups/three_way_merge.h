@@ -26,9 +26,10 @@ void ReadMergeDocuments(const std::string& base_path, const std::string& left_pa
                         TimerStat& timer);
 
 /// Makes three versions comparable: lists that stand as mappings with repeated keys become lists, and objects
-/// of different classes that both sides added under one file ID get different ones; those renumbered on the
-/// right are returned. Throws what PreProcess and RemapCollidingAddFileIDs throw.
-std::vector<RenumberedObject> PrepareForDiff(VexelObjects& base, VexelObjects& left, VexelObjects& right);
+/// that both sides added under one file ID, and that aren't the same, get different ones; those renumbered on
+/// the right are returned. Throws what PreProcess and RemapCollidingAddFileIDs throw.
+std::vector<RenumberedObject> PrepareForDiff(VexelObjects& base, VexelObjects& left, VexelObjects& right,
+                                             SameObject same = SameObject::kSameClass);
 
 /// Merges both diffs into a copy of base, which still needs the post-processing. Throws what merging and
 /// applying throw.

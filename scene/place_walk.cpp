@@ -52,7 +52,8 @@ const YAMLScalar* TargetOf(const YAMLNode* entry, const IsSought& is_sought) {
   };
   if (const YAMLScalar* target = sought(entry)) return target;
   const YAMLMapping* mapping = entry == nullptr ? nullptr : entry->AsMapping();
-  if (mapping == nullptr) return nullptr;
+  static const YAMLScalar* const property_path = YAMLScalar::Lookup("propertyPath");
+  if (mapping == nullptr || mapping->HasKey(property_path)) return nullptr;
   for (const auto& [key, value] : *mapping) {
     if (const YAMLScalar* target = sought(value)) return target;
   }

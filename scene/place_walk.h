@@ -49,7 +49,8 @@ class PlaceWalk {
 using IsSought = std::function<bool(const YAMLScalar* target)>;
 
 /// The sought object that an entry of a list stands for: what it refers to, itself or with one of its fields.
-/// An entry that only mentions an object somewhere deeper says something else as well. Null for none.
+/// An entry that only mentions an object somewhere deeper says something else as well, and so does an
+/// override of a prefab instance. Null for none.
 const YAMLScalar* TargetOf(const YAMLNode* entry, const IsSought& is_sought);
 
 }  // namespace vexel_yaml

@@ -24,7 +24,9 @@ void ReadScenes(const std::string& base_path, const std::string& left_path, cons
   TimerStat step(timer, "Creating mappings");
   TimerStat preprocessing(step, "Preprocess mappings");
   documents.repeated_keys.MakeUnique(files);
-  documents.renumbered = PrepareForDiff(documents.base, documents.left, documents.right);
+  // A stripped object stands for one of a prefab; merged with a whole one it would be neither.
+  documents.renumbered =
+      PrepareForDiff(documents.base, documents.left, documents.right, SameObject::kSameClassAndMark);
   documents.repeated_keys.Renumber(documents.renumbered);
   for (const std::string& line : DescribeDamage(files)) WriteErrorLine(line);
 }

@@ -3,7 +3,7 @@
 import itertools
 from collections import Counter
 
-from scene import NONE, is_unit, owners, target_of, whole
+from scene import NONE, is_unit, local_references, owners, target_of, whole
 
 HANGS_ON = {"m_Father", "m_TransformParent", "m_GameObject"}
 DERIVED = {"m_Children", "m_Component"}  # The other ends of m_Father and m_GameObject.
@@ -83,6 +83,25 @@ def lost(base, side, other, merged):
                 if order_lost(*lists) or lists[0] == lists[2] and lists[1] != lists[3] and \
                         sorted(map(str, lists[1])) == sorted(map(str, lists[3])):
                     yield file_id, (name, "m_Children"), "order"
+
+
+def left_behind(base, side, other, merged):
+    """Objects that `side` deleted and that are there again, where something that `other` left alone referred to them
+    and doesn't any more, as (object, target). What `side` put in the place of a reference is its own edit."""
+    def clears(before, after, target):
+        if isinstance(before, list) and isinstance(after, list):
+            return len(after) < len(before) and {"fileID": target} in before and {"fileID": target} not in after
+        if target_of(before) == target:
+            return after == NONE
+        return isinstance(before, dict) and isinstance(after, dict) and any(
+            clears(below, after.get(key), target) for key, below in before.items() if key not in DERIVED | HANGS_ON)
+
+    for file_id, before in base.items():
+        mine, theirs, after = (version.get(file_id) for version in (side, other, merged))
+        if mine and after and theirs is before and mine is not before:
+            for target in set(local_references(before.fields)) & merged.keys() - side.keys():
+                if clears(before.fields, mine.fields, target) and clears(before.fields, after.fields, target):
+                    yield file_id, target
 
 
 def is_covered(fact, base, side, other, pending):

@@ -56,6 +56,8 @@ def check_edits(law, versions, merged, pending_for):
         for fact in facts.lost(*three, merged):
             if not facts.is_covered(fact, *three, pending_for[side]):
                 raise Broken(f"{law}: lost", f"{side}: {fact}; pending: {list(pending_for[side])}")
+        for file_id, target in facts.left_behind(*three, merged):
+            raise Broken(f"{law}: left behind", f"{file_id} no longer refers to {target}, which {side} deleted")
 
 
 def settle(law, merger, versions, pending, choose):
