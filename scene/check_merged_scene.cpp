@@ -13,6 +13,9 @@ namespace vexel_yaml {
 
 namespace {
 
+// A scene that lives with its faults is merged day after day.
+constexpr size_t kMostNamed = 10;
+
 // Clears the references of one object to others that the merged scene doesn't have any more.
 class ReferenceRepair {
  public:
@@ -105,12 +108,23 @@ void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConf
     for (const auto& [file_id, object] : FindReferring(search, merged, threads))
       repair.Repair(file_id, object);
   }
+  size_t known_count = 0;
   for (SceneFault& fault : CheckScene(merged, settled.touched)) {
-    if (settled.known_faults.contains(fault)) continue;
+    if (settled.known_faults.contains(fault)) {
+      if (known_count++ < kMostNamed) {
+        settled.notes.push_back("Warning: " + fault.file_id->GetText() + ' ' + fault.text +
+                                ", as before the merge");
+      }
+      continue;
+    }
     settled.notes.push_back(fault.file_id->GetText() + ' ' + fault.text +
                             ": please repair this object by hand");
     resolver.AddRecord(
         {{fault.file_id}, ConflictType::kBothChange, MergeResolve::kConflict, nullptr, nullptr});
+  }
+  if (known_count > kMostNamed) {
+    settled.notes.push_back("Warning: " + std::to_string(known_count - kMostNamed) +
+                            " more faults are as before the merge");
   }
 }
 

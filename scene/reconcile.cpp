@@ -44,6 +44,33 @@ class Reconciliation {
     SortContests();
   }
 
+  // One side moved one of them, the other another: each contest shows both moves.
+  void AddCircle(const FileIDs& moved) {
+    std::vector<Contest> added;
+    MergeResolve chosen = MergeResolve::kConflict;
+    for (const YAMLScalar* node : moved) {
+      Contest contest = MakeFatherContest(edits_, node);
+      FileIDs others = moved;
+      std::erase(others, node);
+      if (contest.left == nullptr) contest.left = EditsInShort(edits_, SceneSide::kLeft, others);
+      if (contest.right == nullptr) contest.right = EditsInShort(edits_, SceneSide::kRight, others);
+      Decide(resolver_, contest);
+      if (IsSettled(contest) && chosen == MergeResolve::kConflict) chosen = contest.resolution;
+      added.push_back(std::move(contest));
+    }
+    // They are one: who has settled one of them has settled the others.
+    for (Contest& contest : added) {
+      if (chosen != MergeResolve::kConflict && !IsSettled(contest))
+        contest.resolution = contest.side = chosen;
+      contests_.push_back(std::move(contest));
+    }
+    circles_.push_back(moved);
+    SortContests();
+  }
+
+  // What was moved, of each circle that contests were added for.
+  const std::vector<FileIDs>& GetCircles() const { return circles_; }
+
   // Each step takes back a choice, a deletion or a place, of which there are finitely many.
   void Run() {
     do {
@@ -260,60 +287,62 @@ class Reconciliation {
     return step == node;
   }
 
-  // One side moved one, the other another: each contest shows both moves.
-  void AddCircle(const FileIDs& moved) {
-    std::vector<Contest> added;
-    MergeResolve chosen = MergeResolve::kConflict;
-    for (const YAMLScalar* node : moved) {
-      Contest contest = MakeFatherContest(edits_, node);
-      FileIDs others = moved;
-      std::erase(others, node);
-      if (contest.left == nullptr) contest.left = EditsInShort(edits_, SceneSide::kLeft, others);
-      if (contest.right == nullptr) contest.right = EditsInShort(edits_, SceneSide::kRight, others);
-      Decide(resolver_, contest);
-      if (IsSettled(contest) && chosen == MergeResolve::kConflict) chosen = contest.resolution;
-      added.push_back(std::move(contest));
-    }
-    // They are one: who has settled one of them has settled the others.
-    for (Contest& contest : added) {
-      if (chosen != MergeResolve::kConflict && !IsSettled(contest))
-        contest.resolution = contest.side = chosen;
-      contests_.push_back(std::move(contest));
-    }
-    SortContests();
-  }
-
   const SceneEdits& edits_;
   const RecordingConflictResolver& resolver_;
   std::vector<Contest>& contests_;
   ScenePlan& plan_;
   FileIDs nodes_;
+  std::vector<FileIDs> circles_;
   // The components whose requirements are contests already.
   std::unordered_set<const YAMLScalar*> required_;
 };
 
+bool IsVersion(MergeResolve resolve) {
+  return resolve == MergeResolve::kBase || resolve == MergeResolve::kLeft || resolve == MergeResolve::kRight;
+}
+
 }  // namespace
 
 void Decide(const RecordingConflictResolver& resolver, Contest& contest) {
-  const auto is_version = [](MergeResolve resolve) {
-    return resolve == MergeResolve::kBase || resolve == MergeResolve::kLeft ||
-           resolve == MergeResolve::kRight;
-  };
   const MergeResolve found = resolver.FindResolution(contest.path);
-  contest.resolution = is_version(found) ? found : MergeResolve::kConflict;
-  contest.side = is_version(found)                       ? found
-                 : is_version(resolver.GetDefaultSide()) ? resolver.GetDefaultSide()
-                                                         : MergeResolve::kBase;
+  contest.resolution = IsVersion(found) ? found : MergeResolve::kConflict;
+  contest.side = IsVersion(found)                       ? found
+                 : IsVersion(resolver.GetDefaultSide()) ? resolver.GetDefaultSide()
+                                                        : MergeResolve::kBase;
   // Base has none, and no object lacks its father.
   if (contest.type == ConflictType::kBothAdd && contest.side == MergeResolve::kBase) {
     contest.side = MergeResolve::kLeft;
   }
 }
 
+namespace {
+
+// The circles that there are while nothing is settled: what people have seen when they chose.
+std::vector<FileIDs> FindOpenCircles(const SceneEdits& edits, std::vector<Contest> contests) {
+  const RecordingConflictResolver undecided(MergeResolve::kBase);
+  for (Contest& contest : contests) Decide(undecided, contest);
+  ScenePlan plan(edits);
+  Reconciliation reconciliation(edits, undecided, contests, plan);
+  reconciliation.Run();
+  return reconciliation.GetCircles();
+}
+
+}  // namespace
+
 void Reconcile(const SceneEdits& edits, const RecordingConflictResolver& resolver,
                std::vector<Contest>& contests, ScenePlan& plan) {
+  std::vector<FileIDs> circles;
+  if (!resolver.GetResolutions().empty()) circles = FindOpenCircles(edits, contests);
   for (Contest& contest : contests) Decide(resolver, contest);
-  Reconciliation(edits, resolver, contests, plan).Run();
+  Reconciliation reconciliation(edits, resolver, contests, plan);
+  // Other choices may leave no circle; what was chosen for one stands all the same.
+  const auto is_chosen = [&](const YAMLScalar* node) {
+    return IsVersion(resolver.FindResolution(FatherPath(node, edits.versions.base.Get(node))));
+  };
+  for (const FileIDs& circle : circles) {
+    if (std::ranges::any_of(circle, is_chosen)) reconciliation.AddCircle(circle);
+  }
+  reconciliation.Run();
 }
 
 }  // namespace vexel_yaml

@@ -25,7 +25,8 @@ std::vector<std::string> ExistingPaths(const RecordingConflictResolver& resolver
 // Null where none is nearer than a path of other words.
 const std::string* FindNearest(const std::string& path, const std::vector<std::string>& existing) {
   const std::string* nearest = nullptr;
-  size_t distance = path.size() / 2;
+  // Of a short file ID one digit may be wrong.
+  size_t distance = std::max<size_t>(path.size() / 2, 2);
   for (const std::string& candidate : existing) {
     const auto [shorter, longer] = std::minmax(candidate.size(), path.size());
     if (longer - shorter >= distance) continue;

@@ -66,8 +66,8 @@ def settle(law, merger, versions, pending, choose):
     merged, pending = merger.merge("base", "left", "right", choices=choices)
     # What is pending again contradicts another choice, and one of three must go with that.
     again = pending
-    for side in ("base", *SIDES) if pending else ():
-        choices.update(dict.fromkeys(again, side))
+    for words in itertools.islice(itertools.product(("base", *SIDES), repeat=len(again)), 81) if pending else ():
+        choices.update(zip(again, words))
         merged, pending = merger.merge("base", "left", "right", choices=choices)
         if not pending:
             break
@@ -99,11 +99,10 @@ def stands_as_in_base(versions, merged, path):
         parts = [{part for part in whole(scene, top) if moved.isdisjoint(
             itertools.takewhile(top.__ne__, owners(scene, part)))} for scene in (versions["base"], merged)]
         return parts[0] == parts[1]
-    before, left, right, after = (value_at(scene, path) for scene in (*versions.values(), merged))
+    before, after = (value_at(scene, path) for scene in (versions["base"], merged))
     if isinstance(before, list):  # Its order is what the choice is about; what only one side added is there, too.
         before, after = ([item for item in one if item in two] for one, two in ((before, after), (after, before)))
-    # Where moves no longer form a circle after another choice, nothing was left to choose between.
-    return before is None or before == after or before in (left, right)
+    return before is None or before == after
 
 
 def _without_order(value):
