@@ -5,6 +5,7 @@
 #include <stdexcept>
 
 #include "app/lost_edits.h"
+#include "app/safe_laws.h"
 #include "diff/strip_unchanged.h"
 #include "diff/yaml_diff_output.h"
 #include "diff/yaml_mapping_diff.h"
@@ -26,6 +27,8 @@ enum Law : size_t {
   kDiffText,
   kStripEqual,
   kStripKeeps,
+  kSafeEqualSides,
+  kSafeSound,
 };
 
 std::string Written(VexelObjects& scene) {
@@ -124,7 +127,9 @@ Laws::Laws() {
         "with left and right swapped the result holds the same, but for conflicts and for lists that are "
         "merged by left's keys or count as equally edited",
         "the text of a diff is empty where nothing but an order changed, and only there",
-        "stripping equal files leaves no object", "stripping keeps every object that was added or changed"}) {
+        "stripping equal files leaves no object", "stripping keeps every object that was added or changed",
+        "a safe merge of two equal changes gives that change",
+        "a safe merge breaks nothing that was whole, unless a conflict says so"}) {
     results_.push_back({law, 0, 0, 0, ""});
   }
 }
@@ -166,6 +171,7 @@ void Laws::CheckSide(const SceneTriple& triple, VexelObjects& side) {
          is_silent ? Content(triple.base.get()) == Content(&side) : !triple.base->HasSameContent(side),
          triple);
   Expect(kStripEqual, Stripped(side, side)->Size() == 0, triple);
+  Expect(kSafeEqualSides, TakesEqualEditsOnce(*triple.base, side), triple);
   Expect(kStripKeeps, HoldsAllChanged(*Stripped(*triple.base, side), *triple.base, side), triple);
 }
 
@@ -183,6 +189,7 @@ void Laws::CheckBothSides(const SceneTriple& triple) {
                           &results_[kNothingLost].excused);
   };
   Expect(kNothingLost, !loses(*triple.left, *triple.right) && !loses(*triple.right, *triple.left), triple);
+  Expect(kSafeSound, KeepsSceneSound(triple), triple);
   FieldPath path;
   const Operation* left = CreateDiffOperation(path, triple.base.get(), triple.left.get());
   const Operation* right = CreateDiffOperation(path, triple.base.get(), triple.right.get());

@@ -133,11 +133,26 @@ SettledScene WhatToCheck(const SceneEdits& edits, bool threads) {
   return settled;
 }
 
+bool HaveBothDoneTheSame(const SceneEdits& edits) {
+  const auto& [left, right] = edits.changes;
+  if (left.IsEmpty() || left.kinds != right.kinds) return false;
+  return std::ranges::all_of(left.kinds, [&](const auto& change) {
+    const YAMLNode* object = edits.versions.left.Get(change.first);
+    return object == nullptr || object->EqualsExpensive(edits.versions.right.Get(change.first));
+  });
+}
+
 }  // namespace
 
-SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver, bool threads) {
+SettledScene SettleScene(SceneVersions versions, RecordingConflictResolver& resolver, bool threads) {
   const SceneEdits edits(versions);
   SettledScene settled = WhatToCheck(edits, threads);
+  if (HaveBothDoneTheSame(edits)) {
+    // Whatever it is, also something that is broken.
+    for (const YAMLScalar* file_id : settled.touched) versions.SetObject(file_id, versions.left.Get(file_id));
+    settled.vanishing.clear();
+    return settled;
+  }
   if (!edits.changes[0].IsEmpty() && !edits.changes[1].IsEmpty()) {
     std::vector<Contest> contests = FindContests(edits);
     ScenePlan plan(edits);

@@ -27,7 +27,7 @@ struct SettledScene {
 /// the other edited, where objects hang, the lists that follow from that, and values that both sides edited.
 /// Conflicts are recorded; what is decided stands in all three versions alike afterwards. A choice that can't
 /// be carried out is pending again, and noted. `threads`: looks at the versions side by side.
-SettledScene SettleScene(const SceneVersions& versions, RecordingConflictResolver& resolver, bool threads);
+SettledScene SettleScene(SceneVersions versions, RecordingConflictResolver& resolver, bool threads);
 
 /// Repairs what the merge broke in a merged scene and has one repair; records and notes everything else as
 /// pending.
