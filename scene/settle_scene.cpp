@@ -138,7 +138,7 @@ bool HaveBothDoneTheSame(const SceneEdits& edits) {
   if (left.IsEmpty() || left.kinds != right.kinds) return false;
   return std::ranges::all_of(left.kinds, [&](const auto& change) {
     const YAMLNode* object = edits.versions.left.Get(change.first);
-    return object == nullptr || object->EqualsExpensive(edits.versions.right.Get(change.first));
+    return object == nullptr || object->HasSameContent(*edits.versions.right.Get(change.first));
   });
 }
 
