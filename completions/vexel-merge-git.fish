@@ -38,6 +38,8 @@ $command -n $resolve -l theirs -l left -d "Take what they did"
 $command -n $resolve -l ours -l right -d "Take what we did"
 $command -n $resolve -l base -d "Take neither"
 $command -n $resolve -l path -x -a "(__vexel_merge_git_conflicts)" -d "Only conflicts whose path fits"
+$command -n $resolve -s p -d "Ask conflict by conflict"
+$command -n $resolve -l color -x -a "auto always never" -d "When to use colour"
 $command -n $resolve -l force -d "Also if the file was edited since"
 $command -n $resolve -a "(__vexel_merge_git_unmerged)"
 

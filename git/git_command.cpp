@@ -27,6 +27,7 @@ constexpr std::string_view kUsage =
     R"(usage: vexel-merge-git enable [--global] [--patterns '*.vexel *.prefab *.meta']
        vexel-merge-git disable [--global]
        vexel-merge-git status
+       vexel-merge-git resolve -p [--color=<when>] [--force] [--] [<file>...]
        vexel-merge-git resolve [--theirs | --ours | --base] [--path <pattern>] [--force] [--] <file>...
        vexel-merge-git check [--conflicts] [--staged | <commit> | [--] <file>...]
        vexel-merge-git preview <branch>
@@ -37,8 +38,9 @@ constexpr std::string_view kUsage =
              repository, or with --global those of all your repositories
   disable    undo that, and nothing else
   status     say what is set, and whether the programs are found
-  resolve    merge conflicting files (of folders, all below) once more, with what their records say
-             or, where a side is named, with that side's values; stage those in which nothing is left
+  resolve    merge conflicting files (of folders, all below) once more: with what you answer to -p,
+             which asks conflict by conflict, with a side's values, or with what the records say;
+             stage those in which nothing is left
   check      say which conflicts nobody has settled, and which scenes are broken: of the conflicts
              at hand, in what is staged, or in a commit; status 1 where there are some
   preview    say what merging a branch would do, and who collides with whom; nothing is written

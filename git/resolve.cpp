@@ -1,11 +1,13 @@
 #include "git/resolve.h"
 
 #include <algorithm>
+#include <optional>
 #include <set>
 
 #include "git/conflict_messages.h"
 #include "git/decision_memory.h"
 #include "git/git_call.h"
+#include "git/prompt.h"
 #include "git/repository.h"
 #include "git/settle.h"
 #include "git/shown_text.h"
@@ -24,9 +26,25 @@ std::string SideNamedBy(const std::string& option) {
   return option == "--base" ? "base" : "";
 }
 
-// The options, which may stand anywhere before "--"; all else goes to `files`.
-Choice Parse(const std::vector<std::string>& arguments, std::vector<std::string>& files) {
+// What the user wants, and by which way.
+struct Arguments {
   Choice choice;
+  bool asks = false;
+  ColourUse colour = ColourUse::kAuto;
+  std::vector<std::string> files;
+};
+
+ColourUse ColourNamed(const std::string& word) {
+  if (word == "auto") return ColourUse::kAuto;
+  if (word == "always") return ColourUse::kAlways;
+  if (word == "never") return ColourUse::kNever;
+  throw WrongUsage("--color is auto, always or never");
+}
+
+// The options may stand anywhere before "--".
+Arguments Parse(const std::vector<std::string>& arguments) {
+  Arguments parsed;
+  Choice& choice = parsed.choice;
   for (auto argument = arguments.begin(); argument != arguments.end(); ++argument) {
     if (const std::string side = SideNamedBy(*argument); !side.empty()) {
       if (!choice.side.empty()) throw WrongUsage("only one of --theirs, --ours and --base can be given");
@@ -38,19 +56,31 @@ Choice Parse(const std::vector<std::string>& arguments, std::vector<std::string>
       choice.pattern = argument->substr(7);
     } else if (*argument == "--force") {
       choice.force = true;
+    } else if (*argument == "-p") {
+      parsed.asks = true;
+    } else if (argument->starts_with("--color=")) {
+      parsed.colour = ColourNamed(argument->substr(8));
     } else if (*argument == "--") {
-      files.insert(files.end(), argument + 1, arguments.end());
+      parsed.files.insert(parsed.files.end(), argument + 1, arguments.end());
       break;
     } else if (argument->starts_with('-')) {
       throw WrongUsage("unknown option '" + *argument + "'");
     } else {
-      files.push_back(*argument);
+      parsed.files.push_back(*argument);
     }
   }
-  if (files.empty()) throw WrongUsage("resolve needs a file");
   if (!choice.pattern.empty() && choice.side.empty())
     throw WrongUsage("--path goes with --theirs, --ours or --base");
-  return choice;
+  if (!choice.side.empty() && parsed.asks) throw WrongUsage("-p asks for the side: name none");
+  return parsed;
+}
+
+// How somebody wants to settle who hasn't said it. An editor is no place to begin.
+void AskForWay(Arguments& arguments, Prompt& prompt) {
+  const char way =
+      prompt.AskLetter("Settle here, conflict by conflict (p), or in the editor (e) [p,e,q]? ", "peq");
+  if (way == 'q') throw CommandError("nothing is settled");
+  arguments.asks = way == 'p';
 }
 
 // The file of this name that was in conflict before it was staged.
@@ -76,6 +106,23 @@ std::vector<std::string> NamedConflicts(const std::string& path, const std::stri
     if (!staged.empty()) return staged;
   }
   return {};
+}
+
+// All that is in conflict, where no file is named. What is not found has been said, and `is_complete` is
+// false.
+std::set<std::string> FindAssets(const std::vector<std::string>& files, bool& is_complete) {
+  const std::string top = TopFolder();
+  std::set<std::string> assets;
+  for (const std::string& file : files.empty() ? std::vector<std::string>{top} : files) {
+    const std::vector<std::string> named = NamedConflicts(file, top);
+    if (named.empty()) {
+      Complain(files.empty() ? "nothing is in conflict that has the attribute merge=vexel"
+                             : file + " is not in conflict, or has no attribute merge=vexel");
+      is_complete = false;
+    }
+    assets.insert(named.begin(), named.end());
+  }
+  return assets;
 }
 
 // Adds the file, and gives it the line ends that the user has set for files of the work tree.
@@ -161,20 +208,17 @@ void KeepEdited(const std::string& asset, std::string_view text, const Repositor
 }  // namespace
 
 int RunResolve(const std::vector<std::string>& arguments) {
-  std::vector<std::string> files;
-  const Choice choice = Parse(arguments, files);
-  const std::string top = TopFolder();
+  Arguments parsed = Parse(arguments);
+  Choice& choice = parsed.choice;
+  const bool is_free = choice.side.empty() && !parsed.asks && IsConversation();
+  if (parsed.files.empty() && !parsed.asks && !is_free) throw WrongUsage("resolve needs a file");
   bool is_done = true;
-  std::set<std::string> assets;
-  for (const std::string& file : files) {
-    const std::vector<std::string> named = NamedConflicts(file, top);
-    if (named.empty()) {
-      Complain(file + " is not in conflict, or has no attribute merge=vexel");
-      is_done = false;
-    }
-    assets.insert(named.begin(), named.end());
-  }
+  const std::set<std::string> assets = FindAssets(parsed.files, is_done);
   GoToTop();
+  std::optional<Prompt> prompt;
+  if (!assets.empty() && (parsed.asks || is_free)) prompt.emplace(parsed.colour);
+  if (prompt && is_free) AskForWay(parsed, *prompt);
+  if (parsed.asks && prompt) choice.prompt = &*prompt;
   const MergeSettings settings = SettingsQuery().Get();
   const Repository repository;
   Resolving resolving(repository, settings, choice);
@@ -185,6 +229,10 @@ int RunResolve(const std::vector<std::string>& arguments) {
       // The others can be settled all the same.
       Complain(error.what());
       is_done = false;
+    }
+    if (prompt && prompt->HasQuit()) {
+      is_done = is_done && asset == *assets.rbegin();
+      break;
     }
   }
   resolving.Sweep();

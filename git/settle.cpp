@@ -5,6 +5,7 @@
 
 #include "git/conflict_messages.h"
 #include "git/git_call.h"
+#include "git/questions.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
 #include "platform/files.h"
@@ -55,7 +56,9 @@ class Settling {
 
   Settlement Run() {
     if (!FindStart() || IsEdited()) return {};
-    const bool is_merged = choice_.side.empty() ? MergeEdited() : MergeWithSide();
+    const bool is_merged = choice_.prompt != nullptr ? MergeAnswered()
+                           : choice_.side.empty()    ? MergeEdited()
+                                                     : MergeWithSide();
     if (!is_merged) return {};
     entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
     return {status_, std::move(merge_), std::move(entry_)};
@@ -84,7 +87,7 @@ class Settling {
     }
     entry_.hash = HashOf(merge.GetText());
     entry_.conflicts = ConflictsAfter(merge, asset, entry_.names, {});
-    if (!choice_.side.empty()) return true;
+    if (!choice_.side.empty() || choice_.prompt != nullptr) return true;
     record_ = context_.records.Leave(
         entry_, merge, [&] { return entry_.hash; }, context_.settings);
     if (record_.empty()) Complain("cannot write the record of " + asset);
@@ -121,13 +124,29 @@ class Settling {
       return false;
     }
     const std::string decided = DecidedIn(record_);
-    // Who looks at the scene in the engine while deciding may save it there.
-    if (!context_.is_same_conflict()) {
-      context_.records.Remove(versions_.asset);
-      Complain(versions_.asset + " is no longer in the conflict that it was in when the editor was opened");
+    return IsStillInConflict("the editor was opened") && Merge(decided);
+  }
+
+  bool MergeAnswered() {
+    // Where nothing is open, minds can be changed about all of it.
+    const bool asks_again = entry_.CountPending() == 0;
+    Questions questions(*choice_.prompt, entry_, [&](const std::vector<std::string>& chosen, bool is_blank) {
+      return Merge(is_blank ? std::string() : DecidedIn(record_, chosen)) ? merge_.get() : nullptr;
+    });
+    if (!questions.Ask(asks_again)) return false;
+    if (!questions.HaveDecided() && (choice_.prompt->HasQuit() || status_ != AssetMerge::kMerged)) {
+      Say("Nothing is settled in " + versions_.asset);
       return false;
     }
-    return !IsEdited() && Merge(decided);
+    return IsStillInConflict("the first question was asked");
+  }
+
+  // Who looks at the scene in the engine while deciding may save it there.
+  bool IsStillInConflict(const std::string& since) const {
+    if (context_.is_same_conflict()) return !IsEdited();
+    context_.records.Remove(versions_.asset);
+    Complain(versions_.asset + " is no longer in the conflict that it was in when " + since);
+    return false;
   }
 
   // Only at conflicts, since a pattern in the record itself would also decide about places that only one side

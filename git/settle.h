@@ -10,6 +10,8 @@
 
 namespace vexel_yaml {
 
+class Prompt;
+
 /// How somebody wants the conflicts of a file to be settled.
 struct Choice {
   /// "left", "right" or "base"; empty for what an editor makes of the record.
@@ -18,6 +20,8 @@ struct Choice {
   std::string pattern;
   /// Whether edits of the file may be lost.
   bool force = false;
+  /// Asks about one conflict after the other instead, where it is given; not owned.
+  Prompt* prompt = nullptr;
 };
 
 /// What settling needs to know of the repository.

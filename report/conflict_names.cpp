@@ -61,6 +61,10 @@ const YAMLMappingDiff& BodyDiff(const YAMLMappingDiff& object) {
 
 std::string MappingText(const YAMLMappingDiff& diff) {
   const std::string keys = KeysText(diff);
+  const ChangeSequenceOperation* order = diff.GetKeyOrder();
+  const bool is_reordered =
+      order != nullptr && (order->GetRemapper() != nullptr || !order->GetDiff()->GetEntries().empty());
+  if (keys.empty() && !is_reordered) return "leaves it";
   return keys.empty() ? "reorders it" : "edits " + keys;
 }
 
@@ -101,7 +105,13 @@ class ConflictNamer {
 
   NamedConflict Name(const Record& record) {
     const FieldPath& path = record.path;
-    NamedConflict conflict = {patterns_.For(record), ObjectText(path.front()), {}, {}, {}, {}};
+    NamedConflict conflict = {patterns_.For(record),
+                              names_.GetOwner(path.front())->GetText(),
+                              ObjectText(path.front()),
+                              {},
+                              {},
+                              {},
+                              {}};
     const auto overridden = OverrideAt(record, base_, left_, right_);
     if (overridden) {
       conflict.name += " > " + overridden->name;
@@ -158,7 +168,10 @@ class ConflictNamer {
         return NewValueText(record, static_cast<const ChangeOperation*>(operation)->GetValue());
       case Operation::Kind::kChangeMapping: {
         const YAMLMappingDiff& diff = *static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
-        if (record.path.size() > 1) return OnOneLine(MappingText(diff));
+        if (record.path.size() > 1) {
+          const std::string target = NewTargetText(diff);
+          return OnOneLine(target.empty() ? MappingText(diff) : target);
+        }
         const std::string parts = PartsText(diff, names_.GetPath(record.path.front()));
         return OnOneLine(parts.empty() ? MappingText(BodyDiff(diff)) : parts);
       }
@@ -189,6 +202,18 @@ class ConflictNamer {
       }
     }
     return count > kMostKeys ? text + " and " + std::to_string(count - kMostKeys) + " more" : text;
+  }
+
+  // What a reference leads to now, where that is all that has changed of it; else empty.
+  std::string NewTargetText(const YAMLMappingDiff& diff) {
+    const Operation* change = diff.Get(YAMLScalar::fileID);
+    if (change == nullptr || change->GetKind() != Operation::Kind::kChange || diff.GetEntries().size() > 1)
+      return {};
+    const YAMLScalar* file_id = static_cast<const ChangeOperation*>(change)->GetValue()->AsScalar();
+    if (file_id == nullptr) return {};
+    const std::string target = names_.Describe(file_id);
+    return "{fileID: " + file_id->GetText() +
+           (target.empty() ? "}" : "} (" + Shortened(target, kMostOfValue) + ")");
   }
 
   std::string NewValueText(const Record& record, const YAMLNode* value) {

@@ -16,6 +16,8 @@ namespace vexel_yaml {
 struct NamedConflict {
   /// A pattern for its path, and for no other.
   std::string place;
+  /// The file ID of the game object or prefab instance that the place is in, or else of the object.
+  std::string thing;
   /// Such as "Level01/Lamp Post > Light > m_Intensity"; no other one of the list has the same.
   std::string name;
   /// Base's value; empty where there was none, or none that fits into a line.

@@ -98,12 +98,17 @@ std::string ObjectNames::GetOwnName(const YAMLScalar* file_id) const {
   return name.empty() ? ModifiedName(body) : name;
 }
 
-std::string ObjectNames::GetOwnerName(const YAMLScalar* file_id) const {
+const YAMLScalar* ObjectNames::GetOwner(const YAMLScalar* file_id) const {
   const YAMLScalar* game_object = ReferenceAt(Body(file_id), YAMLScalar::mGameObject);
-  if (game_object != nullptr) return GetOwnName(game_object);
+  if (game_object != nullptr) return game_object;
   // What a prefab instance brings along names no game object of this file.
   const YAMLScalar* instance = ReferenceAt(Body(file_id), YAMLScalar::mPrefabInstance);
-  return instance == nullptr ? std::string() : GetOwnName(instance);
+  return instance == nullptr ? file_id : instance;
+}
+
+std::string ObjectNames::GetOwnerName(const YAMLScalar* file_id) const {
+  const YAMLScalar* owner = GetOwner(file_id);
+  return owner == file_id ? std::string() : GetOwnName(owner);
 }
 
 // The elements of "m_Component" are mappings of one entry, whatever its name, around a reference.

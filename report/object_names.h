@@ -29,6 +29,9 @@ class ObjectNames {
   /// The name that the object itself has; empty for none.
   std::string GetOwnName(const YAMLScalar* file_id) const;
 
+  /// The game object, or else the prefab instance, that the object is a part of; for any other object itself.
+  const YAMLScalar* GetOwner(const YAMLScalar* file_id) const;
+
   /// The name of the game object that a component belongs to; empty for none.
   std::string GetOwnerName(const YAMLScalar* file_id) const;
 

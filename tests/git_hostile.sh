@@ -5,7 +5,6 @@
 set -euo pipefail
 # shellcheck source=tests/support/end_to_end.sh
 source "$(dirname "${BASH_SOURCE[0]}")/support/end_to_end.sh"
-exec </dev/null
 export GIT_EDITOR=true
 
 long="$(printf 'n%.0s' {1..230}).vexel"
@@ -71,7 +70,7 @@ check "the page's name is said" grep -qF report.html "$work/err"
 untouched "a default page"
 git -c mergetool.keepBackup=false mergetool -y -t vexel file.vexel >/dev/null 2>&1 || :
 check "a terminal gets no control characters" refuses grep -q $'\e\[31m' \
-  <(script -qec "vexel-merge-git resolve '${odd[4]}'; vexel-merge-git status" /dev/null)
+  <(script -qec "echo e | vexel-merge-git resolve '${odd[4]}'; vexel-merge-git resolve -p --color=always '${odd[4]}'; vexel-merge-git status" /dev/null)
 
 mv dir "$work/dir" && ln -s ../outside/dir dir && cp "$work/dir/x.vexel" "$work/outside/dir" && outside >"$work/before"
 check "what lies behind a link is refused" refuses vexel-merge-git resolve --left --force dir/x.vexel 2>/dev/null

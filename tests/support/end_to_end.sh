@@ -16,6 +16,8 @@ export HOME="$work/home" PATH="${program%/*}:$PATH" LC_ALL=C.UTF-8 GIT_CONFIG_NO
 export GIT_AUTHOR_NAME=Test GIT_AUTHOR_EMAIL=test@localhost GIT_COMMITTER_NAME=Test GIT_COMMITTER_EMAIL=test@localhost
 unset XDG_CONFIG_HOME
 mkdir "$HOME"
+# Somebody who runs a test by hand is not to be asked anything.
+exec </dev/null
 
 # To the standard error of the test itself: what is sent elsewhere is the checked command's.
 exec 3>&2

@@ -1,0 +1,108 @@
+#!/usr/bin/env bash
+# Settles conflicts conflict by conflict, with answers from a pipe and from a terminal:
+#   git_prompt.sh PROGRAM
+set -euo pipefail
+# shellcheck source=tests/support/end_to_end.sh
+source "$(dirname "${BASH_SOURCE[0]}")/support/end_to_end.sh"
+
+file=Harbour.vexel
+# lamps X.RANGE X.INTENSITY Y.RANGE: two lamps, of which the second one's values are on neighbouring lines.
+lamps() {
+  scene 1 "$1"
+  scene "$2" "$3" | sed '1,2d; s/&1/\&2/; s/fileID: 1/fileID: 2/; s/Lamp/Lantern/'
+}
+commit() { # commit BRANCH LINES...
+  git checkout -q -B "$1" main && "${@:2}" >"$file" && git commit -q -a -m "$1"
+}
+# answer ANSWERS ARGUMENT...: each letter of the answers is one.
+answer() { sed 's/./&\n/g' <<<"$1" | vexel-merge-git resolve -p "${@:2}" >"$work/out" 2>"$work/err"; }
+asked() { grep -c '^  theirs' "$work/out"; }
+is_at() { cmp -s "$file" <(lamps "$@"); }
+is_open() { [ "$(git ls-files -u | wc -l)" -eq 3 ]; }
+again() { git reset -q --hard && ! git merge -q theirs >/dev/null 2>&1; }
+
+git init -q -b main "$work/repository" && cd "$work/repository" && vexel-merge-git enable >/dev/null
+lamps 1 1 1 >"$file" && git add -A && git commit -q -m base
+commit theirs lamps 2 2 2
+commit ours lamps 3 3 3
+
+check "there is nothing to ask without a conflict" refuses answer t
+again
+cp "$file" "$work/undecided"
+check "who only skips decides nothing" refuses answer sssx
+check "which is said" grep -qFx "Nothing is settled in $file" "$work/err"
+check "nor who quits" refuses answer q
+check "nor who says nothing" refuses answer ''
+check "the file is as it was" cmp "$file" "$work/undecided"
+check "in conflict" is_open
+check "an answer that is none is asked for again, with help" refuses answer 'xtq'
+check "the question stays" test "$(asked)" -eq 2 -a "$(grep -c '^q - quit' "$work/out")" -eq 1
+check "what was settled is kept" is_at 2 1 1
+check "the rest is open" is_open
+check "and asked about alone" answer To
+check "in one question for the whole object" test "$(asked)" -eq 1
+check "the answers stand" is_at 2 2 2
+check "the file is staged" test -z "$(git ls-files -u)"
+check "a mind can be changed before the commit" answer sosq
+check "knowing what it was" grep -qFx '  now     theirs' "$work/out"
+check "for one place alone" is_at 2 3 2
+check "who quits then changes nothing" refuses answer sq
+check "it is still staged" is_at 2 3 2
+
+again
+check "answers can be taken back" answer tkotkB
+check "the last one counts" is_at 3 1 1
+again
+harbour=$(vexel-merge-git resolve -p --color=always <<<q 2>/dev/null || :)
+check "colours can be had in a pipe" grep -qF $'\e[35m  theirs  2\e[m' <<<"$harbour"
+scene 7 7 >"$file"
+check "edits since the merge are not overwritten" refuses answer ttt
+check "nor asked about" test ! -s "$work/out"
+again
+mkfifo "$work/answers"
+vexel-merge-git resolve -p <"$work/answers" >"$work/out" 2>"$work/err" &
+{
+  echo t
+  for _ in {1..400}; do ! grep -q Lantern "$work/out" || break && sleep 0.05; done
+  scene 7 7 >"$file" && echo T
+} >"$work/answers"
+check "nor are those made while it asks" refuses wait $!
+check "they are there" cmp -s "$file" <(scene 7 7)
+
+# In a terminal, without options, the prompt is the first choice. Several files come one after the other.
+git reset -q --hard && git checkout -q main && cp "$file" Other.vexel && git add -A && git commit -q -m other
+for side in theirs ours; do
+  commit "$side" lamps "${#side}" "${#side}" "${#side}" && cp "$file" Other.vexel && git commit -q -a -m other
+done
+again
+terminal() { script -qec "$1" /dev/null 2>&1 | tr -d '\r'; }
+printf '%s\n' p t t t o q | NO_COLOR=1 TERM=xterm terminal "vexel-merge-git resolve" >"$work/out" || :
+check "the terminal asks" grep -q '^Settle here, conflict by conflict (p), .*(3/3) \|^(3/3) Lantern' "$work/out"
+check "without colours where they aren't wanted" refuses grep -q $'\e' "$work/out"
+check "the first file is done" is_at 6 6 6
+check "and staged; the other one is left" test "$(git ls-files -u | cut -f 2 | uniq)" = Other.vexel
+check "with what was settled in it" cmp -s Other.vexel <(lamps 4 1 1)
+TERM=xterm terminal "vexel-merge-git resolve -p" <<<q >"$work/out" || :
+check "colours are the rule" grep -qF $'\e[36m  ours    4' "$work/out"
+check "a new commit stops" refuses git commit -q -m undecided >/dev/null 2>&1
+
+# A choice that brings up another conflict: each side has moved one object, and both at once are a circle.
+# objects PARENT...: of objects 1 to 3, 0 for none.
+objects() {
+  printf '%%YAML 1.1\n%%TAG !v! tag:vexel.com,2011:\n'
+  for i in 1 2 3; do
+    printf -- '--- !v!1 &%s0\nGameObject:\n  m_Component:\n  - component: {fileID: %s1}\n  m_Name: Object %s\n' "$i" "$i" "$i"
+    printf -- '--- !v!4 &%s1\nTransform:\n  m_GameObject: {fileID: %s0}\n  m_Father: {fileID: %s}\n' "$i" "$i" "${!i}"
+  done
+}
+git reset -q --hard && git checkout -q main && objects 0 0 0 >"$file" && git commit -q -a -m objects
+commit theirs objects 21 0 0
+commit ours objects 31 11 0
+again
+check "a choice brings up another question" answer tktob
+check "which is asked again after an answer that contradicts the first one" \
+  grep -q '  not settled by that: Object 2 > Transform > m_Father$' "$work/out"
+check "it is announced" grep -q '^  open now: Object 2 > Transform > m_Father$' <(sed 's/.*? //' "$work/out")
+check "it says where to" grep -qFx '  ours    {fileID: 31} (Object 3)' "$work/out"
+
+end_of_checks "people are asked"
