@@ -12,12 +12,6 @@ namespace {
 using Kind = ReportCell::Kind;
 using Record = RecordingConflictResolver::Record;
 
-ObjectNames NamesFor(const MergedFiles& files) {
-  std::vector<const VexelObjects*> versions = {&files.read.right, &files.read.left, &files.read.base};
-  if (files.merged != nullptr) versions.insert(versions.begin(), files.merged.get());
-  return ObjectNames(std::move(versions));
-}
-
 // What the index of an element that base lacks begins with, so that no element of base has the same path.
 constexpr char kNewElement = '+';
 
@@ -58,8 +52,8 @@ std::string_view SettledState(MergeResolve resolution) {
 
 class Collector {
  public:
-  explicit Collector(const MergedFiles& files)
-      : files_(files), names_(NamesFor(files)), patterns_(files.resolver) {}
+  Collector(const MergedFiles& files, ObjectNames& names, const SideNames& sides)
+      : files_(files), names_(names), sides_(sides), patterns_(files.resolver) {}
 
   std::vector<ReportObject> Collect() {
     AddSide(&ReportRow::left, &ReportObject::left, *files_.diffs.left, files_.read.left);
@@ -128,8 +122,8 @@ class Collector {
     for (const RenumberedObject& renumbered : files_.read.renumbered) {
       ReportRow& row = rows_.RowAt({renumbered.new_id});
       row.repaired = true;
-      row.note = "Both sides added another object as " + renumbered.old_id->GetText() +
-                 "; right's was given a file ID of its own";
+      row.note = "Both sides added another object as " + renumbered.old_id->GetText() + "; " + sides_.right +
+                 "'s was given a file ID of its own";
     }
   }
 
@@ -156,7 +150,7 @@ class Collector {
       row.note = "The parents of the transforms formed a circle; it was broken here";
     } else if (const std::string_view dependency = DependencyText(record); !dependency.empty()) {
       const bool from_left = IsLeftType(record.type);
-      row.note = std::string(from_left ? "Left " : "Right ") + std::string(dependency);
+      row.note = (from_left ? sides_.left : sides_.right) + ' ' + std::string(dependency);
       ReportObject& object = rows_.ObjectAt(row.path.front());
       (from_left ? object.left : object.right) = true;
     }
@@ -238,11 +232,14 @@ class Collector {
       row.result.text = "no result";
       return;
     }
-    if (row.result.kind == Kind::kUnchanged) row.result.text = row.base.text;
-    if (row.result.kind == Kind::kUnchanged) row.result.full = row.base.full;
+    if (row.result.kind == Kind::kUnchanged) {
+      row.result.text = row.base.text;
+      row.result.full = row.base.full;
+      row.result.node = row.base.node;
+    }
     if (row.repaired && row.state.empty()) row.state = "repaired";
     if (!row.state.empty()) return;
-    JudgeRow(row);
+    JudgeRow(row, sides_);
     if (row.state == "not taken" && rows_.IsInConflict(row.path)) row.state = "in conflict";
   }
 
@@ -271,7 +268,8 @@ class Collector {
   }
 
   const MergedFiles& files_;
-  ObjectNames names_;
+  ObjectNames& names_;
+  const SideNames& sides_;
   ReportRows rows_{names_};
   RecordPatterns patterns_;
   SideWalk::Places places_;
@@ -281,6 +279,20 @@ class Collector {
 
 }  // namespace
 
-std::vector<ReportObject> CollectReport(const MergedFiles& files) { return Collector(files).Collect(); }
+ObjectNames NamesOf(const MergedFiles& files) {
+  std::vector<const VexelObjects*> versions = {&files.read.right, &files.read.left, &files.read.base};
+  if (files.merged != nullptr) versions.insert(versions.begin(), files.merged.get());
+  return ObjectNames(std::move(versions));
+}
+
+std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names,
+                                        const SideNames& sides) {
+  return Collector(files, names, sides).Collect();
+}
+
+std::vector<ReportObject> CollectReport(const MergedFiles& files) {
+  ObjectNames names = NamesOf(files);
+  return CollectReport(files, names, {});
+}
 
 }  // namespace vexel_yaml

@@ -1,4 +1,6 @@
-# Writes the source that holds page.css and page.js, and the hashes by which the page's policy admits just these two.
+# Writes the source that holds a page's style and script, and the hashes by which its policy admits just these two:
+#   cmake -DOUTPUT=FILE.cpp -DHEADER=HEADER -DNAME=Page -DSTYLE=FILE -DSCRIPTS="FILE FILE ..." [-DPAGE=FILE] -P ...
+# In a PAGE, which is then held as well, {{style}} and {{script}} stand for them.
 
 # The base64 text of the SHA-256 hash of a text: CMake itself gives hexadecimal digits.
 function(base64_hash text result)
@@ -20,19 +22,33 @@ function(base64_hash text result)
   set(${result} ${hash} PARENT_SCOPE)
 endfunction()
 
-get_filename_component(folder ${CMAKE_CURRENT_LIST_FILE} DIRECTORY)
-file(READ ${folder}/page.css css)
-file(READ ${folder}/page.js js)
+file(READ ${STYLE} css)
+set(js "")
+separate_arguments(SCRIPTS)
+foreach(script ${SCRIPTS})
+  file(READ ${script} text)
+  string(APPEND js "${text}")
+endforeach()
 base64_hash("${css}" css_hash)
 base64_hash("${js}" js_hash)
-file(WRITE ${OUTPUT} "#include \"report/page_files.h\"
+set(constants
+"const std::string_view k${NAME}StyleHash = \"sha256-${css_hash}\";
+const std::string_view k${NAME}ScriptHash = \"sha256-${js_hash}\";
+")
+if(PAGE)
+  file(READ ${PAGE} html)
+  string(REPLACE "{{style}}" "${css}" html "${html}")
+  string(REPLACE "{{script}}" "${js}" html "${html}")
+  string(APPEND constants "const std::string_view k${NAME}Page = R\"PAGE(${html})PAGE\";\n")
+else()
+  string(APPEND constants "const std::string_view k${NAME}Style = R\"PAGE(${css})PAGE\";
+const std::string_view k${NAME}Script = R\"PAGE(${js})PAGE\";
+")
+endif()
+file(WRITE ${OUTPUT} "#include \"${HEADER}\"
 
 namespace vexel_yaml {
 
-const std::string_view kPageStyle = R\"PAGE(${css})PAGE\";
-const std::string_view kPageStyleHash = \"sha256-${css_hash}\";
-const std::string_view kPageScript = R\"PAGE(${js})PAGE\";
-const std::string_view kPageScriptHash = \"sha256-${js_hash}\";
-
+${constants}
 }  // namespace vexel_yaml
 ")

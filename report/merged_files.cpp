@@ -47,13 +47,13 @@ Merged MergeValues(MergedFiles& files, TimerStat& timer) {
 Merged MergeScenes(MergedFiles& files, TimerStat& timer) {
   files.settled = files.read.Copy();
   SafeMergeResult result = SafeMerge(*files.settled, files.resolver, {.keep_comparable = true}, timer);
-  const std::vector<std::string> unmatched = DescribeUnmatchedChoices(files.resolver, *result.merged);
-  for (const std::string& line : unmatched) WriteErrorLine(line);
+  files.notes = std::move(result.notes);
   return {std::move(result.unrepaired), std::move(result.repaired)};
 }
 
-void Merge(MergedFiles& files, bool safe, TimerStat& timer) {
-  Merged merged = safe ? MergeScenes(files, timer) : MergeValues(files, timer);
+void Merge(MergedFiles& files) {
+  TimerStat timer("", nullptr);
+  Merged merged = files.safe ? MergeScenes(files, timer) : MergeValues(files, timer);
   // Neither can nodes whose hashes are out of date.
   RebuildHashesOfRead(*merged.repaired);
   RebuildHashesOfRead(*merged.unrepaired);
@@ -63,11 +63,11 @@ void Merge(MergedFiles& files, bool safe, TimerStat& timer) {
 
 }  // namespace
 
-void MergeForReport(const ReportConfig& config, MergedFiles& files) {
+void ReadForReport(const ReportConfig& config, MergedFiles& files) {
   TimerStat silent("", nullptr);
-  SetupRulesAndTypes(config.rules_file, config.type_info_file, silent);
   SceneDocuments& read = files.read;
   const bool threads = AreWorthThreads({config.base_path, config.left_path, config.right_path});
+  files.safe = config.safe;
   if (config.safe) {
     ReadScenes(config.base_path, config.left_path, config.right_path, read, threads, silent);
   } else {
@@ -75,12 +75,26 @@ void MergeForReport(const ReportConfig& config, MergedFiles& files) {
     read.renumbered = PrepareForDiff(read.base, read.left, read.right);
   }
   files.diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, threads, silent);
-  if (!config.merge_file.empty() && !InputConflictRecords(config.merge_file, files.resolver)) {
-    throw YAMLError("Couldn't open merge resolve file '" + config.merge_file + "'");
+}
+
+std::vector<RecordingConflictResolver::RecordResolve> ReadResolutions(const std::string& path) {
+  RecordingConflictResolver reader(MergeResolve::kBase);
+  if (!InputConflictRecords(path, reader)) {
+    throw YAMLError("Couldn't open merge resolve file '" + path + "'");
   }
+  return reader.GetResolutions();
+}
+
+void MergeRead(MergedFiles& files, std::vector<RecordingConflictResolver::RecordResolve> resolutions) {
+  files.unrepaired = nullptr;
+  files.merged = nullptr;
+  files.error.clear();
+  files.notes.clear();
+  files.resolver = RecordingConflictResolver(MergeResolve::kBase);
+  files.resolver.SetResolveMethodForPaths(std::move(resolutions));
   // What both sides did is worth a look all the same where the merge fails.
   try {
-    Merge(files, config.safe, silent);
+    Merge(files);
   } catch (const std::bad_alloc&) {
     throw;
   } catch (const YAMLError& error) {
@@ -88,6 +102,18 @@ void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   } catch (const std::exception& error) {
     files.error = Explained(error);
   }
+}
+
+void MergeForReport(const ReportConfig& config, MergedFiles& files) {
+  TimerStat silent("", nullptr);
+  SetupRulesAndTypes(config.rules_file, config.type_info_file, silent);
+  ReadForReport(config, files);
+  std::vector<RecordingConflictResolver::RecordResolve> resolutions;
+  if (!config.merge_file.empty()) resolutions = ReadResolutions(config.merge_file);
+  MergeRead(files, std::move(resolutions));
+  if (!config.safe || files.merged == nullptr) return;
+  for (const std::string& line : DescribeUnmatchedChoices(files.resolver, *files.merged))
+    WriteErrorLine(line);
 }
 
 std::string Explained(const YAMLError& error) { return WithHint(error.what(), error.GetHint()); }

@@ -26,6 +26,7 @@ struct ReportConfig {
 struct MergedFiles {
   SceneDocuments read;
   DiffPair diffs;
+  bool safe = false;
   /// What became of the versions where they were merged as scenes, else null: records may refer to it.
   std::unique_ptr<SceneDocuments> settled;
   RecordingConflictResolver resolver{MergeResolve::kBase};
@@ -34,11 +35,20 @@ struct MergedFiles {
   std::unique_ptr<VexelObjects> merged;
   /// Why the merge failed after both sides had been compared with base; empty where it didn't.
   std::string error;
+  /// Lines of the merge for people.
+  std::vector<std::string> notes;
 };
 
 /// Merges the three files as the merge command does, conflicts to base. Throws what reading and diffing
 /// throw, and YAMLError where the resolutions can't be read.
 void MergeForReport(const ReportConfig& config, MergedFiles& files);
+
+/// The parts of it, for whoever merges the same files again and again; rules and types are loaded.
+void ReadForReport(const ReportConfig& config, MergedFiles& files);
+/// Reads the resolutions of the record file at `path`. Throws YAMLError.
+std::vector<RecordingConflictResolver::RecordResolve> ReadResolutions(const std::string& path);
+/// Forgets what an earlier merge left in `files`. That the merge fails is said there.
+void MergeRead(MergedFiles& files, std::vector<RecordingConflictResolver::RecordResolve> resolutions);
 
 /// What went wrong and, in brackets behind it, where: a report is for people.
 std::string Explained(const YAMLError& error);

@@ -92,6 +92,18 @@ std::string ObjectNames::GetClass(const YAMLScalar* file_id) const {
   return {};
 }
 
+std::string ObjectNames::GetScriptClass(const std::string& guid) const {
+  const auto found = script_classes_.find(guid);
+  return found == script_classes_.end() ? std::string() : found->second;
+}
+
+const YAMLScalar* ObjectNames::GetWhole(const YAMLScalar* file_id) const {
+  const YAMLScalar* game_object = ReferenceAt(Body(file_id), YAMLScalar::mGameObject);
+  if (game_object != nullptr && Body(game_object) != nullptr) file_id = game_object;
+  const YAMLScalar* instance = ReferenceAt(Body(file_id), YAMLScalar::mPrefabInstance);
+  return instance != nullptr && Body(instance) != nullptr ? instance : file_id;
+}
+
 std::string ObjectNames::GetOwnName(const YAMLScalar* file_id) const {
   const YAMLMapping* body = Body(file_id);
   const std::string name = TextOf(Field(body, NameKey()));

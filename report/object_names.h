@@ -26,6 +26,13 @@ class ObjectNames {
   /// Makes the instances of these scripts, by guid, go by their classes.
   void SetScriptClasses(std::map<std::string, std::string> classes) { script_classes_ = std::move(classes); }
 
+  /// The class of a script, empty for one that isn't known.
+  std::string GetScriptClass(const std::string& guid) const;
+
+  /// What people take the object for a part of: a component's game object, the prefab instance that brought
+  /// it along, or else the object itself.
+  const YAMLScalar* GetWhole(const YAMLScalar* file_id) const;
+
   /// The name that the object itself has; empty for none.
   std::string GetOwnName(const YAMLScalar* file_id) const;
 

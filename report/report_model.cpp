@@ -60,13 +60,13 @@ std::string_view StateOf(const ReportRow& row) {
 
 }  // namespace
 
-void JudgeRow(ReportRow& row) {
+void JudgeRow(ReportRow& row, const SideNames& sides) {
   row.state = StateOf(row);
   const bool lost_left = !HoldsOrder(row.result, row.left);
   const bool lost_right = !HoldsOrder(row.result, row.right);
   if (!lost_left && !lost_right) return;
-  row.note = !lost_right  ? "Left's new order was not taken"
-             : !lost_left ? "Right's new order was not taken"
+  row.note = !lost_right  ? sides.left + "'s new order was not taken"
+             : !lost_left ? sides.right + "'s new order was not taken"
                           : "Neither side's new order was taken";
 }
 

@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "report/merged_files.h"
+#include "report/object_names.h"
 
 namespace vexel_yaml {
 
@@ -23,6 +24,8 @@ struct ReportCell {
   std::vector<uint32_t> order = {};
   /// Whether other rows show changes of parts of it.
   bool parts_changed = false;
+  /// The value itself, of which `text` is for people; null where there is none. Of the documents' life.
+  const YAMLNode* node = nullptr;
 
   bool operator==(const ReportCell& other) const {
     return kind == other.kind && text == other.text && full == other.full;
@@ -62,8 +65,19 @@ struct ReportObject {
   std::vector<ReportRow> rows;
 };
 
-/// Everything a merge did, object by object: those with conflicts first, then by their names.
+/// What the two sides are called in notes.
+struct SideNames {
+  std::string left = "Left";
+  std::string right = "Right";
+};
+
+/// Everything a merge did, object by object: those with conflicts first, then by their names. `names` must
+/// know the objects of the versions and of the result.
+std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names, const SideNames& sides);
+/// The same with names of its own.
 std::vector<ReportObject> CollectReport(const MergedFiles& files);
+/// What knows the objects of the versions and of the result.
+ObjectNames NamesOf(const MergedFiles& files);
 
 /// How the line of a list's edits begins that shows its new order.
 inline constexpr std::string_view kNewOrder = "new order: ";
@@ -72,7 +86,7 @@ inline constexpr std::string_view kChangedInside = "changed inside";
 
 /// Tells what became of a place that no record settles, from what its cells say, and notes it where an order
 /// got lost.
-void JudgeRow(ReportRow& row);
+void JudgeRow(ReportRow& row, const SideNames& sides);
 
 /// Why a record is about components that need or exclude one another, from its side's point of view; empty
 /// for other records.

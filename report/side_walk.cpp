@@ -63,6 +63,7 @@ const YAMLNode* ElementAt(const YAMLSequence& sequence, size_t index) {
 
 ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, ObjectNames& names) {
   ReportCell cell{kind, {}, {}};
+  cell.node = node;
   if (const YAMLMapping* fields = FieldsToCount(path, node)) {
     cell.text = std::to_string(fields->Size()) + (fields->Size() == 1 ? " field" : " fields");
     cell.full = FullText(*fields);

@@ -1,0 +1,28 @@
+#include "report/report_cards.h"
+
+#include <algorithm>
+#include <tuple>
+#include <unordered_map>
+
+namespace vexel_yaml {
+
+std::vector<ReportCard> MakeCards(std::vector<ReportObject> objects, ObjectNames& names) {
+  std::vector<ReportCard> cards;
+  std::unordered_map<const YAMLScalar*, size_t> places;
+  for (ReportObject& object : objects) {
+    const YAMLScalar* whole = names.GetWhole(object.file_id);
+    const auto [place, is_new] = places.emplace(whole, cards.size());
+    if (is_new) {
+      cards.push_back({whole, names.GetOwnName(whole), names.GetPath(whole), names.GetClass(whole), {}});
+    }
+    cards[place->second].objects.push_back(std::move(object));
+  }
+  for (ReportCard& card : cards) {
+    std::ranges::sort(card.objects, {}, [&](const ReportObject& object) {
+      return std::tuple(object.file_id != card.file_id, object.class_name, object.file_id->GetText());
+    });
+  }
+  return cards;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,53 @@
+#include "view/finished_file.h"
+
+#include <optional>
+#include <sstream>
+
+#include "fixups/post_process.h"
+#include "merge/conflict_record_file.h"
+#include "platform/file_replacement.h"
+#include "platform/files.h"
+#include "scene/safe_merge.h"
+#include "yaml/write_objects.h"
+
+namespace vexel_yaml {
+
+FinishedFile FinishFile(const SceneDocuments& read, bool safe,
+                        std::vector<RecordingConflictResolver::RecordResolve> resolutions) {
+  TimerStat silent("", nullptr);
+  RecordingConflictResolver resolver(MergeResolve::kBase);
+  resolver.SetResolveMethodForPaths(std::move(resolutions));
+  std::unique_ptr<SceneDocuments> settled;
+  std::unique_ptr<VexelObjects> merged;
+  if (safe) {
+    settled = read.Copy();
+    merged = SafeMerge(*settled, resolver, {}, silent).merged;
+  } else {
+    const DiffPair diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, true, silent);
+    merged = MergeIntoCopy(read.base, diffs, resolver, silent);
+    PostProcess(*merged, read.left, read.right, resolver);
+  }
+  std::ostringstream text;
+  WriteObjects(*merged, text, true);
+  std::ostringstream record;
+  OutputConflictRecords(record, resolver, false);
+  return {std::move(text).str(), std::move(record).str(), resolver.HasPendingConflicts()};
+}
+
+void StoreResult(const std::string& path, const std::string& text, const std::string& record_path,
+                 const std::string& record) {
+  // Neither before both are on the disk, and the result last: whoever sees it may stage it.
+  std::optional<FileReplacement> record_file;
+  if (!record_path.empty()) {
+    record_file.emplace(VexelToNativePath(record_path));
+    record_file->Stream() << record;
+    record_file->Finish();
+  }
+  FileReplacement result(VexelToNativePath(path));
+  result.Stream() << text;
+  result.Finish();
+  if (record_file) record_file->Commit();
+  result.Commit();
+}
+
+}  // namespace vexel_yaml

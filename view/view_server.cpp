@@ -1,0 +1,222 @@
+#include "view/view_server.h"
+
+#include <chrono>
+#include <condition_variable>
+#include <iostream>
+#include <mutex>
+#include <optional>
+
+#include "platform/error_channel.h"
+#include "platform/thread.h"
+#include "view/local_server.h"
+#include "view/open_browser.h"
+#include "view/page_files.h"
+#include "view/view_session.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+using std::chrono::seconds;
+
+// Long enough for the page to be loaded again.
+constexpr seconds kTimeWithoutPage{5};
+constexpr seconds kTimeAfterBye{2};
+constexpr seconds kHeartbeat{1};
+
+// For how long the page is shown.
+class Lifetime {
+ public:
+  explicit Lifetime(seconds idle) : idle_(idle) {}
+
+  void NoteRequest() {
+    const std::lock_guard lock(mutex_);
+    last_request_ = Clock::now();
+  }
+
+  void PageCame() {
+    const std::lock_guard lock(mutex_);
+    ++pages_;
+    grace_ = kTimeWithoutPage;
+  }
+
+  void PageWent() {
+    const std::lock_guard lock(mutex_);
+    --pages_;
+    gone_since_ = Clock::now();
+    changed_.notify_all();
+  }
+
+  // A page that says good-bye will hardly come again.
+  void HurryUp() {
+    const std::lock_guard lock(mutex_);
+    grace_ = kTimeAfterBye;
+    changed_.notify_all();
+  }
+
+  void End() {
+    const std::lock_guard lock(mutex_);
+    is_ended_ = true;
+    changed_.notify_all();
+  }
+
+  // Until then or a heartbeat long; whether it goes on.
+  bool WaitForHeartbeat() {
+    std::unique_lock lock(mutex_);
+    return !changed_.wait_for(lock, kHeartbeat, [this] { return is_ended_; });
+  }
+
+  void WaitForEnd() {
+    std::unique_lock lock(mutex_);
+    while (!is_ended_) {
+      const Clock::time_point now = Clock::now();
+      if (now >= last_request_ + idle_) return;
+      if (gone_since_ && pages_ == 0 && now >= *gone_since_ + grace_) return;
+      changed_.wait_for(lock, seconds(1));
+    }
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable changed_;
+  const seconds idle_;
+  Clock::time_point last_request_ = Clock::now();
+  std::optional<Clock::time_point> gone_since_;
+  seconds grace_ = kTimeWithoutPage;
+  int pages_ = 0;
+  bool is_ended_ = false;
+};
+
+// What the page asks for.
+class ViewServer {
+ public:
+  ViewServer(std::vector<ViewFile> files, const ViewServerOptions& options)
+      : is_review_(files.front().is_review),
+        session_(std::move(files)),
+        lifetime_(seconds(options.idle_seconds)) {
+    // Before anybody is sent to a page: what can't be read is said in the terminal.
+    session_.State("");
+    server_.set_default_headers({{"Content-Security-Policy", Policy()},
+                                 {"X-Content-Type-Options", "nosniff"},
+                                 {"X-Frame-Options", "DENY"},
+                                 {"Referrer-Policy", "no-referrer"},
+                                 {"Cache-Control", "no-store"},
+                                 {"Cross-Origin-Opener-Policy", "same-origin"},
+                                 {"Cross-Origin-Resource-Policy", "same-origin"},
+                                 {"Cross-Origin-Embedder-Policy", "require-corp"}});
+    server_.Get(".*", [this](const Request& request, Response& response) { OnGet(request, response); });
+    server_.Post(".*", [this](const Request& request, Response& response) { OnPost(request, response); });
+    server_.Bind(options.port);
+  }
+
+  int Run(bool opens_browser) {
+    Thread serving;
+    serving.Start([this] { server_.Serve(); });
+    std::cout << server_.GetAddress() << std::endl;
+    if (opens_browser && HasDisplay()) {
+      OpenBrowser(server_.GetOneTimeAddress());
+    } else if (opens_browser) {
+      const std::string port = std::to_string(server_.GetPort());
+      WriteErrorLine("Open this address in a browser. From another machine, first: ssh -L " + port +
+                     ":127.0.0.1:" + port + " and this machine's name");
+    }
+    lifetime_.WaitForEnd();
+    lifetime_.End();
+    server_.End();
+    serving.Join();
+    return is_review_ || session_.IsFinished() ? 0 : 1;
+  }
+
+ private:
+  using Request = httplib::Request;
+  using Response = httplib::Response;
+
+  static std::string Policy() {
+    return "default-src 'none'; style-src '" + std::string(kViewStyleHash) + "'; script-src '" +
+           std::string(kViewScriptHash) +
+           "'; connect-src 'self'; img-src data:; base-uri 'none'; form-action 'none'; frame-ancestors "
+           "'none'";
+  }
+
+  // Answers with what `answer` returns, or with what speaks against it.
+  template <typename Answer>
+  void Reply(Response& response, Answer answer) {
+    const std::lock_guard lock(mutex_);
+    try {
+      response.set_content(answer(), "application/json");
+    } catch (const RequestError& error) {
+      response.status = error.GetStatus();
+      response.set_content(ErrorJson(error.what()), "application/json");
+    }
+  }
+
+  void OnGet(const Request& request, Response& response) {
+    lifetime_.NoteRequest();
+    const std::string_view place = server_.GetPlace(request);
+    if (place.empty()) {
+      response.set_content(kViewPage.data(), kViewPage.size(), "text/html; charset=utf-8");
+    } else if (place == "state") {
+      Reply(response, [&] { return session_.State(request.get_param_value("file")); });
+    } else if (place == "events") {
+      SendEvents(response);
+    } else {
+      response.status = 404;
+    }
+  }
+
+  void OnPost(const Request& request, Response& response) {
+    lifetime_.NoteRequest();
+    const std::string_view place = server_.GetPlace(request);
+    const std::string_view body = request.body;
+    if (place == "bye") return lifetime_.HurryUp();
+    if (!request.get_header_value("Content-Type").starts_with("application/json")) {
+      response.status = 400;
+      response.set_content(ErrorJson("The request is no JSON"), "application/json");
+    } else if (place == "choose") {
+      Reply(response, [&] { return session_.Choose(body); });
+    } else if (place == "undo") {
+      Reply(response, [&] { return session_.Undo(body); });
+    } else if (place == "redo") {
+      Reply(response, [&] { return session_.Redo(body); });
+    } else if (place == "save") {
+      Reply(response, [&] { return session_.Save(body); });
+      const std::lock_guard lock(mutex_);
+      if (session_.IsFinished()) lifetime_.End();
+    } else if (place == "give-up") {
+      response.set_content("{}", "application/json");
+      lifetime_.End();
+    } else {
+      response.status = 404;
+    }
+  }
+
+  // Tells the page that the program is there, and the program that the page is.
+  void SendEvents(Response& response) {
+    lifetime_.PageCame();
+    response.set_chunked_content_provider(
+        "text/event-stream",
+        [this](size_t, httplib::DataSink& sink) {
+          constexpr std::string_view kComment = ":\n\n";
+          if (!sink.write(kComment.data(), kComment.size())) return false;
+          if (!lifetime_.WaitForHeartbeat()) sink.done();
+          return true;
+        },
+        [this](bool) { lifetime_.PageWent(); });
+  }
+
+  const bool is_review_;
+  // Held by whoever uses the session.
+  std::mutex mutex_;
+  ViewSession session_;
+  Lifetime lifetime_;
+  LocalServer server_;
+};
+
+}  // namespace
+
+int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options) {
+  return ViewServer(std::move(files), options).Run(options.opens_browser);
+}
+
+}  // namespace vexel_yaml

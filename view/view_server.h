@@ -1,0 +1,26 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "view/settling.h"
+
+namespace vexel_yaml {
+
+struct ViewServerOptions {
+  /// 0 for any that is free.
+  int port = 0;
+  bool opens_browser = true;
+  /// After so many seconds without a request the page is given up.
+  int idle_seconds = 8 * 60 * 60;
+};
+
+/// Shows the files on one page in the person's browser, one after the other, until all are saved, or the page
+/// is given up or closed. Prints its address as one line on standard output.
+///
+/// Returns 0 where all files were saved, or where nothing was to be saved (two versions that are compared),
+/// else 1. The rules and the type information are loaded. Throws what opening the first file throws, and
+/// std::runtime_error where no port can be opened.
+int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options);
+
+}  // namespace vexel_yaml

@@ -1,0 +1,250 @@
+#include "view/view_session.h"
+
+#include <algorithm>
+#include <charconv>
+#include <nlohmann/json.hpp>
+#include <unordered_map>
+#include <unordered_set>
+
+#include "report/report_json.h"
+#include "report/value_text.h"
+#include "view/card_order.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+Json Parse(std::string_view body) {
+  Json json = Json::parse(body, nullptr, false);
+  if (!json.is_object()) throw RequestError(400, "The request is no JSON object");
+  return json;
+}
+
+size_t NumberAt(const Json& json, const char* key, size_t otherwise) {
+  const auto found = json.find(key);
+  if (found == json.end()) return otherwise;
+  if (!found->is_number_unsigned()) throw RequestError(400, std::string(key) + " is no number");
+  return found->get<size_t>();
+}
+
+std::string TextAt(const Json& json, const char* key) {
+  const auto found = json.find(key);
+  if (found == json.end() || !found->is_string()) throw RequestError(400, std::string(key) + " is missing");
+  return found->get<std::string>();
+}
+
+Choices::Change ChangeIn(const Json& json) {
+  if (!json.is_object()) throw RequestError(400, "A choice is no JSON object");
+  const std::string path = TextAt(json, "path");
+  const auto choice = json.find("choice");
+  if (choice != json.end() && choice->is_null()) return {path, std::nullopt};
+  const std::string word = TextAt(json, "choice");
+  if (word == "theirs") return {path, MergeResolve::kLeft};
+  if (word == "ours") return {path, MergeResolve::kRight};
+  if (word == "base") return {path, MergeResolve::kBase};
+  throw RequestError(400, "A choice is theirs, ours, base or null");
+}
+
+std::vector<Choices::Change> ChangesIn(const Json& json) {
+  const auto choices = json.find("choices");
+  if (choices == json.end() || !choices->is_array()) throw RequestError(400, "choices is no list");
+  std::vector<Choices::Change> changes;
+  for (const Json& choice : *choices) changes.push_back(ChangeIn(choice));
+  return changes;
+}
+
+std::string Dump(const Json& json) { return json.dump(-1, ' ', false, Json::error_handler_t::replace); }
+
+// The cards are JSON text already, of which there may be megabytes.
+std::string WithCards(const Json& head, std::string_view key, const std::vector<std::string_view>& cards) {
+  std::string text = Dump(head);
+  text.pop_back();
+  text.append(",\"").append(key).append("\":[");
+  for (size_t i = 0; i < cards.size(); ++i) text.append(i == 0 ? "" : ",").append(cards[i]);
+  return text + "]}";
+}
+
+}  // namespace
+
+std::string ErrorJson(std::string_view message) { return Dump({{"error", OnOneLine(message)}}); }
+
+// One file, and what the page has been told of it.
+class ViewSession::OpenFile {
+ public:
+  explicit OpenFile(const ViewFile& file) : settling_(file) { TakeCards(); }
+
+  // Returns the keys of the cards that are new or other than before.
+  std::vector<std::string> TakeCards() {
+    std::vector<ReportCard> cards = settling_.TakeCards();
+    order_.Arrange(cards);
+    std::unordered_map<std::string, std::string> texts;
+    std::vector<std::string> changed;
+    keys_.clear();
+    for (const ReportCard& card : cards) {
+      const std::string key = Cleaned(card.file_id->GetText());
+      std::string text = CardJson(card, settling_.GetNames());
+      const auto before = texts_.find(key);
+      if (before == texts_.end() || before->second != text) changed.push_back(key);
+      texts.emplace(key, std::move(text));
+      keys_.push_back(key);
+    }
+    texts_ = std::move(texts);
+    return changed;
+  }
+
+  Settling& GetSettling() { return settling_; }
+  const std::vector<std::string>& GetKeys() const { return keys_; }
+  const std::string& GetText(const std::string& key) const { return texts_.at(key); }
+  bool IsSaved() const { return is_saved_; }
+  void Save() {
+    settling_.Save();
+    is_saved_ = true;
+  }
+
+ private:
+  Settling settling_;
+  CardOrder order_;
+  // The cards' keys in their order, and their texts.
+  std::vector<std::string> keys_;
+  std::unordered_map<std::string, std::string> texts_;
+  bool is_saved_ = false;
+};
+
+namespace {
+
+Json NamesOf(const ViewFile& file) {
+  const auto base = OnOneLine(file.base_name);
+  const auto theirs = OnOneLine(file.theirs_name);
+  if (file.is_review) return {{"base", base}, {"result", theirs}};
+  return {{"base", base}, {"theirs", theirs}, {"ours", OnOneLine(file.ours_name)}};
+}
+
+Json HeadOf(const ViewFile& file, Settling& settling) {
+  Json notes = Json::array();
+  for (const std::string& note : settling.GetNotes()) notes.push_back(OnOneLine(note));
+  return {{"version", kReportJsonVersion},
+          {"mode", file.is_review ? "review" : "merge"},
+          {"title", OnOneLine(file.title)},
+          {"names", NamesOf(file)},
+          {"revision", settling.GetRevision()},
+          {"pending", settling.CountPending()},
+          {"conflicts", settling.CountConflicts()},
+          {"can_undo", settling.GetChoices().CanUndo()},
+          {"can_redo", settling.GetChoices().CanRedo()},
+          {"error", OnOneLine(settling.GetError())},
+          {"notes", std::move(notes)}};
+}
+
+}  // namespace
+
+ViewSession::ViewSession(std::vector<ViewFile> files) : files_(std::move(files)), open_(files_.size()) {}
+
+ViewSession::~ViewSession() = default;
+
+ViewSession::OpenFile& ViewSession::Open(size_t file) {
+  if (file >= files_.size()) throw RequestError(404, "There is no such file");
+  if (open_[file] == nullptr) {
+    try {
+      open_[file] = std::make_unique<OpenFile>(files_[file]);
+    } catch (const YAMLError& error) {
+      throw RequestError(409, OnOneLine(files_[file].title + ": " + Explained(error)));
+    }
+  }
+  return *open_[file];
+}
+
+size_t ViewSession::FirstUnsaved(size_t from) const {
+  for (size_t i = 0; i < files_.size(); ++i) {
+    const size_t file = (from + i) % files_.size();
+    if (open_[file] == nullptr || !open_[file]->IsSaved()) return file;
+  }
+  return files_.size();
+}
+
+bool ViewSession::IsFinished() const { return FirstUnsaved(0) == files_.size(); }
+
+Json ViewSession::Head(size_t file) {
+  Json head = HeadOf(files_[file], Open(file).GetSettling());
+  Json files = Json::array();
+  for (size_t i = 0; i < files_.size(); ++i) {
+    OpenFile* open = open_[i].get();
+    files.push_back({{"title", OnOneLine(files_[i].title)},
+                     {"pending", open == nullptr ? Json() : Json(open->GetSettling().CountPending())},
+                     {"saved", open != nullptr && open->IsSaved()}});
+  }
+  head["files"] = std::move(files);
+  head["file"] = file;
+  return head;
+}
+
+std::string ViewSession::State(std::string_view file) {
+  size_t number = FirstUnsaved(0) % files_.size();
+  const char* const end = file.data() + file.size();
+  if (!file.empty() && std::from_chars(file.data(), end, number).ptr != end) {
+    throw RequestError(400, "file is no number");
+  }
+  const OpenFile& open = Open(number);
+  std::vector<std::string_view> cards;
+  for (const std::string& key : open.GetKeys()) cards.push_back(open.GetText(key));
+  return WithCards(Head(number), "cards", cards);
+}
+
+template <typename Step>
+std::string ViewSession::Change(const Json& request, Step step) {
+  const size_t file = NumberAt(request, "file", 0);
+  OpenFile& open = Open(file);
+  if (files_[file].is_review)
+    throw RequestError(409, "Two versions are compared: there is nothing to choose");
+  if (open.IsSaved()) throw RequestError(409, "The file is saved already");
+  if (NumberAt(request, "revision", open.GetSettling().GetRevision()) != open.GetSettling().GetRevision()) {
+    throw RequestError(409, "Another window has changed something meanwhile: load the page again");
+  }
+  const std::vector<std::string> before = open.GetKeys();
+  step(open.GetSettling());
+  const std::vector<std::string> changed = open.TakeCards();
+  Json head = Head(file);
+  Json gone = Json::array();
+  const std::unordered_set<std::string> there(open.GetKeys().begin(), open.GetKeys().end());
+  for (const std::string& key : before) {
+    if (!there.contains(key)) gone.push_back(key);
+  }
+  head["gone"] = std::move(gone);
+  if (open.GetKeys() != before) head["order"] = open.GetKeys();
+  std::vector<std::string_view> cards;
+  for (const std::string& key : changed) cards.push_back(open.GetText(key));
+  return WithCards(head, "changed", cards);
+}
+
+std::string ViewSession::Choose(std::string_view body) {
+  const Json request = Parse(body);
+  const std::vector<Choices::Change> changes = ChangesIn(request);
+  return Change(request, [&](Settling& settling) {
+    if (!settling.Choose(changes))
+      throw RequestError(400, "There is nothing to choose at one of these places");
+  });
+}
+
+std::string ViewSession::Undo(std::string_view body) {
+  return Change(Parse(body), [](Settling& settling) { settling.Undo(); });
+}
+
+std::string ViewSession::Redo(std::string_view body) {
+  return Change(Parse(body), [](Settling& settling) { settling.Redo(); });
+}
+
+std::string ViewSession::Save(std::string_view body) {
+  const size_t file = NumberAt(Parse(body), "file", 0);
+  OpenFile& open = Open(file);
+  if (open.IsSaved()) throw RequestError(409, "The file is saved already");
+  try {
+    open.Save();
+  } catch (const std::runtime_error& error) {
+    throw RequestError(409, OnOneLine(error.what()));
+  }
+  const size_t next = FirstUnsaved(file);
+  return Dump({{"saved", true}, {"next", next == files_.size() ? Json() : Json(next)}});
+}
+
+}  // namespace vexel_yaml
