@@ -10,6 +10,7 @@
 #include "fixups/post_process.h"
 #include "git/script_classes.h"
 #include "git/shown_text.h"
+#include "git/undecided_places.h"
 #include "git/work_files.h"
 #include "merge/conflict_record_file.h"
 #include "platform/file_error.h"
@@ -96,7 +97,7 @@ void AssetMerge::Read(bool is_safe) {
   is_read_safe_ = is_safe;
   read_failure_ = nullptr;
   documents_ = std::make_unique<SceneDocuments>();
-  const auto& [asset, base, left, right] = versions_;
+  const std::string &base = versions_.base, &left = versions_.left, &right = versions_.right;
   const CapturedErrors captured;
   try {
     TimerStat silent("", nullptr);
@@ -128,6 +129,7 @@ int AssetMerge::Merge(const MergeSettings& settings, const Decisions* decisions)
   }
   if (decisions != nullptr) TakeDecisions(*decisions);
   const bool breaks_dependency = settings.is_safe ? MergeScenes() : MergeValues();
+  if (!versions_.mark.empty()) RemoveMarks(*merged_, versions_.mark);
   std::ostringstream text;
   WriteObjects(*merged_, text, threads_);
   text_ = std::move(text).str();
@@ -150,7 +152,10 @@ void AssetMerge::TakeDecisions(const Decisions& decisions) {
 bool AssetMerge::MergeScenes() {
   TimerStat silent("", nullptr);
   SafeMergeResult result = SafeMerge(*documents_, resolver_, {.threads = threads_}, silent);
-  for (const std::string& note : result.notes) std::cerr << note << '\n';
+  for (const std::string& note : result.notes) {
+    // That nothing hangs on what is undecided is no news.
+    if (versions_.mark.empty() || note.find(versions_.mark) == std::string::npos) std::cerr << note << '\n';
+  }
   merged_ = std::move(result.merged);
   return result.breaks_dependency;
 }
@@ -213,7 +218,18 @@ const std::vector<NamedConflict>& AssetMerge::GetConflicts() {
   }
   const SceneDocuments& shown = has_overrides ? unchanged : *documents_;
   conflicts_ = NameConflicts(resolver_, shown.base, shown.left, shown.right, FindScriptClasses);
+  if (!versions_.mark.empty()) std::ranges::for_each(*conflicts_, [&](auto& c) { NameUndecided(c); });
   return *conflicts_;
+}
+
+void AssetMerge::NameUndecided(NamedConflict& conflict) const {
+  const std::string& mark = versions_.mark;
+  Replace(conflict.was, mark, " (undecided)");
+  for (std::string* side : {&conflict.theirs, &conflict.ours}) {
+    Replace(*side, "edits " + mark + " of", "keeps");
+    Replace(*side, "edits " + mark, "keeps it");
+    Replace(*side, ", " + mark, "");
+  }
 }
 
 std::map<std::string, std::string> AssetMerge::GetChoices() const {

@@ -21,6 +21,9 @@ struct AssetVersions {
   std::string base;   ///< Paths of files.
   std::string left;
   std::string right;
+  /// What is undecided in a base that git has made, and what marks its values; see undecided_places.h.
+  std::vector<std::string> undecided = {};
+  std::string mark = {};
 
   bool HasAsset() const;
 };
@@ -65,6 +68,7 @@ class AssetMerge {
   /// The merged asset.
   const std::string& GetText() const { return text_; }
   bool HasConflicts() const { return resolver_.HasPendingConflicts(); }
+  const std::vector<RecordingConflictResolver::Record>& GetRecords() const { return resolver_.GetRecords(); }
   /// What is pending. It takes time to name it, which only the first call does.
   const std::vector<NamedConflict>& GetConflicts();
   /// What has been chosen, as a word of a record file, by the conflict's place.
@@ -79,6 +83,7 @@ class AssetMerge {
   /// Both return whether a broken component dependency is pending.
   bool MergeScenes();
   bool MergeValues();
+  void NameUndecided(NamedConflict& conflict) const;
 
   const AssetVersions versions_;
   /// Whether what has been read is for a safe merge; nothing before that.

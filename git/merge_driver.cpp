@@ -11,6 +11,7 @@
 #include "git/repository.h"
 #include "git/settings.h"
 #include "git/shown_text.h"
+#include "git/undecided_places.h"
 #include "git/work_files.h"
 #include "platform/file_error.h"
 #include "report/report_command.h"
@@ -38,6 +39,7 @@ class DriverRun {
   int Merge() {
     // Git answers while the files are looked at.
     SettingsQuery query;
+    MarkUndecided(versions_);
     keeps_records_ = !is_ancestor_ && repository_.IsChanging();
     const bool is_ours = versions_.HasAsset();
     // Kept until the process ends: giving three scenes back node by node takes as long as merging them.
@@ -50,7 +52,7 @@ class DriverRun {
     }
     int status = merge_->Run(settings_);
     if (status > AssetMerge::kFailed && !is_ancestor_) status = DecideAsBefore(status);
-    if (status != AssetMerge::kFailed && !PutFile(versions_.right, merge_->GetText())) {
+    if (status != AssetMerge::kFailed && !PutMerged()) {
       Complain("cannot write the merged " + versions_.asset);
       status = AssetMerge::kFailed;
     }
@@ -63,6 +65,11 @@ class DriverRun {
       TellConflicts();
     }
     return is_to_confirm ? AssetMerge::kConflicts : status;
+  }
+
+  bool PutMerged() const {
+    return PutFile(versions_.right,
+                   is_ancestor_ ? WithUndecidedPlaces(*merge_, versions_) : merge_->GetText());
   }
 
   // Names the conflicts, and merges once more with what was decided when they came before.
@@ -135,7 +142,7 @@ class DriverRun {
     }
   }
 
-  const AssetVersions versions_;
+  AssetVersions versions_;
   const std::string marker_size_;
   const bool is_ancestor_;
   const Repository repository_;

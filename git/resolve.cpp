@@ -12,6 +12,7 @@
 #include "git/settle.h"
 #include "git/shown_text.h"
 #include "git/stage_files.h"
+#include "git/undecided_places.h"
 #include "git/work_files.h"
 #include "platform/file_error.h"
 
@@ -246,7 +247,8 @@ int RunMergetool(const std::vector<std::string>& arguments) {
   const Repository repository;
   const ConflictRecords records(repository);
   const std::string start = TextOf("./" + asset);
-  const AssetVersions versions = {asset, arguments[0], arguments[2], arguments[1]};
+  AssetVersions versions = {asset, arguments[0], arguments[2], arguments[1]};
+  MarkUndecided(versions);
   const SideNames names = FindSideNames(repository);
   const Settlement settlement = Settle(versions, {records, settings, Choice(), names});
   const int status = settlement.status;

@@ -6,6 +6,7 @@
 
 #include "git/git_call.h"
 #include "git/shown_text.h"
+#include "git/undecided_places.h"
 #include "git/work_files.h"
 #include "platform/temporary_files.h"
 
@@ -101,6 +102,7 @@ bool StageFiles::Write(ScratchFolder& folder, AssetVersions& versions) const {
              ": take one with 'git checkout --ours' or '--theirs', then 'git add' it");
     return false;
   }
+  MarkUndecided(versions);
   return true;
 }
 

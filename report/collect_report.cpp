@@ -15,6 +15,11 @@ using Record = RecordingConflictResolver::Record;
 // What the index of an element that base lacks begins with, so that no element of base has the same path.
 constexpr char kNewElement = '+';
 
+bool IsNewElement(const YAMLScalar* step) {
+  const std::string& text = step->GetText();
+  return text.size() > 1 && text[0] == kNewElement && text[1] >= '0' && text[1] <= '9';
+}
+
 // What stands at `path` below `node`; the path leads through mappings and lists. Null for a new element.
 const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path) {
   for (const YAMLScalar* step : path) {
@@ -23,8 +28,7 @@ const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path) {
       node = mapping->HasDuplicateKeys() ? nullptr : mapping->Get(step);
     } else if (const YAMLSequence* sequence = node->AsSequence()) {
       const auto index = static_cast<size_t>(step->GetIntValue());
-      const bool is_new = step->GetText().starts_with(kNewElement);
-      node = !is_new && index < sequence->Size() ? sequence->GetItems()[index] : nullptr;
+      node = !IsNewElement(step) && index < sequence->Size() ? sequence->GetItems()[index] : nullptr;
     } else {
       return nullptr;
     }
@@ -134,14 +138,17 @@ class Collector {
     if (!pending && record.path.front() == YAMLScalar::underscore) return;
     const FieldPath* const known = KnownPlace(record);
     const FieldPath place = known != nullptr ? *known : PlaceOfPart(record.path);
+    const bool is_new = std::ranges::any_of(place, IsNewElement);
     ReportRow& row = rows_.RowAt(place);
     AddOperation(record.left, row, row.left);
     AddOperation(record.right, row, row.right);
-    if (known == nullptr && place != record.path) {
+    if (known == nullptr && is_new) {
       row.note = "Part of what both sides added to the list";
       // No walk over the result comes by here.
-      if (record.resolution == MergeResolve::kLeft) row.result = row.left;
-      if (record.resolution == MergeResolve::kRight) row.result = row.right;
+      const bool is_right = record.resolution == MergeResolve::kRight;
+      // Base has none, so that left's stands for it in a scene.
+      const bool is_left = record.resolution == MergeResolve::kLeft || files_.settled != nullptr;
+      if (is_right || is_left) row.result = is_right ? row.right : row.left;
     }
     row.pending |= pending;
     row.state = pending ? "conflict" : SettledState(record.resolution);
@@ -165,8 +172,10 @@ class Collector {
   }
 
   // What two additions are merged from is in neither side's diff. Its record counts the elements of the
-  // merged list, where another one stands at the index than in base.
+  // merged list, where another one stands at the index than in base. Where scenes are merged as scenes, it
+  // counts those of base, and says so of what base lacks.
   FieldPath PlaceOfPart(FieldPath path) const {
+    if (files_.settled != nullptr) return path;
     for (size_t i = 1; i < path.size(); ++i) {
       const YAMLNode* parent = NodeAt(&files_.read.base, {path.begin(), path.begin() + static_cast<long>(i)});
       if (parent == nullptr) break;

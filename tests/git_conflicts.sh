@@ -73,6 +73,7 @@ check "a merge stops" stops git merge -q doors
 check "scripts go by their classes" says "CONFLICT $file: Lamp > DoorOpener > speed: was 1, theirs (doors) 2, ours 3"
 check "overrides by what they override" says \
   "CONFLICT $file: PrefabInstance 20 > m_LocalPosition.x of 401: was 1, theirs (doors) 2, ours 3"
+check "the page has one row for it" test "$(grep -c '<tr data-path="PrefabInstance' "$(vexel-merge-git report)")" -eq 1
 git add "$file" 2>"$work/err"
 check "it is said that nothing is settled" grep -q "^warning: $file is staged .* at 3 conflicts" "$work/err"
 touch new && git add new 2>"$work/err"
@@ -166,6 +167,26 @@ check "it has both edits in its lines" grep -qF 'm_Intensity: was 9, theirs 2, o
 git revert --abort
 check "a stash stops" stops git stash pop
 check "it has both edits in its lines, too" grep -qF 'm_Intensity: was 9, theirs 3, ours 5' "$work/err"
+git reset -q --hard
+
+# Two people settle the same conflicts otherwise, and then merge with one another.
+git checkout -q -b calm bright && { git merge -q doors >/dev/null 2>&1 || vexel-merge-git resolve --base "$file" >/dev/null; }
+git commit -q -m calm && git checkout -q -b busy doors && { git merge -q bright >/dev/null 2>&1 || vexel-merge-git resolve --ours "$file" >/dev/null; }
+git commit -q -m busy
+check "nobody's decision is overruled" stops git merge -q calm
+check "it is said that there is nothing to go by" says "CONFLICT $file: Lamp > Light > m_Intensity: was 2 (undecided), theirs (calm) 2, ours 4"
+check "base stands until that is settled" is_at 2 10 2 2
+check "the one side can be taken" vexel-merge-git resolve --ours "$file" >/dev/null
+check "as it was" is_at 4 10 2 2
+git reset -q --hard && git checkout -q -b unlit start && harbour 2 10 1 1 | sed '/&10$/,/speed/d' >"$file" && git commit -q -a -m unlit
+git checkout -q -b kept && { git merge -q bright >/dev/null 2>&1 || vexel-merge-git resolve --base "$file" >/dev/null; }
+git commit -q -m kept && git checkout -q -b gone bright && { git merge -q unlit >/dev/null 2>&1 || vexel-merge-git resolve --theirs "$file" >/dev/null; }
+git commit -q -m gone
+check "nor is what somebody has kept removed" stops git merge -q kept
+check "the lamp is there" is_at 2 10 1 1
+check "and can go" vexel-merge-git resolve --ours "$file" >/dev/null
+check "with all of it" refuses grep -q Lamp "$file"
+
 git reset -q --hard && vexel-merge-git disable >"$work/out"
 check "whoever gives up is told of the attributes" grep -q '^.gitattributes is tracked, and has gone: ' "$work/out"
 
