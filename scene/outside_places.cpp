@@ -67,6 +67,29 @@ bool TakeOut(const ListPlace& list, const IsSought& is_sought) {
   return true;
 }
 
+// Takes the entries out of all lists at and below a node that are nothing but a sought reference.
+bool TakeOutBelow(YAMLNode* node, const IsSought& is_sought) {
+  if (node == nullptr) return false;
+  bool is_changed = false;
+  if (YAMLMapping* mapping = node->AsMapping()) {
+    for (const auto& [key, value] : *mapping) is_changed |= TakeOutBelow(value, is_sought);
+  } else if (YAMLSequence* list = node->AsSequence()) {
+    std::vector<YAMLNode*> items;
+    for (YAMLNode* item : list->GetItems()) {
+      const YAMLScalar* target = GetLocalTarget(item);
+      if (target != nullptr && is_sought(target)) {
+        item->Free();
+      } else {
+        is_changed |= TakeOutBelow(item, is_sought);
+        items.push_back(item);
+      }
+    }
+    is_changed |= items.size() < list->Size();
+    list->SwapItems(std::move(items));
+  }
+  return is_changed;
+}
+
 bool IsEmptyReference(const YAMLMapping& reference) {
   return reference.Size() == 1 && reference.HasKey(YAMLScalar::fileID) &&
          GetLocalTarget(&reference) == nullptr;
@@ -89,7 +112,11 @@ OutsidePlaces::OutsidePlaces(const SceneEdits& edits, const ScenePlan& plan) {
       }
     }
     for (const YAMLScalar* file_id : other_changes.added) {
-      if (!plan.Has(file_id)) fate.going.insert(file_id);
+      if (plan.Has(file_id)) {
+        fate.added_by_other.push_back(file_id);
+      } else {
+        fate.going.insert(file_id);
+      }
     }
     fate.changed_by_deleter = changes.changed;
     fate.changed_by_other = other_changes.changed;
@@ -97,6 +124,21 @@ OutsidePlaces::OutsidePlaces(const SceneEdits& edits, const ScenePlan& plan) {
 }
 
 void OutsidePlaces::Settle(const SceneVersions& versions) const {
+  for (const Fate& fate : fates_) {
+    if (fate.going.empty()) continue;
+    // What the deleter doesn't have would have lost these entries with the rest that it deleted.
+    const IsSought goes = [&](const YAMLScalar* target) { return fate.going.contains(target); };
+    const ReferenceSearch search(FileIDs(fate.going.begin(), fate.going.end()));
+    FileIDs file_ids = fate.added_by_other;
+    file_ids.insert(file_ids.end(), fate.staying.begin(), fate.staying.end());
+    for (const YAMLScalar* file_id : file_ids) {
+      for (VexelObjects* version : {&versions.base, &versions.left, &versions.right}) {
+        YAMLNode* object = version->Get(file_id);
+        if (object == nullptr || !search.MayRefer(*object)) continue;
+        if (TakeOutBelow(GetBody(object), goes)) object->RebuildHash(false);
+      }
+    }
+  }
   SettleFate(fates_[0], versions.base, versions.left, versions.right);
   SettleFate(fates_[1], versions.base, versions.right, versions.left);
 }

@@ -26,6 +26,7 @@ class OutsidePlaces {
   // What one side deleted, and what else there was below it.
   struct Fate {
     std::vector<const YAMLScalar*> removed;
+    std::vector<const YAMLScalar*> added_by_other;  // That stays.
     std::vector<const YAMLScalar*> changed_by_deleter;
     std::vector<const YAMLScalar*> changed_by_other;
     FileIDSet staying;

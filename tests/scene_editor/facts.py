@@ -61,8 +61,16 @@ def _children_reordered(before, after):
     return [child for child in lists[0] if child in lists[1]] != [child for child in lists[1] if child in lists[0]]
 
 
+def _without(value, gone):
+    """A value without the entries of lists that are nothing but a reference to what is gone."""
+    if isinstance(value, list):
+        return [_without(item, gone) for item in value if target_of(item) not in gone]
+    return {key: _without(below, gone) for key, below in value.items()} if isinstance(value, dict) else value
+
+
 def lost(base, side, other, merged):
     """Every edit from `base` to `side` that `merged` doesn't show, as (object, path, value)."""
+    gone = (base.keys() | side.keys() | other.keys()) - merged.keys()
     for file_id in base.keys() | side.keys():
         items = [version.get(file_id) for version in (base, side, other, merged)]
         before, mine, _, after = items
@@ -76,7 +84,7 @@ def lost(base, side, other, merged):
                         _missing((name,), before.fields, mine.fields, None, None)):
                     yield file_id, (name,), mine.fields
                 continue
-            for path, value in _missing((name,), *(item and item.fields for item in items)):
+            for path, value in _missing((name,), *(item and _without(item.fields, gone) for item in items)):
                 yield file_id, path, value
             if name == "Transform" and before and not mine.stripped:
                 lists = [item.fields["m_Children"] if item else [] for item in items]
