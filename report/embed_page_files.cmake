@@ -1,5 +1,5 @@
 # Writes the source that holds a page's style and script, and the hashes by which its policy admits just these two:
-#   cmake -DOUTPUT=FILE.cpp -DHEADER=HEADER -DNAME=Page -DSTYLE=FILE -DSCRIPTS="FILE FILE ..." [-DPAGE=FILE] -P ...
+#   cmake -DOUTPUT=FILE.cpp -DHEADER=HEADER -DNAME=Page -DSTYLES="FILE ..." -DSCRIPTS="FILE ..." [-DPAGE=FILE] -P ...
 # In a PAGE, which is then held as well, {{style}} and {{script}} stand for them.
 
 # The base64 text of the SHA-256 hash of a text: CMake itself gives hexadecimal digits.
@@ -22,13 +22,19 @@ function(base64_hash text result)
   set(${result} ${hash} PARENT_SCOPE)
 endfunction()
 
-file(READ ${STYLE} css)
-set(js "")
-separate_arguments(SCRIPTS)
-foreach(script ${SCRIPTS})
-  file(READ ${script} text)
-  string(APPEND js "${text}")
-endforeach()
+# The files one behind the other.
+function(read_all files result)
+  separate_arguments(files)
+  set(all "")
+  foreach(file ${files})
+    file(READ ${file} text)
+    string(APPEND all "${text}")
+  endforeach()
+  set(${result} "${all}" PARENT_SCOPE)
+endfunction()
+
+read_all("${STYLES}" css)
+read_all("${SCRIPTS}" js)
 base64_hash("${css}" css_hash)
 base64_hash("${js}" js_hash)
 set(constants

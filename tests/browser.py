@@ -3,6 +3,8 @@
 import json
 import subprocess
 import sys
+import time
+import urllib.error
 import urllib.request
 from contextlib import contextmanager
 
@@ -16,10 +18,28 @@ class Page:
 
     def call(self, command, **body):
         request = urllib.request.Request(f"{self.session}/{command}", json.dumps(body).encode())
-        return json.load(urllib.request.urlopen(request, timeout=60))["value"]
+        try:
+            return json.load(urllib.request.urlopen(request, timeout=60))["value"]
+        except urllib.error.HTTPError as error:
+            sys.exit(f"{command} {body}: {json.load(error)['value']['message'].splitlines()[0]}")
 
     def script(self, code, *arguments):
         return self.call("execute/sync", script=code, args=arguments)
+
+    def wait(self, condition, what=None):
+        """Until an expression is true in the page."""
+        deadline = time.monotonic() + 20
+        while not self.script(f"return Boolean({condition})"):
+            if time.monotonic() > deadline:
+                sys.exit(f"{what or condition}: it does not come about")
+            time.sleep(0.02)
+
+    def keys(self, keys):
+        """Pressed wherever the focus is; the keys of a list together."""
+        held = keys if isinstance(keys, list) else [keys]
+        actions = [{"type": "keyDown", "value": key} for key in held]
+        actions += [{"type": "keyUp", "value": key} for key in reversed(held)]
+        self.call("actions", actions=[{"type": "key", "id": "keyboard", "actions": actions}])
 
     def element(self, selector):
         return next(iter(self.call("element", using="css selector", value=selector).values()))
@@ -40,8 +60,11 @@ def browser(folder):
         arguments = [*OPTIONS, f"--user-data-dir={folder}/profile"]
         session = page.call("session", capabilities={"alwaysMatch": {"goog:chromeOptions": {"args": arguments}}})
         page.session += f"/session/{session['sessionId']}"
-        yield page
-        urllib.request.urlopen(urllib.request.Request(page.session, method="DELETE"), timeout=60)
+        # Otherwise the browser would go on writing into the folder.
+        try:
+            yield page
+        finally:
+            urllib.request.urlopen(urllib.request.Request(page.session, method="DELETE"), timeout=60)
     finally:
         driver.kill()
         driver.wait()

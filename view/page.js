@@ -91,8 +91,11 @@ function showRest() {
   rest.hidden = state.mode !== "merge" || state.conflicts === 0;
   rest.firstElementChild.textContent = `${capital(what)}:`;
   rest.setAttribute("aria-label", `Take for ${what}`);
-  rest.replaceChildren(rest.firstElementChild, ...sideButtons(state.names, what, {rest: ""}));
-  for (const choice of rest.querySelectorAll("button")) choice.disabled = open === 0;
+  // The buttons stay the same ones: somebody may be pressing one.
+  if (rest.children.length === 1) rest.append(...sideButtons(state.names, what, {rest: ""}));
+  const choices = rest.querySelectorAll("button");
+  labelButtons(choices, state.names, what);
+  for (const choice of choices) choice.disabled = open === 0;
 }
 
 function showHead() {
@@ -141,7 +144,6 @@ function say(text, {important = false, failure = false, row = null} = {}) {
 async function load(file, words = "") {
   const {cards: list, ...head} = await ask(file === undefined ? "state" : `state?file=${file}`);
   state = head;
-  if (state.mode === "review") state.names.result ??= state.names.theirs;
   cards.clear();
   fieldCounts = current = null;
   fresh = new Set();
@@ -149,7 +151,7 @@ async function load(file, words = "") {
   for (const data of parts) cards.set(data.key, {data, element: null, text: null});
   order = parts.map((part) => part.key);
   drawn = 0;
-  for (const old of main.querySelectorAll(".card")) old.remove();
+  for (const old of main.querySelectorAll(".object")) old.remove();
   main.setAttribute("aria-busy", "true");
   drawRest(order);
   showHead();
@@ -209,7 +211,7 @@ function reorder(newOrder) {
 function keepingFocus(change) {
   const held = document.activeElement;
   const row = held?.closest("tr[data-row]")?.dataset.row;
-  const card = held?.closest(".card")?.dataset.key;
+  const card = held?.closest(".object")?.dataset.key;
   const {choice, take} = held?.dataset ?? {};
   change();
   if (card === undefined || document.activeElement === held) return;

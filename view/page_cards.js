@@ -26,15 +26,19 @@ function button(label, data) {
   return setData(element, data);
 }
 
+function labelButtons(buttons, names, what) {
+  for (const element of buttons) {
+    element.title = `Take ${sideTitle(names, element.dataset.take)} for ${what}`;
+    element.setAttribute("aria-label", element.title);
+  }
+}
+
 // Three buttons that take a side for several conflicts at once.
 function sideButtons(names, what, data) {
-  return choiceSides.map((side) => {
-    const element = button(sideWords[side], {...data, take: side});
-    element.title = `Take ${sideTitle(names, side)} for ${what}`;
-    element.setAttribute("aria-label", element.title);
-    element.classList.add(side);
-    return element;
-  });
+  const buttons = choiceSides.map((side) => button(sideWords[side], {...data, take: side}));
+  for (const element of buttons) element.classList.add(element.dataset.take);
+  labelButtons(buttons, names, what);
+  return buttons;
 }
 
 // Those rows are alike that are about one field of one kind of component.
@@ -59,8 +63,9 @@ function choiceCell(row, side, names) {
 
 function resultCell(row, merging) {
   const content = [cellContent(row.result, "result", row.base)];
-  if (merging && row.state !== "") content.push(make("small", "state", row.pending ? "open" : row.state));
-  if (row.repaired && row.state !== "repaired") content.push(make("small", "state repaired", "repaired"));
+  const kind = row.pending ? "conflict" : row.choice !== null ? "settled" : row.state;
+  if (merging && row.state !== "") content.push(make("span", `badge ${kind}`, row.pending ? "open" : row.state));
+  if (row.repaired && row.state !== "repaired") content.push(make("span", "badge repaired", "repaired"));
   return content;
 }
 
@@ -175,7 +180,7 @@ function describeCard(element, card) {
 }
 
 function makeCard(card, context) {
-  const element = setData(make("section", "card"), {key: card.key});
+  const element = setData(make("section", "object"), {key: card.key});
   describeCard(element, card);
   element.append(cardHead(card, context));
   element.append(make("table", "", tableHead(context), ...card.objects.map((object) => makeGroup(object, context))));

@@ -34,17 +34,21 @@ function showShown() {
 }
 
 function filter() {
-  wanted = {
+  const now = {
     side: side.value,
     kinds: kinds.filter((input) => input.checked).map((input) => input.value),
     words: text.value.toLowerCase().split(/\s+/).filter(Boolean),
   };
+  // Leaving the field says "change" once more, while a button is being pressed.
+  if (JSON.stringify(now) === JSON.stringify(wanted)) return;
+  wanted = now;
   for (const card of cards.values()) {
     if (card.element !== null) card.element.hidden = !matches(card);
   }
   divider.hidden = filtering();
   showShown();
   showRest();
+  if (main.getBoundingClientRect().top < 0) main.scrollIntoView();
 }
 
 byId("filters").addEventListener("change", filter);

@@ -8,7 +8,7 @@ function rowElement(key) {
 function focusRow(key) {
   const element = rowElement(key);
   if (element === null) return;
-  element.closest(".card").hidden = false;
+  element.closest(".object").hidden = false;
   element.tabIndex = -1;
   element.focus({preventScroll: true});
   element.scrollIntoView({block: "center"});
@@ -115,6 +115,14 @@ document.addEventListener("keydown", (event) => {
   event.preventDefault();
   if (!event.repeat || "npjk".includes(key)) command(event.shiftKey);
 });
+
+// What is scrolled to must not hide below the bars, which have more lines in a narrow window.
+const bars = new ResizeObserver(() => {
+  const height = byId("bars").offsetHeight || byId("bar").offsetHeight;
+  document.documentElement.style.scrollPaddingTop = `${height + 8}px`;
+});
+bars.observe(byId("bars"));
+bars.observe(byId("bar"));
 
 window.addEventListener("beforeunload", (event) => {
   if (!ended && !main.inert && state?.can_undo) event.preventDefault();
