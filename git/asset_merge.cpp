@@ -16,11 +16,11 @@
 #include "platform/file_error.h"
 #include "platform/thread.h"
 #include "report/merged_files.h"
-#include "report/override_names.h"
 #include "report/record_patterns.h"
 #include "report/value_text.h"
 #include "rules/setup.h"
 #include "scene/safe_merge.h"
+#include "scene/unmatched_choices.h"
 #include "yaml/write_objects.h"
 
 namespace vexel_yaml {
@@ -71,6 +71,15 @@ std::vector<std::string> EditedObjects(const YAMLMappingDiff& diff, ObjectNames&
     if (known.insert(name).second) objects.push_back(std::move(name));
   }
   return objects;
+}
+
+// Whether an element of a list is on the path, or something that is called like one.
+bool HasElement(const FieldPath& path) {
+  return path.size() > 2 && std::any_of(path.begin() + 2, path.end(), [](const YAMLScalar* component) {
+           const std::string& text = component->GetText();
+           const size_t digits = text.starts_with('+') ? 1 : 0;
+           return text.size() > digits && text.find_first_not_of("0123456789", digits) == std::string::npos;
+         });
 }
 
 void Replace(std::string& text, const std::string& name, const std::string& by) {
@@ -207,23 +216,26 @@ void AssetMerge::SayMessages() const { vexel_yaml::SayMessages(messages_, versio
 
 const std::vector<NamedConflict>& AssetMerge::GetConflicts() {
   if (conflicts_) return *conflicts_;
-  // A safe merge changes what it has read, and an override is known by what both sides have made of it.
+  // A safe merge changes what it has read, and an element of a list is known by what was there before.
   SceneDocuments unchanged;
-  const bool has_overrides = std::ranges::any_of(
-      resolver_.GetRecords(), [](const auto& record) { return IsInOverride(record.path); });
-  if (has_overrides) {
+  const bool has_elements =
+      std::ranges::any_of(resolver_.GetRecords(), [](const auto& record) { return HasElement(record.path); });
+  if (has_elements) {
     const CapturedErrors said_before;
     TimerStat silent("", nullptr);
     ReadScenes(versions_.base, versions_.left, versions_.right, unchanged, threads_, silent);
   }
-  const SceneDocuments& shown = has_overrides ? unchanged : *documents_;
-  conflicts_ = NameConflicts(resolver_, shown.base, shown.left, shown.right, FindScriptClasses);
+  const SceneDocuments& shown = has_elements ? unchanged : *documents_;
+  conflicts_ = NameConflicts(resolver_, {shown.base, shown.left, shown.right, is_read_safe_.value_or(false)},
+                             FindScriptClasses);
   if (!versions_.mark.empty()) std::ranges::for_each(*conflicts_, [&](auto& c) { NameUndecided(c); });
   return *conflicts_;
 }
 
 void AssetMerge::NameUndecided(NamedConflict& conflict) const {
   const std::string& mark = versions_.mark;
+  const bool has_marked_father = conflict.was.starts_with("below ") && conflict.was.ends_with(mark);
+  if (conflict.was.starts_with("nothing") || has_marked_father) conflict.was = "undecided";
   Replace(conflict.was, mark, " (undecided)");
   for (std::string* side : {&conflict.theirs, &conflict.ours}) {
     Replace(*side, "edits " + mark + " of", "keeps");
@@ -245,9 +257,43 @@ std::map<std::string, std::string> AssetMerge::GetChoices() const {
   return choices;
 }
 
+std::set<std::string> AssetMerge::FindBaseless() const {
+  const RecordPatterns patterns(resolver_);
+  std::set<std::string> places;
+  for (const RecordingConflictResolver::Record& record : resolver_.GetRecords()) {
+    const bool is_baseless =
+        record.type == ConflictType::kBothAdd && record.resolution == MergeResolve::kBase;
+    if (is_baseless && is_read_safe_.value_or(false)) places.insert(patterns.For(record));
+  }
+  return places;
+}
+
+std::vector<std::string> AssetMerge::DropUnknownChoices(const std::set<std::string>& known) {
+  const std::vector<FieldPath> unmatched = resolver_.FindUnmatchedPatterns();
+  std::vector<RecordingConflictResolver::RecordResolve> kept, unknown;
+  for (const auto& choice : resolver_.GetResolutions()) {
+    const bool is_unknown =
+        std::ranges::count(unmatched, choice.pattern) > 0 && !known.contains(PathToString(choice.pattern));
+    (is_unknown ? unknown : kept).push_back(choice);
+  }
+  if (unknown.empty()) return {};
+  resolver_.SetResolveMethodForPaths(std::move(unknown));
+  std::vector<std::string> lines = DescribeUnmatchedChoices(resolver_, *merged_);
+  resolver_.SetResolveMethodForPaths(std::move(kept));
+  return lines;
+}
+
 std::string AssetMerge::GetRecord() const {
+  RecordingConflictResolver shown = resolver_;
+  // Those for several places, of which the first one counts here, stand before those for a single one.
+  std::vector<RecordingConflictResolver::RecordResolve> choices = shown.GetResolutions();
+  const auto single = std::stable_partition(choices.begin(), choices.end(), [](const auto& choice) {
+    return std::ranges::count(choice.pattern, YAMLScalar::star) > 0;
+  });
+  std::reverse(choices.begin(), single);
+  shown.SetResolveMethodForPaths(std::move(choices));
   std::ostringstream out;
-  OutputConflictRecords(out, resolver_, false);
+  OutputConflictRecords(out, shown, false);
   return std::move(out).str();
 }
 

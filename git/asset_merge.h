@@ -4,6 +4,7 @@
 #include <map>
 #include <memory>
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -73,7 +74,12 @@ class AssetMerge {
   const std::vector<NamedConflict>& GetConflicts();
   /// What has been chosen, as a word of a record file, by the conflict's place.
   std::map<std::string, std::string> GetChoices() const;
-  /// The record file's text.
+  /// The places where base's value was chosen, and base has none: left's stands there.
+  std::set<std::string> FindBaseless() const;
+  /// Forgets what was chosen for places that are neither in this merge nor among `known`. Returns a line for
+  /// people about each.
+  std::vector<std::string> DropUnknownChoices(const std::set<std::string>& known);
+  /// The record file's text, which goes by the last line for a place.
   std::string GetRecord() const;
 
  private:

@@ -9,6 +9,7 @@
 #include <optional>
 
 #include "git/conflict_messages.h"
+#include "git/decided_lines.h"
 #include "git/folder_lock.h"
 #include "git/git_call.h"
 #include "git/index_state.h"
@@ -26,14 +27,13 @@ namespace {
 
 constexpr std::string_view kSuffix = ".vexel-conflicts";
 constexpr std::string_view kEntrySuffix = ".path";
-constexpr std::string_view kHeading = "Conflict handling:";
 
 // Whether it still looks like one, also after somebody has taken one of the two lines out.
 bool IsRecord(const std::string& path) {
   if (!IsFile(path)) return false;
   // What can't be read is somebody else's.
   return std::ranges::any_of(Pieces(ReadWholeFile(path).value_or(""), '\n'), [](const std::string& line) {
-    return line.starts_with("# What is in conflict in ") || line.starts_with(kHeading);
+    return line.starts_with("# What is in conflict in ") || line.starts_with(kDecidedHeading);
   });
 }
 
@@ -63,15 +63,6 @@ std::string RecordText(const RecordEntry& entry, const AssetMerge& merge) {
     if (!conflict.is_settled) text += "# " + conflict.text + "\n# theirs|ours|base " + conflict.place + "\n";
   }
   return text;
-}
-
-// A line of decisions in the words of record files.
-std::string InWordsOfRecords(const std::string& line) {
-  for (const auto& [word, meant] :
-       {std::pair<std::string, std::string>("theirs ", "left "), {"ours ", "right "}}) {
-    if (line.starts_with(word)) return meant + line.substr(word.size());
-  }
-  return line;
 }
 
 }  // namespace
@@ -223,20 +214,6 @@ bool ConflictRecords::HaveAny() const {
 std::string ShownRecord(std::string_view record) {
   if (record.starts_with("./")) record.remove_prefix(2);
   return std::string(record);
-}
-
-std::string DecidedIn(const std::string& record, const std::vector<std::string>& first) {
-  std::vector<std::string> lines = Pieces(TextOf(record), '\n');
-  const auto last = std::find_if(lines.rbegin(), lines.rend(), [](const std::string& line) {
-    return line == kHeading || line == std::string(kHeading) + '\r';
-  });
-  // The number of lines above the heading.
-  const size_t above = last == lines.rend() ? lines.size() : static_cast<size_t>(lines.rend() - last) - 1;
-  std::string text(above - std::min(above, first.size()), '\n');
-  text += std::string(kHeading) + '\n';
-  for (const std::string& line : first) text += line + '\n';
-  for (size_t i = above + 1; i < lines.size(); ++i) text += InWordsOfRecords(lines[i]) + '\n';
-  return text;
 }
 
 std::string ExcludeFile(const Repository& repository) {

@@ -73,12 +73,6 @@ class ConflictRecords {
 /// The path as people write it.
 std::string ShownRecord(std::string_view record);
 
-/// What a record's last section says, which is the one that people edit. What stands above comes from the
-/// sides of the merge, and whatever it looks like, it decides nothing. Lines keep their numbers. A section
-/// that somebody has removed decides nothing, but can be added to. The lines of `first` come before all
-/// others, and so count first.
-std::string DecidedIn(const std::string& record, const std::vector<std::string>& first = {});
-
 /// Keeps records out of git's sight: they are for one person on one machine. Returns whether that changed
 /// anything. Throws CommandError where it can't.
 bool ExcludeRecords(const Repository& repository);

@@ -6,6 +6,7 @@
 #include "git/asset_merge.h"
 #include "git/conflict_messages.h"
 #include "git/conflict_records.h"
+#include "git/decided_lines.h"
 #include "git/decision_memory.h"
 #include "git/git_call.h"
 #include "git/repository.h"

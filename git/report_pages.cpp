@@ -7,6 +7,7 @@
 
 #include "git/asset_merge.h"
 #include "git/conflict_records.h"
+#include "git/decided_lines.h"
 #include "git/git_call.h"
 #include "git/merged_commits.h"
 #include "git/path_names.h"

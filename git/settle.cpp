@@ -1,10 +1,13 @@
 #include "git/settle.h"
 
 #include <algorithm>
+#include <set>
 #include <vector>
 
 #include "git/conflict_messages.h"
+#include "git/decided_lines.h"
 #include "git/git_call.h"
+#include "git/named_places.h"
 #include "git/questions.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
@@ -16,21 +19,11 @@ namespace {
 
 constexpr int kMostMerges = 3;
 
-// Whether a place fits a pattern, component by component. As texts: as numbers, two file IDs of 19 digits may
-// be equal.
-bool Fits(const std::string& place, const std::string& pattern) {
-  if (pattern.empty()) return true;
-  const std::vector<std::string> wanted = Pieces(pattern + ".", '.');
-  const std::vector<std::string> given = Pieces(place + ".", '.');
-  return std::ranges::equal(wanted, given,
-                            [](const std::string& w, const std::string& g) { return w == "*" || w == g; });
-}
-
 // The decisions that a choice makes about these places, as lines of a record.
-std::vector<std::string> Chosen(const Choice& choice, const std::vector<std::string>& places) {
+std::vector<std::string> Chosen(const Choice& choice, const std::vector<NamedPlace>& places) {
   std::vector<std::string> lines;
-  for (const std::string& place : places) {
-    if (Fits(place, choice.pattern)) lines.push_back(choice.side + " " + place);
+  for (const NamedPlace& place : places) {
+    if (IsMeant(place, choice.pattern)) lines.push_back(choice.side + " " + place.place);
   }
   return lines;
 }
@@ -60,6 +53,7 @@ class Settling {
                            : choice_.side.empty()    ? MergeEdited()
                                                      : MergeWithSide();
     if (!is_merged) return {};
+    TellBaseless();
     entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
     return {status_, std::move(merge_), std::move(entry_)};
   }
@@ -124,7 +118,21 @@ class Settling {
       return false;
     }
     const std::string decided = DecidedIn(record_);
-    return IsStillInConflict("the editor was opened") && Merge(decided);
+    if (!IsStillInConflict("the editor was opened") || !Merge(decided)) return false;
+    std::set<std::string> places;
+    for (const RecordedConflict& conflict : entry_.conflicts) places.insert(conflict.place);
+    for (const std::string& line : merge_->DropUnknownChoices(places)) Say(line);
+    for (const std::string& line : DescribeCommentedChoices(record_, places)) Say(line);
+    return true;
+  }
+
+  // Says where whoever wants base's value gets another one.
+  void TellBaseless() const {
+    const std::set<std::string> places = merge_->FindBaseless();
+    for (const RecordedConflict& conflict : entry_.conflicts) {
+      if (!places.contains(conflict.place)) continue;
+      Say("Warning: base has nothing at " + NamedPlace::NameIn(conflict.text) + ", so theirs stands there");
+    }
   }
 
   bool MergeAnswered() {
@@ -152,18 +160,20 @@ class Settling {
   // Only at conflicts, since a pattern in the record itself would also decide about places that only one side
   // has changed.
   bool MergeWithSide() {
-    std::vector<std::string> places;
+    std::vector<NamedPlace> places;
     // Whoever says no more than a side means the rest, or all where nothing is left.
     const bool is_rest = choice_.pattern.empty() && entry_.CountPending() > 0;
     for (const RecordedConflict& conflict : entry_.conflicts) {
-      if (!is_rest || !conflict.is_settled) places.push_back(conflict.place);
+      if (!is_rest || !conflict.is_settled)
+        places.push_back({conflict.place, NamedPlace::NameIn(conflict.text)});
     }
     std::vector<std::string> chosen = Chosen(choice_, places);
     if (has_failed_) chosen.push_back(choice_.side + " " + choice_.pattern);
     for (int merges = 1;; ++merges) {
       if (!Merge(DecidedIn(record_, chosen))) return false;
-      std::vector<std::string> pending;
-      for (const NamedConflict& conflict : merge_->GetConflicts()) pending.push_back(conflict.place);
+      std::vector<NamedPlace> pending;
+      for (const NamedConflict& conflict : merge_->GetConflicts())
+        pending.push_back({conflict.place, conflict.name});
       bool is_new = false;
       for (const std::string& line : Chosen(choice_, pending)) {
         if (std::ranges::find(chosen, line) != chosen.end()) continue;
@@ -173,7 +183,8 @@ class Settling {
       if (!is_new || merges == kMostMerges) break;
     }
     if (!chosen.empty() || (status_ == AssetMerge::kMerged && choice_.pattern.empty())) return true;
-    Complain("no conflict in " + versions_.asset + " fits '" + choice_.pattern + "'");
+    Complain("no conflict in " + versions_.asset + " fits '" + choice_.pattern + "'" +
+             SuggestionFor(choice_.pattern, places));
     return false;
   }
 

@@ -59,6 +59,25 @@ const YAMLMappingDiff& BodyDiff(const YAMLMappingDiff& object) {
   return *static_cast<const ChangeMappingOperation*>(body)->GetDiff();
 }
 
+const YAMLScalar* NewScalar(const Operation* operation) {
+  if (operation == nullptr) return nullptr;
+  const auto kind = operation->GetKind();
+  if (kind != Operation::Kind::kAdd && kind != Operation::Kind::kChange) return nullptr;
+  return static_cast<const ValuedOperation*>(operation)->GetValue()->AsScalar();
+}
+
+// The new values of a few fields, such as "x 2, z 3"; empty where more than that was done.
+std::string ScalarsText(const YAMLMappingDiff& diff) {
+  std::string text;
+  if (diff.GetEntries().size() > kMostKeys) return text;
+  for (const YAMLMappingDiff::Entry& entry : diff.GetEntries()) {
+    const YAMLScalar* value = NewScalar(entry.operation);
+    if (value == nullptr) return {};
+    text += (text.empty() ? "" : ", ") + entry.key->GetText() + " " + value->GetText();
+  }
+  return text.size() > kMostOfValue ? std::string() : text;
+}
+
 std::string MappingText(const YAMLMappingDiff& diff) {
   const std::string keys = KeysText(diff);
   const ChangeSequenceOperation* order = diff.GetKeyOrder();
@@ -90,9 +109,8 @@ std::string FullText(const Operation* operation) {
 
 class ConflictNamer {
  public:
-  ConflictNamer(const RecordingConflictResolver& resolver, const VexelObjects& base, const VexelObjects& left,
-                const VexelObjects& right)
-      : patterns_(resolver), base_(base), left_(left), right_(right), names_({&right, &left, &base}) {}
+  ConflictNamer(const RecordingConflictResolver& resolver, const ComparedVersions& versions)
+      : patterns_(resolver), versions_(versions), names_({&versions.right, &versions.left, &versions.base}) {}
 
   void FindScripts(const std::vector<const Record*>& records, const ScriptSearch& search) {
     std::set<std::string> guids;
@@ -112,17 +130,22 @@ class ConflictNamer {
                               {},
                               {},
                               {}};
-    const auto overridden = OverrideAt(record, base_, left_, right_);
+    const auto overridden = OverrideAt(record, versions_);
     if (overridden) {
       conflict.name += " > " + overridden->name;
     } else if (path.size() > 2) {
       conflict.name += " > " + FieldText(path);
     }
     const YAMLNode* base_value = overridden ? overridden->base_value : ValueAt(path);
-    if (path.size() > 1 && base_value != nullptr) conflict.was = WasText(*base_value);
+    if (record.type == ConflictType::kBothAdd) {
+      conflict.was = "nothing";
+      if (versions_.are_scenes) conflict.was += " (theirs stands until settled)";
+    } else if (path.size() > 1 && base_value != nullptr) {
+      conflict.was = IsAboutFather(path) ? FatherText(*base_value) : WasText(*base_value);
+    }
     conflict.theirs = SideText(record, record.left, true);
     conflict.ours = SideText(record, record.right, false);
-    conflict.edits = conflict.was + '\n' + FullText(record.left) + '\n' + FullText(record.right);
+    conflict.edits = BaseContent(path) + '\n' + FullText(record.left) + '\n' + FullText(record.right);
     return conflict;
   }
 
@@ -136,16 +159,60 @@ class ConflictNamer {
     return class_name.empty() || class_name == "GameObject" ? path : path + " > " + class_name;
   }
 
-  // Of a place that no list is on the way to: the index in a path is none of base's.
   const YAMLNode* ValueAt(const FieldPath& path) const {
-    const YAMLNode* node = &base_;
+    const YAMLNode* node = &versions_.base;
     for (const YAMLScalar* component : path) {
-      const YAMLMapping* mapping = node->AsMapping();
-      if (mapping == nullptr || mapping->HasDuplicateKeys()) return nullptr;
-      node = mapping->Get(component);
+      const YAMLSequence* list = versions_.are_scenes ? node->AsSequence() : nullptr;
+      const auto index = static_cast<size_t>(component->GetIntValue());
+      if (list != nullptr) {
+        node = IsIndex(component->GetText()) && index < list->Size() ? list->GetItems()[index] : nullptr;
+      } else {
+        const YAMLMapping* mapping = node->AsMapping();
+        node = mapping == nullptr || mapping->HasDuplicateKeys() ? nullptr : mapping->Get(component);
+      }
       if (node == nullptr) return nullptr;
     }
     return node;
+  }
+
+  // All that goes or stays with a conflict: of an object, what belongs to it or hangs below it as well, and
+  // of an element that can't be told, its list.
+  std::string BaseContent(const FieldPath& path) {
+    FieldPath place = path;
+    while (place.size() > 2 && ValueAt(place) == nullptr) place.pop_back();
+    if (place.size() > 1) {
+      const YAMLNode* value = ValueAt(place);
+      return value == nullptr ? std::string() : TextOf(*value);
+    }
+    const YAMLScalar* owner = names_.GetOwner(path.front());
+    const std::string own_path = names_.GetPath(path.front());
+    std::string content;
+    for (const YAMLMapping::Slot& slot : versions_.base) {
+      const std::string& there = names_.GetPath(slot.key);
+      const bool is_below = !own_path.empty() && there.starts_with(own_path) &&
+                            (there.size() == own_path.size() || there[own_path.size()] == '/');
+      if (is_below || names_.GetOwner(slot.key) == owner) content += TextOf(*slot.value) + '\n';
+    }
+    return content;
+  }
+
+  static std::string TextOf(const YAMLNode& value) {
+    const YAMLScalar* scalar = value.AsScalar();
+    return scalar == nullptr ? value.GetYAMLString() : scalar->GetText();
+  }
+
+  static bool IsAboutFather(const FieldPath& path) {
+    return path.back() == YAMLScalar::mFather || path.back() == YAMLScalar::mTransformParent;
+  }
+
+  std::string FatherText(const YAMLNode& reference) {
+    const YAMLScalar* father = LocalReference(&reference);
+    return father == nullptr ? "at the top" : "below " + PlaceText(father);
+  }
+
+  std::string PlaceText(const YAMLScalar* file_id) {
+    const std::string name = OnOneLine(names_.Describe(file_id));
+    return name.empty() ? "object " + file_id->GetText() : Shortened(name, kMostOfValue);
   }
 
   std::string WasText(const YAMLNode& value) {
@@ -169,8 +236,9 @@ class ConflictNamer {
       case Operation::Kind::kChangeMapping: {
         const YAMLMappingDiff& diff = *static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
         if (record.path.size() > 1) {
-          const std::string target = NewTargetText(diff);
-          return OnOneLine(target.empty() ? MappingText(diff) : target);
+          if (IsAboutFather(record.path) && NewTarget(diff) != nullptr) return MoveText(NewTarget(diff));
+          std::string values = NewTarget(diff) == nullptr ? ScalarsText(diff) : NewTargetText(diff);
+          return OnOneLine(values.empty() ? MappingText(diff) : values);
         }
         const std::string parts = PartsText(diff, names_.GetPath(record.path.front()));
         return OnOneLine(parts.empty() ? MappingText(BodyDiff(diff)) : parts);
@@ -204,13 +272,20 @@ class ConflictNamer {
     return count > kMostKeys ? text + " and " + std::to_string(count - kMostKeys) + " more" : text;
   }
 
-  // What a reference leads to now, where that is all that has changed of it; else empty.
-  std::string NewTargetText(const YAMLMappingDiff& diff) {
+  // What a reference leads to now, where that is all that has changed of it; else null.
+  static const YAMLScalar* NewTarget(const YAMLMappingDiff& diff) {
     const Operation* change = diff.Get(YAMLScalar::fileID);
     if (change == nullptr || change->GetKind() != Operation::Kind::kChange || diff.GetEntries().size() > 1)
-      return {};
-    const YAMLScalar* file_id = static_cast<const ChangeOperation*>(change)->GetValue()->AsScalar();
-    if (file_id == nullptr) return {};
+      return nullptr;
+    return NewScalar(change);
+  }
+
+  std::string MoveText(const YAMLScalar* father) {
+    return IsNullReference(father) ? "moves it to the top" : "moves it below " + PlaceText(father);
+  }
+
+  std::string NewTargetText(const YAMLMappingDiff& diff) {
+    const YAMLScalar* file_id = NewTarget(diff);
     const std::string target = names_.Describe(file_id);
     return "{fileID: " + file_id->GetText() +
            (target.empty() ? "}" : "} (" + Shortened(target, kMostOfValue) + ")");
@@ -224,9 +299,7 @@ class ConflictNamer {
   }
 
   const RecordPatterns patterns_;
-  const VexelObjects& base_;
-  const VexelObjects& left_;
-  const VexelObjects& right_;
+  const ComparedVersions versions_;
   ObjectNames names_;
 };
 
@@ -245,14 +318,13 @@ std::string WithName(std::string_view side, std::string_view name) {
 
 }  // namespace
 
-std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver, const VexelObjects& base,
-                                         const VexelObjects& left, const VexelObjects& right,
-                                         const ScriptSearch& search) {
+std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver,
+                                         const ComparedVersions& versions, const ScriptSearch& search) {
   std::vector<const Record*> pending;
   for (const Record& record : resolver.GetRecords()) {
     if (record.resolution == MergeResolve::kConflict) pending.push_back(&record);
   }
-  ConflictNamer namer(resolver, base, left, right);
+  ConflictNamer namer(resolver, versions);
   namer.FindScripts(pending, search);
   std::vector<NamedConflict> conflicts;
   for (const Record* record : pending) conflicts.push_back(namer.Name(*record));

@@ -9,6 +9,7 @@
 
 #include "merge/recording_conflict_resolver.h"
 #include "report/object_names.h"
+#include "report/override_names.h"
 
 namespace vexel_yaml {
 
@@ -20,12 +21,12 @@ struct NamedConflict {
   std::string thing;
   /// Such as "Level01/Lamp Post > Light > m_Intensity"; no other one of the list has the same.
   std::string name;
-  /// Base's value; empty where there was none, or none that fits into a line.
+  /// Base's value, or that it has none; empty for an object, and for a value that doesn't fit into a line.
   std::string was;
   /// What each side did, such as "4" or "removes it".
   std::string theirs;
   std::string ours;
-  /// Base's value and both edits in full, by which the same conflict is known when it comes again.
+  /// Base's content and both edits in full, by which the same conflict is known when it comes again.
   std::string edits;
 };
 
@@ -35,9 +36,8 @@ using ScriptSearch = std::function<ScriptClasses(const std::set<std::string>& gu
 
 /// The pending conflicts of a merge of these versions, in the order of its records. Where scripts are among
 /// them, `search` is asked once.
-std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver, const VexelObjects& base,
-                                         const VexelObjects& left, const VexelObjects& right,
-                                         const ScriptSearch& search);
+std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver,
+                                         const ComparedVersions& versions, const ScriptSearch& search);
 
 /// The conflict in one line; the sides' own names stand in brackets where they have some.
 std::string ConflictLine(const NamedConflict& conflict, std::string_view theirs, std::string_view ours);

@@ -77,20 +77,36 @@ const YAMLNode* BaseValue(const VexelObjects& base, const FieldPath& path, const
   return nullptr;
 }
 
-}  // namespace
+// The override whose place in the list is known.
+std::optional<NamedOverride> OverrideIn(const VexelObjects& version, const FieldPath& path) {
+  const YAMLSequence* list = ListIn(version, path);
+  const auto index = static_cast<size_t>(path[kListLength]->GetIntValue());
+  if (list == nullptr || index >= list->Size() || list->GetItems()[index] == nullptr) return std::nullopt;
+  const YAMLMapping* entry = list->GetItems()[index]->AsMapping();
+  const std::string name = NameOf(entry);
+  if (name.empty()) return std::nullopt;
+  return NamedOverride{name, PlaceIn(entry, path)};
+}
 
 bool IsInOverride(const FieldPath& path) {
   return path.size() >= kFieldAt && path[kListLength - 1] == Key("m_Modifications");
 }
 
+}  // namespace
+
 std::optional<NamedOverride> OverrideAt(const RecordingConflictResolver::Record& record,
-                                        const VexelObjects& base, const VexelObjects& left,
-                                        const VexelObjects& right) {
+                                        const ComparedVersions& versions) {
   const FieldPath& path = record.path;
   if (!IsInOverride(path)) return std::nullopt;
+  if (versions.are_scenes) {
+    const bool is_new = path[kListLength]->GetText().starts_with('+');
+    std::optional<NamedOverride> found = OverrideIn(is_new ? versions.left : versions.base, path);
+    if (found && is_new) found->base_value = nullptr;
+    return found;
+  }
   std::optional<std::string> name;
-  for (const YAMLMapping* theirs : EntriesWith(left, path, record.left)) {
-    for (const YAMLMapping* ours : EntriesWith(right, path, record.right)) {
+  for (const YAMLMapping* theirs : EntriesWith(versions.left, path, record.left)) {
+    for (const YAMLMapping* ours : EntriesWith(versions.right, path, record.right)) {
       const std::string common = NameOf(theirs);
       if (common.empty() || common != NameOf(ours) || name == common) continue;
       // Several fit.
@@ -99,7 +115,7 @@ std::optional<NamedOverride> OverrideAt(const RecordingConflictResolver::Record&
     }
   }
   if (!name) return std::nullopt;
-  return NamedOverride{*name, BaseValue(base, path, *name)};
+  return NamedOverride{*name, BaseValue(versions.base, path, *name)};
 }
 
 }  // namespace vexel_yaml

@@ -133,6 +133,36 @@ check "the command shows all" stops vexel-merge-git check "$file"
 check "lamps of one name are told apart" test "$(grep -c 'Lamp > m_Layer ([13]0.GameObject.m_Layer): ' "$work/out")" -eq 2
 git merge --abort
 
+# What somebody writes into the record.
+cat >"$work/editor" <<'EDITOR'
+sed -i 's/^# theirs.ours.base 12/ours 12/; s/^# theirs.ours.base 13/# ours 13/' "$1"
+printf '%s\n' 'theirs 12.Light.m_Intensity' 'ours 13.MonoBehavior.speed' >>"$1"
+EDITOR
+git checkout -q all && { git merge -q doors >/dev/null 2>&1 || :; }
+check "what has no line is still open" stops env GIT_EDITOR="sh '$work/editor'" vexel-merge-git resolve "$file"
+check "of two lines for a place the last one counts" is_at 4 20 1 1
+check "a path that is nowhere is named" says \
+  "Warning: the choice for '13.MonoBehavior.speed' matches nothing; did you mean '13.MonoBehaviour.speed'?"
+check "and goes" refuses grep -q MonoBehavior.speed "$file.vexel-conflicts"
+check "so is a choice that is a comment" says "Warning: '# ours 13.MonoBehaviour.speed' chooses nothing: take the \"#\" off"
+check "a place has the name that its line has" stops vexel-merge-git resolve --theirs --path "Lamp > DoorOpener > speed" "$file"
+check "or that of its object" stops vexel-merge-git resolve --ours --path Lamp "$file"
+check "which settles all of that" is_at 9 20 3 1
+check "a name that is nowhere is an error" stops vexel-merge-git resolve --ours --path PrefabInstnace "$file"
+check "which names the nearest one" says "error: no conflict in $file fits 'PrefabInstnace'; did you mean 'PrefabInstance 20'?"
+git merge --abort
+
+# Lines about a vector, and about what base lacks.
+door() { harbour 2 10 1 1 | sed "s/  speed: 1/&\n  offset: {x: $1, y: $2}${3:+\n  tint: $3}/" >"$file" && git commit -q -a -m door; }
+git checkout -q -b door start && door 0 0 && git checkout -q -b wide && door 2 0 4 && git checkout -q door && door 0 3 5
+check "a merge with both stops" stops git merge -q wide
+check "the line has the components" says "CONFLICT $file: Lamp > DoorOpener > offset: was {x: 0, y: 0}, theirs (wide) x 2, ours y 3"
+check "it says that base has none" says \
+  "CONFLICT $file: Lamp > DoorOpener > tint: was nothing (theirs stands until settled), theirs (wide) adds 4, ours adds 5"
+vexel-merge-git resolve --base "$file" >/dev/null 2>"$work/err"
+check "who wants base's is told what it gets" says "Warning: base has nothing at Lamp > DoorOpener > tint, so theirs stands there"
+git reset -q --hard
+
 # In a rebase, "theirs" are one's own commits.
 git checkout -q doors
 check "a rebase stops" stops git rebase -q all
@@ -186,6 +216,20 @@ check "nor is what somebody has kept removed" stops git merge -q kept
 check "the lamp is there" is_at 2 10 1 1
 check "and can go" vexel-merge-git resolve --ours "$file" >/dev/null
 check "with all of it" refuses grep -q Lamp "$file"
+git reset -q --hard && git config rerere.enabled true
+# unlit_at SPEED: one side removes the lamp, the other edits it, while its script was edited before.
+unlit_at() {
+  git checkout -q -B faster start && harbour 2 10 "$1" 1 >"$file" && git commit -q --allow-empty -a -m faster
+  git checkout -q -B unlit && harbour 2 10 1 1 | sed '/&10$/,/speed/d' >"$file" && git commit -q -a -m unlit
+  git checkout -q -B bright faster && harbour 9 10 "$1" 1 >"$file" && git commit -q -a -m bright
+  stops git merge -q unlit
+}
+unlit_at 1 && vexel-merge-git resolve --theirs "$file" >/dev/null && git reset -q --hard
+check "the same removal is remembered" unlit_at 1
+check "as it was settled" says "1 conflict of $file settled as before"
+git reset -q --hard
+check "that of a lamp which was another one is not" unlit_at 7
+check "but is asked" refuses grep -q 'settled as before' "$work/err"
 
 git reset -q --hard && vexel-merge-git disable >"$work/out"
 check "whoever gives up is told of the attributes" grep -q '^.gitattributes is tracked, and has gone: ' "$work/out"

@@ -103,6 +103,6 @@ check "a choice brings up another question" answer tktob
 check "which is asked again after an answer that contradicts the first one" \
   grep -q '  not settled by that: Object 2 > Transform > m_Father$' "$work/out"
 check "it is announced" grep -q '^  open now: Object 2 > Transform > m_Father$' <(sed 's/.*? //' "$work/out")
-check "it says where to" grep -qFx '  ours    {fileID: 31} (Object 3)' "$work/out"
+check "it says where to" grep -qFx '  ours    moves it below Object 3' "$work/out"
 
 end_of_checks "people are asked"
