@@ -142,7 +142,7 @@ _vexel_merge_git() {
       ;;
     "resolve "*)
       if [[ "$cur" == -* && " ${COMP_WORDS[*]:0:COMP_CWORD} " != *" -- "* ]]; then
-        _vexel_offer -p --theirs --left --ours --right --base --path --color= --force --
+        _vexel_offer -p --theirs --left --ours --right --base --path --color= --as-is --force --
       else
         compopt -o filenames
         mapfile -t items < <(_vexel_unmerged)

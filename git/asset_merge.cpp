@@ -47,20 +47,6 @@ class CapturedErrors {
   std::streambuf* previous_;
 };
 
-// Both stay loaded, and can be loaded only once a process: what is wrong with them is wrong for every merge.
-void LoadRulesAndTypes(const MergeSettings& settings) {
-  static const std::exception_ptr failure = [&]() -> std::exception_ptr {
-    try {
-      TimerStat silent("", nullptr);
-      SetupRulesAndTypes(settings.rules, settings.type_info, silent);
-      return nullptr;
-    } catch (...) {
-      return std::current_exception();
-    }
-  }();
-  if (failure) std::rethrow_exception(failure);
-}
-
 // The objects that a diff is about, as people call them; a game object is one with its components.
 std::vector<std::string> EditedObjects(const YAMLMappingDiff& diff, ObjectNames& names) {
   std::vector<std::string> objects;
@@ -89,6 +75,20 @@ void Replace(std::string& text, const std::string& name, const std::string& by) 
 }
 
 }  // namespace
+
+void LoadRulesAndTypes(const MergeSettings& settings) {
+  // What is wrong with them is wrong for every merge.
+  static const std::exception_ptr failure = [&]() -> std::exception_ptr {
+    try {
+      TimerStat silent("", nullptr);
+      SetupRulesAndTypes(settings.rules, settings.type_info, silent);
+      return nullptr;
+    } catch (...) {
+      return std::current_exception();
+    }
+  }();
+  if (failure) std::rethrow_exception(failure);
+}
 
 void SayMessages(std::string messages, const AssetVersions& versions) {
   if (messages.empty()) return;

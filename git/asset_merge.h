@@ -108,6 +108,9 @@ class AssetMerge {
   Edits edits_;
 };
 
+/// Loads the rules and the type information, once a process. Throws what SetupRulesAndTypes throws.
+void LoadRulesAndTypes(const MergeSettings& settings);
+
 /// Says what a program or a merge has said about the versions, with the asset's own name.
 void SayMessages(std::string messages, const AssetVersions& versions);
 

@@ -1,5 +1,6 @@
 #include "git/check.h"
 
+#include <algorithm>
 #include <set>
 
 #include "git/asset_merge.h"
@@ -11,6 +12,7 @@
 #include "git/new_faults.h"
 #include "git/repository.h"
 #include "git/settings.h"
+#include "git/settled_by_hand.h"
 #include "git/shown_text.h"
 #include "git/stage_files.h"
 #include "git/work_files.h"
@@ -60,9 +62,13 @@ Arguments Parse(const Paths& arguments) {
 
 // The files of ours that the paths mean, from the top folder.
 Paths AssetsBelow(const Paths& paths) {
-  ProgramCall call = GitCall({"--literal-pathspecs", "ls-files", "-z", "--full-name", "--"});
+  ProgramCall call = GitCall({"--literal-pathspecs", "ls-files", "-z", "--full-name", "--cached", "--others",
+                              "--exclude-standard", "--error-unmatch", "--"});
   call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
-  const Paths found = Pieces(RunProgram(call).output, '\0');
+  const ProgramResult files = RunProgram(call);
+  // Git has said which one isn't there.
+  if (files.status != 0) throw CommandError("");
+  const Paths found = Pieces(files.output, '\0');
   const std::set<std::string> once(found.begin(), found.end());
   return OursAmong(Paths(once.begin(), once.end()), TopFolder());
 }
@@ -75,10 +81,13 @@ class Check {
 
   void Staged() {
     const auto staged = StagedChanges();
-    for (const RecordEntry& entry : records_.Entries()) {
-      const auto blob = staged.find(entry.asset);
-      if (blob == staged.end() || blob->second != entry.hash) continue;
-      Report(entry.asset, entry.conflicts, "staged as the merge left it");
+    const std::vector<RecordEntry> entries = records_.Entries();
+    const auto in_conflict = entries.empty() ? ConflictPaths() : PathsInConflict(true);
+    if (!in_conflict) throw CommandError("", kGitRefused);
+    for (const RecordEntry& entry : entries) {
+      // What stays as ours has it is no change, but may be what nobody has settled.
+      const bool is_part = staged.contains(entry.asset) || in_conflict->staged.contains(entry.asset);
+      if (is_part) ReportStaged(entry);
     }
     if (conflicts_only_) return;
     Paths changed;
@@ -94,9 +103,13 @@ class Check {
     const std::string commit = FindCommit(name);
     Paths parents = Pieces(Line(Git({"rev-list", "--parents", "-n", "1", commit})), ' ');
     parents.erase(parents.begin());
-    if (parents.size() == 2) Undecided(FindMerged(commit));
-    if (parents.empty() || conflicts_only_) return;
-    for (const std::string& asset : OursAmong(ChangedPaths(parents.front(), commit, {}))) {
+    if (parents.size() < CountParents(commit)) return MissHistory(name);
+    if (parents.size() == 2) CheckMerge(name, parents, commit);
+    if (conflicts_only_) return;
+    const Paths changed = parents.empty()
+                              ? Pieces(Git({"ls-tree", "-r", "-z", "--name-only", commit}).output, '\0')
+                              : ChangedPaths(parents.front(), commit, {});
+    for (const std::string& asset : OursAmong(changed)) {
       Paths before;
       for (const std::string& parent : parents) before.push_back(TextAt(parent + ":" + asset));
       ReportFaults(asset, TextAt(commit + ":" + asset), before);
@@ -115,13 +128,16 @@ class Check {
       for (const RecordEntry& entry : records_.Entries()) assets.insert(entry.asset);
     }
     for (const std::string& asset : assets) {
-      const RecordEntry entry = records_.Entry(asset);
+      RecordEntry entry = records_.Entry(asset);
       if (!in_conflict->unmerged.contains(asset)) {
-        Report(asset, entry.conflicts, "staged as the merge left it");
-      } else if (!entry.conflicts.empty()) {
-        Report(asset, entry.conflicts, "in conflict");
-      } else {
+        ReportStaged(entry);
+      } else if (entry.conflicts.empty()) {
         Unmerged(asset);
+      } else {
+        const std::string text = TextOf("./" + asset);
+        const std::string merged = records_.MergedText(asset);
+        if (!merged.empty() && text != merged) records_.MarkSettledByHand(entry, text, settings_);
+        Report(entry, " has ");
       }
       if (!conflicts_only_) ReportFaults(asset, TextOf("./" + asset), {TextAt("HEAD:" + asset)});
     }
@@ -132,20 +148,74 @@ class Check {
     return GitQuietly({"cat-file", "blob", object}).output;
   }
 
+  // Those that the commit itself names, which a shallow clone may lack.
+  static size_t CountParents(const std::string& commit) {
+    const Paths lines = Pieces(Git({"cat-file", "commit", commit}).output, '\n');
+    return static_cast<size_t>(
+        std::count_if(lines.begin(), std::ranges::find(lines, ""),
+                      [](const std::string& line) { return line.starts_with("parent "); }));
+  }
+
+  void MissHistory(const std::string& commit) {
+    is_clean_ = false;
+    Complain("what " + commit + " comes from is not in this shallow clone; 'git fetch --unshallow' gets it");
+  }
+
+  void CheckMerge(const std::string& name, const Paths& parents, const std::string& commit) {
+    const Paths bases = Pieces(GitQuietly({"merge-base", "--all", parents[0], parents[1]}).output, '\n');
+    if (bases.empty() && Line(Git({"rev-parse", "--is-shallow-repository"})) == "true") {
+      return MissHistory(name);
+    }
+    if (bases.size() > 1) {
+      Say("warning: the parents of " + name +
+          " have several common ancestors, so it can't be told what was settled in it");
+    }
+    if (bases.size() == 1) Undecided(FindMerged(commit));
+  }
+
+  void ReportStaged(RecordEntry entry) {
+    const auto blobs = IndexBlobs({entry.asset}, true);
+    if (!blobs) throw CommandError("", kGitRefused);
+    const auto blob = blobs->find(entry.asset);
+    if (blob == blobs->end()) {
+      // Both sides have renamed it, and each of the new names has what the merge left.
+      for (const auto& [path, staged] : StagedChanges()) {
+        if (staged == entry.hash) Report({path, {}, {}, entry.conflicts, {}}, " is staged with ");
+      }
+      return;
+    }
+    if (blob->second != entry.hash) records_.MarkSettledByHand(entry, TextAt(blob->second), settings_);
+    Report(entry, " is staged with ");
+  }
+
   // What a merge commit has as the merge left it.
   void Undecided(const MergedCommits& merged) {
     ScratchFolder scratch;
     for (const std::string& asset : OursAmong(ChangedOnBothSides(merged, {}))) {
       AssetVersions versions;
-      if (!WriteVersions(merged, asset, scratch, versions) || !versions.HasAsset()) continue;
+      const bool are_complete = WriteVersions(merged, asset, scratch, versions);
+      if (versions.left.empty() || versions.right.empty() || !versions.HasAsset()) continue;
       AssetMerge merge(versions);
-      // What could not be merged was made by hand.
-      if (merge.RunQuietly(settings_) == AssetMerge::kFailed || !merge.HasConflicts()) continue;
-      const ProgramResult blob =
-          GitQuietly({"rev-parse", "--verify", "--quiet", merged.commit + ":" + asset});
-      if (Line(blob) != Line(RunProgram(HashCall(asset, merge.GetText())))) continue;
-      Report(asset, ConflictsAfter(merge, asset, {}, {}), "in this commit as the merge left it");
+      if (!are_complete || merge.RunQuietly(settings_) == AssetMerge::kFailed) {
+        ReportUnmerged(merged, asset);
+        continue;
+      }
+      if (!merge.HasConflicts()) continue;
+      RecordEntry entry = {asset, {}, {}, ConflictsAfter(merge, asset, {}, {}), {}};
+      const auto sides = [&] { return SideTexts{TextOf(versions.base), TextOf(versions.left)}; };
+      MarkSettledByHand(merge.GetText(), TextAt(merged.commit + ":" + asset), settings_, sides,
+                        entry.conflicts);
+      if (IsSettled(entry)) continue;
+      Complain(asset + " stands in this commit as the merge left it, at " +
+               CountOfConflicts(entry.CountPending()));
     }
+  }
+
+  // What could not be merged was made by hand, or left as it was.
+  void ReportUnmerged(const MergedCommits& merged, const std::string& asset) {
+    if (TextAt(merged.commit + ":" + asset) != TextAt(merged.ours + ":" + asset)) return;
+    is_clean_ = false;
+    Complain(asset + " could not be merged, and stands in this commit as ours had it");
   }
 
   void ReportFaults(const std::string& asset, const std::string& text, const Paths& before) {
@@ -166,17 +236,19 @@ class Check {
       Complain(asset + " is in conflict");
       return;
     }
-    Report(asset, ConflictsAfter(merge, asset, {}, {}), "in conflict");
+    Report({asset, {}, {}, ConflictsAfter(merge, asset, {}, {}), {}}, " has ");
   }
 
-  void Report(const std::string& asset, const std::vector<RecordedConflict>& conflicts,
-              const std::string& state) {
-    const RecordEntry entry = {asset, {}, {}, conflicts, false};
-    if (entry.CountPending() == 0) return;
+  void Report(const RecordEntry& entry, const std::string& state) {
+    if (!IsSettled(entry)) Complain(entry.asset + state + Unsettled(entry));
+  }
+
+  // Lists the conflicts that aren't.
+  bool IsSettled(const RecordEntry& entry) {
+    if (entry.CountPending() == 0) return true;
     is_clean_ = false;
-    TellConflicts(asset, conflicts);
-    Complain(asset + " is " + state + ", with base's values at " + CountOfConflicts(entry.CountPending()) +
-             "; to settle: " + ResolveCall(asset) + " (with --base to keep these values)");
+    TellConflicts(entry.asset, entry.conflicts);
+    return false;
   }
 
   const Repository repository_;

@@ -36,6 +36,12 @@ void TellConflicts(const std::string& asset, const std::vector<RecordedConflict>
   for (const std::string& line : Lines(asset, conflicts)) Tell(line);
 }
 
+std::string Unsettled(const RecordEntry& entry) {
+  return CountOfConflicts(entry.CountPending()) +
+         " that nobody has settled; to settle: " + ResolveCall(entry.asset) +
+         ", or to keep what stands there: " + ResolveCall(entry.asset, "resolve --as-is");
+}
+
 std::string ResolveCall(const std::string& asset, const std::string& command) {
   return "vexel-merge-git " + command + (asset.starts_with('-') ? " -- " : " ") + Typeable(asset);
 }

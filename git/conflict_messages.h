@@ -14,6 +14,9 @@ void SayConflicts(const std::string& asset, const std::vector<RecordedConflict>&
 /// Prints all of them to standard output.
 void TellConflicts(const std::string& asset, const std::vector<RecordedConflict>& conflicts);
 
+/// Such as "2 conflicts that nobody has settled", and how to go on.
+std::string Unsettled(const RecordEntry& entry);
+
 /// The command that settles the conflicts in this file, or with `command`, another one.
 std::string ResolveCall(const std::string& asset, const std::string& command = "resolve");
 

@@ -12,12 +12,14 @@
 #include "git/decided_lines.h"
 #include "git/folder_lock.h"
 #include "git/git_call.h"
-#include "git/index_state.h"
 #include "git/marked_block.h"
 #include "git/name_in_use.h"
 #include "git/path_names.h"
 #include "git/record_hook.h"
+#include "git/settled_by_hand.h"
+#include "git/setup.h"
 #include "git/shown_text.h"
+#include "git/stage_files.h"
 #include "git/work_files.h"
 #include "platform/read_whole_file.h"
 
@@ -27,6 +29,7 @@ namespace {
 
 constexpr std::string_view kSuffix = ".vexel-conflicts";
 constexpr std::string_view kEntrySuffix = ".path";
+constexpr std::string_view kMergedSuffix = ".merged";
 
 // Whether it still looks like one, also after somebody has taken one of the two lines out.
 bool IsRecord(const std::string& path) {
@@ -72,7 +75,8 @@ ConflictRecords::ConflictRecords(const Repository& repository)
 
 ConflictRecords::Places ConflictRecords::PlacesFor(const std::string& asset) const {
   const std::string kept = folder_ + "/" + HashedPath(asset);
-  return {"./" + asset + std::string(kSuffix), kept + std::string(kSuffix), kept + std::string(kEntrySuffix)};
+  return {"./" + asset + std::string(kSuffix), kept + std::string(kSuffix), kept + std::string(kEntrySuffix),
+          kept + std::string(kMergedSuffix)};
 }
 
 std::string ConflictRecords::Find(const std::string& asset) const {
@@ -86,6 +90,28 @@ RecordEntry ConflictRecords::Entry(const std::string& asset) const {
   return ReadEntry(PlacesFor(asset).entry);
 }
 
+std::string ConflictRecords::MergedText(const std::string& asset) const {
+  return TextOf(PlacesFor(asset).merged);
+}
+
+void ConflictRecords::MarkSettledByHand(RecordEntry& entry, const std::string& text,
+                                        const MergeSettings& settings) const {
+  const std::string merged = MergedText(entry.asset);
+  if (merged.empty()) {
+    // It could not be merged, or not by this version of the program.
+    for (RecordedConflict& conflict : entry.conflicts) conflict.is_settled = true;
+    return;
+  }
+  const auto sides = [&] {
+    ScratchFolder scratch(repository_);
+    AssetVersions versions;
+    const StageFiles stages(entry.asset);
+    if (!stages.AreComplete() || !stages.Write(scratch, versions)) return SideTexts();
+    return SideTexts{TextOf(versions.base), TextOf(versions.left)};
+  };
+  vexel_yaml::MarkSettledByHand(merged, text, settings, sides, entry.conflicts);
+}
+
 std::vector<RecordEntry> ConflictRecords::Entries() const {
   std::vector<RecordEntry> entries;
   std::error_code error;
@@ -95,21 +121,21 @@ std::vector<RecordEntry> ConflictRecords::Entries() const {
     // A crash has left it without its text.
     if (!entries.back().asset.empty()) continue;
     entries.pop_back();
-    unlink(std::filesystem::path(file.path()).replace_extension(kSuffix).c_str());
+    for (const std::string_view suffix : {kSuffix, kMergedSuffix})
+      unlink(std::filesystem::path(file.path()).replace_extension(suffix).c_str());
     unlink(file.path().c_str());
   }
   std::ranges::sort(entries, {}, &RecordEntry::asset);
   return entries;
 }
 
-std::string ConflictRecords::Leave(RecordEntry entry, const AssetMerge& merge,
+std::string ConflictRecords::Leave(RecordEntry entry, const AssetMerge& merge, std::string_view merged,
                                    const std::function<std::string()>& hash,
                                    const MergeSettings& settings) const {
-  const std::string text = RecordText(entry, merge);
   std::string record;
   {
     const FolderLock lock(repository_);
-    record = Place(std::move(entry), text, hash, !settings.has_other_hooks);
+    record = Place(std::move(entry), merge, merged, hash, settings.hooks_folder);
   }
   if (record.empty()) return record;
   // The record is there all the same.
@@ -121,9 +147,40 @@ std::string ConflictRecords::Leave(RecordEntry entry, const AssetMerge& merge,
   return record;
 }
 
+bool ConflictRecords::LeaveUnmerged(RecordEntry entry, const std::function<std::string()>& hash,
+                                    const MergeSettings& settings) const {
+  const FolderLock lock(repository_);
+  Remove(entry.asset);
+  return Remember(PlacesFor(entry.asset), entry, hash, settings.hooks_folder);
+}
+
+bool ConflictRecords::Remember(const Places& places, RecordEntry& entry,
+                               const std::function<std::string()>& hash,
+                               const std::string& hooks_folder) const {
+  // The first version had a list of this name.
+  if (IsFile(folder_)) unlink(folder_.c_str());
+  const bool is_first = mkdir(folder_.c_str(), 0777) == 0;
+  if (!is_first && !IsFolder(folder_)) return false;
+  entry.hash = hash();
+  if (!WriteEntry(places.entry, entry)) return false;
+  const bool are_placed = hooks_folder.empty() && PlaceHooks(repository_);
+  const std::vector<std::string> foreign = ForeignGuards(repository_, hooks_folder);
+  if (is_first && !foreign.empty()) {
+    Say("warning: hooks of your own are in use (" + Joined(foreign) +
+        "), so nothing stops a commit of what nobody has settled: run 'vexel-merge-git check --staged' "
+        "before "
+        "it, or there");
+  } else if (is_first && hooks_folder.empty() && !are_placed) {
+    Say("warning: no hooks can be placed here, so nothing stops a commit of what nobody has settled: run "
+        "'vexel-merge-git check --staged' before it");
+  }
+  return true;
+}
+
 // Remembered first, so that no record is there that nobody removes.
-std::string ConflictRecords::Place(RecordEntry entry, const std::string& text,
-                                   const std::function<std::string()>& hash, bool may_use_hook) const {
+std::string ConflictRecords::Place(RecordEntry entry, const AssetMerge& merge, std::string_view merged,
+                                   const std::function<std::string()>& hash,
+                                   const std::string& hooks_folder) const {
   const Places places = PlacesFor(entry.asset);
   const std::string name = entry.asset + std::string(kSuffix);
   const bool is_beside = entry.CountPending() > 0;
@@ -133,13 +190,9 @@ std::string ConflictRecords::Place(RecordEntry entry, const std::string& text,
   const bool is_ours = IsFile(places.entry) && IsRecord(places.beside);
   const bool is_free = access(places.beside.c_str(), F_OK) != 0;
   const bool is_for_us = IsPlain(name) && (!in_use || !in_use->Get());
-  // The first version had a list of this name.
-  if (IsFile(folder_)) unlink(folder_.c_str());
-  if (mkdir(folder_.c_str(), 0777) != 0 && !IsFolder(folder_)) return {};
-  entry.hash = hash();
-  if (!WriteEntry(places.entry, entry)) return {};
-  if (may_use_hook) PlaceHooks(repository_);
-  if (!PutFile(places.kept, text)) return {};
+  const std::string text = RecordText(entry, merge);
+  if (!Remember(places, entry, hash, hooks_folder)) return {};
+  if (!PutFile(places.merged, merged) || !PutFile(places.kept, text)) return {};
   if (!is_beside) {
     if (is_ours && IsForUs(name)) unlink(places.beside.c_str());
     return places.kept;
@@ -150,45 +203,27 @@ std::string ConflictRecords::Place(RecordEntry entry, const std::string& text,
   return places.kept;
 }
 
+void ConflictRecords::TakeAsIs(const std::string& asset, const std::string& hash) const {
+  const FolderLock lock(repository_);
+  RecordEntry entry = Entry(asset);
+  if (entry.asset.empty()) {
+    // What both sides have renamed is remembered by its old name.
+    for (RecordEntry& renamed : Entries()) {
+      if (renamed.hash == hash) entry = std::move(renamed);
+    }
+  }
+  if (entry.asset.empty()) return;
+  entry.hash = hash;
+  for (RecordedConflict& conflict : entry.conflicts) conflict.is_settled = true;
+  const Places places = PlacesFor(entry.asset);
+  WriteEntry(places.entry, entry);
+  if (Find(entry.asset) == places.beside) unlink(places.beside.c_str());
+}
+
 void ConflictRecords::Remove(const std::string& asset) const {
   const Places places = PlacesFor(asset);
   if (Find(asset) == places.beside) unlink(places.beside.c_str());
-  unlink(places.kept.c_str());
-  unlink(places.entry.c_str());
-}
-
-void ConflictRecords::Sweep(bool is_committed) const {
-  if (!IsFolder(folder_)) return;
-  const FolderLock lock(repository_);
-  if (repository_.IsLocked()) return;
-  const auto paths = PathsInConflict();
-  if (!paths) return;
-  const std::vector<RecordEntry> entries = Entries();
-  std::vector<std::string> staged;
-  for (const RecordEntry& entry : entries) {
-    if (!is_committed && paths->staged.contains(entry.asset)) staged.push_back(entry.asset);
-  }
-  const auto blobs = IndexBlobs(staged);
-  if (!blobs) return;
-  for (const RecordEntry& entry : entries) {
-    if (paths->unmerged.contains(entry.asset)) continue;
-    const auto blob = blobs->find(entry.asset);
-    const bool is_staged = !is_committed && paths->staged.contains(entry.asset);
-    if (!is_staged || blob == blobs->end() || blob->second != entry.hash) {
-      Remove(entry.asset);
-    } else if (entry.CountPending() > 0 && !entry.is_told) {
-      TellStaged(entry);
-    }
-  }
-  RemoveHooks();
-}
-
-void ConflictRecords::TellStaged(RecordEntry entry) const {
-  Say("warning: " + entry.asset + " is staged as the merge left it, with base's values at " +
-      CountOfConflicts(entry.CountPending()) +
-      " that nobody has settled; to settle: " + ResolveCall(entry.asset));
-  entry.is_told = true;
-  WriteEntry(PlacesFor(entry.asset).entry, entry);
+  for (const std::string& file : {places.kept, places.merged, places.entry}) unlink(file.c_str());
 }
 
 // With the last record of this work tree: the hooks go, unless another one has a record.

@@ -29,6 +29,7 @@ constexpr std::string_view kUsage =
        vexel-merge-git status
        vexel-merge-git resolve -p [--color=<when>] [--force] [--] [<file>...]
        vexel-merge-git resolve [--theirs | --ours | --base] [--path <pattern>] [--force] [--] <file>...
+       vexel-merge-git resolve --as-is [--] <file>...
        vexel-merge-git check [--conflicts] [--staged | <commit> | [--] <file>...]
        vexel-merge-git preview <branch>
        vexel-merge-git report [-o <file>] [<merge commit>] [-- <path>...]
@@ -40,7 +41,7 @@ constexpr std::string_view kUsage =
   status     say what is set, and whether the programs are found
   resolve    merge conflicting files (of folders, all below) once more: with what you answer to -p,
              which asks conflict by conflict, with a side's values, or with what the records say;
-             stage those in which nothing is left
+             stage those in which nothing is left, or with --as-is, all as they stand
   check      say which conflicts nobody has settled, and which scenes are broken: of the conflicts
              at hand, in what is staged, or in a commit; status 1 where there are some
   preview    say what merging a branch would do, and who collides with whom; nothing is written

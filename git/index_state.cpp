@@ -24,11 +24,20 @@ std::vector<IndexLine> IndexLines(const std::string& output) {
   return lines;
 }
 
+// Of the lines of "ls-files --stage"; files in conflict have none.
+std::map<std::string, std::string> BlobsIn(const std::string& output) {
+  std::map<std::string, std::string> blobs;
+  for (const IndexLine& line : IndexLines(output)) {
+    if (line.fields.size() == 3 && line.fields[2] == "0") blobs[line.path] = line.fields[1];
+  }
+  return blobs;
+}
+
 }  // namespace
 
-std::optional<ConflictPaths> PathsInConflict() {
+std::optional<ConflictPaths> PathsInConflict(bool in_users_index) {
   ProgramCall call = GitCall({"ls-files", "-z", "-t", "--unmerged", "--resolve-undo"});
-  call.without = {kIndexVariable};
+  if (!in_users_index) call.without = {kIndexVariable};
   const ProgramResult result = RunProgram(call);
   if (result.status != 0) return std::nullopt;
   ConflictPaths paths;
@@ -38,23 +47,37 @@ std::optional<ConflictPaths> PathsInConflict() {
   return paths;
 }
 
-std::optional<std::map<std::string, std::string>> IndexBlobs(const std::vector<std::string>& paths) {
-  std::map<std::string, std::string> blobs;
-  if (paths.empty()) return blobs;
+std::optional<std::map<std::string, std::string>> IndexBlobs(const std::vector<std::string>& paths,
+                                                             bool in_users_index) {
+  if (paths.empty()) return std::map<std::string, std::string>();
   ProgramCall call = GitCall({"--literal-pathspecs", "ls-files", "-z", "--stage", "--"});
   if (paths.size() <= kMostArguments) call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
-  call.without = {kIndexVariable};
+  if (!in_users_index) call.without = {kIndexVariable};
   const ProgramResult result = RunProgram(call);
   if (result.status != 0) return std::nullopt;
-  for (const IndexLine& line : IndexLines(result.output)) {
-    if (line.fields.size() == 3 && line.fields[2] == "0") blobs[line.path] = line.fields[1];
-  }
-  return blobs;
+  return BlobsIn(result.output);
 }
 
-std::map<std::string, std::string> StagedChanges() {
-  const ProgramResult result = GitQuietly({"diff-index", "--cached", "--raw", "-z", "--no-renames",
-                                           "--no-abbrev", "--no-relative", "HEAD", "--"});
+std::set<std::string> EditedFiles(const std::vector<std::string>& paths) {
+  if (paths.empty()) return {};
+  ProgramCall call =
+      GitCall({"--literal-pathspecs", "diff-files", "--name-only", "-z", "--no-relative", "--"});
+  if (paths.size() <= kMostArguments) call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
+  call.without = {kIndexVariable};
+  const std::vector<std::string> edited = Pieces(RunProgram(call).output, '\0');
+  return {edited.begin(), edited.end()};
+}
+
+std::map<std::string, std::string> StagedChanges(bool in_users_index) {
+  ProgramCall call = GitCall({"diff-index", "--cached", "--raw", "-z", "--no-renames", "--no-abbrev",
+                              "--no-relative", "HEAD", "--"});
+  call.errors = ProgramCall::Errors::kDropped;
+  if (!in_users_index) call.without = {kIndexVariable};
+  const ProgramResult result = RunProgram(call);
+  if (result.status != 0) {
+    call.arguments = {"git", "ls-files", "-z", "--stage"};
+    return BlobsIn(RunProgram(call).output);
+  }
   std::map<std::string, std::string> blobs;
   const std::vector<std::string> pieces = Pieces(result.output, '\0');
   // Two modes, two blobs and a letter, then the path.

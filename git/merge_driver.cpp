@@ -32,8 +32,10 @@ class DriverRun {
       return Merge();
     } catch (const FileError& error) {
       Complain(error.what());
-      return LeaveUnmerged();
+    } catch (const CommandError& error) {
+      if (*error.what() != '\0') Complain(error.what());
     }
+    return LeaveUnmerged();
   }
 
  private:
@@ -75,7 +77,7 @@ class DriverRun {
 
   // Names the conflicts, and merges once more with what was decided when they came before.
   int DecideAsBefore(int status) {
-    entry_ = {versions_.asset, {}, FindSideNames(repository_), {}, false};
+    entry_ = {versions_.asset, {}, FindSideNames(repository_), {}, {}};
     entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, {});
     if (!settings_.remembers_decisions) return status;
     const std::vector<std::string> lines = DecisionMemory(repository_).Recall(entry_.conflicts);
@@ -105,16 +107,30 @@ class DriverRun {
   }
 
   int LeaveUnmerged() {
-    RemoveRecord();
     if (is_ancestor_) {
       // Ours as the ancestor of both sides would make what theirs did look undone, and drop it.
       PutFile(versions_.right, TextOf(versions_.base));
-    } else {
-      Say(versions_.asset +
-          " is not merged, but left as ours has it; take it so with 'git add', or theirs with 'git checkout "
-          "--theirs'");
+      return AssetMerge::kFailed;
     }
+    Say(versions_.asset + " is not merged, but left as ours has it; take it so with '" +
+        ResolveCall(versions_.asset, "resolve --as-is") + "', or theirs with 'git checkout --theirs'");
+    if (keeps_records_) GuardUnmerged();
     return AssetMerge::kFailed;
+  }
+
+  void GuardUnmerged() {
+    const RecordEntry entry = {versions_.asset,
+                               {},
+                               FindSideNames(repository_),
+                               {{{}, "not merged, but left as ours has it", {}, false}},
+                               {}};
+    const auto hash = [&] { return Line(RunProgram(HashCall(versions_.asset, TextOf(versions_.right)))); };
+    try {
+      if (records_.LeaveUnmerged(entry, hash, settings_)) return;
+    } catch (const FileError& error) {
+      Complain(error.what());
+    }
+    Complain("cannot write the record of " + versions_.asset);
   }
 
   // The merge goes on whatever fails here.
@@ -131,7 +147,7 @@ class DriverRun {
     // Git answers while it is asked other things.
     Program hash(HashCall(versions_.asset, merge_->GetText()));
     const std::string record = records_.Leave(
-        entry_, *merge_, [&] { return Line(hash.Wait()); }, settings_);
+        entry_, *merge_, merge_->GetText(), [&] { return Line(hash.Wait()); }, settings_);
     if (record.empty()) {
       Complain("cannot write the record of " + versions_.asset);
     } else if (entry_.CountPending() > 0) {

@@ -47,8 +47,9 @@ bool Questions::Begin(bool again) {
   if (again) {
     AssetMerge* blank = merge_({}, true);
     if (blank == nullptr) return false;
-    for (const NamedConflict& conflict : blank->GetConflicts())
-      questions_.push_back({conflict, {}, {}, false});
+    for (const NamedConflict& conflict : blank->GetConflicts()) {
+      if (!kept_.contains(conflict.place)) questions_.push_back({conflict, {}, {}, false});
+    }
   }
   AssetMerge* merge = merge_({}, false);
   if (merge == nullptr) return false;
@@ -58,7 +59,7 @@ bool Questions::Begin(bool again) {
     if (choice != choices.end()) question.earlier = choice->second;
   }
   Update(*merge, false);
-  TellHeading();
+  if (!questions_.empty()) TellHeading();
   return true;
 }
 
@@ -137,7 +138,7 @@ void Questions::Update(AssetMerge& merge, bool tells) {
     }
   }
   for (const NamedConflict& conflict : merge.GetConflicts()) {
-    if (!open.contains(conflict.place)) continue;
+    if (!open.contains(conflict.place) || kept_.contains(conflict.place)) continue;
     questions_.push_back({conflict, {}, {}, true});
     tell("open now: ", questions_.back());
   }

@@ -20,9 +20,10 @@ class Questions {
   /// that has failed, which has been said.
   using Merge = std::function<AssetMerge*(const std::vector<std::string>& chosen, bool is_blank)>;
 
-  /// Neither `prompt` nor `entry`, what is remembered of the file, is owned.
-  Questions(Prompt& prompt, const RecordEntry& entry, Merge merge)
-      : prompt_(prompt), entry_(entry), merge_(std::move(merge)) {}
+  /// What stands at the places `kept` is not asked about. Neither `prompt` nor `entry`, what is remembered of
+  /// the file, is owned, nor are these.
+  Questions(Prompt& prompt, const RecordEntry& entry, const std::set<std::string>& kept, Merge merge)
+      : prompt_(prompt), entry_(entry), kept_(kept), merge_(std::move(merge)) {}
 
   /// Asks until nothing is left or the user has had enough: about what is open or, if `again`, about all.
   /// The last merge is then the one with the answers. False where a merge has failed.
@@ -60,6 +61,7 @@ class Questions {
 
   Prompt& prompt_;
   const RecordEntry& entry_;
+  const std::set<std::string>& kept_;
   const Merge merge_;
   std::vector<Question> questions_;
   std::vector<Step> steps_;

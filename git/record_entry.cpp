@@ -11,10 +11,9 @@ namespace vexel_yaml {
 
 namespace {
 
-constexpr std::string_view kTold = "told";
 constexpr std::string_view kSettled = "settled";
 constexpr std::string_view kPending = "pending";
-// Path, blob, state and two names; 1.0.1 knew the first two.
+// Path, two blobs and two names; 1.0.1 knew the first two.
 constexpr size_t kLinesBefore = 5;
 
 }  // namespace
@@ -27,7 +26,7 @@ RecordEntry ReadEntry(const std::string& path) {
   std::vector<std::string> lines = Pieces(TextOf(path), '\n');
   const size_t count = lines.size();
   lines.resize(std::max(count, kLinesBefore));
-  RecordEntry entry = {UnquotedPath(lines[0]), lines[1], {lines[3], lines[4]}, {}, lines[2] == kTold};
+  RecordEntry entry = {UnquotedPath(lines[0]), lines[1], {lines[3], lines[4]}, {}, lines[2]};
   for (size_t i = kLinesBefore; i < count; ++i) {
     const std::vector<std::string> fields = Pieces(lines[i], '\t');
     if (fields.size() == 4)
@@ -37,8 +36,7 @@ RecordEntry ReadEntry(const std::string& path) {
 }
 
 bool WriteEntry(const std::string& path, const RecordEntry& entry) {
-  std::string text = QuotedPath(entry.asset) + "\n" + entry.hash + "\n";
-  text += entry.is_told ? kTold : "";
+  std::string text = QuotedPath(entry.asset) + "\n" + entry.hash + "\n" + entry.told_hash;
   text += "\n" + entry.names.theirs + "\n" + entry.names.ours + "\n";
   for (const RecordedConflict& conflict : entry.conflicts) {
     text += conflict.is_settled ? kSettled : kPending;

@@ -25,8 +25,8 @@ struct RecordEntry {
   std::string hash;
   SideNames names;
   std::vector<RecordedConflict> conflicts;
-  /// Whether somebody has been told that it was staged undecided.
-  bool is_told = false;
+  /// The staged blob of which somebody has been told that it is undecided.
+  std::string told_hash;
 
   size_t CountPending() const;
 };

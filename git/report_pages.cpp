@@ -4,6 +4,7 @@
 #include <filesystem>
 #include <iterator>
 #include <optional>
+#include <set>
 
 #include "git/asset_merge.h"
 #include "git/conflict_records.h"
@@ -46,6 +47,24 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   }
   if (argument != arguments.end()) parsed.paths.assign(argument + 1, arguments.end());
   return parsed;
+}
+
+// The files below the paths, or all, that were in conflict until somebody staged them.
+Paths StagedConflicts(const Paths& pathspecs) {
+  ProgramCall call = GitCall({"ls-files", "-z", "--resolve-undo", "--full-name", "--"});
+  call.arguments.insert(call.arguments.end(), pathspecs.begin(), pathspecs.end());
+  std::set<std::string> paths;
+  for (const std::string& entry : Pieces(RunProgram(call).output, '\0'))
+    paths.insert(entry.substr(entry.find('\t') + 1));
+  return {paths.begin(), paths.end()};
+}
+
+// Those that are not settled and committed.
+Paths Remembered(Paths paths) {
+  const Repository repository;
+  const ConflictRecords records(repository);
+  std::erase_if(paths, [&](const std::string& path) { return records.Entry(path).asset.empty(); });
+  return paths;
 }
 
 // Made pages, one asset after the other.
@@ -142,15 +161,18 @@ int RunReportPages(const std::vector<std::string>& arguments) {
   const std::string page =
       parsed.page.empty() ? "" : (std::filesystem::current_path() / parsed.page).string();
   std::optional<MergedCommits> merged;
-  Paths paths;
+  Paths paths, staged;
   if (!parsed.commit.empty()) {
     merged = FindMerged(parsed.commit);
     paths = ChangedOnBothSides(*merged, parsed.paths);
   } else {
     if (parsed.paths.empty()) GoToTop();
     paths = UnmergedBelow(parsed.paths).value_or(Paths());
+    staged = StagedConflicts(parsed.paths);
   }
   GoToTop();
+  staged = Remembered(std::move(staged));
+  paths.insert(paths.end(), staged.begin(), staged.end());
   const Paths assets = OursAmong(paths);
   if (assets.empty()) {
     throw CommandError(merged ? "no file of ours was changed on both sides of " + parsed.commit

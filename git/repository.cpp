@@ -48,6 +48,13 @@ Repository::Repository() : folder_(FindFolder()), common_folder_(Variable("GIT_C
 
 bool Repository::IsLocked() const { return FileExists(Path("index.lock")); }
 
+bool Repository::IsAtWork() const {
+  for (const char* name : {"MERGE_HEAD", "CHERRY_PICK_HEAD", "REVERT_HEAD", "rebase-merge", "rebase-apply"}) {
+    if (FileExists(Path(name))) return true;
+  }
+  return false;
+}
+
 bool Repository::IsChanging() const {
   if (!IsLocked()) return false;
   if (FileExists(".git") || !Variable("GIT_WORK_TREE").empty()) return true;

@@ -22,6 +22,9 @@ class Repository {
   /// one that is there.
   bool IsChanging() const;
 
+  /// Whether git is in the middle of a merge, a rebase, or a pick of commits.
+  bool IsAtWork() const;
+
   /// Whether git holds the index right now.
   bool IsLocked() const;
 

@@ -61,6 +61,8 @@ Arguments Parse(const std::vector<std::string>& arguments) {
       parsed.asks = true;
     } else if (argument->starts_with("--color=")) {
       parsed.colour = ColourNamed(argument->substr(8));
+    } else if (*argument == "--as-is") {
+      choice.as_is = true;
     } else if (*argument == "--") {
       parsed.files.insert(parsed.files.end(), argument + 1, arguments.end());
       break;
@@ -73,6 +75,7 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   if (!choice.pattern.empty() && choice.side.empty())
     throw WrongUsage("--path goes with --theirs, --ours or --base");
   if (!choice.side.empty() && parsed.asks) throw WrongUsage("-p asks for the side: name none");
+  if (choice.as_is && (!choice.side.empty() || parsed.asks)) throw WrongUsage("--as-is goes with no choice");
   return parsed;
 }
 
@@ -144,7 +147,16 @@ class Resolving {
   // Resolves a file, and stages it if nothing is left. Returns whether that is so.
   bool Resolve(const std::string& asset) {
     StageFiles stages(asset);
+    if (stages.IsStaged() && IsCommitted(asset)) {
+      Complain(asset + " is not in conflict any more: it is committed");
+      return false;
+    }
+    if (choice_.as_is) return TakeAsIs(asset);
     AssetVersions versions;
+    const bool is_of_one_side = choice_.side == "left" || choice_.side == "right";
+    if (stages.LackBase() && is_of_one_side && choice_.pattern.empty()) {
+      return PutAsset(asset, stages.TextOf(choice_.side == "left" ? "3" : "2")) && TakeAsIs(asset);
+    }
     if (!stages.Write(scratch_, versions)) return false;
     if (!versions.HasAsset()) {
       Complain(asset + " was merged as text: edit it, and 'git add' it");
@@ -162,6 +174,23 @@ class Resolving {
   void Sweep() const { records_.Sweep(); }
 
  private:
+  // Git still knows the stages then.
+  bool IsCommitted(const std::string& asset) const {
+    return records_.Entry(asset).asset.empty() && !repository_.IsAtWork() &&
+           GitQuietly({"diff-index", "--quiet", "--cached", "HEAD", "--", ":(literal)" + asset}).status == 0;
+  }
+
+  bool TakeAsIs(const std::string& asset) {
+    if (HasMarkers(asset)) {
+      Complain(asset + " has conflict markers");
+      return false;
+    }
+    records_.TakeAsIs(asset, HashOfAsset(asset));
+    if (!Stage(asset)) return false;
+    Tell("Resolved " + asset);
+    return true;
+  }
+
   // Its record stays, in case that somebody changes their mind before the commit.
   bool Finish(const Settlement& settlement) {
     const std::string& asset = settlement.entry.asset;
@@ -174,7 +203,7 @@ class Resolving {
   // What is settled already counts when the rest is settled in the engine.
   bool LeaveRest(const Settlement& settlement, StageFiles& stages) {
     const std::string& asset = settlement.entry.asset;
-    if (!PutAsset(asset, settlement.merge->GetText()) || !stages.Unstage()) return false;
+    if (!PutAsset(asset, settlement.text) || !stages.Unstage()) return false;
     LeaveRecord(settlement);
     Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset + ":");
     SayConflicts(asset, settlement.entry.conflicts);
@@ -184,7 +213,8 @@ class Resolving {
   void LeaveRecord(const Settlement& settlement) {
     const std::string& asset = settlement.entry.asset;
     const std::string record = records_.Leave(
-        settlement.entry, *settlement.merge, [&] { return HashOfAsset(asset); }, settings_);
+        settlement.entry, *settlement.merge, settlement.merge->GetText(), [&] { return HashOfAsset(asset); },
+        settings_);
     if (record.empty()) Complain("cannot write the record of " + asset);
   }
 
@@ -211,7 +241,7 @@ void KeepEdited(const std::string& asset, std::string_view text, const Repositor
 int RunResolve(const std::vector<std::string>& arguments) {
   Arguments parsed = Parse(arguments);
   Choice& choice = parsed.choice;
-  const bool is_free = choice.side.empty() && !parsed.asks && IsConversation();
+  const bool is_free = choice.side.empty() && !parsed.asks && !choice.as_is && IsConversation();
   if (parsed.files.empty() && !parsed.asks && !is_free) throw WrongUsage("resolve needs a file");
   bool is_done = true;
   const std::set<std::string> assets = FindAssets(parsed.files, is_done);
@@ -260,8 +290,10 @@ int RunMergetool(const std::vector<std::string>& arguments) {
   if (status == AssetMerge::kFailed) return status;
   const bool is_merged = status == AssetMerge::kMerged;
   const std::string hash = is_merged ? HashOfAsset(asset) : records.Entry(asset).hash;
+  // Git keeps the old file where something is left.
+  const std::string merged = is_merged ? settlement.merge->GetText() : records.MergedText(asset);
   const std::string record = records.Leave(
-      settlement.entry, *settlement.merge, [&] { return hash; }, settings);
+      settlement.entry, *settlement.merge, merged, [&] { return hash; }, settings);
   if (record.empty()) Complain("cannot write the record of " + asset);
   if (!is_merged) Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset);
   return is_merged ? AssetMerge::kMerged : AssetMerge::kConflicts;

@@ -86,7 +86,7 @@ MergeSettings SettingsQuery::Get() {
     ReadAlone("vexel.safe", settings.is_safe);
     ReadAlone("rerere.enabled", settings.remembers_decisions);
     ReadAlone("rerere.autoUpdate", settings.stages_remembered);
-    settings.has_other_hooks = GitQuietly({"config", "--get", "core.hooksPath"}).status == 0;
+    ReadAlone("core.hooksPath", settings.hooks_folder);
     return settings;
   }
   const std::vector<std::string> entries = Pieces(answer.output, '\0');
@@ -95,8 +95,7 @@ MergeSettings SettingsQuery::Get() {
   TakeFrom(entries, "vexel.safe", settings.is_safe);
   TakeFrom(entries, "rerere.enabled", settings.remembers_decisions);
   TakeFrom(entries, "rerere.autoupdate", settings.stages_remembered);
-  settings.has_other_hooks = std::ranges::any_of(
-      entries, [](const std::string& entry) { return entry.starts_with("core.hookspath"); });
+  TakeFrom(entries, "core.hookspath", "core.hooksPath", settings.hooks_folder);
   return settings;
 }
 

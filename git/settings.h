@@ -16,8 +16,8 @@ struct MergeSettings {
   /// left to confirm then.
   bool remembers_decisions = false;
   bool stages_remembered = false;
-  /// Whether git calls other hooks than those of the repository.
-  bool has_other_hooks = false;
+  /// The folder whose hooks git calls in place of those of the repository; empty for none.
+  std::string hooks_folder;
 };
 
 /// Reads them in one question to git, which is under way while the caller does something else.

@@ -9,7 +9,9 @@
 #include "git/git_call.h"
 #include "git/named_places.h"
 #include "git/questions.h"
+#include "git/settled_by_hand.h"
 #include "git/shown_text.h"
+#include "git/stage_files.h"
 #include "git/work_files.h"
 #include "platform/files.h"
 
@@ -28,11 +30,6 @@ std::vector<std::string> Chosen(const Choice& choice, const std::vector<NamedPla
   return lines;
 }
 
-bool HasMarkers(const std::string& asset) {
-  const std::string text = TextOf("./" + asset);
-  return text.starts_with("<<<<<<< ") || text.find("\n<<<<<<< ") != std::string::npos;
-}
-
 // Also of a name with blanks, while the editor may be a command with arguments.
 bool Edit(const std::string& record) {
   const ProgramResult editor = Git({"var", "GIT_EDITOR"});
@@ -48,14 +45,18 @@ class Settling {
       : versions_(versions), context_(context), choice_(context.choice) {}
 
   Settlement Run() {
-    if (!FindStart() || IsEdited()) return {};
+    if (!FindStart() || !FindEdits()) return {};
     const bool is_merged = choice_.prompt != nullptr ? MergeAnswered()
                            : choice_.side.empty()    ? MergeEdited()
                                                      : MergeWithSide();
-    if (!is_merged) return {};
+    if (!is_merged || !CarryEdits()) return {};
     TellBaseless();
     entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
-    return {status_, std::move(merge_), std::move(entry_)};
+    for (RecordedConflict& conflict : entry_.conflicts) {
+      if (by_hand_.contains(conflict.place)) conflict.is_settled = true;
+    }
+    if (entry_.CountPending() == 0) status_ = AssetMerge::kMerged;
+    return {status_, std::move(merge_), std::move(text_), std::move(entry_)};
   }
 
  private:
@@ -65,8 +66,11 @@ class Settling {
     const std::string& asset = versions_.asset;
     record_ = context_.records.Find(asset);
     entry_ = context_.records.Entry(asset);
-    if (!record_.empty()) return true;
-    entry_ = {asset, {}, context_.names, {}, false};
+    if (!record_.empty()) {
+      merged_ = context_.records.MergedText(asset);
+      return true;
+    }
+    entry_ = {asset, {}, context_.names, {}, {}};
     AssetMerge merge(versions_);
     if (merge.RunQuietly(context_.settings) == AssetMerge::kFailed) {
       if (!choice_.side.empty() && !choice_.pattern.empty()) {
@@ -79,11 +83,12 @@ class Settling {
           ResolveCall(asset, "resolve --theirs --path <object>"));
       return false;
     }
-    entry_.hash = HashOf(merge.GetText());
+    merged_ = merge.GetText();
+    entry_.hash = HashOf(merged_);
     entry_.conflicts = ConflictsAfter(merge, asset, entry_.names, {});
     if (!choice_.side.empty() || choice_.prompt != nullptr) return true;
     record_ = context_.records.Leave(
-        entry_, merge, [&] { return entry_.hash; }, context_.settings);
+        entry_, merge, merged_, [&] { return entry_.hash; }, context_.settings);
     if (record_.empty()) Complain("cannot write the record of " + asset);
     return !record_.empty();
   }
@@ -92,17 +97,59 @@ class Settling {
     return Line(RunProgram(HashCall(versions_.asset, std::move(text))));
   }
 
-  // Whether somebody has changed the asset since it was merged, which has been said.
-  bool IsEdited() const {
+  // What somebody has made of the asset since it was merged. False where it can't be kept, which has been
+  // said.
+  bool FindEdits() {
     const std::string& asset = versions_.asset;
-    if (choice_.force || !FileExists("./" + asset) || HashOfAsset(asset) == entry_.hash) return false;
+    edited_.clear();
+    by_hand_.clear();
+    if (choice_.force || !FileExists("./" + asset)) return true;
+    const std::string text = TextOf("./" + asset);
+    if (text == merged_ || HashOf(text) == (merged_.empty() ? entry_.hash : HashOf(merged_))) return true;
     if (HasMarkers(asset)) {
       Complain(asset + " was merged as text; say --force to merge it anew, and lose what was edited since");
-    } else {
-      Complain(asset +
-               " was edited after the merge; 'git add' it as it is, or say --force to lose the edits");
+      return false;
+    }
+    if (merged_.empty()) {
+      Complain(asset + " was edited after the merge; to take it so: " +
+               ResolveCall(asset, "resolve --as-is") + ", or say --force to lose the edits");
+      return false;
+    }
+    edited_ = text;
+    std::vector<RecordedConflict> conflicts = entry_.conflicts;
+    for (RecordedConflict& conflict : conflicts) conflict.is_settled = false;
+    const auto sides = [&] { return SideTexts{TextOf(versions_.base), TextOf(versions_.left)}; };
+    MarkSettledByHand(merged_, edited_, context_.settings, sides, conflicts);
+    for (const RecordedConflict& conflict : conflicts) {
+      if (conflict.is_settled) by_hand_.insert(conflict.place);
     }
     return true;
+  }
+
+  // Merges what was edited by hand with what the new merge makes of the conflicts.
+  bool CarryEdits() {
+    text_ = merge_->GetText();
+    if (edited_.empty()) return true;
+    if (text_ == merged_) {
+      text_ = edited_;
+      return true;
+    }
+    ScratchFolder scratch;
+    AssetMerge carried({versions_.asset, scratch.Write("merged", merged_), scratch.Write("chosen", text_),
+                        scratch.Write("edited", edited_)});
+    const int status = carried.RunQuietly(context_.settings);
+    if (status == AssetMerge::kMerged) {
+      text_ = carried.GetText();
+      return true;
+    }
+    if (status == AssetMerge::kFailed) {
+      carried.SayMessages();
+    } else {
+      SayConflicts(versions_.asset, ConflictsAfter(carried, versions_.asset, {"chosen now", "edited"}, {}));
+    }
+    Complain(versions_.asset +
+             " was edited by hand, and that doesn't go with the choice; say --force to lose " + "the edits");
+    return false;
   }
 
   bool Merge(const std::string& decided) {
@@ -138,20 +185,27 @@ class Settling {
   bool MergeAnswered() {
     // Where nothing is open, minds can be changed about all of it.
     const bool asks_again = entry_.CountPending() == 0;
-    Questions questions(*choice_.prompt, entry_, [&](const std::vector<std::string>& chosen, bool is_blank) {
-      return Merge(is_blank ? std::string() : DecidedIn(record_, chosen)) ? merge_.get() : nullptr;
-    });
+    Questions questions(
+        *choice_.prompt, entry_, by_hand_, [&](const std::vector<std::string>& chosen, bool is_blank) {
+          return Merge(is_blank ? std::string() : DecidedIn(record_, chosen)) ? merge_.get() : nullptr;
+        });
     if (!questions.Ask(asks_again)) return false;
-    if (!questions.HaveDecided() && (choice_.prompt->HasQuit() || status_ != AssetMerge::kMerged)) {
+    if (!questions.HaveDecided() && (choice_.prompt->HasQuit() || HasOpen())) {
       Say("Nothing is settled in " + versions_.asset);
       return false;
     }
     return IsStillInConflict("the first question was asked");
   }
 
+  bool HasOpen() {
+    return std::ranges::any_of(merge_->GetConflicts(), [&](const NamedConflict& conflict) {
+      return !by_hand_.contains(conflict.place);
+    });
+  }
+
   // Who looks at the scene in the engine while deciding may save it there.
-  bool IsStillInConflict(const std::string& since) const {
-    if (context_.is_same_conflict()) return !IsEdited();
+  bool IsStillInConflict(const std::string& since) {
+    if (context_.is_same_conflict()) return FindEdits();
     context_.records.Remove(versions_.asset);
     Complain(versions_.asset + " is no longer in the conflict that it was in when " + since);
     return false;
@@ -164,7 +218,7 @@ class Settling {
     // Whoever says no more than a side means the rest, or all where nothing is left.
     const bool is_rest = choice_.pattern.empty() && entry_.CountPending() > 0;
     for (const RecordedConflict& conflict : entry_.conflicts) {
-      if (!is_rest || !conflict.is_settled)
+      if ((!is_rest || !conflict.is_settled) && !IsKept(conflict.place))
         places.push_back({conflict.place, NamedPlace::NameIn(conflict.text)});
     }
     std::vector<std::string> chosen = Chosen(choice_, places);
@@ -172,8 +226,9 @@ class Settling {
     for (int merges = 1;; ++merges) {
       if (!Merge(DecidedIn(record_, chosen))) return false;
       std::vector<NamedPlace> pending;
-      for (const NamedConflict& conflict : merge_->GetConflicts())
-        pending.push_back({conflict.place, conflict.name});
+      for (const NamedConflict& conflict : merge_->GetConflicts()) {
+        if (!IsKept(conflict.place)) pending.push_back({conflict.place, conflict.name});
+      }
       bool is_new = false;
       for (const std::string& line : Chosen(choice_, pending)) {
         if (std::ranges::find(chosen, line) != chosen.end()) continue;
@@ -182,11 +237,15 @@ class Settling {
       }
       if (!is_new || merges == kMostMerges) break;
     }
-    if (!chosen.empty() || (status_ == AssetMerge::kMerged && choice_.pattern.empty())) return true;
+    const bool is_merged = status_ == AssetMerge::kMerged || !by_hand_.empty();
+    if (!chosen.empty() || (is_merged && choice_.pattern.empty())) return true;
     Complain("no conflict in " + versions_.asset + " fits '" + choice_.pattern + "'" +
              SuggestionFor(choice_.pattern, places));
     return false;
   }
+
+  // Whoever has settled a conflict by hand doesn't mean it without naming it.
+  bool IsKept(const std::string& place) const { return choice_.pattern.empty() && by_hand_.contains(place); }
 
   const AssetVersions& versions_;
   const SettleContext& context_;
@@ -195,11 +254,21 @@ class Settling {
   // Whether the merge has failed without a choice.
   bool has_failed_ = false;
   RecordEntry entry_;
+  // How the last merge left the file, and what it has become since; empty where it is still that.
+  std::string merged_;
+  std::string edited_;
+  std::set<std::string> by_hand_;
+  std::string text_;
   std::unique_ptr<AssetMerge> merge_;
   int status_ = AssetMerge::kFailed;
 };
 
 }  // namespace
+
+bool HasMarkers(const std::string& asset) {
+  const std::string text = TextOf("./" + asset);
+  return text.starts_with("<<<<<<< ") || text.find("\n<<<<<<< ") != std::string::npos;
+}
 
 std::string HashOfAsset(const std::string& asset) {
   return Line(RunProgram(HashCall(asset, TextOf("./" + asset))));
@@ -214,7 +283,7 @@ bool PutAsset(const std::string& asset, std::string_view text) {
 Settlement Settle(const AssetVersions& versions, const SettleContext& context) {
   if (IsPlain(versions.asset)) {
     Settlement settlement = Settling(versions, context).Run();
-    if (settlement.status != AssetMerge::kMerged || PutAsset(versions.asset, settlement.merge->GetText())) {
+    if (settlement.status != AssetMerge::kMerged || PutAsset(versions.asset, settlement.text)) {
       return settlement;
     }
     return {};

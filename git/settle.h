@@ -22,6 +22,8 @@ struct Choice {
   bool force = false;
   /// Asks about one conflict after the other instead, where it is given; not owned.
   Prompt* prompt = nullptr;
+  /// Whether all is to stay as it stands in the work tree.
+  bool as_is = false;
 };
 
 /// What settling needs to know of the repository.
@@ -40,6 +42,8 @@ struct Settlement {
   int status = AssetMerge::kFailed;
   /// Null where it has failed.
   std::unique_ptr<AssetMerge> merge;
+  /// What the merge makes of the file, with what was edited by hand since the last one.
+  std::string text;
   /// What to remember of it, without the blob.
   RecordEntry entry;
 };
@@ -47,12 +51,18 @@ struct Settlement {
 /// Merges the file of the work tree once more, with what the user decides now, and writes it there where
 /// nothing is pending. What went wrong has been said.
 ///
+/// What somebody has edited by hand since the last merge is merged into it, and a conflict that is settled
+/// like that is none. Only where such an edit meets what is chosen now, nothing is done.
+///
 /// With a side, it takes as many merges as it takes until nothing fits any more, three at most: what hangs on
 /// a decision can be decided only once that counts.
 Settlement Settle(const AssetVersions& versions, const SettleContext& context);
 
 /// Writes the work tree's file. Returns whether it could; else it has said so.
 bool PutAsset(const std::string& asset, std::string_view text);
+
+/// Whether the work tree's file has what a merge of texts leaves at a conflict.
+bool HasMarkers(const std::string& asset);
 
 /// The blob that git would make of the work tree's file; empty where there is none.
 std::string HashOfAsset(const std::string& asset);

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 
+#include "git/conflict_messages.h"
 #include "git/git_call.h"
 #include "git/shown_text.h"
 #include "git/undecided_places.h"
@@ -46,6 +47,17 @@ StageFiles::StageFiles(const std::string& asset) : asset_(asset), stages_(Stages
   if (!stages_.empty()) return;
   is_staged_ = true;
   stages_ = Stages(true);
+}
+
+bool StageFiles::LackBase() const {
+  return stages_.size() == 2 && stages_[0].number == "2" && stages_[1].number == "3";
+}
+
+std::string StageFiles::TextOf(const std::string& number) const {
+  for (const Stage& stage : stages_) {
+    if (stage.number == number) return Git({"cat-file", "--filters", "--path=" + asset_, stage.blob}).output;
+  }
+  return {};
 }
 
 bool StageFiles::Unstage() {
@@ -98,8 +110,8 @@ bool StageFiles::Write(ScratchFolder& folder, AssetVersions& versions) const {
     return false;
   }
   if (versions.base.empty()) {
-    Complain("both sides have added " + asset_ +
-             ": take one with 'git checkout --ours' or '--theirs', then 'git add' it");
+    Complain("both sides have added " + asset_ + "; take one: " + ResolveCall(asset_, "resolve --ours") +
+             ", or --theirs");
     return false;
   }
   MarkUndecided(versions);

@@ -45,6 +45,18 @@ class StageFiles {
   /// are not three files, which has been said.
   bool Write(ScratchFolder& folder, AssetVersions& versions) const;
 
+  /// Whether the file was in conflict until it was staged.
+  bool IsStaged() const { return is_staged_; }
+
+  /// Whether git still knows all three.
+  bool AreComplete() const { return stages_.size() == 3; }
+
+  /// Whether both sides have added the file.
+  bool LackBase() const;
+
+  /// A stage as a file of the work tree: "1" is base, "2" ours, "3" theirs. Empty where there is none.
+  std::string TextOf(const std::string& number) const;
+
   /// Whether they are still the same.
   bool AreSame() const { return Stages(is_staged_) == stages_; }
 

@@ -1,10 +1,13 @@
 #include <unistd.h>
 
+#include <algorithm>
 #include <iostream>
 
 #include "git/conflict_records.h"
 #include "git/git_call.h"
+#include "git/record_hook.h"
 #include "git/repository.h"
+#include "git/settings.h"
 #include "git/setup.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
@@ -91,6 +94,11 @@ void TellConflicts(const ConflictRecords& records) {
     const std::string record = records.Find(asset);
     if (records.IsKept(record)) Tell("  its record is " + record);
   }
+  const std::vector<std::string> unmerged = UnmergedBelow({}, false).value_or(std::vector<std::string>());
+  for (const RecordEntry& entry : records.Entries()) {
+    const bool is_told = std::ranges::find(unmerged, entry.asset) != unmerged.end();
+    if (!is_told && entry.CountPending() > 0) Tell("not settled    " + entry.asset);
+  }
 }
 
 }  // namespace
@@ -116,6 +124,11 @@ int RunStatus(const std::vector<std::string>& arguments) {
   const ConflictRecords records(repository);
   records.Sweep();
   TellConflicts(records);
+  const auto foreign = ForeignGuards(repository, SettingsQuery().Get().hooks_folder);
+  if (!foreign.empty()) {
+    Tell("hooks          your own are in use (" + Joined(foreign) +
+         "): let them call 'vexel-merge-git check --staged'");
+  }
   return is_complete ? 0 : 1;
 }
 

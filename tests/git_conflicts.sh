@@ -75,30 +75,126 @@ check "overrides by what they override" says \
   "CONFLICT $file: PrefabInstance 20 > m_LocalPosition.x of 401: was 1, theirs (doors) 2, ours 3"
 check "the page has one row for it" test "$(grep -c '<tr data-path="PrefabInstance' "$(vexel-merge-git report)")" -eq 1
 git add "$file" 2>"$work/err"
-check "it is said that nothing is settled" grep -q "^warning: $file is staged .* at 3 conflicts" "$work/err"
+check "it is said that nothing is settled" grep -q "^warning: $file is staged with 3 conflicts" "$work/err"
 touch new && git add new 2>"$work/err"
 check "it is said once" test ! -s "$work/err"
 check "the commit is stopped" stops git commit -q -m early
 check "a check for scripts says so, too" stops vexel-merge-git check --staged
+check "so does the status" grep -qx "not settled    $file" <(vexel-merge-git status)
+check "a page shows it" vexel-merge-git report >/dev/null
 check "one side's choice leaves the rest" stops vexel-merge-git resolve "$file" --theirs --path '*.Light.*'
 check "which the other side gets" vexel-merge-git resolve --ours "$file" >/dev/null
 check "a choice stays what it was" is_at 4 20 3 3
 check "it can be changed until the commit" vexel-merge-git resolve --base --path 13.MonoBehaviour.speed "$file" >/dev/null
 check "for that place alone" is_at 4 20 1 3
 harbour 4 20 7 7 >"$file" && git add "$file"
-check "what was edited since is not overwritten" stops vexel-merge-git resolve --ours "$file"
+check "what was edited since is not overwritten" vexel-merge-git resolve --ours "$file" >/dev/null 2>&1
+check "it stays as it was edited" is_at 4 20 7 7
 check "what is edited can be committed" git commit -q -m merged
 check "nothing is left" has_nothing_of_ours
+check "nothing is in conflict any more" stops vexel-merge-git resolve --force --theirs "$file"
+check "and nothing was merged again" is_at 4 20 7 7
 check "the commit has no conflict" vexel-merge-git check HEAD
 git reset -q --hard all && git merge -q doors >/dev/null 2>&1 || git add "$file" 2>/dev/null
 check "whoever insists can commit" git commit -q --no-verify -m careless
 check "a build server finds it" stops vexel-merge-git check HEAD
 check "nothing is left of that either" has_nothing_of_ours
+
+# What somebody edits by hand is settled where that was, and nowhere else.
+git reset -q --hard all && git merge -q doors >/dev/null 2>&1 || sed -i 's/m_Range: 20/m_Range: 20.0/; s/speed: 1/speed: 5/; s/$/\r/' "$file"
+vexel-merge-git check >"$work/out" 2>&1 || :
+check "one of three is settled by hand" test "$(grep -c ^CONFLICT "$work/out")" -eq 2
+check "the others stop the commit" stops git commit -q -a -m early
+check "they are counted" grep -q "^error: $file is staged with 2 conflicts that nobody has settled" "$work/err"
+git add "$file" 2>"$work/err"
+check "and were when it was staged" grep -q "^warning: $file is staged with 2 conflicts" "$work/err"
+check "a choice elsewhere leaves the edit" stops vexel-merge-git resolve --theirs --path '*.Light.*' "$file"
+check "which is merged" test "$(grep -c 'speed: 5\|m_Intensity: 4' "$file")" -eq 2
+check "a choice that meets the edit is refused" stops vexel-merge-git resolve --ours --path 13.MonoBehaviour.speed "$file"
+check "it names both" grep -q "DoorOpener > speed: was 1, theirs (chosen now) 3, ours (edited) 5" "$work/err"
+check "the rest can be meant to stay" vexel-merge-git resolve --as-is "$file" >/dev/null
+check "then it can be committed" git commit -q -m by-hand
+check "with the edit, the choice and what stood there" is_at 4 20.0 5 1
+check "whose conflict a build server finds" stops vexel-merge-git check HEAD
+git reset -q --hard all && git merge -q doors >/dev/null 2>&1 || vexel-merge-git resolve --force --base --path 13.MonoBehaviour.speed "$file" 2>/dev/null || :
+check "an edit is merged with choices made before" vexel-merge-git resolve --theirs "$file" >/dev/null
+sed -i 's/m_Range: 20/m_Range: 30/' "$file"
+check "and with those made after it" vexel-merge-git resolve --ours --path '*.Light.*' "$file" >/dev/null
+check "none is lost" is_at 9 30 1 2
+# In a list, each element is a place: overrides of x, y and z, and of w, which both sides add. Ours has lost z.
+override() { printf '    - target: {fileID: 401, guid: 00000000000000000000000000000001, type: 3}\n      propertyPath: m_LocalPosition.%s\n      value: %s\n      objectReference: {fileID: 0}\n' "$@"; }
+git reset -q --hard && git checkout -q -b list start && { harbour 2 10 1 1 && override z 1 y 1; } >"$file" && git commit -q -a -m list
+git checkout -q -b longer && { harbour 2 10 1 2 && override z 1 y 6 w 2; } >"$file" && git commit -q -a -m longer
+git checkout -q list && { harbour 2 10 1 3 && override y 7 w 3; } >"$file" && git commit -q -a -m shorter
+git merge -q longer >/dev/null 2>&1 || sed -i '/LocalPosition.y/{n; s/1/9/}' "$file"
+vexel-merge-git check >"$work/out" 2>&1 || :
+check "one override is settled, and two are not" test "$(sed -n 's/^CONFLICT.*ours //p' "$work/out" | xargs)" = "3 adds 3"
+
+# A lamp that one side removes is compared with all of its parts.
+git reset -q --hard && git checkout -q -b removed start && harbour 2 10 1 1 | sed '/&10$/,/speed/d' >"$file" && git commit -q -a -m removed
+git merge -q bright >/dev/null 2>&1 || sed -i 's/value: 1/value: 8/' "$file"
+check "an edit elsewhere doesn't settle it" stops git commit -q -a -m early
+sed -i 's/m_Intensity: 2/m_Intensity: 3/' "$file"
+check "an edit of its light does" git commit -q -a -m lit
+
+# A file that both sides added can't be merged, and must not go with one side by chance.
+for side in 1 2; do
+  git checkout -q -b "added-$side" start && harbour 3 10 1 $side >New.vexel && git add New.vexel && git commit -q -m $side
+done
+check "two files of one name don't merge" stops git merge -q added-1
+check "nor is ours committed without a word" stops git commit -q -a -m early
+git add New.vexel
+check "nor once it is staged" stops git commit -q -m early
+check "a side can be taken" vexel-merge-git resolve --theirs New.vexel >/dev/null
+check "it is theirs" cmp New.vexel <(harbour 3 10 1 1)
+check "and another one" vexel-merge-git resolve --ours New.vexel >/dev/null
+check "which can be committed" git commit -q -m ours
+git checkout -q --detach all
 git reset -q --hard all
 printf '#!/bin/sh\nexit 0\n' >.git/hooks/pre-commit && chmod +x .git/hooks/pre-commit && cp .git/hooks/pre-commit "$work/own"
 git merge -q doors >/dev/null 2>&1 || :
 check "somebody's own hook stays" cmp .git/hooks/pre-commit "$work/own"
+git merge --abort && git merge doors >/dev/null 2>"$work/err" || :
+check "it is said that nothing stops a commit then" grep -q '^warning: hooks of your own are in use (pre-commit)' "$work/err"
+check "by the status as well" grep -q '^hooks .*(pre-commit)' <(vexel-merge-git status)
 git merge --abort && rm .git/hooks/pre-commit
+git merge -q doors >/dev/null 2>&1 || echo 'echo mine' >>.git/hooks/pre-commit
+git merge --abort
+check "what somebody adds to ours stays" test "$(cat .git/hooks/pre-commit)" = $'#!/bin/sh\necho mine'
+rm .git/hooks/pre-commit
+
+# Whatever becomes of a file that nobody has settled, it is not committed by chance.
+pop() { # pop: the edits of "lights" come from a stash, and meet those of "bright"
+  git reset -q --hard && git stash clear && git checkout -q --detach start && harbour 4 10 1 1 >"$file" && git stash -q
+  git checkout -q --detach bright && { git stash pop -q >/dev/null 2>&1 || git add "$file" 2>/dev/null; }
+}
+again() { # again TEXT GIT-COMMAND...: after that, all is staged
+  pop && "${@:2}" >/dev/null 2>&1 && git add "$file" 2>/dev/null
+  check "it is stopped after $1" stops git commit -q -m early
+}
+pop && echo 1 >>new && git add new && git commit -q -m other -- new 2>/dev/null
+check "it is stopped after a commit of something else" stops git commit -q -m early
+again "another branch" git checkout -q -B other
+again "it was unstaged" git restore --staged "$file"
+again "a reset" git reset -q
+again "a stash" eval 'git stash -q && git stash pop -q'
+pop && git reset -q --hard && git stash clear && vexel-merge-git status >/dev/null
+check "nothing of it is left" has_nothing_of_ours
+
+# Patches ask another hook.
+git checkout -q -B patch start && harbour 4 10 1 1 >"$file" && git commit -q -a -m patch
+git rebase -q --apply bright >/dev/null 2>&1 || git add "$file" 2>/dev/null
+check "a series of patches is stopped, too" stops git rebase --continue
+git rebase --abort && git checkout -q --detach start && git branch -q -D patch other
+
+# A file that both sides have renamed is remembered by its old name.
+git checkout -q -B there lights && git mv "$file" there && git commit -q -m there
+git checkout -q -B here bright && git mv "$file" here.vexel && git commit -q -m here
+git merge -q there >/dev/null 2>&1 || git add -A 2>/dev/null
+check "what has a new name on both sides is not committed undecided" stops git commit -q -m early
+check "but as it stands" vexel-merge-git resolve --as-is here.vexel >/dev/null
+check "can be committed" git commit -q -m renamed
+git checkout -q --detach all && git branch -q -D here there
 
 # Scenes are merged as scenes.
 git checkout -q -b dark start && harbour 2 10 1 1 | sed '/&10$/,/speed/d' >"$file" && git commit -q -a -m dark

@@ -56,8 +56,13 @@ again
 harbour=$(vexel-merge-git resolve -p --color=always <<<q 2>/dev/null || :)
 check "colours can be had in a pipe" grep -qF $'\e[35m  theirs  2\e[m' <<<"$harbour"
 scene 7 7 >"$file"
-check "edits since the merge are not overwritten" refuses answer ttt
-check "nor asked about" test ! -s "$work/out"
+check "edits since the merge are not overwritten" answer ttt
+check "nor asked about" test ! -s "$work/out" -o "$(asked)" -eq 0
+check "they are there" cmp -s "$file" <(scene 7 7)
+again
+lamps 7 1 1 >"$file"
+check "the rest is asked about" answer to
+check "and merged with them" is_at 7 2 3
 again
 mkfifo "$work/answers"
 vexel-merge-git resolve -p <"$work/answers" >"$work/out" 2>"$work/err" &
