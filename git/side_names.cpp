@@ -76,13 +76,51 @@ std::string MergedHead() {
   return name;
 }
 
+std::vector<std::string> StepsDone(const Repository& repository, const std::string& folder) {
+  return Pieces(TextOf(repository.Path(folder + "/done")), '\n');
+}
+
+// Whether it is the rebase that merges, and not what somebody does where it has stopped for an edit, or what
+// was stashed before it and comes back at its end.
+bool IsAtStep(const Repository& repository, const std::string& folder) {
+  if (!IsFile(repository.Path(folder + "/head-name")) || IsFile(repository.Path(folder + "/amend"))) {
+    return false;
+  }
+  const std::vector<std::string> done = StepsDone(repository, folder);
+  const std::string commit = done.empty() ? std::string() : StepIn(done.back()).commit;
+  const std::string rewritten = '\n' + TextOf(repository.Path(folder + "/rewritten-list"));
+  return commit.empty() || rewritten.find('\n' + commit) == std::string::npos;
+}
+
+// As the user has named it, which only the log of HEAD knows: several branches can be there.
+std::string NewBase(const Repository& repository, const std::string& folder) {
+  constexpr std::string_view kStart = "(start): checkout ";
+  const std::string onto = FirstLine(repository.Path(folder + "/onto"));
+  std::vector<std::string> log = Pieces(TextOf(repository.Path("logs/HEAD")), '\n');
+  const auto start = std::find_if(log.rbegin(), log.rend(), [&](const std::string& line) {
+    return line.find(kStart) != std::string::npos;
+  });
+  // Old commit, new commit, who and when, a tab, and what was done.
+  const bool is_this = start != log.rend() && start->find(' ' + onto + ' ') != std::string::npos;
+  return is_this ? Readable(start->substr(start->find(kStart) + kStart.size())) : BranchAt(onto);
+}
+
+// The branch as the message of a merge names it; empty where it names none.
+std::string MergedBranch(const Repository& repository) {
+  const std::string message = FirstLine(repository.Path("MERGE_MSG"));
+  const size_t begin = message.find('\'');
+  const size_t end = begin == std::string::npos ? begin : message.find('\'', begin + 1);
+  const bool is_merge = message.starts_with("Merge ") && end != std::string::npos;
+  return is_merge ? Readable(message.substr(begin + 1, end - begin - 1)) : std::string();
+}
+
 SideNames InRebase(const Repository& repository, const std::string& folder) {
   const std::string branch =
       Readable(WithoutPrefix(FirstLine(repository.Path(folder + "/head-name")), "refs/heads/"));
-  const std::vector<std::string> done = Pieces(TextOf(repository.Path(folder + "/done")), '\n');
+  const std::vector<std::string> done = StepsDone(repository, folder);
   const std::string subject = done.empty() ? std::string() : StepIn(done.back()).subject;
   return {(subject.empty() ? "a commit" : Quoted(subject)) + " of " + branch + ", which is rebased",
-          BranchAt(FirstLine(repository.Path(folder + "/onto"))) + ", its new base"};
+          NewBase(repository, folder) + ", its new base"};
 }
 
 std::string Picked(const Step& step) {
@@ -95,13 +133,15 @@ std::string Picked(const Step& step) {
 SideNames FindSideNames(const Repository& repository) {
   if (const std::string head = MergedHead(); !head.empty()) return {head, {}};
   for (const char* folder : {"rebase-merge", "rebase-apply"}) {
-    if (IsFile(repository.Path(std::string(folder) + "/head-name"))) return InRebase(repository, folder);
+    if (IsAtStep(repository, folder)) return InRebase(repository, folder);
   }
   if (const std::string step = FirstLine(repository.Path("sequencer/todo")); !step.empty())
     return {Picked(StepIn(step)), {}};
   // Once a merge has stopped.
-  if (const std::string head = FirstLine(repository.Path("MERGE_HEAD")); !head.empty())
-    return {BranchAt(head), {}};
+  if (const std::string head = FirstLine(repository.Path("MERGE_HEAD")); !head.empty()) {
+    const std::string branch = MergedBranch(repository);
+    return {branch.empty() ? BranchAt(head) : branch, {}};
+  }
   for (const auto& [file, word] :
        {std::pair("CHERRY_PICK_HEAD", "pick"), std::pair("REVERT_HEAD", "revert")}) {
     const std::string head = FirstLine(repository.Path(file));

@@ -260,7 +260,7 @@ check "who wants base's is told what it gets" says "Warning: base has nothing at
 git reset -q --hard
 
 # In a rebase, "theirs" are one's own commits.
-git checkout -q doors
+git checkout -q doors && git branch a-namesake all
 check "a rebase stops" stops git rebase -q all
 check "it says whose is whose" says \
   "CONFLICT $file: Lamp > Light > m_Intensity: was 2, theirs (\"Work on lights\" of doors, which is rebased) 4, ours (all, its new base) 9"
@@ -282,6 +282,17 @@ find .git/vexel-merge-decisions -type f -exec touch -d '61 days ago' {} +
 git rebase -q all >/dev/null 2>&1 || vexel-merge-git resolve --theirs "$file" >/dev/null
 check "what is old is forgotten" test -z "$(find .git/vexel-merge-decisions -mtime +60)"
 git rebase --abort && git config --unset rerere.enabled
+
+# What is picked where a rebase stops, or comes back at its end, isn't what is rebased.
+commit swift start 2 10 5 1
+git checkout -q -b slow start && harbour 2 40 1 1 >"$file" && git commit -q -a -m range
+GIT_SEQUENCE_EDITOR="sed -i s/^pick/edit/" git rebase -q -i swift 2>/dev/null
+git cherry-pick doors~ >/dev/null 2>&1 && check "a pick in the middle stops" stops git cherry-pick bright
+check "its line doesn't name the rebase" grep -qF 'm_Intensity: was 2, theirs 9, ours 4' "$work/err"
+git cherry-pick --abort && git rebase --abort && harbour 2 40 8 1 >"$file"
+git rebase -q --autostash swift >/dev/null 2>&1
+check "nor does the record of what was stashed" grep -q 'speed: was 1, theirs 8, ours 5$' "$file.vexel-conflicts"
+git reset -q --hard && git stash drop -q
 
 git checkout -q all
 check "a series of picks stops" stops git cherry-pick start..doors
