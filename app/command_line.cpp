@@ -86,6 +86,16 @@ void TakePaths(const CommandLineArguments& arguments, size_t index, std::span<st
   }
 }
 
+// An option behind the paths is a path, and a merge that was meant to be a safe one would be none.
+void HintAtLateOptions(const CommandLineArguments& arguments, size_t first_path) {
+  for (size_t i = first_path; i < arguments.size(); ++i) {
+    const std::string& argument = arguments[i];
+    if (std::ranges::find(kMergeOptions, argument) == kMergeOptions.end()) continue;
+    gHintsEnabled = gHintsEnabled || argument == kOptionSafe;
+    WriteHint("'" + argument + "' stands behind the paths, and is taken for one: options stand before them");
+  }
+}
+
 bool ParseFilePairArgs(std::string_view command, const CommandLineArguments& arguments, int first,
                        FilePairConfig& config) {
   const Switch switches[] = {{kOptionTiming, config.timing, true},
@@ -138,6 +148,7 @@ bool ParseMergeArgs(const CommandLineArguments& arguments, int first, MergeConfi
                                 &config.premerge_base_destination,
                                 &config.premerge_right_destination};
   TakePaths(arguments, index, paths);
+  HintAtLateOptions(arguments, index);
   return true;
 }
 

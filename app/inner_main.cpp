@@ -59,6 +59,7 @@ int InnerMain(const CommandLineArguments& arguments) {
   if (command.starts_with('-')) {
     errs << "Missing command (e.g. 'merge') before option " << command;
     ErrMsg(errs);
+    WriteHint("called without arguments, VexelYAMLMerge prints its version and its usage");
     return 1;
   }
   if (IsSubversionCall(arguments)) return ProcessMergeCommand(SubversionMergeConfig(arguments));
