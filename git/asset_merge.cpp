@@ -198,7 +198,7 @@ int AssetMerge::RunQuietly(const MergeSettings& settings, const Decisions* decis
     } catch (const std::bad_alloc&) {
       throw;
     } catch (const DecisionError& error) {
-      failure = error.what();
+      failure = std::string("error: ") + error.what() + "; correct that line, or take it out";
     } catch (const FileError& error) {
       failure = OnOneLine(error.what());
     } catch (const YAMLError& error) {

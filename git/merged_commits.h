@@ -1,5 +1,6 @@
 #pragma once
 
+#include <map>
 #include <string>
 #include <vector>
 
@@ -14,6 +15,9 @@ struct MergedCommits {
   std::string base;
   std::string ours;
   std::string theirs;
+  /// The files that a side has renamed: base's names by the new ones.
+  std::map<std::string, std::string> renamed_by_ours = {};
+  std::map<std::string, std::string> renamed_by_theirs = {};
 };
 
 /// The merge commit of this name, and its parents. Throws CommandError for any other commit.
@@ -26,10 +30,18 @@ std::string FindCommit(const std::string& name);
 std::vector<std::string> ChangedPaths(const std::string& from, const std::string& to,
                                       const std::vector<std::string>& paths);
 
+/// Looks what the sides have renamed, as git does in a merge.
+void FindRenamed(MergedCommits& merged);
+
+/// What base calls a file of the merge.
+std::string OldName(const MergedCommits& merged, const std::string& name);
+
+/// By the names that the merge has for them.
 std::vector<std::string> ChangedOnBothSides(const MergedCommits& merged,
                                             const std::vector<std::string>& paths);
 
-/// Writes the versions of a file, as files whose names say which they are. False where one has none.
+/// Writes the versions of a file of the merge, as files whose names say which they are. False where one has
+/// none.
 bool WriteVersions(const MergedCommits& merged, const std::string& asset, ScratchFolder& scratch,
                    AssetVersions& versions);
 

@@ -26,11 +26,12 @@ std::string ListOf(const Names& names) {
 }
 
 // Who has changed the file between two commits, the latest first.
-Names Authors(const std::string& from, const std::string& to, const std::string& asset) {
+Names Authors(const MergedCommits& merged, const std::string& side, const std::string& asset) {
   Names authors;
-  for (std::string& name :
-       Pieces(Git({"--literal-pathspecs", "log", "-z", "--format=%an", from + ".." + to, "--", asset}).output,
-              '\0')) {
+  for (std::string& name : Pieces(Git({"--literal-pathspecs", "log", "-z", "--format=%an",
+                                       merged.base + ".." + side, "--", asset, OldName(merged, asset)})
+                                      .output,
+                                  '\0')) {
     if (std::ranges::find(authors, name) == authors.end()) authors.push_back(std::move(name));
   }
   return authors;
@@ -45,8 +46,7 @@ class Preview {
   bool Tell(const std::string& asset) {
     AssetVersions versions;
     if (!WriteVersions(merged_, asset, scratch_, versions)) {
-      vexel_yaml::Tell(asset +
-                       ": not in all three versions; git asks which one is to stay, unless it was renamed");
+      vexel_yaml::Tell(asset + ": not in all three versions; git asks which one is to stay");
       return true;
     }
     if (!versions.HasAsset()) {
@@ -72,7 +72,7 @@ class Preview {
   void TellSide(const std::string& side, const std::string& commit, const std::string& asset,
                 const Names& objects) {
     const std::string edits = objects.empty() ? std::string() : ": " + ListOf(objects);
-    vexel_yaml::Tell("  " + side + ", by " + ListOf(Authors(merged_.base, commit, asset)) + edits);
+    vexel_yaml::Tell("  " + side + ", by " + ListOf(Authors(merged_, commit, asset)) + edits);
   }
 
   const MergedCommits merged_;
@@ -95,6 +95,7 @@ bool FindSides(const std::string& branch, MergedCommits& merged) {
   if (merged.base == merged.ours && merged.base != merged.theirs) {
     Tell("Nothing to merge: " + branch + " only goes on from here.");
   }
+  FindRenamed(merged);
   return merged.base != merged.theirs && merged.base != merged.ours;
 }
 

@@ -69,6 +69,13 @@ check "and with whom" grep -qFx "  theirs, by Test: Lamp, PrefabInstance 20" "$w
 check "it writes nothing" test -z "$(git status --porcelain)$(find .git -name 'vexel-merge.*' -type d)"
 check "a preview without conflicts is one" vexel-merge-git preview start >/dev/null
 
+git checkout -q -b moved start && git mv "$file" Docks.vexel && git commit -q -m moved
+check "a file that one side renames is merged" vexel-merge-git preview doors >"$work/out"
+check "by its new name" grep -qFx "Docks.vexel: merges without conflicts" "$work/out"
+check "as git does it" git merge -q --no-edit doors
+check "such a merge has a page" vexel-merge-git report HEAD >/dev/null
+git checkout -q --detach all
+
 check "a merge stops" stops git merge -q doors
 check "scripts go by their classes" says "CONFLICT $file: Lamp > DoorOpener > speed: was 1, theirs (doors) 2, ours 3"
 check "overrides by what they override" says \

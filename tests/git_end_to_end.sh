@@ -117,7 +117,7 @@ check "an editor that changes nothing settles nothing" refuses env GIT_EDITOR=tr
 check "the file is still unmerged" is_unmerged
 check "a mistake is named with its line" refuses env GIT_EDITOR="sed -i 's/^# theirs.ours.base/up/'" \
   vexel-merge-git resolve "$file" 2>"$work/err"
-check "in the record's own name" grep -q "^$file.*'up'.* on line [0-9]*$" "$work/err"
+check "in the record's own name" grep -q "^error: $file.*'up'.* on line [0-9]*; " "$work/err"
 cd Assets
 check "the editor's choice is merged" env GIT_EDITOR="sed -i 's/^up/ours/'" vexel-merge-git resolve . >/dev/null
 cd ..
