@@ -102,7 +102,8 @@ def stands_as_in_base(versions, merged, path):
     before, after = (value_at(scene, path) for scene in (versions["base"], merged))
     if isinstance(before, list):  # Its order is what the choice is about; what only one side added is there, too.
         before, after = ([item for item in one if item in two] for one, two in ((before, after), (after, before)))
-    return before is None or before == after
+    # A reference to what is gone is cleared, whatever was chosen for it.
+    return before is None or before == after or path[-1] == "fileID" and before not in merged
 
 
 def _without_order(value):
