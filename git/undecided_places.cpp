@@ -283,17 +283,18 @@ std::string FreeMark(const AssetVersions& versions) {
 
 std::string WithUndecidedPlaces(const AssetMerge& merge, const AssetVersions& versions) {
   Places places(versions.undecided.begin(), versions.undecided.end());
+  std::string text = merge.GetText();
   VexelObjects result, base, left;
-  ParseYAMLString(merge.GetText(), result);
+  ParseYAMLString(text, result);
   ParseYAMLFile(versions.base, base);
   ParseYAMLFile(versions.left, left);
+  if (!versions.mark.empty()) RemoveMarks(base, versions.mark);
   for (const RecordingConflictResolver::Record& record : merge.GetRecords()) {
     if (record.resolution != MergeResolve::kConflict) continue;
     places.insert(PlaceOf(PlaceInResult(record.path, result, base, left)));
     if (record.path.size() > 1) continue;
     for (const Operation* operation : {record.left, record.right}) AddParts(operation, places);
   }
-  std::string text = merge.GetText();
   if (places.empty()) return text;
   if (!text.ends_with('\n')) text += '\n';
   text += std::string(kBegin) + '\n';

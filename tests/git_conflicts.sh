@@ -314,14 +314,19 @@ check "it has both edits in its lines, too" grep -qF 'm_Intensity: was 9, theirs
 git reset -q --hard
 
 # Two people settle the same conflicts otherwise, and then merge with one another.
-git checkout -q -b calm bright && { git merge -q doors >/dev/null 2>&1 || vexel-merge-git resolve --base "$file" >/dev/null; }
-git commit -q -m calm && git checkout -q -b busy doors && { git merge -q bright >/dev/null 2>&1 || vexel-merge-git resolve --ours "$file" >/dev/null; }
+git checkout -q -b calm all && { git merge -q doors >/dev/null 2>&1 || vexel-merge-git resolve --base "$file" >/dev/null; }
+git commit -q -m calm && git checkout -q -b busy doors && { git merge -q all >/dev/null 2>&1 || vexel-merge-git resolve --ours "$file" >/dev/null; }
 git commit -q -m busy
 check "nobody's decision is overruled" stops git merge -q calm
 check "it is said that there is nothing to go by" says "CONFLICT $file: Lamp > Light > m_Intensity: was 2 (undecided), theirs (calm) 2, ours 4"
-check "base stands until that is settled" is_at 2 10 2 2
+check "of overrides, too" says \
+  "CONFLICT $file: PrefabInstance 20 > m_LocalPosition.x of 401: was 1 (undecided), theirs (calm) 1, ours 2"
+check "base stands until that is settled" is_at 2 20 1 1
+check "the page shows as much" test "$(grep -c '<td class="base[^>]*><span class="value">[12](undecided)' "$(vexel-merge-git report)")" -eq 3
 check "the one side can be taken" vexel-merge-git resolve --ours "$file" >/dev/null
-check "as it was" is_at 4 10 2 2
+check "as it was" is_at 4 20 2 2
+check "and base" vexel-merge-git resolve --base "$file" >/dev/null
+check "without a trace" is_at 2 20 1 1
 git reset -q --hard && git checkout -q -b unlit start && harbour 2 10 1 1 | sed '/&10$/,/speed/d' >"$file" && git commit -q -a -m unlit
 git checkout -q -b kept && { git merge -q bright >/dev/null 2>&1 || vexel-merge-git resolve --base "$file" >/dev/null; }
 git commit -q -m kept && git checkout -q -b gone bright && { git merge -q unlit >/dev/null 2>&1 || vexel-merge-git resolve --theirs "$file" >/dev/null; }
@@ -330,6 +335,37 @@ check "nor is what somebody has kept removed" stops git merge -q kept
 check "the lamp is there" is_at 2 10 1 1
 check "and can go" vexel-merge-git resolve --ours "$file" >/dev/null
 check "with all of it" refuses grep -q Lamp "$file"
+# tree FATHER: a buoy below one of three piers, or at the top.
+tree() {
+  printf '%%YAML 1.1\n%%TAG !v! tag:vexel.com,2011:\n'
+  for node in 11 21 31 41; do
+    printf -- '--- !v!1 &%s\nGameObject:\n  m_Component:\n  - component: {fileID: %s}\n  m_Name: N%s\n' $((node - 1)) $node $node
+    printf -- '--- !v!4 &%s\nTransform:\n  m_GameObject: {fileID: %s}\n  m_Children: ' $node $((node - 1))
+    if [ "$node" = "$1" ]; then printf '\n  - {fileID: 41}\n'; else echo '[]'; fi
+    printf '  m_Father: {fileID: %s}\n' $((node == 41 ? $1 : 0))
+  done
+}
+# moves MINE THEIRS: both move it from 11; one then settles that with base's father, the other with their own.
+moves() {
+  git reset -q --hard && git checkout -q -B tree start && tree 11 >"$file" && git commit -q -a -m tree
+  git checkout -q -B mine && tree "$1" >"$file" && git commit -q -a -m mine && git branch -f my-move
+  git checkout -q -B other tree && tree "$2" >"$file" && git commit -q -a -m other && git branch -f other-move
+  { git merge -q my-move >/dev/null 2>&1 || vexel-merge-git resolve --ours "$file" >/dev/null; } && git commit -q -m other
+  git checkout -q mine
+  { git merge -q other-move >/dev/null 2>&1 || vexel-merge-git resolve --base "$file" >/dev/null; } && git commit -q -m mine
+  stops git merge -q other
+}
+for fathers in "21 31" "0 21" "21 0"; do
+  check "a move from where it is kept is asked" moves $fathers
+  check "as one conflict" test "$(grep -c "^CONFLICT $file: N41 > Transform > m_Father: was undecided" "$work/err")" -eq 1
+  check "what stands meanwhile is sound" refuses grep -q undecided "$file"
+  check "one side's move can be taken" vexel-merge-git resolve --theirs "$file" >/dev/null
+  check "it is theirs" test "$(tail -1 "$file")" = "  m_Father: {fileID: ${fathers#* }}"
+  check "in a sound scene" vexel-merge-git check --staged
+  check "and taken back" vexel-merge-git resolve --ours "$file" >/dev/null
+  check "for ours" test "$(tail -1 "$file")" = "  m_Father: {fileID: 11}"
+  check "in a sound scene, too" vexel-merge-git check --staged
+done
 git reset -q --hard && git config rerere.enabled true
 # unlit_at SPEED: one side removes the lamp, the other edits it, while its script was edited before.
 unlit_at() {
