@@ -94,6 +94,11 @@ void SayMessages(std::string messages, const AssetVersions& versions) {
   if (messages.empty()) return;
   if (messages.ends_with('\n')) messages.pop_back();
   const std::string asset = "'" + Shown(versions.asset) + "'";
+  for (const auto& [side, name] :
+       {std::pair("the left file", "theirs"), std::pair("the right file", "ours")}) {
+    Replace(messages, std::string(side) + " '", "the file '");
+    Replace(messages, side, name);
+  }
   Replace(messages, "'" + versions.base + "'", asset);
   Replace(messages, "'" + versions.left + "'", asset + " (theirs)");
   Replace(messages, "'" + versions.right + "'", asset + " (ours)");

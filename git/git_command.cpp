@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdlib>
 #include <iostream>
 #include <string_view>
 
@@ -90,6 +91,11 @@ int RunGitCommand(const Arguments& command_line) {
     return kWrongUsage;
   }
   initialize();
+  // What these make of pathspecs is meant for the user's, and would undo what ours say.
+  for (const char* variable :
+       {"GIT_LITERAL_PATHSPECS", "GIT_GLOB_PATHSPECS", "GIT_NOGLOB_PATHSPECS", "GIT_ICASE_PATHSPECS"}) {
+    unsetenv(variable);
+  }
   // Git's own messages are all there is to read, also on a desktop.
   gHeadlessEnabled = true;
   const TempFilesGuard guard;

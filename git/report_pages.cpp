@@ -87,7 +87,7 @@ class PageMaker {
       scratch_.Write("decided", DecidedIn(record));
       call.insert(call.end(), {"-i", "decided"});
     }
-    std::string title = asset;
+    std::string title = asset + (merged_ ? std::string() : WhoseSides(asset));
     if (merged_) title += ", the parents of " + ShortHash(merged_->commit) + " merged anew";
     call.insert(call.end(), {"-o", target, "--title", title, versions.base, versions.left, versions.right});
     // From their folder, since the page shows the paths that were given.
@@ -102,6 +102,14 @@ class PageMaker {
   }
 
  private:
+  // In a rebase, what is the user's own is on the left.
+  std::string WhoseSides(const std::string& asset) const {
+    const RecordEntry entry = records_.Entry(asset);
+    const SideNames names = entry.asset.empty() ? FindSideNames(repository_) : entry.names;
+    return (names.theirs.empty() ? "" : ", left (theirs): " + names.theirs) +
+           (names.ours.empty() ? "" : ", right (ours): " + names.ours);
+  }
+
   bool WriteMerged(const std::string& asset, AssetVersions& versions) {
     const bool is_there = WriteVersions(*merged_, asset, scratch_, versions);
     if (!is_there) Say(asset + ": not in all three versions, so there is nothing to compare");
