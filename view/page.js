@@ -51,22 +51,23 @@ function drawUpTo(count) {
   main.append(fragment);
 }
 
-// The rest of thousands of cards comes while the first ones are being looked at.
+// The rest of thousands of cards comes while the first ones are being looked at. Pieces of so many cards, not of so
+// many milliseconds: on a busy machine these would get ever smaller, and each piece costs a look at all cards.
 function drawRest(of) {
   if (of !== order) return;
-  const until = performance.now() + 40;
-  while (drawn < order.length && performance.now() < until) drawUpTo(drawn + 1);
+  drawUpTo(drawn + (drawn === 0 ? 20 : 100));
   main.setAttribute("aria-busy", String(drawn < order.length));
   if (drawn === order.length) placeDivider();
   else setTimeout(drawRest, 0, of);
 }
 
+// Before the objects at the end that nothing is to be settled about.
 function placeDivider() {
-  const alone = order.filter((key) => !rowsOf(cards.get(key).data).some(settles));
-  const first = alone.length > 0 && alone.length < order.length ? cards.get(alone[0]).element : null;
-  divider.textContent = `Merged without a conflict: ${plural(alone.length, "object")}`;
+  const last = order.findLastIndex((key) => rowsOf(cards.get(key).data).some(settles));
+  const alone = order.length - last - 1;
+  divider.textContent = `Merged without a conflict: ${plural(alone, "object")}`;
   divider.hidden = filtering();
-  if (first) first.before(divider);
+  if (last >= 0 && alone > 0) cards.get(order[last]).element.after(divider);
   else divider.remove();
 }
 
@@ -258,6 +259,7 @@ function applyChanges({changed: whole, gone: wholeGone, order: newOrder, ...head
       many.firstElementChild.textContent = `all ${countAlike(many.dataset.field)} of this field`;
     }
   }
+  if (drawn === order.length) placeDivider();
   showHead();
   showShown();
   return found;

@@ -118,7 +118,7 @@ function tableHead({names, merging}) {
 
 function cardHead(card, {names, merging}) {
   const title = make("h2", "", make("span", "name", card.name || card.class), " ");
-  if (card.class !== "GameObject" && card.name) title.append(make("span", "class", card.class), " ");
+  if (card.class !== "GameObject" && card.class !== card.name) title.append(make("span", "class", card.class), " ");
   if (card.path && card.path !== card.name) title.append(make("span", "path", card.path), " ");
   for (const kind of card.kinds) {
     if (kind === "conflict") continue;
@@ -139,7 +139,7 @@ function makeGroup(object, context) {
   const title = make("th", "", object.title || object.class);
   title.colSpan = context.merging ? 5 : 3;
   title.scope = "rowgroup";
-  if (object.title && object.title !== object.class) title.append(" ", make("span", "class", object.class));
+  if (object.script) title.append(" ", make("span", "class", object.class));
   const rows = object.rows.map((row) => makeRow(object, row, context));
   return make("tbody", "", make("tr", "component", title), ...rows);
 }
