@@ -89,7 +89,7 @@ function showRest() {
   const open = openShown().length;
   const rest = byId("rest");
   const what = open === state.pending ? `all ${open} open` : `the ${open} open that are shown`;
-  rest.hidden = state.mode !== "merge" || state.conflicts === 0;
+  rest.hidden = state.mode !== "merge" || state.conflicts < 2;
   rest.firstElementChild.textContent = `${capital(what)}:`;
   rest.setAttribute("aria-label", `Take for ${what}`);
   // The buttons stay the same ones: somebody may be pressing one.
