@@ -19,7 +19,7 @@ class Page:
     def call(self, command, **body):
         request = urllib.request.Request(f"{self.session}/{command}", json.dumps(body).encode())
         try:
-            return json.load(urllib.request.urlopen(request, timeout=60))["value"]
+            return json.load(urllib.request.urlopen(request, timeout=300))["value"]
         except urllib.error.HTTPError as error:
             sys.exit(f"{command} {body}: {json.load(error)['value']['message'].splitlines()[0]}")
 
@@ -28,7 +28,7 @@ class Page:
 
     def wait(self, condition, what=None):
         """Until an expression is true in the page."""
-        deadline = time.monotonic() + 20
+        deadline = time.monotonic() + 60
         while not self.script(f"return Boolean({condition})"):
             if time.monotonic() > deadline:
                 sys.exit(f"{what or condition}: it does not come about")
@@ -45,6 +45,8 @@ class Page:
         return next(iter(self.call("element", using="css selector", value=selector).values()))
 
     def click(self, selector):
+        # The driver itself would scroll just far enough, which may be below a bar.
+        self.script("document.querySelector(arguments[0]).scrollIntoView({block: 'center'})", selector)
         self.call(f"element/{self.element(selector)}/click")
 
     def type(self, selector, text):
@@ -64,7 +66,7 @@ def browser(folder):
         try:
             yield page
         finally:
-            urllib.request.urlopen(urllib.request.Request(page.session, method="DELETE"), timeout=60)
+            urllib.request.urlopen(urllib.request.Request(page.session, method="DELETE"), timeout=300)
     finally:
         driver.kill()
         driver.wait()

@@ -65,7 +65,7 @@ class View:
                                 "row.dataset.path, row.querySelector('[aria-pressed=true]')?.dataset.choice ?? null]))")
 
     def ends_with(self, status, what):
-        expect(what, self.process.wait(timeout=20), status)
+        expect(what, self.process.wait(timeout=60), status)
 
 
 def settled_by_hand(view, choices, *options):
@@ -158,6 +158,25 @@ def choices_for_many(start):
         view.open(count, "each was one step")
 
 
+def many_in_one_object(start):
+    """It is drawn in parts, which are one object all the same."""
+    view = start({name: "--- !v!114 &1\nMonoBehaviour:\n" + "".join(f"  field{n}: {value}\n" for n in range(250))
+                  for name, value in (("base", 1), ("left", 2), ("right", 3))})
+    page = view.page
+    expect("every conflict is there", len(view.taken()), 250)
+    page.keys("n")
+    page.keys("k")
+    page.keys("o")
+    view.open(249, "the last one, which is before the first")
+    expect("it keeps the focus", page.script("return document.activeElement.dataset.path"), "1.MonoBehaviour.field249")
+    page.click("[data-card][data-take=theirs]")
+    view.open(0, "all of the object")
+    expect("each row shows it", set(view.taken().values()), {"theirs"})
+    page.click("#undo")
+    view.open(249, "and back")
+    expect("each row shows that", [path for path, side in view.taken().items() if side], ["1.MonoBehaviour.field249"])
+
+
 def what_a_choice_brings_up(start):
     types = ["--typeInfo", TYPES]
     view = start({"base": mesh(True, False), "left": mesh(False, False), "right": mesh(True, True)}, *types)
@@ -231,7 +250,8 @@ def main(programs):
             return views[-1]
 
         try:
-            for test in (settle_and_save, choices_for_many, what_a_choice_brings_up, give_up, hostile_values):
+            for test in (settle_and_save, choices_for_many, many_in_one_object, what_a_choice_brings_up, give_up,
+                         hostile_values):
                 started = time.monotonic()
                 test(start)
                 print(f"{test.__name__}: {time.monotonic() - started:.1f} s")
