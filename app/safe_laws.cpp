@@ -42,12 +42,12 @@ bool TakesEqualEditsOnce(const VexelObjects& base, const VexelObjects& side) {
 
 bool KeepsSceneSound(const SceneTriple& triple) {
   const SafelyMerged merged(*triple.base, *triple.left, *triple.right);
-  std::set<SceneFault> known;
+  std::set<const YAMLScalar*> broken;
   for (const VexelObjects* version : {triple.base.get(), triple.left.get(), triple.right.get()}) {
-    for (SceneFault& fault : CheckScene(*version)) known.insert(std::move(fault));
+    for (const SceneFault& fault : CheckScene(*version)) broken.insert(fault.file_id);
   }
   return std::ranges::all_of(CheckScene(*merged.scene), [&](const SceneFault& fault) {
-    return known.contains(fault) || merged.IsPendingAt(fault.file_id);
+    return broken.contains(fault.file_id) || merged.IsPendingAt(fault.file_id);
   });
 }
 

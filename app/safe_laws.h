@@ -8,8 +8,8 @@ namespace vexel_yaml {
 /// fields doesn't count.
 bool TakesEqualEditsOnce(const VexelObjects& base, const VexelObjects& side);
 
-/// Whether a safe merge either leaves everything whole that is whole in all three versions, or has a pending
-/// record at the object.
+/// Whether a safe merge either leaves every object whole that is whole in all three versions, or has a
+/// pending record at it.
 bool KeepsSceneSound(const SceneTriple& triple);
 
 }  // namespace vexel_yaml

@@ -47,11 +47,12 @@ class SceneChecker {
   void CheckListed(const YAMLScalar* holder, const YAMLScalar* key, const std::string& what) {
     if (holder == nullptr) return;
     const YAMLNode* object = objects_.Get(holder);
+    const YAMLMapping* body = GetBody(object);
     // A stripped object has no lists.
-    if (object == nullptr || ReadLinks(object).is_stripped) return;
+    if (body == nullptr || ReadLinks(object).is_stripped) return;
     const auto [known, is_new] = listed_.try_emplace({holder, key});
     if (is_new) {
-      for (const YAMLScalar* target : Targets(*GetBody(object), key)) ++known->second[target];
+      for (const YAMLScalar* target : Targets(*body, key)) ++known->second[target];
     }
     const size_t count = known->second.contains(file_id_) ? known->second.at(file_id_) : 0;
     if (count == 1) return;

@@ -79,13 +79,19 @@ const YAMLScalar* ScenePlan::GetFather(const YAMLScalar* node) const {
 }
 
 const YAMLScalar* ScenePlan::GetOwner(const YAMLScalar* file_id) const {
+  const auto owner_in = [&](const VexelObjects& version) { return ReadLinks(version.Get(file_id)).owner; };
   const auto owner = owners_.find(file_id);
-  if (owner != owners_.end()) return ReadLinks(Version(owner->second).Get(file_id)).owner;
-  const SceneVersions& versions = edits_.versions;
-  for (const VexelObjects* version : {&versions.base, &versions.left, &versions.right}) {
-    if (version->HasKey(file_id)) return ReadLinks(version->Get(file_id)).owner;
-  }
-  return nullptr;
+  if (owner != owners_.end()) return owner_in(Version(owner->second));
+  const auto object = objects_.find(file_id);
+  if (object != objects_.end()) return owner_in(Version(object->second));
+  const auto& [base, left, right] = edits_.versions;
+  if (!left.HasKey(file_id)) return owner_in(right.HasKey(file_id) ? right : base);
+  const YAMLScalar* of_left = owner_in(left);
+  if (!right.HasKey(file_id) || !base.HasKey(file_id)) return of_left;
+  const YAMLScalar* of_base = owner_in(base);
+  const YAMLScalar* of_right = owner_in(right);
+  if (of_left == of_base) return of_right;
+  return of_right == of_base || of_right == of_left ? of_left : of_base;
 }
 
 void ScenePlan::Follow(const std::vector<Contest>& contests) {

@@ -133,6 +133,19 @@ SettledScene WhatToCheck(const SceneEdits& edits, bool threads) {
   return settled;
 }
 
+// Objects that nobody edited may get other lists. To be called before the versions change.
+void AddHolders(const std::vector<DerivedList>& lists, const VexelObjects& base, SettledScene& settled) {
+  std::unordered_set<const YAMLScalar*> seen(settled.touched.begin(), settled.touched.end());
+  FileIDs holders;
+  for (const DerivedList& list : lists) {
+    if (seen.insert(list.file_id).second) holders.push_back(list.file_id);
+  }
+  // Nobody edited them: they are alike in all versions that have them.
+  const std::vector<SceneFault> faults = CheckScene(base, holders);
+  settled.known_faults.insert(faults.begin(), faults.end());
+  settled.touched.insert(settled.touched.end(), holders.begin(), holders.end());
+}
+
 bool HaveBothDoneTheSame(const SceneEdits& edits) {
   const auto& [left, right] = edits.changes;
   if (left.IsEmpty() || left.kinds != right.kinds) return false;
@@ -159,7 +172,9 @@ SettledScene SettleScene(SceneVersions versions, RecordingConflictResolver& reso
     Reconcile(edits, resolver, contests, plan);
     const Records along = WhatGoesAlong(edits, plan, contests);
     const OutsidePlaces outside(edits, plan);
-    ExecutePlan(plan, MakeDerivedLists(edits, plan, resolver), versions);
+    const std::vector<DerivedList> lists = MakeDerivedLists(edits, plan, resolver);
+    AddHolders(lists, versions.base, settled);
+    ExecutePlan(plan, lists, versions);
     outside.Settle(versions);
     Record(contests, along, resolver, settled.notes);
   }

@@ -133,6 +133,15 @@ TEST(SafeMerge, AChoiceForAMoveStandsWhereAnotherOneDissolvedTheCircle) {
   EXPECT_EQ(chosen.At("21", "m_Children"), "- {fileID: 11}");
 }
 
+TEST(SafeMerge, AComponentIsListedByTheGameObjectThatItNames) {
+  std::string loose = Lamp(10);
+  loose.replace(loose.rfind("  m_GameObject: {fileID: 10}"), 28, "  m_Note: 1");
+  std::string left = Lamp(10, 0, "", 3), right = Lamp(10, 0, "", 2) + Lamp(20);
+  const SafelyMerged mended(loose, left, right);
+  EXPECT_EQ(mended.At("10", "m_Component"), "- component: {fileID: 11}\n- component: {fileID: 12}");
+  EXPECT_EQ(mended.At("12", "m_GameObject"), "{fileID: 10}");
+}
+
 TEST(SafeMerge, WhatBothDidAlikeIsTakenAsItIs) {
   const std::string broken = Lamp(10, 99, "{fileID: 98}");
   const SafelyMerged merged(Lamp(10), broken, broken);

@@ -63,6 +63,7 @@ TEST(CheckScene, NamesWhatAnEngineCantLoad) {
   EXPECT_THAT(FaultsOf(Thing(10) + Thing(20, "", 11)), ElementsAre("21 is no child in the list of 11"));
   EXPECT_THAT(FaultsOf(parent + Thing(20)), ElementsAre("11 lists the child 21, which is none of it"));
   EXPECT_THAT(FaultsOf(Thing(10, "{fileID: 11}", 11)), ElementsAre("11 hangs below itself"));
+  EXPECT_THAT(FaultsOf("--- !v!1 &7\nGameObject: 1\n" + Script(5, "m_GameObject: {fileID: 7}")), IsEmpty());
   EXPECT_THAT(FaultsOf(Script(5, "target: {fileID: 7}")), ElementsAre("5 refers to 7, which isn't there"));
 }
 
