@@ -174,6 +174,7 @@ class Check {
   }
 
   void ReportStaged(RecordEntry entry) {
+    if (entry.asset.empty()) return;
     const auto blobs = IndexBlobs({entry.asset}, true);
     if (!blobs) throw CommandError("", kGitRefused);
     const auto blob = blobs->find(entry.asset);

@@ -159,22 +159,28 @@ bool ConflictRecords::Remember(const Places& places, RecordEntry& entry,
                                const std::string& hooks_folder) const {
   // The first version had a list of this name.
   if (IsFile(folder_)) unlink(folder_.c_str());
-  const bool is_first = mkdir(folder_.c_str(), 0777) == 0;
-  if (!is_first && !IsFolder(folder_)) return false;
+  if (mkdir(folder_.c_str(), 0777) != 0 && !IsFolder(folder_)) return false;
   entry.hash = hash();
   if (!WriteEntry(places.entry, entry)) return false;
-  const bool are_placed = hooks_folder.empty() && PlaceHooks(repository_);
+  const bool are_placed = !hooks_folder.empty() || PlaceHooks(repository_);
   const std::vector<std::string> foreign = ForeignGuards(repository_, hooks_folder);
-  if (is_first && !foreign.empty()) {
-    Say("warning: hooks of your own are in use (" + Joined(foreign) +
-        "), so nothing stops a commit of what nobody has settled: run 'vexel-merge-git check --staged' "
-        "before "
-        "it, or there");
-  } else if (is_first && hooks_folder.empty() && !are_placed) {
-    Say("warning: no hooks can be placed here, so nothing stops a commit of what nobody has settled: run "
-        "'vexel-merge-git check --staged' before it");
+  if (!foreign.empty()) {
+    TellUnguarded("hooks of your own are in use (" + Joined(foreign) + ")");
+  } else if (!are_placed) {
+    TellUnguarded("no hooks can be placed here");
   }
   return true;
+}
+
+// Once in a merge of many files, in which git holds one lock.
+void ConflictRecords::TellUnguarded(const std::string& reason) const {
+  const std::string mark = folder_ + "/.vexel-told";
+  const std::string lock = repository_.LockMark();
+  if (lock.empty() || TextOf(mark) == lock) return;
+  PutFile(mark, lock);
+  Say("warning: " + reason +
+      ", so nothing stops a commit of what nobody has settled: run 'vexel-merge-git check --staged' before "
+      "it");
 }
 
 // Remembered first, so that no record is there that nobody removes.

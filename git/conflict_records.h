@@ -78,6 +78,7 @@ class ConflictRecords {
   Places PlacesFor(const std::string& asset) const;
   bool Remember(const Places& places, RecordEntry& entry, const std::function<std::string()>& hash,
                 const std::string& hooks_folder) const;
+  void TellUnguarded(const std::string& reason) const;
   /// Returns the record's path; empty where it can't.
   std::string Place(RecordEntry entry, const AssetMerge& merge, std::string_view merged,
                     const std::function<std::string()>& hash, const std::string& hooks_folder) const;

@@ -112,8 +112,8 @@ class DriverRun {
       PutFile(versions_.right, TextOf(versions_.base));
       return AssetMerge::kFailed;
     }
-    Say(versions_.asset + " is not merged, but left as ours has it; take it so with '" +
-        ResolveCall(versions_.asset, "resolve --as-is") + "', or theirs with 'git checkout --theirs'");
+    Say(versions_.asset + " is not merged, but left as ours has it; to take it so: " +
+        ResolveCall(versions_.asset, "resolve --as-is") + ", or theirs: git checkout --theirs, and git add");
     if (keeps_records_) GuardUnmerged();
     return AssetMerge::kFailed;
   }

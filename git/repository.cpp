@@ -1,5 +1,7 @@
 #include "git/repository.h"
 
+#include <sys/stat.h>
+
 #include <cstdlib>
 #include <filesystem>
 
@@ -47,6 +49,12 @@ Repository::Repository() : folder_(FindFolder()), common_folder_(Variable("GIT_C
 }
 
 bool Repository::IsLocked() const { return FileExists(Path("index.lock")); }
+
+std::string Repository::LockMark() const {
+  struct stat status = {};
+  if (stat(Path("index.lock").c_str(), &status) != 0) return {};
+  return std::to_string(status.st_ino) + " " + std::to_string(status.st_mtime) + "\n";
+}
 
 bool Repository::IsAtWork() const {
   for (const char* name : {"MERGE_HEAD", "CHERRY_PICK_HEAD", "REVERT_HEAD", "rebase-merge", "rebase-apply"}) {

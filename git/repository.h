@@ -28,6 +28,9 @@ class Repository {
   /// Whether git holds the index right now.
   bool IsLocked() const;
 
+  /// What tells the lock by which git holds it from others; empty where there is none.
+  std::string LockMark() const;
+
  private:
   std::string folder_;
   std::string common_folder_;

@@ -50,11 +50,6 @@ std::optional<ElementName> ReadElementName(std::string_view text) {
   return error == std::errc() && rest == end ? std::optional(name) : std::nullopt;
 }
 
-void Parse(const std::string& text, VexelObjects& objects) {
-  // The parser could not even start.
-  if (!ParseYAMLString(text, objects)) throw std::bad_alloc();
-}
-
 class PlaceComparison {
  public:
   PlaceComparison(const std::string& merged, const std::string& later, bool is_safe,
@@ -63,6 +58,8 @@ class PlaceComparison {
     Parse(merged, merged_);
     Parse(later, later_);
   }
+  PlaceComparison(const PlaceComparison&) = delete;
+  PlaceComparison& operator=(const PlaceComparison&) = delete;
 
   bool IsSame(const FieldPath& place) {
     if (place.size() == 1) return IsSameObject(ResolveEscapes(place.front()));
@@ -74,6 +71,12 @@ class PlaceComparison {
   }
 
  private:
+  // Nearly every object is the same in all versions, and is not even looked at.
+  void Parse(const std::string& text, VexelObjects& objects) {
+    // The parser could not even start.
+    if (!ParseYAMLText(FileText(text), objects, cache_)) throw std::bad_alloc();
+  }
+
   // Once, and only for a place that may be in a list.
   void ReadSides() {
     if (are_sides_read_) return;
@@ -143,6 +146,7 @@ class PlaceComparison {
   const bool is_safe_;
   const std::function<SideTexts()>& sides_;
   bool are_sides_read_ = false;
+  DocumentCache cache_;
   VexelObjects merged_;
   VexelObjects later_;
   VexelObjects base_;

@@ -162,7 +162,7 @@ printf '#!/bin/sh\nexit 0\n' >.git/hooks/pre-commit && chmod +x .git/hooks/pre-c
 git merge -q doors >/dev/null 2>&1 || :
 check "somebody's own hook stays" cmp .git/hooks/pre-commit "$work/own"
 git merge --abort && git merge doors >/dev/null 2>"$work/err" || :
-check "it is said that nothing stops a commit then" grep -q '^warning: hooks of your own are in use (pre-commit)' "$work/err"
+check "it is said that nothing stops a commit then, also the second time" grep -q '^warning: hooks of your own are in use (pre-commit)' "$work/err"
 check "by the status as well" grep -q '^hooks .*(pre-commit)' <(vexel-merge-git status)
 git merge --abort && rm .git/hooks/pre-commit
 git merge -q doors >/dev/null 2>&1 || echo 'echo mine' >>.git/hooks/pre-commit
@@ -220,6 +220,15 @@ git commit -q -m broken
 check "in its commit as well" stops vexel-merge-git check HEAD
 git commit -q --allow-empty -m next
 check "and not in the next one" vexel-merge-git check HEAD
+git clone -q --depth 1 "file://$PWD" "$work/shallow" && cp "$file" Untracked.vexel
+check "a file is looked at that nobody has added" stops vexel-merge-git check Untracked.vexel
+check "one that isn't there is an error" stops vexel-merge-git check -- none.vexel
+rm Untracked.vexel && cd "$work/shallow"
+check "whoever lacks the history is told" stops vexel-merge-git check HEAD
+cd "$work/repository"
+git checkout -q --orphan first && git commit -q -m first
+check "a first commit is looked at, too" stops vexel-merge-git check HEAD
+git checkout -q --detach dark && git branch -q -D first
 
 # More conflicts than anybody reads, in two lamps of one name.
 git checkout -q -b many start && printf '  key%02d: 1\n' {1..12} >keys
