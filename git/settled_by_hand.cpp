@@ -11,6 +11,7 @@
 #include "scene/list_alignment.h"
 #include "scene/same_fields.h"
 #include "yaml/read_yaml.h"
+#include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
 
@@ -166,8 +167,10 @@ void MarkSettledByHand(const std::string& merged, const std::string& later, cons
     }
   } catch (const std::bad_alloc&) {
     throw;
-  } catch (const std::exception&) {
+  } catch (const YAMLError&) {
     // Whoever commits such a file is asked.
+  } catch (const std::exception&) {
+    // The same for rules that can't be read.
   }
 }
 

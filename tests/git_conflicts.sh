@@ -113,7 +113,10 @@ vexel-merge-git check >"$work/out" 2>&1 || :
 check "one of three is settled by hand" test "$(grep -c ^CONFLICT "$work/out")" -eq 2
 check "the others stop the commit" stops git commit -q -a -m early
 check "they are counted" grep -q "^error: $file is staged with 2 conflicts that nobody has settled" "$work/err"
-git add "$file" 2>"$work/err"
+cp "$file" "$work/edited" && printf '%%YAML 1.1\n--- !v!1 &1\nA: [\n' >"$file"
+check "what can't be read is still open" test "$(vexel-merge-git check 2>/dev/null | grep -c ^CONFLICT)" -eq 3
+check "and not merged with a choice" stops vexel-merge-git resolve --theirs "$file"
+cp "$work/edited" "$file" && git add "$file" 2>"$work/err"
 check "and were when it was staged" grep -q "^warning: $file is staged with 2 conflicts" "$work/err"
 check "a choice elsewhere leaves the edit" stops vexel-merge-git resolve --theirs --path '*.Light.*' "$file"
 check "which is merged" test "$(grep -c 'speed: 5\|m_Intensity: 4' "$file")" -eq 2
