@@ -1,4 +1,4 @@
-# Completes VexelYAMLMerge, vexel-merge-git and vexel-merge-report in bash 4 and later. It needs nothing else: without
+# Completes VexelYAMLMerge and the vexel-merge programs in bash 4 and later. It needs nothing else: without
 # the bash-completion package, source this file in ~/.bashrc.
 
 # _vexel_offer CANDIDATE...: those that begin with what has been typed.
@@ -101,7 +101,25 @@ _vexel_merge_report() {
       *) if _vexel_option_value; then return; fi ;;
     esac
     if [[ "$cur" == -* ]]; then
-      _vexel_offer -o --title -i --rules --typeInfo --safe --conflicts --text --version --help
+      _vexel_offer -o --title -i --rules --typeInfo --safe --json --conflicts --text --version --help
+      return
+    fi
+  fi
+  _vexel_files vexel prefab meta
+}
+
+_vexel_merge_view() {
+  local cur prev
+  _vexel_words
+  if ! _vexel_paths_started 1 " -i -o --rules --typeInfo --title --theirs --ours --base --port --idle-timeout "; then
+    case "$prev" in
+      --title | --theirs | --ours | --base | --port | --idle-timeout) return ;;
+      -o) _vexel_files && return ;;
+      *) if _vexel_option_value; then return; fi ;;
+    esac
+    if [[ "$cur" == -* ]]; then
+      _vexel_offer -i -o --plain --rules --typeInfo --title --theirs --ours --base --port --no-browser \
+        --idle-timeout --version --help
       return
     fi
   fi
@@ -172,3 +190,4 @@ _vexel_merge_git() {
 complete -F _vexel_yaml_merge VexelYAMLMerge
 complete -F _vexel_merge_git vexel-merge-git
 complete -F _vexel_merge_report vexel-merge-report
+complete -F _vexel_merge_view vexel-merge-view

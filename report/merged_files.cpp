@@ -45,7 +45,7 @@ Merged MergeValues(MergedFiles& files, TimerStat& timer) {
 }
 
 Merged MergeScenes(MergedFiles& files, TimerStat& timer) {
-  files.settled = files.read.Copy();
+  files.settled = files.untouched.Copy();
   SafeMergeResult result = SafeMerge(*files.settled, files.resolver, {.keep_comparable = true}, timer);
   files.notes = std::move(result.notes);
   return {std::move(result.unrepaired), std::move(result.repaired)};
@@ -63,18 +63,22 @@ void Merge(MergedFiles& files) {
 
 }  // namespace
 
-void ReadForReport(const ReportConfig& config, MergedFiles& files) {
+void ReadVersions(const ReportConfig& config, SceneDocuments& documents) {
   TimerStat silent("", nullptr);
-  SceneDocuments& read = files.read;
   const bool threads = AreWorthThreads({config.base_path, config.left_path, config.right_path});
-  files.safe = config.safe;
   if (config.safe) {
-    ReadScenes(config.base_path, config.left_path, config.right_path, read, threads, silent);
+    ReadScenes(config.base_path, config.left_path, config.right_path, documents, threads, silent);
   } else {
-    ReadMergeDocuments(config.base_path, config.left_path, config.right_path, read, threads, silent);
-    read.renumbered = PrepareForDiff(read.base, read.left, read.right);
+    ReadMergeDocuments(config.base_path, config.left_path, config.right_path, documents, threads, silent);
+    documents.renumbered = PrepareForDiff(documents.base, documents.left, documents.right);
   }
-  files.diffs = CreateDiffPair({read.base, read.left}, {read.base, read.right}, threads, silent);
+}
+
+void CompareVersions(MergedFiles& files, bool threads) {
+  TimerStat silent("", nullptr);
+  files.untouched.CopyTo(files.read);
+  const auto& [base, left, right] = static_cast<const MergeDocuments&>(files.read);
+  files.diffs = CreateDiffPair({base, left}, {base, right}, threads, silent);
 }
 
 std::vector<RecordingConflictResolver::RecordResolve> ReadResolutions(const std::string& path) {
@@ -107,7 +111,9 @@ void MergeRead(MergedFiles& files, std::vector<RecordingConflictResolver::Record
 void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   TimerStat silent("", nullptr);
   SetupRulesAndTypes(config.rules_file, config.type_info_file, silent);
-  ReadForReport(config, files);
+  files.safe = config.safe;
+  ReadVersions(config, files.untouched);
+  CompareVersions(files, AreWorthThreads({config.base_path, config.left_path, config.right_path}));
   std::vector<RecordingConflictResolver::RecordResolve> resolutions;
   if (!config.merge_file.empty()) resolutions = ReadResolutions(config.merge_file);
   MergeRead(files, std::move(resolutions));

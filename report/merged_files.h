@@ -26,6 +26,9 @@ struct ReportConfig {
 struct MergedFiles {
   SceneDocuments read;
   DiffPair diffs;
+  /// What was read, for a safe merge: it takes an object for edited that was unfolded in one version alone,
+  /// as a look at `read` does.
+  SceneDocuments untouched;
   bool safe = false;
   /// What became of the versions where they were merged as scenes, else null: records may refer to it.
   std::unique_ptr<SceneDocuments> settled;
@@ -43,8 +46,10 @@ struct MergedFiles {
 /// throw, and YAMLError where the resolutions can't be read.
 void MergeForReport(const ReportConfig& config, MergedFiles& files);
 
-/// The parts of it, for whoever merges the same files again and again; rules and types are loaded.
-void ReadForReport(const ReportConfig& config, MergedFiles& files);
+/// The parts of it, for whoever merges the same files again and again; rules and types are loaded. First,
+/// what the files hold; once it is `untouched`, it is compared.
+void ReadVersions(const ReportConfig& config, SceneDocuments& documents);
+void CompareVersions(MergedFiles& files, bool threads);
 /// Reads the resolutions of the record file at `path`. Throws YAMLError.
 std::vector<RecordingConflictResolver::RecordResolve> ReadResolutions(const std::string& path);
 /// Forgets what an earlier merge left in `files`. That the merge fails is said there.

@@ -145,29 +145,39 @@ const YAMLScalar* ObjectNames::ParentOf(const YAMLScalar* transform) const {
   return ReferenceAt(Modification(prefab), YAMLScalar::mTransformParent);
 }
 
-std::string ObjectNames::TransformPath(const YAMLScalar* transform) const {
-  std::vector<std::string> names;
-  std::unordered_set<const YAMLScalar*> seen;
-  for (; transform != nullptr && seen.insert(transform).second; transform = ParentOf(transform)) {
+const ObjectNames::Step& ObjectNames::StepAt(const YAMLScalar* transform) {
+  const auto [entry, is_new] = steps_.try_emplace(transform);
+  if (is_new) {
     std::string name = GetOwnName(transform);
     if (name.empty()) name = GetOwnerName(transform);
-    if (name.empty()) break;
+    entry->second = {Shortened(name, kMostOfName), ParentOf(transform)};
+  }
+  return entry->second;
+}
+
+std::string ObjectNames::TransformPath(const YAMLScalar* transform) {
+  std::vector<std::string_view> names;
+  std::unordered_set<const YAMLScalar*> seen;
+  while (transform != nullptr && seen.insert(transform).second) {
+    const Step& step = StepAt(transform);
+    if (step.name.empty()) break;
     if (names.size() == kMostNames) {
       names.emplace_back(kEllipsis);
       break;
     }
-    names.push_back(Shortened(name, kMostOfName));
+    names.push_back(step.name);
+    transform = step.parent;
   }
   std::ranges::reverse(names);
   std::string path;
-  for (const std::string& name : names) {
+  for (const std::string_view name : names) {
     if (!path.empty()) path += '/';
     path += name;
   }
   return path;
 }
 
-std::string ObjectNames::FindPath(const YAMLScalar* file_id) const {
+std::string ObjectNames::FindPath(const YAMLScalar* file_id) {
   const YAMLMapping* body = Body(file_id);
   const YAMLScalar* game_object = ReferenceAt(body, YAMLScalar::mGameObject);
   if (game_object == nullptr && GetClass(file_id) == YAMLScalar::gameObject->GetText()) game_object = file_id;

@@ -55,10 +55,18 @@ class ObjectNames {
   const YAMLMapping* Body(const YAMLScalar* file_id) const;
   const YAMLScalar* TransformOf(const YAMLScalar* game_object) const;
   const YAMLScalar* ParentOf(const YAMLScalar* transform) const;
-  std::string TransformPath(const YAMLScalar* transform) const;
-  std::string FindPath(const YAMLScalar* file_id) const;
+  std::string TransformPath(const YAMLScalar* transform);
+  std::string FindPath(const YAMLScalar* file_id);
+
+  /// A transform's part of the paths that lead by it.
+  struct Step {
+    std::string name;
+    const YAMLScalar* parent;
+  };
+  const Step& StepAt(const YAMLScalar* transform);
 
   std::vector<const VexelObjects*> versions_;
+  std::unordered_map<const YAMLScalar*, Step> steps_;
   std::unordered_map<const YAMLScalar*, std::string> paths_;
   std::map<std::string, std::string> script_classes_;
 };

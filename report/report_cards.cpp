@@ -18,8 +18,11 @@ std::vector<ReportCard> MakeCards(std::vector<ReportObject> objects, ObjectNames
     cards[place->second].objects.push_back(std::move(object));
   }
   for (ReportCard& card : cards) {
-    std::ranges::sort(card.objects, {}, [&](const ReportObject& object) {
-      return std::tuple(object.file_id != card.file_id, object.class_name, object.file_id->GetText());
+    std::ranges::sort(card.objects, [&](const ReportObject& a, const ReportObject& b) {
+      const bool is_part_a = a.file_id != card.file_id;
+      const bool is_part_b = b.file_id != card.file_id;
+      return std::tie(is_part_a, a.class_name, a.file_id->GetText()) <
+             std::tie(is_part_b, b.class_name, b.file_id->GetText());
     });
   }
   return cards;

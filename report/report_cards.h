@@ -15,6 +15,8 @@ struct ReportCard {
   std::string path;
   std::string class_name;
   std::vector<ReportObject> objects;
+
+  bool operator==(const ReportCard& other) const = default;
 };
 
 /// In the order of the objects; those of a card are in an order that doesn't change as conflicts are settled.

@@ -13,6 +13,7 @@
 #include "report/conflict_list.h"
 #include "report/merged_files.h"
 #include "report/readable_headers.h"
+#include "report/report_json.h"
 #include "report/value_text.h"
 #include "report/write_page.h"
 #include "yaml/yaml_error.h"
@@ -24,13 +25,15 @@ namespace {
 constexpr std::string_view kUsage =
     "usage: vexel-merge-report [options] <base> <left> <right>\n"
     "           writes what a merge of the three files does as a page for the browser\n"
+    "       vexel-merge-report --json [options] <base> <left> <right>\n"
+    "           writes the same as JSON for other programs\n"
     "       vexel-merge-report --conflicts [options] <base> <left> <right>\n"
     "           prints one line a conflict: a pattern for its path, what left did, what right did, between "
     "tabs\n"
     "       vexel-merge-report --text <file>\n"
     "           prints a scene or prefab with the names of its objects in their header lines\n"
     "\n"
-    "options: -o FILE         where the page goes (report.html); - for standard output\n"
+    "options: -o FILE         where the page goes (report.html), or the JSON; - for standard output\n"
     "         --title TEXT    the page's title\n"
     "         -i FILE         settle conflicts as FILE says\n"
     "         --rules FILE    other merge rules than the default ones\n"
@@ -38,7 +41,7 @@ constexpr std::string_view kUsage =
     "         --safe          merge scenes as scenes, as VexelYAMLMerge merge --safe does\n"
     "         --version, --help\n";
 
-enum class Mode { kPage, kConflicts, kText };
+enum class Mode { kPage, kJson, kConflicts, kText };
 
 struct Arguments {
   Mode mode = Mode::kPage;
@@ -84,6 +87,8 @@ Arguments Parse(const std::vector<std::string>& arguments) {
       only_paths = true;
     } else if (argument == "--conflicts") {
       parsed.mode = Mode::kConflicts;
+    } else if (argument == "--json") {
+      parsed.mode = Mode::kJson;
     } else if (argument == "--text") {
       parsed.mode = Mode::kText;
     } else if (argument == "--safe") {
@@ -105,6 +110,7 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   }
   for (size_t i = 0; i < paths.size(); ++i) *paths[i] = given[i];
   if (parsed.mode == Mode::kPage && parsed.output.empty()) parsed.output = DefaultPage();
+  if (parsed.mode == Mode::kJson && parsed.output.empty()) parsed.output = "-";
   return parsed;
 }
 
@@ -125,17 +131,25 @@ void PrintConflicts(const RecordingConflictResolver& resolver) {
   }
 }
 
-void WritePageFile(const Arguments& arguments, const MergedFiles& files) {
+void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostream& out) {
   const ReportConfig& config = arguments.config;
   const std::string title = arguments.title.empty() ? "Merge report" : arguments.title;
+  if (arguments.mode == Mode::kJson) {
+    out << ReportJson(files, title);
+    return;
+  }
   const PageHead head = {title, config.base_path, config.left_path, config.right_path, files.error};
+  WritePage(out, head, CollectReport(files));
+}
+
+void WriteReportFile(const Arguments& arguments, const MergedFiles& files) {
   if (arguments.output == "-") {
-    WritePage(std::cout, head, CollectReport(files));
+    WriteReport(arguments, files, std::cout);
     return;
   }
   const TempFilesGuard guard;
   FileReplacement file(VexelToNativePath(arguments.output));
-  WritePage(file.Stream(), head, CollectReport(files));
+  WriteReport(arguments, files, file.Stream());
   file.Commit();
 }
 
@@ -150,8 +164,8 @@ int Report(const Arguments& arguments) {
   const std::string prefix = "Cannot merge file '" + arguments.config.base_path + "': ";
   try {
     MergeForReport(arguments.config, files);
-    if (arguments.mode == Mode::kPage) {
-      WritePageFile(arguments, files);
+    if (arguments.mode == Mode::kPage || arguments.mode == Mode::kJson) {
+      WriteReportFile(arguments, files);
       return 0;
     }
     if (!files.error.empty()) return Fail(prefix + files.error);

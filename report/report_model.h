@@ -48,6 +48,8 @@ struct ReportRow {
   std::string record_path;
   bool repaired = false;
   std::string note;
+
+  bool operator==(const ReportRow& other) const = default;
 };
 
 /// An object that somebody changed, or that the merge is in trouble with.
@@ -63,6 +65,8 @@ struct ReportObject {
   bool pending = false;
   bool repaired = false;
   std::vector<ReportRow> rows;
+
+  bool operator==(const ReportObject& other) const = default;
 };
 
 /// What the two sides are called in notes.

@@ -136,9 +136,9 @@ std::string Readable(std::string_view key) {
   if (key.starts_with("m_") && key.size() > 2) key.remove_prefix(2);
   std::string text;
   for (size_t i = 0; i < key.size(); ++i) {
-    const bool begins_word = IsUpper(key[i]) && i > 0 &&
-                             (IsLower(key[i - 1]) || IsDigit(key[i - 1]) ||
-                              (IsUpper(key[i - 1]) && i + 1 < key.size() && IsLower(key[i + 1])));
+    const bool begins_word =
+        IsUpper(key[i]) && i > 0 &&
+        (IsLower(key[i - 1]) || (IsUpper(key[i - 1]) && i + 1 < key.size() && IsLower(key[i + 1])));
     if (begins_word) text += ' ';
     const bool is_first = text.empty() || text.back() == ' ';
     if (key[i] == '_') {

@@ -7,12 +7,16 @@ namespace vexel_yaml {
 
 std::unique_ptr<SceneDocuments> SceneDocuments::Copy() const {
   auto copy = std::make_unique<SceneDocuments>();
-  base.CopyTo(copy->base);
-  left.CopyTo(copy->left);
-  right.CopyTo(copy->right);
-  copy->renumbered = renumbered;
-  copy->repeated_keys = repeated_keys;
+  CopyTo(*copy);
   return copy;
+}
+
+void SceneDocuments::CopyTo(SceneDocuments& target) const {
+  base.CopyTo(target.base);
+  left.CopyTo(target.left);
+  right.CopyTo(target.right);
+  target.renumbered = renumbered;
+  target.repeated_keys = repeated_keys;
 }
 
 void ReadScenes(const std::string& base_path, const std::string& left_path, const std::string& right_path,

@@ -16,6 +16,8 @@ struct SceneDocuments : MergeDocuments {
   RepeatedKeys repeated_keys;
 
   std::unique_ptr<SceneDocuments> Copy() const;
+  /// The same into documents that are there already, and empty.
+  void CopyTo(SceneDocuments& target) const;
 };
 
 /// Reads the three files into empty `documents`, on threads of their own if `threads`, and prepares them for

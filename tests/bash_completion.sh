@@ -12,7 +12,7 @@ export HOME="$work" XDG_CONFIG_HOME="$work" XDG_DATA_HOME="$work" GIT_CONFIG_NOS
 
 export PATH="$work/bin:$PATH"
 mkdir "$work/bin" "$work/project" && cd "$work/project"
-for program in VexelYAMLMerge vexel-merge-git vexel-merge-report; do
+for program in VexelYAMLMerge vexel-merge-git vexel-merge-report vexel-merge-view; do
   printf '#!/bin/sh\n{ printf "%%s" "${0##*/}"; printf "<%%s>" "$@"; echo; } >>"$HOME/calls"\n' >"$work/bin/$program"
   chmod +x "$work/bin/$program"
 done
@@ -31,7 +31,7 @@ printf '%b\n' "source $completions/VexelYAMLMerge.bash" 'vexel-merge-git res\t\t
   'vexel-merge-git resolve --path 12\t' 'vexel-merge-git report fir\t' \
   'vexel-merge-git resolve --le\t--pa\t11\tAssets/Main\\ S\t' 'vexel-merge-git enable --pat\t\t' \
   'VexelYAMLMerge me\t--fallb\tno\t--nothr\tAssets/O\t"Assets/Mai\t' 'cd Code' \
-  'vexel-merge-git resolve -- \t' 'vexel-merge-report --conf\t../Assets/O\t' exit |
+  'vexel-merge-git resolve -- \t' 'vexel-merge-report --conf\t../Assets/O\t' 'vexel-merge-view --no\t../Assets/O\t' exit |
   python3 -c 'import pty; pty.spawn(["bash", "--norc", "--noprofile", "-i"])' >"$work/terminal" 2>&1
 diff - "$work/calls" <<'CALLS' || { cat "$work/terminal" >&2; exit 1; }
 vexel-merge-git<resolve><Assets/Main Scene.vexel>
@@ -42,6 +42,7 @@ vexel-merge-git<enable><--patterns><*.vexel *.prefab *.meta>
 VexelYAMLMerge<merge><--fallback><none><--nothreads><Assets/Other.prefab><Assets/Main Scene.vexel>
 vexel-merge-git<resolve><--><../Assets/Main Scene.vexel>
 vexel-merge-report<--conflicts><../Assets/Other.prefab>
+vexel-merge-view<--no-browser><../Assets/Other.prefab>
 CALLS
 
 zsh -n "$completions/_VexelYAMLMerge"

@@ -104,7 +104,8 @@ void LocalServer::Bind(int port) {
   } else if (bind_to_port(kLoopback, port)) {
     port_ = port;
   }
-  if (port_ > 0) return;
+  // The library's own backlog is five, and who finds it full tries again after a second.
+  if (port_ > 0 && ::listen(svr_sock_, SOMAXCONN) == 0) return;
   throw std::runtime_error(port == 0 ? "Cannot open a port for the page"
                                      : "Cannot open port " + std::to_string(port) + " for the page");
 }

@@ -6,6 +6,7 @@
 #include "merge/conflict_record_file.h"
 #include "report/report_json.h"
 #include "view/finished_file.h"
+#include "view/scene_excerpt.h"
 
 namespace vexel_yaml {
 
@@ -27,7 +28,15 @@ Settling::Settling(const ViewFile& file) : file_(file) {
   // Against itself a version has no changes.
   config.right_path = file.is_review ? file.base_path : file.right_path;
   config.safe = file.safe || file.is_review;
-  ReadForReport(config, files_);
+  ReadVersions(config, whole_);
+  files_.safe = config.safe;
+  if (file.safe && !file.is_review) {
+    MakeExcerpt(whole_, files_.untouched);
+  } else {
+    whole_.CopyTo(files_.untouched);
+  }
+  CompareVersions(files_, false);
+  whole_.CopyTo(shown_);
   Merge();
   TakeOverResolutions();
 }
@@ -84,7 +93,9 @@ void Settling::Merge() {
   } else {
     MergeRead(files_, AllResolutions());
   }
-  names_ = NamesOf(files_);
+  std::vector<const VexelObjects*> versions = {&shown_.right, &shown_.left, &shown_.base};
+  if (files_.merged != nullptr) versions.insert(versions.begin(), files_.merged.get());
+  names_.emplace(std::move(versions));
   std::vector<ReportObject> objects = CollectReport(files_, *names_, NamesInNotes(file_));
   FindScripts(objects);
   for (ReportObject& object : objects) object.class_name = names_->GetClass(object.file_id);
@@ -116,16 +127,16 @@ void Settling::CountConflicts(const std::vector<ReportObject>& objects) {
 }
 
 void Settling::Save() {
-  const auto refuse = [](size_t count) {
-    throw std::runtime_error(count == 1 ? "1 conflict is not settled yet"
-                                        : std::to_string(count) + " conflicts are not settled yet");
-  };
   if (file_.is_review) throw std::runtime_error("Two versions that are only compared have no result");
   if (!files_.error.empty()) throw std::runtime_error("There is no result: " + files_.error);
-  if (pending_ > 0) refuse(pending_);
+  if (pending_ > 0) {
+    throw std::runtime_error(pending_ == 1 ? "1 conflict is not settled yet"
+                                           : std::to_string(pending_) + " conflicts are not settled yet");
+  }
   try {
-    const FinishedFile finished = FinishFile(files_.read, file_.safe, AllResolutions());
-    if (finished.has_pending) refuse(1);
+    const FinishedFile finished = FinishFile(whole_, file_.safe, AllResolutions());
+    if (finished.has_pending)
+      throw std::runtime_error("The whole file has conflicts that its changed parts don't show");
     file_.store(finished.text, finished.record);
   } catch (const YAMLError& error) {
     throw std::runtime_error(Explained(error));

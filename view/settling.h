@@ -71,6 +71,10 @@ class Settling {
   void CountConflicts(const std::vector<ReportObject>& objects);
 
   const ViewFile file_;
+  /// As it was read, and for everybody who looks at it.
+  SceneDocuments whole_;
+  SceneDocuments shown_;
+  /// Of all that was read, or of what a merge looks at.
   MergedFiles files_;
   /// What was chosen before the page, as far as it can't be taken back there.
   std::vector<RecordingConflictResolver::RecordResolve> resolutions_ = file_.resolutions;

@@ -79,24 +79,29 @@ class ViewSession::OpenFile {
   std::vector<std::string> TakeCards() {
     std::vector<ReportCard> cards = settling_.TakeCards();
     order_.Arrange(cards);
-    std::unordered_map<std::string, std::string> texts;
+    std::unordered_map<std::string, Shown> shown;
     std::vector<std::string> changed;
     keys_.clear();
-    for (const ReportCard& card : cards) {
-      const std::string key = Cleaned(card.file_id->GetText());
-      std::string text = CardJson(card, settling_.GetNames());
-      const auto before = texts_.find(key);
-      if (before == texts_.end() || before->second != text) changed.push_back(key);
-      texts.emplace(key, std::move(text));
-      keys_.push_back(key);
+    for (ReportCard& card : cards) {
+      std::string key = Cleaned(card.file_id->GetText());
+      const auto before = shown_.find(key);
+      // Most cards are as they were, and making JSON of them would take as long as the merge.
+      if (before != shown_.end() && before->second.card == card) {
+        shown.insert(shown_.extract(before));
+      } else {
+        std::string text = CardJson(card, settling_.GetNames());
+        shown.emplace(key, Shown{std::move(card), std::move(text)});
+        changed.push_back(key);
+      }
+      keys_.push_back(std::move(key));
     }
-    texts_ = std::move(texts);
+    shown_ = std::move(shown);
     return changed;
   }
 
   Settling& GetSettling() { return settling_; }
   const std::vector<std::string>& GetKeys() const { return keys_; }
-  const std::string& GetText(const std::string& key) const { return texts_.at(key); }
+  const std::string& GetText(const std::string& key) const { return shown_.at(key).text; }
   bool IsSaved() const { return is_saved_; }
   void Save() {
     settling_.Save();
@@ -106,9 +111,14 @@ class ViewSession::OpenFile {
  private:
   Settling settling_;
   CardOrder order_;
-  // The cards' keys in their order, and their texts.
+  struct Shown {
+    // Its cells' nodes are those of a merge that is forgotten.
+    ReportCard card;
+    std::string text;
+  };
+  // The cards' keys in their order, and what the page was told.
   std::vector<std::string> keys_;
-  std::unordered_map<std::string, std::string> texts_;
+  std::unordered_map<std::string, Shown> shown_;
   bool is_saved_ = false;
 };
 

@@ -1,0 +1,298 @@
+#!/usr/bin/env python3
+# Settles conflicts with vexel-merge-view as its page does, and attacks it as other pages and programs may:
+#   view_requests.py <VexelYAMLMerge> <vexel-merge-view> <vexel-merge-report> <examples> [<random scenes>]
+
+import http.client
+import json
+import os
+import random
+import resource
+import signal
+import socket
+import subprocess
+import sys
+import tempfile
+import time
+from pathlib import Path
+
+sys.path.insert(0, str(Path(__file__).resolve().parent / "scene_editor"))
+import edits  # noqa: E402
+import scene  # noqa: E402
+
+MERGE, VIEW, REPORT, EXAMPLES = *map(os.path.abspath, sys.argv[1:4]), Path(sys.argv[4]).resolve()
+PAIRS = int(sys.argv[5]) if len(sys.argv) > 5 else 25
+HOSTILE = "<img src=x onerror=alert(1)>\u202e\u0001\t\"'</script>"
+
+
+def expect(what, got, wanted):
+    if got != wanted:
+        sys.exit(f"{what}: {got!r} instead of {wanted!r}")
+
+
+def node(name, number, father, children, fields=""):
+    kids = "".join(f"\n  - {{fileID: {child}1}}" for child in children) or " []"
+    return (f"--- !v!1 &{number}0\nGameObject:\n  m_Component:\n  - component: {{fileID: {number}1}}\n"
+            f"  m_Name: {json.dumps(name)}\n  m_IsActive: 1\n{fields}--- !v!4 &{number}1\nTransform:\n"
+            f"  m_GameObject: {{fileID: {number}0}}\n  m_Children:{kids}\n  m_Father: {{fileID: {father}}}\n")
+
+
+class View:
+    """A running program, and what its page would ask."""
+
+    def __init__(self, versions, *options, **environment):
+        self.folder = Path(tempfile.mkdtemp(dir=WORK))
+        self.versions = []
+        for name, text in zip(("base", "left", "right"), versions):
+            self.versions.append(str(self.folder / name))
+            if isinstance(text, str):
+                text = ("%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n" + text).encode()
+            Path(self.versions[-1]).write_bytes(text)
+        self.merged = self.folder / "merged.vexel"
+        self.merged.write_text("as it was\n")
+        if "BROWSER" not in environment:
+            options += ("--no-browser",)
+        self.program = subprocess.Popen([VIEW, *options, "--", *self.versions, str(self.merged)],
+                                        stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True,
+                                        env={**os.environ, **environment})
+        self.address = self.program.stdout.readline().strip()
+        host, self.secret = self.address.removeprefix("http://").rstrip("/").split("/")
+        self.port = int(host.split(":")[1])
+
+    def raw(self, method, path, body=None, **headers):
+        connection = http.client.HTTPConnection("127.0.0.1", self.port, timeout=20)
+        connection.request(method, path, body, {name.replace("_", "-"): text for name, text in headers.items()})
+        answer = connection.getresponse()
+        return answer, answer.read()
+
+    def get(self, place):
+        answer, body = self.raw("GET", f"/{self.secret}/{place}")
+        return answer.status, json.loads(body)
+
+    def post(self, place, **request):
+        answer, body = self.raw("POST", f"/{self.secret}/{place}", json.dumps(request), Content_Type="application/json")
+        return answer.status, json.loads(body)
+
+    def choose(self, **choices):
+        return self.post("choose", file=0, choices=[{"path": path, "choice": side} for path, side in choices.items()])
+
+    def end(self):
+        """The exit status, and what is at the destination."""
+        status = self.program.wait(20)
+        expect("nothing is left beside the files", [p.name for p in self.folder.iterdir() if "MERGE" in p.name], [])
+        return status, self.merged.read_text()
+
+
+def rows(state, cards="cards"):
+    return {row["key"]: row for card in state[cards] for part in card["objects"] for row in part["rows"]}
+
+
+def examples():
+    return [(EXAMPLES / f"{name}.vexel").read_bytes() for name in ("base", "left", "right")]
+
+
+LIGHT, DELAY = "500302.Light.m_Intensity", "501502.MonoBehaviour.waveDelay"
+
+
+def settles_as_merge_does(*mode):
+    view = View(examples(), "--theirs", "Ann", *(["--plain"] if not mode else []), "-o", "record")
+    _, state = view.get("state")
+    expect("what is open", (state["pending"], state["conflicts"], state["names"]["theirs"]), (2, 2, "Ann"))
+    light = rows(state)[LIGHT]
+    expect("their light", light["theirs"], {"kind": "changed", "text": "4", "value": {"type": "number", "number": "4"}})
+    expect("its name", (light["label"], light["path"], light["choice"]), ("Intensity", LIGHT, None))
+    expect("a save too early", view.post("save", file=0), (409, {"error": "2 conflicts are not settled yet"}))
+
+    status, delta = view.choose(**{LIGHT: "theirs"})
+    expect("a choice", (status, delta["pending"], [card["key"] for card in delta["changed"]]), (200, 1, ["100300"]))
+    expect("a settled place", rows(delta, "changed")[LIGHT]["result"]["text"], "4")
+    expect("a choice from an old page", view.post("choose", file=0, revision=1, choices=[])[0], 409)
+    view.choose(**{DELAY: "ours", LIGHT: "base"})
+    _, state = view.post("undo", file=0)
+    expect("what is taken back", (state["pending"], state["can_undo"], state["can_redo"]), (1, True, True))
+    _, before = view.get("state")
+    _, state = view.post("redo", file=0)
+    expect("what is done again", (state["pending"], state["can_redo"]), (0, False))
+    view.choose(**{LIGHT: None})
+    _, state = view.get("state")
+    expect("an open place", (state["pending"], rows(state)[LIGHT]["state"]), (1, "conflict"))
+    expect("the order", [card["key"] for card in state["cards"]], [card["key"] for card in before["cards"]])
+    view.choose(**{LIGHT: "theirs"})
+
+    expect("the save", view.post("save", file=0), (200, {"saved": True, "next": None}))
+    status, merged = view.end()
+    expect("the status of the saved merge", status, 0)
+    again = view.folder / "again"
+    subprocess.run([MERGE, "merge", "-h", "--force", "--fallback", "none", *mode, "-i", "record", "-o", os.devnull,
+                    *view.versions, again], check=True)
+    expect("the merge with the same choices is the same", again.read_text() == merged, True)
+
+
+def a_choice_brings_up_another_conflict():
+    # Each one hung theirs below the other's.
+    base = node("Crane", 1, 0, []) + node("Hook", 2, 0, [])
+    left = node("Crane", 1, 21, []) + node("Hook", 2, 0, [1])
+    right = node("Crane", 1, 0, [2]) + node("Hook", 2, 11, [])
+    view = View([base, left, right])
+    _, state = view.get("state")
+    places = [row["path"] for row in rows(state).values() if "path" in row]
+    expect("what is open", state["pending"], len(places))
+    _, delta = view.choose(**dict.fromkeys(places, "theirs"))
+    expect("all of theirs", delta["pending"], 0)
+    view.post("give-up")
+    expect("what is given up", view.end(), (1, "as it was\n"))
+
+
+def shows_random_scenes_as_a_whole_merge_does():
+    """The page merges a part of each scene, and must never tell."""
+    saved = 0
+    for number in range(PAIRS):
+        rng = random.Random(f"view/{number}")
+        built = edits.build(*edits.make_triple(rng, 6))
+        view = View([scene.write(built[name]).encode() for name in ("base", "left", "right")],
+                    "--theirs", "theirs", "--ours", "ours", "-o", "record")
+        chosen = view.folder / "chosen"
+        choices = {}
+        for _ in range(4):
+            _, state = view.get("state")
+            words = {"theirs": "left", "ours": "right", "base": "base"}
+            chosen.write_text("Conflict handling:\n" + "".join(f"{words[choices[p]]} {p}\n" for p in sorted(choices)))
+            report = json.loads(subprocess.run([REPORT, "--json", "--safe", "-i", chosen, *view.versions],
+                                               capture_output=True, check=True).stdout)
+            expect(f"the cards of scene {number}, {choices}", rows(state), rows(report))
+            expect(f"what is open in scene {number}", state["pending"], report["pending"])
+            expect(f"what is said of scene {number}", state["notes"], report["notes"])
+            open_places = [row["path"] for row in rows(state).values() if row["pending"]]
+            if not open_places:
+                break
+            choice = {path: rng.choice(list(words)) for path in open_places}
+            choices.update(choice)
+            view.choose(**choice)
+        if view.post("save", file=0)[0] == 200:
+            saved += 1
+            again = view.folder / "again"
+            subprocess.run([MERGE, "merge", "--safe", "-h", "--force", "--fallback", "none", "-i", chosen, "-o", os.devnull,
+                            *view.versions, again], check=True, stderr=subprocess.DEVNULL)
+            expect(f"the saved scene {number}", view.end(), (0, again.read_text()))
+        else:
+            view.post("give-up")
+            expect(f"the status of scene {number}", view.end()[0], 1)
+    expect("most scenes are saved", saved > PAIRS // 2, True)
+
+
+def hostile_values_stay_text():
+    def lamp(text, extra):
+        return node(HOSTILE, 1, 0, []) + f"--- !v!108 &12\nLight:\n  m_Text: {json.dumps(text)}\n{extra}"
+
+    extra = "".join(f"  m_Field{i}: %d\n" for i in range(5000))
+    versions = [lamp(HOSTILE * n + "x" * 100_000, extra.replace("%d", str(n))) for n in (1, 2, 3)]
+    view = View(versions)
+    started = time.monotonic()
+    answer, body = view.raw("GET", f"/{view.secret}/state")
+    state = json.loads(body)
+    expect("what is open", state["pending"], 5001)
+    expect("a long value", len(rows(state)["12.Light.m_Text"]["theirs"]["full"]) > 100_000, True)
+    expect("a control character", any(c in body.decode() for c in "\u202e\u0001"), False)
+    expect("the state is there soon", time.monotonic() - started < 10, True)
+    view.program.send_signal(signal.SIGTERM)
+    expect("a terminated program", view.end(), (-signal.SIGTERM, "as it was\n"))
+
+
+def refuses_others():
+    view = View(examples())
+    inside, wrong = f"/{view.secret}/", "/" + "0" * 32 + "/"
+    own = f"127.0.0.1:{view.port}"
+    for path in ("/", "/state", wrong, wrong + "state", f"/{view.secret}", "//" + view.secret + "/", "/../" + view.secret,
+                 f"/{view.secret[:-1]}/state", f"/x/..{inside}state", "/favicon.ico", "*"):
+        for method in ("GET", "POST", "PUT", "OPTIONS"):
+            answer, body = view.raw(method, path)
+            expect(f"{method} {path} without the secret", (answer.status, body), (404, b""))
+    for headers in ({"Host": "evil.example"}, {"Host": f"evil.example:{view.port}"}, {"Host": "127.0.0.1"},
+                    {"Origin": "http://evil.example"}, {"Origin": "null"}, {"Origin": f"https://{own}"},
+                    {"Sec_Fetch_Site": "cross-site"}, {"Sec_Fetch_Site": "same-site"}):
+        for method in ("GET", "POST"):
+            answer, body = view.raw(method, inside + "state", **headers)
+            expect(f"{method} with {headers}", (answer.status, body), (403, b""))
+    for headers in ({"Host": f"localhost:{view.port}"}, {"Origin": f"http://{own}", "Sec_Fetch_Site": "same-origin"}):
+        expect(f"with {headers}", view.raw("GET", inside + "state", **headers)[0].status, 200)
+    for method in ("PUT", "DELETE", "HEAD", "OPTIONS"):
+        expect(method, view.raw(method, inside)[0].status, 403)
+    page = view.raw("GET", inside)[0]
+    for name in ("Cache-Control", "Content-Security-Policy", "X-Content-Type-Options", "Referrer-Policy"):
+        expect(f"one {name}", len(page.headers.get_all(name)), 1)
+    expect("what the page may do", page.headers["Content-Security-Policy"].split(";")[0], "default-src 'none'")
+
+    expect("a path trick", view.raw("GET", inside + "../../etc/passwd")[0].status, 404)
+    expect("no such file", view.get("state?file=1")[0], 404)
+    for body in ("", "[]", "{", '{"choices": 1}', '{"choices": [{"path": "1.x"}]}', "[" * 100_000):
+        answer, _ = view.raw("POST", inside + "choose", body, Content_Type="application/json")
+        expect(f"the request {body[:40]}", answer.status, 400)
+    expect("no such place", view.choose(**{LIGHT: "ours", "*.Light.m_Intensity": "ours"})[0], 400)
+    expect("a form", view.raw("POST", inside + "choose", "{}", Content_Type="text/plain")[0].status, 400)
+    expect("a large body", view.raw("POST", inside + "choose", "x" * (5 << 20), Content_Type="application/json")[0].status,
+           413)
+    expect("what is open after all that", view.get("state")[1]["pending"], 2)
+
+    # Every connection that the program lets in, half of them in the middle of a request.
+    resource.setrlimit(resource.RLIMIT_NOFILE, (min(4096, resource.getrlimit(resource.RLIMIT_NOFILE)[1]),) * 2)
+    held = []
+    for number in range(1000):
+        held.append(socket.create_connection(("127.0.0.1", view.port), 20))
+        if number % 2:
+            held[-1].sendall(b"GET / HTTP/1.1\r\nHost: ")
+    started = time.monotonic()
+    expect("beside 1,000 connections", view.choose(**{LIGHT: "ours"})[0], 200)
+    expect("without having waited for them", time.monotonic() - started < 4, True)
+    for connection in held:
+        connection.close()
+    view.post("give-up")
+    expect("what is given up", view.end(), (1, "as it was\n"))
+
+
+def ends_with_its_page():
+    listing = Path(WORK) / "browser"
+    listing.write_text("#!/bin/sh\nprintf %s \"$2\" >\"$1.called.new\"; mv \"$1.called.new\" \"$1.called\"\n")
+    listing.chmod(0o700)
+    view = View(examples(), BROWSER=f"{listing} {listing} %s:other", DISPLAY=":0", SSH_CONNECTION="")
+    called = Path(f"{listing}.called")
+    deadline = time.monotonic() + 20
+    while not called.exists() and time.monotonic() < deadline:
+        time.sleep(0.01)
+    path = called.read_text().removeprefix(f"http://127.0.0.1:{view.port}")
+    expect("the secret in the browser's arguments", view.secret in path, False)
+    answer, _ = view.raw("GET", path)
+    expect("its address leads to the page", (answer.status, answer.headers["Location"]), (303, f"/{view.secret}/"))
+    expect("its address the second time", view.raw("GET", path)[0].status, 404)
+
+    def open_page():
+        events = socket.create_connection(("127.0.0.1", view.port))
+        events.sendall(f"GET /{view.secret}/events HTTP/1.1\r\nHost: 127.0.0.1:{view.port}\r\n\r\n".encode())
+        return events if events.recv(100) else None
+
+    open_page().close()
+    again = open_page()
+    time.sleep(6)
+    expect("the program while its page was loaded again", view.program.poll(), None)
+    again.close()
+    expect("the program without its page", view.end(), (1, "as it was\n"))
+
+
+def says_what_is_wrong():
+    view = View(examples(), "--idle-timeout", "4", "-o", "/nowhere/record")
+    view.choose(**{LIGHT: "ours", DELAY: "ours"})
+    status, answer = view.post("save", file=0)
+    expect("a record that can't be written", (status, "/nowhere/record" in answer["error"]), (409, True))
+    expect("the program left alone", view.end(), (1, "as it was\n"))
+    broken = subprocess.run([VIEW, *view.versions[:2], "/nowhere/right", "merged"], capture_output=True, text=True)
+    expect("a file that can't be read", (broken.returncode, broken.stdout, broken.stderr.count("\n")), (1, "", 1))
+
+
+with tempfile.TemporaryDirectory() as WORK:
+    os.chdir(WORK)
+    settles_as_merge_does("--safe")
+    settles_as_merge_does()
+    a_choice_brings_up_another_conflict()
+    shows_random_scenes_as_a_whole_merge_does()
+    hostile_values_stay_text()
+    refuses_others()
+    ends_with_its_page()
+    says_what_is_wrong()
