@@ -3,6 +3,7 @@
 
 #include "report/record_patterns.h"
 #include "report/report_rows.h"
+#include "report/shown_diff.h"
 #include "report/side_walk.h"
 
 namespace vexel_yaml {
@@ -103,7 +104,7 @@ class Collector {
     };
     const YAMLMapping& base = files_.read.base;
     SideWalk(names_, found, GoneIn(&ReportRow::result), nullptr)
-        .Walk(*YAMLMappingDiff::Diff(base, *files_.merged), base, *files_.merged);
+        .Walk(*DiffToShow(base, *files_.merged), base, *files_.merged);
   }
 
   void AddRepairs() {
@@ -119,7 +120,7 @@ class Collector {
     };
     SideWalk(
         names_, found, [](const FieldPath&) {}, nullptr)
-        .Walk(*YAMLMappingDiff::Diff(*files_.unrepaired, *files_.merged), *files_.unrepaired, *files_.merged);
+        .Walk(*DiffToShow(*files_.unrepaired, *files_.merged), *files_.unrepaired, *files_.merged);
   }
 
   void AddRenumbered() {

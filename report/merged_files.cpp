@@ -8,6 +8,7 @@
 #include "platform/error_channel.h"
 #include "platform/hinted_error.h"
 #include "platform/thread.h"
+#include "report/shown_diff.h"
 #include "rules/setup.h"
 #include "scene/safe_merge.h"
 #include "scene/unmatched_choices.h"
@@ -78,7 +79,11 @@ void CompareVersions(MergedFiles& files, bool threads) {
   TimerStat silent("", nullptr);
   files.untouched.CopyTo(files.read);
   const auto& [base, left, right] = static_cast<const MergeDocuments&>(files.read);
-  files.diffs = CreateDiffPair({base, left}, {base, right}, threads, silent);
+  if (files.safe) {
+    files.diffs = {DiffToShow(base, left), DiffToShow(base, right)};
+  } else {
+    files.diffs = CreateDiffPair({base, left}, {base, right}, threads, silent);
+  }
 }
 
 std::vector<RecordingConflictResolver::RecordResolve> ReadResolutions(const std::string& path) {
