@@ -17,6 +17,7 @@
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/progress.h"
 #include "platform/run_main.h"
 #include "platform/thread.h"
 #include "platform/timer_stat.h"
@@ -185,8 +186,11 @@ class MergeRun {
 
 int HandleMergeCommand(const MergeConfig& config, const std::string& path_for_tool) {
   TimerStat timer("Merge Command", config.timing ? &std::cout : nullptr);
+  const Progress progress("Merging " +
+                          (config.destination_path.empty() ? config.base_path : config.destination_path));
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
   MergeRun run(config, NewKeptDocuments(), timer);
+  Progress::Step("reading");
   if (config.safe) {
     run.ReadSceneDocuments();
   } else {
@@ -195,12 +199,14 @@ int HandleMergeCommand(const MergeConfig& config, const std::string& path_for_to
     run.CreateDiffs();
   }
   if (!run.ReadResolutions()) return 1;
+  Progress::Step("merging");
   if (config.safe) {
     run.MergeScenes();
   } else {
     run.Merge();
   }
   run.OutputConflicts();
+  Progress::Step("writing");
   run.OutputResult(path_for_tool);
   run.OutputPremerge();
   // The last that can fail before the destination changes.

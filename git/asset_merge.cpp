@@ -14,6 +14,7 @@
 #include "git/work_files.h"
 #include "merge/conflict_record_file.h"
 #include "platform/file_error.h"
+#include "platform/progress.h"
 #include "platform/thread.h"
 #include "report/merged_files.h"
 #include "report/record_patterns.h"
@@ -111,6 +112,7 @@ void AssetMerge::Read(bool is_safe) {
   is_read_safe_ = is_safe;
   read_failure_ = nullptr;
   documents_ = std::make_unique<SceneDocuments>();
+  Progress::Step("reading");
   const std::string &base = versions_.base, &left = versions_.left, &right = versions_.right;
   const CapturedErrors captured;
   try {
@@ -132,6 +134,7 @@ int AssetMerge::Merge(const MergeSettings& settings, const Decisions* decisions)
   // What is wrong with these is told first.
   LoadRulesAndTypes(settings);
   if (read_failure_) std::rethrow_exception(read_failure_);
+  Progress::Step("merging");
   const auto& [base, left, right] = static_cast<const MergeDocuments&>(*documents_);
   if (!settings.is_safe || lists_edits_) {
     TimerStat silent("", nullptr);
@@ -144,6 +147,7 @@ int AssetMerge::Merge(const MergeSettings& settings, const Decisions* decisions)
   if (decisions != nullptr) TakeDecisions(*decisions);
   const bool breaks_dependency = settings.is_safe ? MergeScenes() : MergeValues();
   if (!versions_.mark.empty()) RemoveMarks(*merged_, versions_.mark);
+  Progress::Step("writing");
   std::ostringstream text;
   WriteObjects(*merged_, text, threads_);
   text_ = std::move(text).str();

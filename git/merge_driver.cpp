@@ -15,6 +15,7 @@
 #include "git/undecided_places.h"
 #include "git/work_files.h"
 #include "platform/file_error.h"
+#include "platform/progress.h"
 #include "report/report_command.h"
 
 namespace vexel_yaml {
@@ -28,6 +29,8 @@ class DriverRun {
       : versions_(std::move(versions)), marker_size_(std::move(marker_size)), is_ancestor_(is_ancestor) {}
 
   int Run() {
+    // Who waits for the merge of many files waits since the first one of them.
+    const Progress progress("Merging " + versions_.asset, Progress::kPatience - repository_.TimeAtWork());
     try {
       return Merge();
     } catch (const FileError& error) {

@@ -7,6 +7,7 @@
 #include "git/merged_commits.h"
 #include "git/settings.h"
 #include "git/shown_text.h"
+#include "platform/progress.h"
 #include "report/value_text.h"
 
 namespace vexel_yaml {
@@ -44,6 +45,7 @@ class Preview {
 
   // Returns whether it would have conflicts, or fail.
   bool Tell(const std::string& asset) {
+    const Progress progress("Looking at " + asset);
     AssetVersions versions;
     if (!WriteVersions(merged_, asset, scratch_, versions)) {
       vexel_yaml::Tell(asset + ": not in all three versions; git asks which one is to stay");

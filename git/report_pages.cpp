@@ -18,6 +18,7 @@
 #include "git/stage_files.h"
 #include "git/work_files.h"
 #include "platform/files.h"
+#include "platform/progress.h"
 
 namespace vexel_yaml {
 
@@ -75,6 +76,7 @@ class PageMaker {
 
   // False where there is no page, and that has been said.
   bool Make(const std::string& asset) {
+    const Progress progress("Making the page of " + asset);
     AssetVersions versions;
     if (!(merged_ ? WriteMerged(asset, versions) : WriteUnmerged(asset, versions))) return false;
     const std::string target = page_.empty() ? DefaultPage(asset) : page_;

@@ -2,6 +2,7 @@
 
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <filesystem>
 
@@ -61,6 +62,15 @@ bool Repository::IsAtWork() const {
     if (FileExists(Path(name))) return true;
   }
   return false;
+}
+
+std::chrono::milliseconds Repository::TimeAtWork() const {
+  struct stat status = {};
+  if (stat(Path("index.lock").c_str(), &status) != 0) return {};
+  const auto since = std::chrono::system_clock::from_time_t(status.st_mtime);
+  const auto elapsed = std::chrono::system_clock::now() - since;
+  return std::max(std::chrono::milliseconds(0),
+                  std::chrono::duration_cast<std::chrono::milliseconds>(elapsed));
 }
 
 bool Repository::IsChanging() const {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <string>
 
 namespace vexel_yaml {
@@ -24,6 +25,9 @@ class Repository {
 
   /// Whether git is in the middle of a merge, a rebase, or a pick of commits.
   bool IsAtWork() const;
+
+  /// For how long git has held the index; nothing where it doesn't.
+  std::chrono::milliseconds TimeAtWork() const;
 
   /// Whether git holds the index right now.
   bool IsLocked() const;

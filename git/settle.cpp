@@ -14,6 +14,7 @@
 #include "git/stage_files.h"
 #include "git/work_files.h"
 #include "platform/files.h"
+#include "platform/progress.h"
 
 namespace vexel_yaml {
 
@@ -154,6 +155,7 @@ class Settling {
 
   bool Merge(const std::string& decided) {
     const Decisions decisions = {decided, ShownRecord(record_)};
+    const Progress progress("Merging " + versions_.asset);
     merge_ = std::make_unique<AssetMerge>(versions_);
     status_ = merge_->Run(context_.settings, &decisions);
     return status_ != AssetMerge::kFailed;

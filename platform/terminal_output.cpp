@@ -4,6 +4,8 @@
 
 #include <utility>
 
+#include "platform/progress.h"
+
 namespace vexel_yaml {
 
 namespace {
@@ -83,6 +85,11 @@ bool EscapingBuffer::PutEscaped(char byte) {
   const auto number = static_cast<unsigned char>(byte);
   const char text[] = {'\\', 'x', kDigits[number >> 4U], kDigits[number & 0xFU]};
   return target_.sputn(text, sizeof(text)) == sizeof(text);
+}
+
+TerminalBuffer::int_type TerminalBuffer::overflow(int_type character) {
+  Progress::MakeRoom();
+  return EscapingBuffer::overflow(character);
 }
 
 TerminalOutput::TerminalOutput(std::ostream& stream, int descriptor)

@@ -31,6 +31,15 @@ class EscapingBuffer : public std::streambuf {
   std::string sequence_;
 };
 
+/// An EscapingBuffer for a terminal, on which a line of progress makes room for the text.
+class TerminalBuffer : public EscapingBuffer {
+ public:
+  using EscapingBuffer::EscapingBuffer;
+
+ protected:
+  int_type overflow(int_type character) override;
+};
+
 /// Lets a stream escape, in its lifetime, if its descriptor is a terminal. Files and pipes get every byte.
 class TerminalOutput {
  public:
@@ -42,7 +51,7 @@ class TerminalOutput {
  private:
   std::ostream& stream_;
   std::streambuf* previous_;
-  EscapingBuffer buffer_;
+  TerminalBuffer buffer_;
 };
 
 }  // namespace vexel_yaml
