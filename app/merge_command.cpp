@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <cstdlib>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -81,6 +82,20 @@ int FinishWithTool(int tool_result, const std::string& tool_output, const std::s
   return status;
 }
 
+// A tool that merges by structure itself needs what the merge began with: what is handed over has one side's
+// values at the conflicts.
+void TellTools(const MergeConfig& config) {
+  const auto set = [](const char* name, const std::string& value) { setenv(name, value.c_str(), 1); };
+  set("VEXEL_BASE", config.base_path);
+  set("VEXEL_LEFT", config.left_path);
+  set("VEXEL_RIGHT", config.right_path);
+  set("VEXEL_DESTINATION", config.destination_path);
+  set("VEXEL_RULES", config.rules_file);
+  set("VEXEL_TYPE_INFO", config.type_info_file);
+  set("VEXEL_CHOICES", config.merge_file);
+  set("VEXEL_SAFE", config.safe ? "1" : "");
+}
+
 int MergeStructurally(const MergeConfig& config, const std::string& merged) {
   const int result = HandleMergeCommand(config, merged);
   const bool conflicts = result == 2 || result == 3;
@@ -91,6 +106,7 @@ int MergeStructurally(const MergeConfig& config, const std::string& merged) {
   }
   const std::string& base = config.premerge ? config.premerge_base_destination : config.base_path;
   const std::string& right = config.premerge ? config.premerge_right_destination : config.right_path;
+  TellTools(config);
   const int tool_result = FallbackMergeTool(base, merged, right, tool_output, config.fallback_spec_file);
   return FinishWithTool(tool_result, tool_output, config.destination_path, false);
 }

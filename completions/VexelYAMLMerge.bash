@@ -139,7 +139,7 @@ _vexel_merge_git() {
   local cur prev word items=()
   _vexel_words
   if [[ "$COMP_CWORD" -eq 1 ]]; then
-    _vexel_offer enable disable status resolve check preview report --version --help
+    _vexel_offer enable disable status resolve check preview report review --version --help
     return
   fi
   case "${COMP_WORDS[1]} $prev" in
@@ -160,7 +160,7 @@ _vexel_merge_git() {
       ;;
     "resolve "*)
       if [[ "$cur" == -* && " ${COMP_WORDS[*]:0:COMP_CWORD} " != *" -- "* ]]; then
-        _vexel_offer -p --theirs --left --ours --right --base --path --color= --as-is --force --
+        _vexel_offer -p --web --port --no-browser --theirs --left --ours --right --base --path --color= --as-is --force --
       else
         compopt -o filenames
         mapfile -t items < <(_vexel_unmerged)
@@ -173,6 +173,16 @@ _vexel_merge_git() {
         _vexel_files vexel prefab meta
       elif [[ "$cur" == -* ]]; then
         _vexel_offer -o --
+      else
+        _vexel_revisions
+      fi
+      ;;
+    "review --port") ;;
+    "review "*)
+      if [[ " ${COMP_WORDS[*]:0:COMP_CWORD} " == *" -- "* ]]; then
+        _vexel_files vexel prefab meta
+      elif [[ "$cur" == -* ]]; then
+        _vexel_offer --port --no-browser --
       else
         _vexel_revisions
       fi

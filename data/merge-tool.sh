@@ -26,7 +26,23 @@ use() {
 has_display() { [ -z "${CI-}" ] && { [ -n "${DISPLAY-}${WAYLAND_DISPLAY-}" ] || [ "$(uname)" = Darwin ]; }; }
 has_terminal() { [ -z "${CI-}" ] && [ "${TERM:-dumb}" != dumb ] && (: <>/dev/tty) 2>/dev/null; }
 
+# What was merged by structure is settled on a page, from what that merge began with: its result has one side's values
+# at the conflicts.
+settle_on_page() {
+  [ -n "${VEXEL_LEFT-}" ] && [ -z "${SSH_CONNECTION-}" ] || return 0
+  set -- --title "${VEXEL_DESTINATION:-$result}"
+  [ -n "${VEXEL_SAFE-}" ] || set -- "$@" --plain
+  [ -z "${VEXEL_RULES-}" ] || set -- "$@" --rules "$VEXEL_RULES"
+  [ -z "${VEXEL_TYPE_INFO-}" ] || set -- "$@" --typeInfo "$VEXEL_TYPE_INFO"
+  [ -z "${VEXEL_CHOICES-}" ] || set -- "$@" -i "$VEXEL_CHOICES"
+  # Standard output is for the records of the merge.
+  use "${VEXEL_DATA_FILES-}/vexel-merge-view" "$@" -- "$VEXEL_BASE" "$VEXEL_LEFT" "$VEXEL_RIGHT" "$result" >&2
+}
+
 if has_display; then
+  case $left in
+    /tmp/MERGE*) settle_on_page ;;
+  esac
   for programs in "${HOME-}/Applications" /Applications; do
     use "$programs/kdiff3.app/Contents/MacOS/kdiff3" "$base" "$left" "$right" -o "$result"
     use "$programs/p4merge.app/Contents/MacOS/p4merge" "$base" "$left" "$right" "$result"

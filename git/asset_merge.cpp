@@ -8,6 +8,7 @@
 #include <sstream>
 
 #include "fixups/post_process.h"
+#include "git/captured_errors.h"
 #include "git/script_classes.h"
 #include "git/shown_text.h"
 #include "git/undecided_places.h"
@@ -31,21 +32,6 @@ namespace {
 // A mistake in what the user has decided, which says its line.
 class DecisionError : public std::runtime_error {
   using std::runtime_error::runtime_error;
-};
-
-// What is written to standard error in its lifetime, for messages that name temporary files.
-class CapturedErrors {
- public:
-  CapturedErrors() : previous_(std::cerr.rdbuf(text_.rdbuf())) {}
-  CapturedErrors(const CapturedErrors&) = delete;
-  CapturedErrors& operator=(const CapturedErrors&) = delete;
-  ~CapturedErrors() { std::cerr.rdbuf(previous_); }
-
-  std::string Text() const { return text_.str(); }
-
- private:
-  std::ostringstream text_;
-  std::streambuf* previous_;
 };
 
 // The objects that a diff is about, as people call them; a game object is one with its components.
@@ -78,7 +64,6 @@ void Replace(std::string& text, const std::string& name, const std::string& by) 
 }  // namespace
 
 void LoadRulesAndTypes(const MergeSettings& settings) {
-  // What is wrong with them is wrong for every merge.
   static const std::exception_ptr failure = [&]() -> std::exception_ptr {
     try {
       TimerStat silent("", nullptr);

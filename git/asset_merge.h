@@ -108,7 +108,8 @@ class AssetMerge {
   Edits edits_;
 };
 
-/// Loads the rules and the type information, once a process. Throws what SetupRulesAndTypes throws.
+/// Loads the rules and the type information, once: both stay loaded, and all merges of a process have the
+/// same. Throws what was wrong with them, each time.
 void LoadRulesAndTypes(const MergeSettings& settings);
 
 /// Says what a program or a merge has said about the versions, with the asset's own name.

@@ -181,7 +181,10 @@ int RunEnable(const std::vector<std::string>& arguments) {
   if (!places.is_global && !IsPlain(places.attributes)) {
     throw CommandError("git follows no symbolic link or folder at " + places.attributes);
   }
-  const auto wanted = WantedConfiguration();
+  auto wanted = WantedConfiguration();
+  // Git has one tool for all files, and somebody's own choice counts more.
+  const ProgramResult tool = GitQuietly({"config", "--get", "merge.tool"});
+  if (tool.status != 0 || Line(tool) == "vexel") wanted.emplace_back("merge.tool", "vexel");
   const Configuration configuration(places);
   const MarkedBlock block(places.attributes, "attributes", places.state);
   for (const auto& [key, value] : wanted) configuration.Check(key);

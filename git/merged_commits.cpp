@@ -8,14 +8,13 @@
 
 namespace vexel_yaml {
 
-namespace {
-
-// The path of the file; empty where the commit has none.
 std::string WriteVersion(const std::string& commit, const std::string& name, const std::string& asset,
                          ScratchFolder& scratch) {
   const ProgramResult version = GitQuietly({"cat-file", "--filters", commit + ":" + asset});
   return version.status == 0 ? scratch.Write(name, version.output) : std::string();
 }
+
+namespace {
 
 std::map<std::string, std::string> Renamed(const std::string& from, const std::string& to) {
   const std::vector<std::string> fields = Pieces(
@@ -79,7 +78,9 @@ void FindRenamed(MergedCommits& merged) {
 
 std::vector<std::string> ChangedPaths(const std::string& from, const std::string& to,
                                       const std::vector<std::string>& paths) {
-  ProgramCall call = GitCall({"diff", "-z", "--name-only", "--no-relative", "--no-renames", from, to, "--"});
+  ProgramCall call = GitCall({"diff", "-z", "--name-only", "--no-relative", "--no-renames", from});
+  if (!to.empty()) call.arguments.push_back(to);
+  call.arguments.emplace_back("--");
   call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
   call.with = {"GIT_LITERAL_PATHSPECS=1"};
   std::vector<std::string> changed = Pieces(RunProgram(call).output, '\0');
@@ -112,6 +113,16 @@ bool WriteVersions(const MergedCommits& merged, const std::string& asset, Scratc
               WriteVersion(merged.theirs, "left " + ShortHash(merged.theirs), theirs, scratch),
               WriteVersion(merged.ours, "right " + ShortHash(merged.ours), ours, scratch)};
   return !versions.base.empty() && !versions.left.empty() && !versions.right.empty();
+}
+
+std::vector<std::string> Authors(const std::string& range, const std::vector<std::string>& paths) {
+  std::vector<std::string> arguments = {"--literal-pathspecs", "log", "-z", "--format=%an", range, "--"};
+  arguments.insert(arguments.end(), paths.begin(), paths.end());
+  std::vector<std::string> authors;
+  for (std::string& name : Pieces(Git(std::move(arguments)).output, '\0')) {
+    if (std::ranges::find(authors, name) == authors.end()) authors.push_back(std::move(name));
+  }
+  return authors;
 }
 
 std::string ShortHash(const std::string& commit) { return Line(Git({"rev-parse", "--short", commit})); }

@@ -27,6 +27,7 @@ MergedCommits FindMerged(const std::string& name);
 std::string FindCommit(const std::string& name);
 
 /// The paths that one of two commits has otherwise than the other one, sorted; those below `paths`, or all.
+/// An empty `to` is the work tree.
 std::vector<std::string> ChangedPaths(const std::string& from, const std::string& to,
                                       const std::vector<std::string>& paths);
 
@@ -44,6 +45,13 @@ std::vector<std::string> ChangedOnBothSides(const MergedCommits& merged,
 /// none.
 bool WriteVersions(const MergedCommits& merged, const std::string& asset, ScratchFolder& scratch,
                    AssetVersions& versions);
+
+/// Writes the file as a commit has it. Returns its path; empty where the commit has none.
+std::string WriteVersion(const std::string& commit, const std::string& name, const std::string& asset,
+                         ScratchFolder& scratch);
+
+/// Who has changed one of the paths in a range of commits, the latest first.
+std::vector<std::string> Authors(const std::string& range, const std::vector<std::string>& paths);
 
 /// The commit as people write it.
 std::string ShortHash(const std::string& commit);

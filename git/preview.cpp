@@ -26,18 +26,6 @@ std::string ListOf(const Names& names) {
   return text;
 }
 
-// Who has changed the file between two commits, the latest first.
-Names Authors(const MergedCommits& merged, const std::string& side, const std::string& asset) {
-  Names authors;
-  for (std::string& name : Pieces(Git({"--literal-pathspecs", "log", "-z", "--format=%an",
-                                       merged.base + ".." + side, "--", asset, OldName(merged, asset)})
-                                      .output,
-                                  '\0')) {
-    if (std::ranges::find(authors, name) == authors.end()) authors.push_back(std::move(name));
-  }
-  return authors;
-}
-
 class Preview {
  public:
   Preview(MergedCommits merged, std::string branch)
@@ -74,7 +62,8 @@ class Preview {
   void TellSide(const std::string& side, const std::string& commit, const std::string& asset,
                 const Names& objects) {
     const std::string edits = objects.empty() ? std::string() : ": " + ListOf(objects);
-    vexel_yaml::Tell("  " + side + ", by " + ListOf(Authors(merged_, commit, asset)) + edits);
+    vexel_yaml::Tell("  " + side + ", by " +
+                     ListOf(Authors(merged_.base + ".." + commit, {asset, OldName(merged_, asset)})) + edits);
   }
 
   const MergedCommits merged_;

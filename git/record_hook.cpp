@@ -5,9 +5,9 @@
 #include <array>
 #include <string_view>
 
+#include "git/setup.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
-#include "platform/executable_path.h"
 
 namespace vexel_yaml {
 
@@ -53,7 +53,7 @@ bool IsOurs(const std::string& path, const Hook& hook) {
 // Our lines, and the line before them. Whoever adds some has them run.
 constexpr std::string_view kShell = "#!/bin/sh\n";
 std::string HookLines(const Hook& hook) {
-  const std::string self = ShellQuoted(ExecutablePath());
+  const std::string self = ShellQuoted(OurProgram());
   return Mark(hook) + std::string(hook.purpose) + ".\n" + "if [ -x " + self + " ]; then " + self + " " +
          std::string(hook.command) + " || exit; fi\n";
 }

@@ -1,6 +1,7 @@
 #include "git/report_pages.h"
 
 #include <algorithm>
+#include <cctype>
 #include <filesystem>
 #include <iterator>
 #include <optional>
@@ -19,6 +20,7 @@
 #include "git/work_files.h"
 #include "platform/files.h"
 #include "platform/progress.h"
+#include "report/value_text.h"
 
 namespace vexel_yaml {
 
@@ -68,6 +70,30 @@ Paths Remembered(Paths paths) {
   return paths;
 }
 
+// Nothing that a file is called becomes markup, and what is no character isn't shown.
+std::string InMarkup(const std::string& text) {
+  std::string markup;
+  for (const char c : OnOneLine(text)) {
+    markup += c == '<' ? "&lt;" : c == '&' ? "&amp;" : c == '"' ? "&quot;" : std::string(1, c);
+  }
+  return markup;
+}
+
+// A path as a relative address, whatever bytes it has.
+std::string LinkTo(const std::string& path) {
+  constexpr char kDigits[] = "0123456789ABCDEF";
+  std::string link = "./";
+  for (const char c : path) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (std::isalnum(byte) != 0 || c == '/' || c == '.' || c == '-' || c == '_') {
+      link += c;
+    } else {
+      link += {'%', kDigits[byte >> 4U], kDigits[byte & 0xFU]};
+    }
+  }
+  return link;
+}
+
 // Made pages, one asset after the other.
 class PageMaker {
  public:
@@ -91,6 +117,9 @@ class PageMaker {
     }
     std::string title = asset + (merged_ ? std::string() : WhoseSides(asset));
     if (merged_) title += ", the parents of " + ShortHash(merged_->commit) + " merged anew";
+    // What was decided or edited by hand is in the commit alone.
+    if (merged_ && !WriteVersion(merged_->commit, "committed", asset, scratch_).empty())
+      call.insert(call.end(), {"--committed", "committed"});
     call.insert(call.end(), {"-o", target, "--title", title, versions.base, versions.left, versions.right});
     // From their folder, since the page shows the paths that were given.
     const ProgramResult result = RunProgram(
@@ -100,7 +129,24 @@ class PageMaker {
       return false;
     }
     Tell(shown_page_.empty() ? target : shown_page_);
+    pages_.emplace_back(asset, target);
     return true;
+  }
+
+  // Writes a page with links to all of them, if there are several.
+  void MakeIndex() const {
+    if (pages_.size() < 2) return;
+    const std::string folder = PagesFolder();
+    std::string text =
+        "<!DOCTYPE html>\n<html lang=\"en\"><meta charset=\"utf-8\"><meta name=\"color-scheme\" "
+        "content=\"light dark\"><title>Merged scenes</title>\n<h1>" +
+        std::to_string(pages_.size()) + " merged scenes</h1>\n<ul>\n";
+    for (const auto& [asset, page] : pages_) {
+      text += "<li><a href=\"" + LinkTo(page.substr(folder.size())) + "\">" + InMarkup(asset) + "</a></li>\n";
+    }
+    const std::string index = folder + "index.html";
+    if (!PutFile(index, text + "</ul>\n</html>\n")) throw CommandError("cannot write " + index);
+    Tell(index);
   }
 
  private:
@@ -135,13 +181,16 @@ class PageMaker {
   // Not all that an asset may be called has room for a suffix, and a folder can be called like another
   // asset's page.
   std::string DefaultPage(const std::string& asset) {
-    const std::string pages =
-        std::filesystem::absolute(repository_.Path("vexel-merge-report")).string() + "/";
+    const std::string pages = PagesFolder();
     std::string page = pages + asset + ".html";
     const size_t name_size = asset.size() - (asset.rfind('/') + 1);
     if (name_size <= 200 && MakeFoldersFor(page) && !IsFolder(page)) return page;
     MakeFoldersFor(pages);
     return pages + HashedPath(asset) + ".html";
+  }
+
+  std::string PagesFolder() const {
+    return std::filesystem::absolute(repository_.Path("vexel-merge-report")).string() + "/";
   }
 
   // A mistake in the record, whose line is named, was read from a copy.
@@ -160,6 +209,8 @@ class PageMaker {
   const Repository repository_;
   const ConflictRecords records_{repository_};
   ScratchFolder scratch_{repository_};
+  // Assets and their pages.
+  std::vector<std::pair<std::string, std::string>> pages_;
 };
 
 }  // namespace
@@ -197,6 +248,7 @@ int RunReportPages(const std::vector<std::string>& arguments) {
   PageMaker maker(parsed, page, merged);
   bool is_done = true;
   for (const std::string& asset : assets) is_done = maker.Make(asset) && is_done;
+  maker.MakeIndex();
   return is_done ? 0 : 1;
 }
 

@@ -9,10 +9,6 @@ namespace vexel_yaml {
 /// CommandError.
 int RunResolve(const std::vector<std::string>& arguments);
 
-/// Called by git mergetool with base, ours, theirs and the file's path. Git stages the result itself, and
-/// restores the file where this fails.
-int RunMergetool(const std::vector<std::string>& arguments);
-
 /// Removes the records of conflicts that are gone, from any folder of the work tree, and with "--committed"
 /// those of what is staged, too: what hooks call.
 int RunSweep(const std::vector<std::string>& arguments);

@@ -47,9 +47,10 @@ class Settling {
 
   Settlement Run() {
     if (!FindStart() || !FindEdits()) return {};
-    const bool is_merged = choice_.prompt != nullptr ? MergeAnswered()
-                           : choice_.side.empty()    ? MergeEdited()
-                                                     : MergeWithSide();
+    const bool is_merged = choice_.prompt != nullptr     ? MergeAnswered()
+                           : choice_.decided.has_value() ? Merge(*choice_.decided)
+                           : choice_.side.empty()        ? MergeEdited()
+                                                         : MergeWithSide();
     if (!is_merged || !CarryEdits()) return {};
     TellBaseless();
     entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
@@ -87,7 +88,7 @@ class Settling {
     merged_ = merge.GetText();
     entry_.hash = HashOf(merged_);
     entry_.conflicts = ConflictsAfter(merge, asset, entry_.names, {});
-    if (!choice_.side.empty() || choice_.prompt != nullptr) return true;
+    if (!choice_.side.empty() || choice_.prompt != nullptr || choice_.decided) return true;
     record_ = context_.records.Leave(
         entry_, merge, merged_, [&] { return entry_.hash; }, context_.settings);
     if (record_.empty()) Complain("cannot write the record of " + asset);

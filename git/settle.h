@@ -2,6 +2,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "git/asset_merge.h"
@@ -24,6 +25,8 @@ struct Choice {
   Prompt* prompt = nullptr;
   /// Whether all is to stay as it stands in the work tree.
   bool as_is = false;
+  /// What has been decided already, instead of what the record says: the text of another one.
+  std::optional<std::string> decided = std::nullopt;
 };
 
 /// What settling needs to know of the repository.

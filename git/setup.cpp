@@ -9,7 +9,6 @@
 #include "git/repository.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
-#include "platform/executable_path.h"
 #include "platform/files.h"
 
 namespace vexel_yaml {
@@ -93,10 +92,14 @@ std::string UserAttributes() {
   return set.status == 0 ? Line(set) : UserFolder() + "/attributes";
 }
 
+// The running one may be that with the page, which stands beside it.
+std::string OurProgram() { return TargetOf(GetDataFilesDir() + "vexel-merge-git"); }
+
 std::string CommandForGit() {
   const std::string name = "vexel-merge-git";
   const std::string found = InPath(name);
-  return !found.empty() && TargetOf(found) == ExecutablePath() ? name : ShellQuoted(ExecutablePath());
+  const std::string program = OurProgram();
+  return !found.empty() && TargetOf(found) == program ? name : ShellQuoted(program);
 }
 
 // hideResolved would hand the merge tool files that git has half merged already, as text. Without the

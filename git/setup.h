@@ -23,7 +23,10 @@ struct SetupPlaces {
   std::string Where() const { return is_global ? "all your repositories" : "this repository"; }
 };
 
-/// What git and hooks are told to call, as a word of a shell command: the bare name where that is found,
+/// The whole path of vexel-merge-git.
+std::string OurProgram();
+
+/// What git is told to call, as a word of a shell command: the bare name where that is found,
 /// since it survives an update of the program to another folder, and works in a configuration that several
 /// machines share.
 std::string CommandForGit();

@@ -21,14 +21,35 @@ namespace {
 
 // Fixed storage, so that a signal handler can walk it: a person who interrupts a merge in a hurry would
 // otherwise leave copies of the scene in the temporary folder or, worse, in the working copy. A merge has at
-// most four temporary files and four that wait to take the place of others.
+// most four temporary files and four that wait to take the place of others; for a page with many scenes,
+// slots are added, and never given back.
 struct Slot {
   std::array<char, 4096> path;
   std::atomic<bool> used = false;
+  Slot* next = nullptr;
 };
 
 std::array<Slot, 16> slots;
+std::atomic<Slot*> added_slots = nullptr;
 Mutex slots_mutex;
+
+template <typename Action>
+void ForEachSlot(Action action) {
+  for (Slot& slot : slots) action(slot);
+  for (Slot* slot = added_slots; slot != nullptr; slot = slot->next) action(*slot);
+}
+
+Slot* FreeSlot() {
+  Slot* free = nullptr;
+  ForEachSlot([&](Slot& slot) {
+    if (!slot.used) free = &slot;
+  });
+  if (free != nullptr) return free;
+  auto* added = new Slot;
+  added->next = added_slots;
+  added_slots = added;
+  return added;
+}
 
 extern "C" void RemoveTempFilesAndDie(int signal_number) {
   UnlinkTempFiles();
@@ -51,8 +72,7 @@ int Remember(const std::string& path) {
   AutoLock lock(slots_mutex);
   static bool handled = false;
   if (!std::exchange(handled, true)) HandleSignals();
-  Slot* slot = std::find_if(slots.begin(), slots.end(), [](const Slot& s) { return !s.used; });
-  if (slot == slots.end()) return EMFILE;
+  Slot* slot = FreeSlot();
   if (path.size() >= slot->path.size()) return ENAMETOOLONG;
   *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';
   slot->used = true;
@@ -106,9 +126,9 @@ bool RememberTempFile(const std::string& path) { return Remember(path) == 0; }
 
 void ForgetTempFile(const std::string& path) {
   AutoLock lock(slots_mutex);
-  for (Slot& slot : slots) {
+  ForEachSlot([&](Slot& slot) {
     if (slot.used && path == slot.path.data()) slot.used = false;
-  }
+  });
 }
 
 void RemoveTempFile(const std::string& path) {
@@ -120,17 +140,17 @@ void RemoveTempFile(const std::string& path) {
 void RemoveTempFiles() {
   AutoLock lock(slots_mutex);
   UnlinkTempFiles();
-  for (Slot& slot : slots) slot.used = false;
+  ForEachSlot([](Slot& slot) { slot.used = false; });
 }
 
 void UnlinkTempFiles() {
-  for (const Slot& slot : slots) {
+  ForEachSlot([](const Slot& slot) {
     if (slot.used) unlink(slot.path.data());
-  }
+  });
   // Folders, which are empty by now.
-  for (const Slot& slot : slots) {
+  ForEachSlot([](const Slot& slot) {
     if (slot.used) rmdir(slot.path.data());
-  }
+  });
 }
 
 }  // namespace vexel_yaml

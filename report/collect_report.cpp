@@ -57,7 +57,7 @@ std::string_view SettledState(MergeResolve resolution) {
 
 class Collector {
  public:
-  Collector(const MergedFiles& files, ObjectNames& names, const SideNames& sides)
+  Collector(const MergedFiles& files, ObjectNames& names, const SideWords& sides)
       : files_(files), names_(names), sides_(sides), patterns_(files.resolver) {}
 
   std::vector<ReportObject> Collect() {
@@ -67,6 +67,7 @@ class Collector {
       AddResult();
       AddRepairs();
     }
+    if (files_.committed != nullptr) AddCommitted();
     AddRenumbered();
     for (const Record& record : files_.resolver.GetRecords()) AddRecord(record);
     for (ReportObject& object : rows_.Objects()) Finish(object);
@@ -105,6 +106,16 @@ class Collector {
     const YAMLMapping& base = files_.read.base;
     SideWalk(names_, found, GoneIn(&ReportRow::result), nullptr)
         .Walk(*DiffToShow(base, *files_.merged), base, *files_.merged);
+  }
+
+  void AddCommitted() {
+    const auto found = [&](const FieldPath& path, ReportCell change, const YAMLNode* from) {
+      rows_.ObjectAt(path.front()).changed = true;
+      SetCell(path, &ReportRow::committed, std::move(change), from);
+    };
+    const auto& [base, committed, same] = static_cast<const MergeDocuments&>(*files_.committed);
+    SideWalk(names_, found, GoneIn(&ReportRow::committed), nullptr)
+        .Walk(*DiffToShow(base, committed), base, committed);
   }
 
   void AddRepairs() {
@@ -224,6 +235,7 @@ class Collector {
       Inherit(row, &ReportRow::left, &files_.read.left);
       Inherit(row, &ReportRow::right, &files_.read.right);
       Inherit(row, &ReportRow::result, files_.merged.get());
+      if (files_.committed != nullptr) Inherit(row, &ReportRow::committed, &files_.committed->left);
     }
     for (const ReportRow& row : object.rows) rows_.MarkAbove(row);
     for (ReportRow& row : object.rows) FinishRow(row);
@@ -238,19 +250,25 @@ class Collector {
   }
 
   void FinishRow(ReportRow& row) {
+    if (row.committed.kind == Kind::kUnchanged) FillFromBase(row, row.committed);
     if (files_.merged == nullptr) {
       row.result.text = "no result";
       return;
     }
-    if (row.result.kind == Kind::kUnchanged) {
-      row.result.text = row.base.text;
-      row.result.full = row.base.full;
-      row.result.node = row.base.node;
+    if (row.result.kind == Kind::kUnchanged) FillFromBase(row, row.result);
+    if (files_.committed != nullptr && row.note.empty() && !(row.committed == row.result)) {
+      row.note = "Committed otherwise than merged";
     }
     if (row.repaired && row.state.empty()) row.state = "repaired";
     if (!row.state.empty()) return;
     JudgeRow(row, sides_);
     if (row.state == "not taken" && rows_.IsInConflict(row.path)) row.state = "in conflict";
+  }
+
+  static void FillFromBase(const ReportRow& row, ReportCell& cell) {
+    cell.text = row.base.text;
+    cell.full = row.base.full;
+    cell.node = row.base.node;
   }
 
   // What happened to the whole happened to the part.
@@ -279,7 +297,7 @@ class Collector {
 
   const MergedFiles& files_;
   ObjectNames& names_;
-  const SideNames& sides_;
+  const SideWords& sides_;
   ReportRows rows_{names_};
   RecordPatterns patterns_;
   SideWalk::Places places_;
@@ -296,7 +314,7 @@ ObjectNames NamesOf(const MergedFiles& files) {
 }
 
 std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names,
-                                        const SideNames& sides) {
+                                        const SideWords& sides) {
   return Collector(files, names, sides).Collect();
 }
 

@@ -75,6 +75,18 @@ void ReadVersions(const ReportConfig& config, SceneDocuments& documents) {
   }
 }
 
+namespace {
+
+// The places in its lists are to count from base, as those of the result do.
+void ReadCommitted(ReportConfig config, MergedFiles& files) {
+  config.left_path = config.committed_path;
+  config.right_path = config.base_path;
+  files.committed = std::make_unique<SceneDocuments>();
+  ReadVersions(config, *files.committed);
+}
+
+}  // namespace
+
 void CompareVersions(MergedFiles& files, bool threads) {
   TimerStat silent("", nullptr);
   files.untouched.CopyTo(files.read);
@@ -119,6 +131,7 @@ void MergeForReport(const ReportConfig& config, MergedFiles& files) {
   files.safe = config.safe;
   ReadVersions(config, files.untouched);
   CompareVersions(files, AreWorthThreads({config.base_path, config.left_path, config.right_path}));
+  if (!config.committed_path.empty()) ReadCommitted(config, files);
   std::vector<RecordingConflictResolver::RecordResolve> resolutions;
   if (!config.merge_file.empty()) resolutions = ReadResolutions(config.merge_file);
   MergeRead(files, std::move(resolutions));

@@ -16,6 +16,8 @@ struct ReportConfig {
   std::string left_path;   ///< Theirs.
   std::string right_path;  ///< Mine.
   std::string merge_file;  ///< Where resolutions are read from; empty for none.
+  /// What became of such a merge in the end, to be shown beside its result; empty for none.
+  std::string committed_path;
   std::string rules_file = "auto";
   std::string type_info_file;
   bool safe = false;  ///< Whether scenes are merged as scenes.
@@ -36,6 +38,8 @@ struct MergedFiles {
   /// Before and after the repairs; null where the merge failed.
   std::unique_ptr<VexelObjects> unrepaired;
   std::unique_ptr<VexelObjects> merged;
+  /// What became of it in the end, as left of a base of its own; null unless asked for.
+  std::unique_ptr<SceneDocuments> committed;
   /// Why the merge failed after both sides had been compared with base; empty where it didn't.
   std::string error;
   /// Lines of the merge for people.

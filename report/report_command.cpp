@@ -38,6 +38,7 @@ constexpr std::string_view kUsage =
     "         -i FILE         settle conflicts as FILE says\n"
     "         --rules FILE    other merge rules than the default ones\n"
     "         --typeInfo FILE check components, with the type information in FILE\n"
+    "         --committed FILE show beside the result what became of it in the end\n"
     "         --safe          merge scenes as scenes, as VexelYAMLMerge merge --safe does\n"
     "         --version, --help\n";
 
@@ -61,6 +62,7 @@ std::string* ValueTarget(std::string_view option, Arguments& parsed) {
   if (option == "-o") return &parsed.output;
   if (option == "--title") return &parsed.title;
   if (option == "-i") return &parsed.config.merge_file;
+  if (option == "--committed") return &parsed.config.committed_path;
   if (option == "--rules") return &parsed.config.rules_file;
   if (option == "--typeInfo") return &parsed.config.type_info_file;
   return nullptr;
@@ -138,7 +140,8 @@ void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostr
     out << ReportJson(files, title);
     return;
   }
-  const PageHead head = {title, config.base_path, config.left_path, config.right_path, files.error};
+  const PageHead head = {title,       config.base_path,          config.left_path, config.right_path,
+                         files.error, files.committed != nullptr};
   WritePage(out, head, CollectReport(files));
 }
 

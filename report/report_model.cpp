@@ -60,7 +60,7 @@ std::string_view StateOf(const ReportRow& row) {
 
 }  // namespace
 
-void JudgeRow(ReportRow& row, const SideNames& sides) {
+void JudgeRow(ReportRow& row, const SideWords& sides) {
   row.state = StateOf(row);
   const bool lost_left = !HoldsOrder(row.result, row.left);
   const bool lost_right = !HoldsOrder(row.result, row.right);

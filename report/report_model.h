@@ -41,6 +41,8 @@ struct ReportRow {
   ReportCell left;
   ReportCell right;
   ReportCell result;
+  /// What was committed in the end, where that is known.
+  ReportCell committed;
   /// What became of it, in a word or two; empty where the merge failed.
   std::string_view state;
   /// Whether the conflict still waits for somebody, and with which pattern it is settled.
@@ -70,14 +72,14 @@ struct ReportObject {
 };
 
 /// What the two sides are called in notes.
-struct SideNames {
+struct SideWords {
   std::string left = "Left";
   std::string right = "Right";
 };
 
 /// Everything a merge did, object by object: those with conflicts first, then by their names. `names` must
 /// know the objects of the versions and of the result.
-std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names, const SideNames& sides);
+std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names, const SideWords& sides);
 /// The same with names of its own.
 std::vector<ReportObject> CollectReport(const MergedFiles& files);
 /// What knows the objects of the versions and of the result.
@@ -90,7 +92,7 @@ inline constexpr std::string_view kChangedInside = "changed inside";
 
 /// Tells what became of a place that no record settles, from what its cells say, and notes it where an order
 /// got lost.
-void JudgeRow(ReportRow& row, const SideNames& sides);
+void JudgeRow(ReportRow& row, const SideWords& sides);
 
 /// Why a record is about components that need or exclude one another, from its side's point of view; empty
 /// for other records.

@@ -86,7 +86,8 @@ void WriteCell(std::ostream& out, std::string_view name, const ReportCell& cell)
   if (!cell.text.empty()) {
     WriteText(out, cell);
   } else if (unchanged && name != "base") {
-    out << "<span class=\"none\">" << (name == "result" ? "not there" : "unchanged") << "</span>";
+    out << "<span class=\"none\">" << (name == "result" || name == "committed" ? "not there" : "unchanged")
+        << "</span>";
   }
   out << "</td>";
 }
@@ -115,7 +116,7 @@ void WriteRecordPath(std::ostream& out, std::string_view path) {
   out << Escaped{path} << "</code>";
 }
 
-void WriteRow(std::ostream& out, const ReportRow& row) {
+void WriteRow(std::ostream& out, const ReportRow& row, bool shows_committed) {
   out << "<tr data-path=\"" << Escaped{PathToString({row.path.begin() + 1, row.path.end()})} << "\""
       << RowClass(row) << "><th scope=\"row\">" << Escaped{FieldLabel(row)};
   if (!row.note.empty()) out << "<small>" << Escaped{row.note} << "</small>";
@@ -124,6 +125,7 @@ void WriteRow(std::ostream& out, const ReportRow& row) {
   WriteCell(out, "left", row.left);
   WriteCell(out, "right", row.right);
   WriteCell(out, "result", row.result);
+  if (shows_committed) WriteCell(out, "committed", row.committed);
   out << "<td class=\"state\">";
   if (!row.state.empty()) out << "<span>" << row.state << "</span>";
   if (row.repaired && row.state != "repaired") out << " <span>repaired</span>";
@@ -153,7 +155,7 @@ struct Side {
 constexpr Side kLeft = {"left", "Left (theirs)", &ReportObject::left, &ReportRow::left};
 constexpr Side kRight = {"right", "Right (mine)", &ReportObject::right, &ReportRow::right};
 
-void WriteObject(std::ostream& out, const ReportObject& object) {
+void WriteObject(std::ostream& out, const ReportObject& object, bool shows_committed) {
   const Escaped file_id{object.file_id->GetText()};
   out << "<section class=\"object\" data-file-id=\"" << file_id << "\" data-sides=\""
       << (object.left ? "left" : "") << (object.left && object.right ? " " : "")
@@ -172,8 +174,9 @@ void WriteObject(std::ostream& out, const ReportObject& object) {
     if (object.*kind.flag) out << " <span class=\"badge " << kind.name << "\">" << kind.name << "</span>";
   }
   out << "</h2>\n<table><thead><tr><th>Field</th><th>Base</th><th class=\"left\">Left</th><th "
-         "class=\"right\">Right</th><th>Result</th><th>State</th></tr></thead><tbody>\n";
-  for (const ReportRow& row : object.rows) WriteRow(out, row);
+         "class=\"right\">Right</th><th>Result</th>"
+      << (shows_committed ? "<th>Committed</th>" : "") << "<th>State</th></tr></thead><tbody>\n";
+  for (const ReportRow& row : object.rows) WriteRow(out, row, shows_committed);
   out << "</tbody></table></section>\n";
 }
 
@@ -273,7 +276,7 @@ void WritePage(std::ostream& out, const PageHead& head, const std::vector<Report
   out << "</header>\n";
   if (!objects.empty()) WriteFilters(out, objects.size());
   out << "<main>\n";
-  for (const ReportObject& object : objects) WriteObject(out, object);
+  for (const ReportObject& object : objects) WriteObject(out, object, head.shows_committed);
   if (objects.empty()) {
     out << "<p class=\"empty\">Nothing changed.</p>\n";
   } else {

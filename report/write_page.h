@@ -14,6 +14,8 @@ struct PageHead {
   std::string right_path;
   /// Why the merge failed; empty where it didn't.
   std::string error;
+  /// Whether it is shown what was committed in the end.
+  bool shows_committed = false;
 };
 
 /// Writes one HTML page that needs no other file and no network. Texts may come from strangers: none of them

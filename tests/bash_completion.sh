@@ -48,5 +48,5 @@ CALLS
 zsh -n "$completions/_VexelYAMLMerge"
 for file in "$completions"/*.fish; do
   fish --no-config -c 'source $argv[1]; complete -C "$argv[2]"' "$file" "$(basename "$file" .fish) "
-done | cut -f 1 | diff - <(printf '%s\n' diff merge strip unittest check disable enable preview report resolve status Assets/ Code/ \
+done | cut -f 1 | diff - <(printf '%s\n' diff merge strip unittest check disable enable preview report resolve review status Assets/ Code/ \
   Assets/ Code/)

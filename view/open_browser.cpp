@@ -40,15 +40,6 @@ std::vector<std::string> BrowserCommand(const std::string& address) {
 
 }  // namespace
 
-bool HasDisplay() {
-  if (!Variable("SSH_CONNECTION").empty()) return false;
-#ifdef __APPLE__
-  return true;
-#else
-  return !Variable("DISPLAY").empty() || !Variable("WAYLAND_DISPLAY").empty();
-#endif
-}
-
 void OpenBrowser(const std::string& address) {
   std::vector<std::string> command = BrowserCommand(address);
   std::vector<char*> arguments;

@@ -4,9 +4,6 @@
 
 namespace vexel_yaml {
 
-/// Whether a browser started here would show something to somebody.
-bool HasDisplay();
-
 /// Starts the browser that the person prefers, and doesn't wait for it. That none starts is no error.
 void OpenBrowser(const std::string& address);
 

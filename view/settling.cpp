@@ -14,7 +14,7 @@ namespace {
 
 using Resolutions = std::vector<RecordingConflictResolver::RecordResolve>;
 
-SideNames NamesInNotes(const ViewFile& file) {
+SideWords NamesInNotes(const ViewFile& file) {
   return {file.theirs_name.empty() ? "Their side" : file.theirs_name,
           file.ours_name.empty() ? "Our side" : file.ours_name};
 }

@@ -6,6 +6,7 @@
 #include <mutex>
 #include <optional>
 
+#include "platform/display.h"
 #include "platform/error_channel.h"
 #include "platform/thread.h"
 #include "view/local_server.h"

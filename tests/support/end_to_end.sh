@@ -18,6 +18,8 @@ unset XDG_CONFIG_HOME
 mkdir "$HOME"
 # Somebody who runs a test by hand is not to be asked anything.
 exec </dev/null
+# Nor is a page to be opened.
+unset DISPLAY WAYLAND_DISPLAY CI
 
 # To the standard error of the test itself: what is sent elsewhere is the checked command's.
 exec 3>&2

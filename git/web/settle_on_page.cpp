@@ -1,0 +1,162 @@
+#include "git/web/settle_on_page.h"
+
+#include <algorithm>
+#include <iostream>
+#include <memory>
+#include <stdexcept>
+
+#include "git/captured_errors.h"
+#include "git/decided_lines.h"
+#include "git/git_call.h"
+#include "git/merged_commits.h"
+#include "git/mergetool.h"
+#include "git/repository.h"
+#include "git/resolve_arguments.h"
+#include "git/resolving.h"
+#include "git/script_classes.h"
+#include "git/shown_text.h"
+#include "git/web/page_options.h"
+#include "git/work_files.h"
+#include "platform/file_error.h"
+#include "report/merged_files.h"
+#include "report/value_text.h"
+#include "view/view_server.h"
+
+namespace vexel_yaml {
+
+namespace {
+
+// Runs `settle`, and throws what it has said unless it succeeds, for the page to show.
+template <typename Settle>
+void OrThrow(Settle settle) {
+  std::string said;
+  bool is_settled = false;
+  {
+    const CapturedErrors captured;
+    try {
+      is_settled = settle();
+    } catch (const FileError& error) {
+      std::cerr << error.what();
+    }
+    said = captured.Text();
+  }
+  if (!is_settled) throw std::runtime_error(OnOneLine(said.empty() ? "error: it can't be staged" : said));
+  std::cerr << said << std::flush;
+}
+
+// Who is behind a side, as far as git tells, such as "Ann, feature/lights".
+std::string WithAuthors(const std::string& from, const std::string& to, const std::string& asset,
+                        const std::string& name) {
+  constexpr size_t kMostAuthors = 2;
+  const std::vector<std::string> authors = Authors(from + ".." + to, {asset});
+  std::string text;
+  for (size_t i = 0; i < std::min(authors.size(), kMostAuthors); ++i) text += authors[i] + ", ";
+  if (authors.size() > kMostAuthors) text += "..., ";
+  return text + name;
+}
+
+SideNames NamesFor(const Repository& repository, const std::string& asset) {
+  SideNames names = FindSideNames(repository);
+  if (names.ours.empty()) names.ours = Line(GitQuietly({"symbolic-ref", "--quiet", "--short", "HEAD"}));
+  if (!IsFile(repository.Path("MERGE_HEAD"))) return names;
+  return {WithAuthors("HEAD", "MERGE_HEAD", asset, names.theirs),
+          WithAuthors("MERGE_HEAD", "HEAD", asset, names.ours)};
+}
+
+ViewFile PageFile(const AssetVersions& versions, const MergeSettings& settings,
+                  const Repository& repository) {
+  const SideNames names = NamesFor(repository, versions.asset);
+  ViewFile file = {versions.asset, versions.base, versions.left, versions.right};
+  file.safe = settings.is_safe;
+  file.theirs_name = names.theirs;
+  file.ours_name = names.ours;
+  file.script_search = FindScriptClasses;
+  const std::string record = ConflictRecords(repository).Find(versions.asset);
+  if (record.empty()) return file;
+  try {
+    file.resolutions = ReadResolutions(ScratchFolder(repository).Write("decided", DecidedIn(record)));
+  } catch (const YAMLError& error) {
+    throw CommandError(ShownRecord(record) + ": " + error.what());
+  }
+  return file;
+}
+
+// A file with its versions, which are there as long as the page is.
+class ResolvedFile {
+ public:
+  ResolvedFile(const Repository& repository, const MergeSettings& settings, const std::string& asset,
+               bool force)
+      : repository_(repository), settings_(settings), asset_(asset), force_(force), stages_(asset) {}
+
+  // False where that can't be settled on a page, which has been said.
+  bool Open(std::vector<ViewFile>& files) {
+    AssetVersions versions;
+    if (!stages_.Write(scratch_, versions)) return false;
+    if (!versions.HasAsset()) {
+      Complain(asset_ + " was merged as text: edit it, and 'git add' it");
+      return false;
+    }
+    ViewFile& file = files.emplace_back(PageFile(versions, settings_, repository_));
+    file.store = [this](const std::string&, const std::string& record) { Store(record); };
+    return true;
+  }
+
+ private:
+  // Merged once more with what has been decided, as by any other way to settle it.
+  void Store(const std::string& record) const {
+    if (!stages_.AreSame()) {
+      throw std::runtime_error(asset_ +
+                               " is no longer in the conflict that it was in when the page was opened");
+    }
+    Choice choice;
+    choice.force = force_;
+    choice.decided = record;
+    OrThrow([&] { return Resolving(repository_, settings_, choice).Resolve(asset_); });
+  }
+
+  const Repository& repository_;
+  const MergeSettings& settings_;
+  const std::string asset_;
+  const bool force_;
+  const StageFiles stages_;
+  ScratchFolder scratch_{repository_};
+};
+
+}  // namespace
+
+int ResolveOnPage(const std::vector<std::string>& arguments) {
+  const ResolveArguments parsed = ParseResolve(arguments);
+  const ViewServerOptions options = PageOptions(parsed.port, parsed.opens_browser);
+  bool is_done = true;
+  const std::set<std::string> assets = FindConflicts(parsed.files, is_done);
+  GoToTop();
+  const MergeSettings settings = SettingsQuery().Get();
+  const Repository repository;
+  LoadForPage(settings);
+  std::vector<std::unique_ptr<ResolvedFile>> resolved;
+  std::vector<ViewFile> files;
+  for (const std::string& asset : assets) {
+    resolved.push_back(std::make_unique<ResolvedFile>(repository, settings, asset, parsed.choice.force));
+    is_done = resolved.back()->Open(files) && is_done;
+  }
+  if (files.empty()) return 1;
+  const int status = ShowPage(std::move(files), options);
+  ConflictRecords(repository).Sweep();
+  return is_done ? status : 1;
+}
+
+int MergetoolOnPage(const std::vector<std::string>& arguments) {
+  const AssetVersions versions = MergetoolVersions(arguments);
+  const MergeSettings settings = SettingsQuery().Get();
+  const Repository repository;
+  LoadForPage(settings);
+  ViewFile file = PageFile(versions, settings, repository);
+  file.store = [&](const std::string&, const std::string& record) {
+    Choice choice;
+    choice.decided = record;
+    OrThrow([&] { return SettleForMergetool(versions, choice) == AssetMerge::kMerged; });
+  };
+  return ShowPage({file}, PageOptions({}, true));
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,218 @@
+#!/usr/bin/env python3
+# Settles the conflicts of git, Mercurial and the merge command by the requests that the page makes:
+#   git_on_page.py PROGRAM
+# As the browser that these start (git_on_page.py --browser ANSWERS ADDRESS) it takes each side named in ANSWERS.
+
+import atexit
+import http.client
+import json
+import os
+import subprocess
+import sys
+import tempfile
+import urllib.request
+from pathlib import Path
+
+from browser import expect
+
+SCENE = """%YAML 1.1
+%TAG !v! tag:vexel.com,2011:
+--- !v!1 &10
+GameObject:
+  m_Component:
+  - component: {{fileID: 11}}
+  m_Name: Lamp
+--- !v!108 &11
+Light:
+  m_GameObject: {{fileID: 10}}
+  m_Intensity: {}
+  m_Range: {}
+"""
+
+
+class Page:
+    def __init__(self, address):
+        self.address = address.strip().rstrip("/")
+
+    def state(self, file=0):
+        return json.load(urllib.request.urlopen(f"{self.address}/state?file={file}", timeout=60))
+
+    def post(self, what, **body):
+        host, secret = self.address.removeprefix("http://").split("/")
+        connection = http.client.HTTPConnection(host, timeout=60)
+        connection.request("POST", f"/{secret}/{what}", json.dumps(body), {"Content-Type": "application/json"})
+        answer = connection.getresponse()
+        return answer.status, json.loads(answer.read() or b"{}")
+
+    def take(self, side, file=0):
+        state = self.state(file)
+        rows = [row for card in state["cards"] for part in card["objects"] for row in part["rows"] if row["pending"]]
+        choices = [{"path": row["path"], "choice": side} for row in rows]
+        expect("a choice", self.post("choose", file=file, revision=state["revision"], choices=choices)[0], 200)
+
+
+def settle_as_browser(side, address):
+    # The first address leads to the page's own.
+    page = Page(urllib.request.urlopen(address, timeout=60).geturl())
+    page.take(side)
+    page.post("save", file=0)
+
+
+def run(*command, status=0, **env):
+    # Git asks for a return before a tool that it has chosen itself.
+    done = subprocess.run(command, env={**os.environ, **env}, input="\n", capture_output=True, text=True, timeout=40)
+    if (done.returncode == 0) != (status == 0):
+        sys.exit(f"{command} ended with {done.returncode}: {done.stdout}{done.stderr}")
+    return done.stdout
+
+
+def opened(*command):
+    process = subprocess.Popen(["vexel-merge-git", *command, "--no-browser"], stdout=subprocess.PIPE, text=True)
+    atexit.register(process.kill)
+    return process, Page(process.stdout.readline())
+
+
+def write(intensity, reach, *files):
+    for file in files:
+        Path(file).write_text(SCENE.format(intensity, reach))
+
+
+def commit(branch, intensity, reach, *files):
+    run("git", "checkout", "-q", "-B", branch, "start")
+    write(intensity, reach, *files)
+    Path("notes.txt").write_text(branch)
+    run("git", "commit", "-q", "-a", "-m", branch)
+
+
+def conflict():
+    run("git", "reset", "-q", "--hard")
+    run("git", "merge", "-q", "theirs", status=1)
+
+
+def is_unmerged(file):
+    return run("git", "ls-files", "-u", "--", file) != ""
+
+
+def check_resolve():
+    conflict()
+    process, page = opened("resolve", "--web")
+    state = page.state()
+    expect("the sides", state["names"], {"base": "", "theirs": "Test, theirs", "ours": "Test, ours"})
+    expect("the files", [file["title"] for file in state["files"]], ["A.vexel", "B.vexel"])
+    expect("what is saved too early", page.post("save", file=0)[0], 409)
+    page.take("theirs")
+    expect("the next file", page.post("save", file=0), (200, {"saved": True, "next": 1}))
+    expect("what is still in conflict", [is_unmerged(file) for file in ("A.vexel", "B.vexel")], [False, True])
+    page.take("ours", file=1)
+    write(7, 7, "B.vexel")
+    status, answer = page.post("save", file=1)
+    expect("a save over edits", (status, "edited by hand" in answer["error"]), (409, True))
+    expect("the edited file", Path("B.vexel").read_text(), SCENE.format(7, 7))
+    run("git", "checkout", "-q", "-m", "--", "B.vexel")
+    expect("a save without them", page.post("save", file=1)[0], 200)
+    expect("the end", process.wait(30), 0)
+    run("git", "add", "notes.txt")
+    run("git", "commit", "-q", "-m", "merged")
+    expect("what is committed", [Path(file).read_text() for file in ("A.vexel", "B.vexel")],
+           [SCENE.format(4, 10), SCENE.format(9, 10)])
+    run("git", "reset", "-q", "--hard", "HEAD~")
+    conflict()
+    expect("what was chosen, when it comes again", Path("A.vexel").read_text(), SCENE.format(4, 10))
+    process, page = opened("resolve", "--web", "A.vexel")
+    expect("what is left to do", page.state()["pending"], 0)
+    page.post("give-up")
+    expect("giving up", process.wait(30), 1)
+    expect("the file that was given up", is_unmerged("A.vexel"), True)
+
+
+def check_mergetool(browser):
+    run("git", "config", "rerere.enabled", "false")
+    conflict()
+    tool = ("git", "-c", "mergetool.keepBackup=false", "mergetool", "--no-prompt")
+    page = {"DISPLAY": ":none", "BROWSER": f"{browser} theirs"}
+    run(*tool, "B.vexel", **page)
+    expect("the file", (Path("B.vexel").read_text(), is_unmerged("B.vexel")), (SCENE.format(4, 10), False))
+    run(*tool, "A.vexel", status=1, GIT_EDITOR="true", CI="true", **page)
+    expect("a file on a build server", is_unmerged("A.vexel"), True)
+    vim = Path(os.environ["HOME"], "bin", "vim")
+    vim.parent.mkdir()
+    vim.write_text("#!/bin/sh\nfor merged; do :; done\necho settled >\"$merged\"\n")
+    vim.chmod(0o755)
+    run(*tool, "notes.txt", EDITOR="vim", PATH=f"{vim.parent}:{os.environ['PATH']}")
+    expect("a file of another kind", (Path("notes.txt").read_text(), is_unmerged("notes.txt")), ("settled\n", False))
+
+
+def check_review():
+    run("git", "reset", "-q", "--hard")
+    run("git", "rm", "-q", "B.vexel")
+    write(1, 1, "New.vexel")
+    run("git", "add", "-A")
+    run("git", "commit", "-q", "-m", "new")
+    process, page = opened("review", "start...HEAD")
+    state = page.state()
+    expect("the mode", (state["mode"], state["names"]), ("review", {"base": "before HEAD", "result": "HEAD"}))
+    expect("the changed files", [file["title"] for file in state["files"]], ["A.vexel", "B.vexel", "New.vexel"])
+    row = state["cards"][0]["objects"][0]["rows"][0]
+    expect("a change", (row["field"], row["base"]["text"], row["result"]["text"]), ("m_Intensity", "2", "9"))
+    for file, kind in ((1, "removed"), (2, "added")):
+        expect(f"a file that was {kind}", kind in page.state(file)["cards"][0]["kinds"], True)
+    expect("a choice", page.post("choose", file=0, revision=1, choices=[])[0], 409)
+    page.post("give-up")
+    expect("the end of a review", process.wait(30), 0)
+    run("vexel-merge-git", "review", "HEAD", status=1)
+
+
+def check_others(browser):
+    page = {"DISPLAY": ":none", "BROWSER": f"{browser} ours"}
+    for name, values in (("base", (2, 10)), ("left", (4, 20)), ("right", (9, 10))):
+        write(*values, f"{name}.vexel")
+    merge = ("VexelYAMLMerge", "merge", "-h", "--safe", "base.vexel", "left.vexel", "right.vexel", "out.vexel")
+    run(*merge, status=1, CI="true", TERM="dumb", **page)
+    run(*merge, **page)
+    expect("the result of the default tools", Path("out.vexel").read_text(), SCENE.format(9, 20))
+    run("hg", "init", "hg")
+    os.chdir("hg")
+    for name in ("base", "left", "right"):
+        Path("H.vexel").write_bytes(Path(f"../{name}.vexel").read_bytes())
+        run("hg", "commit", "-q", "-A", "-m", name)
+        run("hg", "update", "-q", "0")
+    run("hg", "update", "-q", "2")
+    run("hg", "merge", "1", status=1)
+    run("hg", "resolve", "--tool", "vexel-page", "H.vexel", **page)
+    expect("the result with Mercurial", Path("H.vexel").read_text(), SCENE.format(9, 20))
+
+
+def main():
+    program, project = Path(sys.argv[1]).resolve(), Path(__file__).resolve().parent.parent
+    for name in list(os.environ):
+        if name.startswith(("GIT_", "HG", "SSH_")) or name in ("DISPLAY", "WAYLAND_DISPLAY", "CI", "VISUAL", "EDITOR"):
+            del os.environ[name]
+    with tempfile.TemporaryDirectory() as folder:
+        who = {f"GIT_{role}_{what}": "Test" for role in ("AUTHOR", "COMMITTER") for what in ("NAME", "EMAIL")}
+        os.environ.update(who, HOME=folder, PATH=f"{program.parent}:{os.environ['PATH']}", GIT_CONFIG_NOSYSTEM="1",
+                          HGRCPATH=str(project / "integrations/mercurial/hgrc"), HGUSER="Test")
+        browser = Path(folder, "browser")
+        browser.write_text(f'#!/bin/sh\nexec "{sys.executable}" "{Path(__file__).resolve()}" --browser "$@"\n')
+        browser.chmod(0o755)
+        run("git", "init", "-q", "-b", "start", f"{folder}/repository")
+        os.chdir(f"{folder}/repository")
+        run("vexel-merge-git", "enable")
+        run("git", "config", "rerere.enabled", "true")
+        write(2, 10, "A.vexel", "B.vexel")
+        Path("notes.txt").write_text("start")
+        run("git", "add", "-A")
+        run("git", "commit", "-q", "-m", "start")
+        commit("theirs", 4, 10, "A.vexel", "B.vexel")
+        commit("ours", 9, 10, "A.vexel", "B.vexel")
+        check_resolve()
+        check_mergetool(browser)
+        check_review()
+        os.chdir(folder)
+        check_others(browser)
+        os.chdir("/")
+
+
+if sys.argv[1] == "--browser":
+    settle_as_browser(sys.argv[2], sys.argv[3])
+else:
+    main()
