@@ -1,16 +1,17 @@
 #!/usr/bin/env python3
 # Settles conflicts on the page of the built program, in a real browser: view_browser.py <folder of the programs>
 
+import os
 import subprocess
 import sys
 import tempfile
 import time
-from contextlib import contextmanager
 from pathlib import Path
 
 from browser import browser, expect
 
 TYPES = Path(__file__).resolve().parent.parent / "examples" / "typeinfo.yaml"
+FILES = ["base.vexel", "left.vexel", "right.vexel"]
 HEADER = "%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n"
 # Names and values that would take the page over if they became markup, or an attribute's end.
 HOSTILE = r"""</script><script>document.title='taken'</script><img src=x onerror=\"document.title='taken'\">' \e[31m\x01"""
@@ -35,18 +36,18 @@ def mesh(has_filter, has_renderer):
             + "".join(f"--- !{kind}:\n  m_GameObject: {{fileID: 90}}\n" for _, kind in components))
 
 
-class View:
-    """The program, started on three versions of a scene, with the browser on its page."""
+def environment_in(programs, home):
+    return {**os.environ, "PATH": f"{programs}:{os.environ['PATH']}", "HOME": str(home)}
 
-    def __init__(self, programs, page, folder, versions, *options):
-        self.programs, self.page, self.folder = programs, page, Path(folder)
-        for name, text in versions.items():
-            (self.folder / f"{name}.vexel").write_text(HEADER + text)
-        self.merged = self.folder / "merged.vexel"
-        self.merged.write_text("as it was\n")
-        self.files = ["base.vexel", "left.vexel", "right.vexel"]
-        self.process = subprocess.Popen([f"{programs}/vexel-merge-view", "--no-browser", *options, *self.files,
-                                         self.merged], cwd=folder, stdout=subprocess.PIPE, text=True)
+
+class View:
+    """The program that has been started, with the browser on its page."""
+
+    def __init__(self, programs, page, folder, *command):
+        self.programs, self.page, self.folder = programs, page, folder
+        self.merged = folder / "merged.vexel"
+        self.process = subprocess.Popen([programs / command[0], *command[1:]], cwd=folder, stdout=subprocess.PIPE,
+                                        text=True, env=environment_in(programs, folder))
         page.call("url", url=self.process.stdout.readline().strip())
         page.wait("document.querySelector('#cards[aria-busy=false]') !== null")
 
@@ -73,7 +74,7 @@ def settled_by_hand(view, choices, *options):
     record = "Conflict handling:\n" + "".join(f"{side} {path}\n" for path, side in choices.items())
     (view.folder / "choices").write_text(record)
     subprocess.run([f"{view.programs}/VexelYAMLMerge", "merge", "-h", "--fallback", "none", "--safe", "-i", "choices",
-                    *options, *view.files, "by_hand.vexel"], cwd=view.folder, check=True, stdout=subprocess.DEVNULL)
+                    *options, *FILES, "by_hand.vexel"], cwd=view.folder, check=True, stdout=subprocess.DEVNULL)
     return (view.folder / "by_hand.vexel").read_bytes()
 
 
@@ -81,8 +82,8 @@ CONTROL, SHIFT = "\ue009", "\ue008"
 LAMP, COLOUR, SECOND = "12.Light.m_Intensity", "12.Light.m_Color", "22.Light.m_Intensity"
 
 
-def settle_and_save(start):
-    view = start({"base": lamp(1, 2) + lamp(2, 5, name="Second"),
+def settle_and_save(bench):
+    view = bench.start({"base": lamp(1, 2) + lamp(2, 5, name="Second"),
                   "left": lamp(1, 3, colour="{r: 1, g: 0.5, b: 0, a: 1}") + lamp(2, 6, 40, "Second"),
                   "right": lamp(1, 4, colour="{r: 0, g: 0, b: 1, a: 1}") + lamp(2, 7, name="Second")},
                  "--theirs", "Ben, wider")
@@ -128,9 +129,9 @@ def settle_and_save(start):
     expect("what is saved", view.merged.read_bytes(), wanted)
 
 
-def choices_for_many(start):
+def choices_for_many(bench):
     lamps = range(1, 8)
-    view = start({name: "".join(lamp(n, value, extent, f"Lamp {n}") for n in lamps)
+    view = bench.start({name: "".join(lamp(n, value, extent, f"Lamp {n}") for n in lamps)
                   for name, value, extent in (("base", 1, 10), ("left", 2, 20), ("right", 3, 30))})
     page = view.page
     view.open(14, "two conflicts a lamp")
@@ -158,9 +159,9 @@ def choices_for_many(start):
         view.open(count, "each was one step")
 
 
-def many_in_one_object(start):
+def many_in_one_object(bench):
     """It is drawn in parts, which are one object all the same."""
-    view = start({name: "--- !v!114 &1\nMonoBehaviour:\n" + "".join(f"  field{n}: {value}\n" for n in range(250))
+    view = bench.start({name: "--- !v!114 &1\nMonoBehaviour:\n" + "".join(f"  field{n}: {value}\n" for n in range(250))
                   for name, value in (("base", 1), ("left", 2), ("right", 3))})
     page = view.page
     expect("every conflict is there", len(view.taken()), 250)
@@ -177,9 +178,9 @@ def many_in_one_object(start):
     expect("each row shows that", [path for path, side in view.taken().items() if side], ["1.MonoBehaviour.field249"])
 
 
-def what_a_choice_brings_up(start):
+def what_a_choice_brings_up(bench):
     types = ["--typeInfo", TYPES]
-    view = start({"base": mesh(True, False), "left": mesh(False, False), "right": mesh(True, True)}, *types)
+    view = bench.start({"base": mesh(True, False), "left": mesh(False, False), "right": mesh(True, True)}, *types)
     page = view.page
     view.open(1, "the filter that is needed and gone")
     page.click(view.tile("92", "theirs"))
@@ -195,9 +196,9 @@ def what_a_choice_brings_up(start):
     expect("what is saved", view.merged.read_bytes(), settled_by_hand(view, {"92": "left", "93": "left"}, *types))
 
 
-def give_up(start):
+def give_up(bench):
     versions = {"base": lamp(1, 2), "left": lamp(1, 3), "right": lamp(1, 4)}
-    view = start(versions)
+    view = bench.start(versions)
     view.page.click(view.tile(LAMP, "ours"))
     view.open(0, "settled")
     view.page.click("#give-up")
@@ -208,20 +209,20 @@ def give_up(start):
     view.ends_with(1, "given up")
     expect("the file", view.merged.read_text(), "as it was\n")
 
-    view = start(versions)
+    view = bench.start(versions)
     view.page.call("url", url="about:blank")
     view.ends_with(1, "the page was left")
     expect("the file", view.merged.read_text(), "as it was\n")
 
-    view = start(versions)
+    view = bench.start(versions)
     view.process.kill()
     view.page.wait("document.getElementById('cards').inert && document.querySelector('#notice.failure') !== null",
                    "that the program is gone is said")
 
 
-def hostile_values(start):
+def hostile_values(bench):
     long = "x" * 100_000
-    view = start({"base": lamp(1, 2, name=HOSTILE), "left": lamp(1, f'"{HOSTILE}"', name=HOSTILE),
+    view = bench.start({"base": lamp(1, 2, name=HOSTILE), "left": lamp(1, f'"{HOSTILE}"', name=HOSTILE),
                   "right": lamp(1, long, name=HOSTILE)}, "--title", HOSTILE, "--theirs", HOSTILE)
     page = view.page
     view.open(1, "the conflict is there")
@@ -239,24 +240,85 @@ def hostile_values(start):
     expect("the long value is in the file", long in view.merged.read_text(), True)
 
 
+def from_conflict_to_commit(bench):
+    """With git: everything from the merge that stops to the commit is clicked."""
+    folder = bench.folder()
+    environment = {**environment_in(bench.programs, folder), "GIT_AUTHOR_NAME": "Mara", "GIT_AUTHOR_EMAIL": "m@x.org",
+                   "GIT_COMMITTER_NAME": "Mara", "GIT_COMMITTER_EMAIL": "m@x.org"}
+
+    def git(*command, status=0):
+        done = subprocess.run(["git", *command], cwd=folder, env=environment, capture_output=True, text=True)
+        expect(f"git {command}: {done.stdout}{done.stderr}", done.returncode, status)
+        return done.stdout
+
+    def commit(intensity):
+        for name in ("Harbour.vexel", "Island.vexel"):
+            (folder / name).write_text(HEADER + lamp(1, intensity))
+        git("add", ".")
+        git("commit", "-q", "-m", f"Let it be {intensity}")
+
+    git("init", "-q", "-b", "main")
+    subprocess.run([bench.programs / "vexel-merge-git", "enable"], cwd=folder, env=environment, check=True,
+                   stdout=subprocess.DEVNULL)
+    commit(5)
+    git("switch", "-q", "-c", "darker")
+    commit(1)
+    git("switch", "-q", "main")
+    commit(7)
+    git("merge", "--no-edit", "darker", status=1)
+
+    view = bench.open(folder, "vexel-merge-git", "resolve", "--web", "--no-browser")
+    page = view.page
+    expect("both files are listed", page.script("return document.querySelectorAll('#files button').length"), 2)
+    expect("the branch", "darker" in view.text("thead .theirs"), True)
+    page.click(view.tile(LAMP, "theirs"))
+    view.open(0, "the first file")
+    page.click("#save")
+    view.open(1, "the next file comes up")
+    page.click(view.tile(LAMP, "ours"))
+    view.open(0, "the second file")
+    page.click("#save")
+    view.ends_with(0, "all are saved")
+    git("commit", "-q", "--no-edit")
+    expect("what is committed", [line for name in ("Harbour", "Island") for line in git("show", f"HEAD:{name}.vexel")
+                                 .splitlines() if "Intensity" in line], ["  m_Intensity: 1", "  m_Intensity: 7"])
+
+
+class Bench:
+    """Starts programs, each in a folder of its own, and ends what is left of them."""
+
+    def __init__(self, programs, page, root):
+        self.programs, self.page, self.root, self.views = programs, page, root, []
+
+    def folder(self):
+        folder = Path(self.root, str(len(self.views)))
+        folder.mkdir()
+        return folder
+
+    def open(self, folder, *command):
+        self.views.append(View(self.programs, self.page, folder, *command))
+        return self.views[-1]
+
+    def start(self, versions, *options):
+        """The view on three versions of a scene."""
+        folder = self.folder()
+        for name, text in versions.items():
+            (folder / f"{name}.vexel").write_text(HEADER + text)
+        (folder / "merged.vexel").write_text("as it was\n")
+        return self.open(folder, "vexel-merge-view", "--no-browser", *options, *FILES, "merged.vexel")
+
+
 def main(programs):
     with tempfile.TemporaryDirectory(prefix="view") as root, browser(root) as page:
-        views = []
-
-        def start(versions, *options):
-            folder = Path(root, str(len(views)))
-            folder.mkdir()
-            views.append(View(programs, page, folder, versions, *options))
-            return views[-1]
-
+        bench = Bench(programs, page, root)
         try:
             for test in (settle_and_save, choices_for_many, many_in_one_object, what_a_choice_brings_up, give_up,
-                         hostile_values):
+                         hostile_values, from_conflict_to_commit):
                 started = time.monotonic()
-                test(start)
+                test(bench)
                 print(f"{test.__name__}: {time.monotonic() - started:.1f} s")
         finally:
-            for view in views:
+            for view in bench.views:
                 view.process.kill()
 
 
