@@ -261,6 +261,11 @@ class Collector {
     }
     if (row.repaired && row.state.empty()) row.state = "repaired";
     if (!row.state.empty()) return;
+    if (row.left.kind == Kind::kUnchanged && row.right.kind == Kind::kUnchanged &&
+        row.committed.kind != Kind::kUnchanged) {
+      row.state = "only committed";
+      return;
+    }
     JudgeRow(row, sides_);
     if (row.state == "not taken" && rows_.IsInConflict(row.path)) row.state = "in conflict";
   }

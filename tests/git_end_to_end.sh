@@ -174,6 +174,9 @@ git commit -q -m "Merge darker"
 check "nothing is left of it" has_no_record
 check "the page of a merge commit is made" vexel-merge-git report -o "$work/page.html" HEAD -- "$file" >/dev/null
 check "it names the file" grep -qF "Main Scene.vexel" "$work/page.html"
+check "it shows what was settled" grep -q '<td class="committed unchanged"><span class="value">2</span>' "$work/page.html"
+scene 2 33 >"$file" && git commit -q -a --amend --no-edit && vexel-merge-git report -o "$work/page.html" HEAD >/dev/null
+check "and what was edited by hand" grep -q '<span class="value">33</span></td><td class="state"><span>only committed' "$work/page.html"
 check "a commit with one parent has no page" refuses vexel-merge-git report HEAD~ 2>/dev/null
 
 # A file that nobody can read stays as ours has it, and in conflict.
