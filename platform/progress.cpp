@@ -56,6 +56,8 @@ Progress::Progress(const std::string& task, std::chrono::milliseconds patience)
   }
   s_current = this;
   s_may_draw = true;
+  // Whoever has waited already is told at once, however soon the work is done.
+  if (patience_ <= std::chrono::milliseconds(0)) Draw();
 }
 
 Progress::~Progress() {
