@@ -12,7 +12,7 @@ slowly() {
   { sleep "$1" && cat right.vexel; } >slow.vexel &
   "${@:2}"
 }
-terminal() { TERM=${term-xterm} script -qec "$1" /dev/null | tr '\r' '\n' >out; }
+terminal() { SHELL=$BASH TERM=${term-xterm} script -qec "$1" /dev/null | tr '\r' '\n' >out; }
 merge="VexelYAMLMerge merge -h --fallback none base.vexel left.vexel slow.vexel"
 draws() { grep -qF "$1" out; }
 
