@@ -204,7 +204,8 @@ class DeedSearch {
         if (is_edited) Add(Deed::Kind::kRefers, file_id, target);
       }
     };
-    PlaceWalk([](const YAMLMapping&, const YAMLMapping&) {}, look_at)
+    PlaceWalk(
+        is_deleted, [](const YAMLMapping&, const YAMLMapping&) {}, look_at)
         .Walk(file_id, base_.Get(file_id), const_cast<YAMLNode*>(kept_.Get(file_id)),
               const_cast<YAMLNode*>(other_.Get(file_id)));
   }

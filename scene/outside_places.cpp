@@ -153,19 +153,19 @@ void OutsidePlaces::SettleFate(const Fate& fate, const VexelObjects& base, Vexel
     return fate.going.contains(target) || fate.as_in_base.contains(target);
   };
   const IsSought goes = [&](const YAMLScalar* target) { return fate.going.contains(target); };
-  PlaceWalk walk(
-      [&](const YAMLMapping& reference, YAMLMapping& now) {
-        if (!stays(GetLocalTarget(&reference)) || !IsEmptyReference(now)) return;
-        now.Clear();
-        reference.CloneInto(now);
-        deleter_changed = true;
-      },
-      [&](const ListPlace& list) {
-        deleter_changed |= BringBack(list, stays);
-        if (list.other == nullptr) return;
-        other_changed |= Revert(list, loses_edits);
-        other_changed |= TakeOut(list, goes);
-      });
+  PlaceWalk walk([&](const YAMLScalar* target) { return stays(target) || goes(target); },
+                 [&](const YAMLMapping& reference, YAMLMapping& now) {
+                   if (!stays(GetLocalTarget(&reference)) || !IsEmptyReference(now)) return;
+                   now.Clear();
+                   reference.CloneInto(now);
+                   deleter_changed = true;
+                 },
+                 [&](const ListPlace& list) {
+                   deleter_changed |= BringBack(list, stays);
+                   if (list.other == nullptr) return;
+                   other_changed |= Revert(list, loses_edits);
+                   other_changed |= TakeOut(list, goes);
+                 });
   const auto settle = [&](const YAMLScalar* file_id) {
     YAMLNode* in_deleter = deleter.Get(file_id);
     YAMLNode* in_other = other.Get(file_id);

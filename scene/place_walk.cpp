@@ -3,6 +3,7 @@
 namespace vexel_yaml {
 
 void PlaceWalk::Walk(const YAMLScalar* file_id, const YAMLNode* base, YAMLNode* deleter, YAMLNode* other) {
+  if (!Refers(base) && !Refers(other)) return;
   path_ = {file_id};
   kind_ = ReadLinks(base).kind;
   WalkNodes(base, deleter, other);
@@ -32,6 +33,8 @@ void PlaceWalk::WalkMappings(const YAMLMapping& base, YAMLMapping& deleter, YAML
 }
 
 void PlaceWalk::WalkLists(const YAMLSequence& base, YAMLSequence& deleter, YAMLSequence* other) {
+  // To align lists takes far longer than to look for references.
+  if (!Refers(&base) && !Refers(other)) return;
   const std::optional<ListAlignment> alignment =
       AlignLists(path_, base, deleter, other == nullptr ? base : *other);
   if (!alignment) return;
@@ -43,6 +46,13 @@ void PlaceWalk::WalkLists(const YAMLSequence& base, YAMLSequence& deleter, YAMLS
     path_.pop_back();
   }
   on_list_({base, deleter, other, alignment->elements, path_});
+}
+
+bool PlaceWalk::Refers(const YAMLNode* node) const {
+  bool refers = false;
+  VisitReferences(const_cast<YAMLNode*>(node),
+                  [&](YAMLMapping& reference) { refers |= is_sought_(GetLocalTarget(&reference)); });
+  return refers;
 }
 
 const YAMLScalar* TargetOf(const YAMLNode* entry, const IsSought& is_sought) {

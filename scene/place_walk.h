@@ -20,8 +20,11 @@ struct ListPlace {
   FieldPath& path;
 };
 
+using IsSought = std::function<bool(const YAMLScalar* target)>;
+
 /// Goes through what one object holds in all of them, lists that follow from what objects say themselves and
-/// fathers aside. Lists whose elements can't be told apart are passed over.
+/// fathers aside. What refers to nothing sought in base or on the other side is passed over, and so are lists
+/// whose elements can't be told apart.
 class PlaceWalk {
  public:
   /// Gets a reference to another object in base, and what stands there now.
@@ -29,8 +32,8 @@ class PlaceWalk {
   /// Comes after the calls for what is in the list's elements, and may change both lists.
   using OnList = std::function<void(const ListPlace& list)>;
 
-  PlaceWalk(OnField on_field, OnList on_list)
-      : on_field_(std::move(on_field)), on_list_(std::move(on_list)) {}
+  PlaceWalk(IsSought is_sought, OnField on_field, OnList on_list)
+      : is_sought_(std::move(is_sought)), on_field_(std::move(on_field)), on_list_(std::move(on_list)) {}
 
   /// Any of the three may be null.
   void Walk(const YAMLScalar* file_id, const YAMLNode* base, YAMLNode* deleter, YAMLNode* other);
@@ -40,13 +43,14 @@ class PlaceWalk {
   void WalkMappings(const YAMLMapping& base, YAMLMapping& deleter, YAMLMapping* other);
   void WalkLists(const YAMLSequence& base, YAMLSequence& deleter, YAMLSequence* other);
 
+  bool Refers(const YAMLNode* node) const;
+
+  IsSought is_sought_;
   OnField on_field_;
   OnList on_list_;
   FieldPath path_;
   ObjectLinks::Kind kind_ = ObjectLinks::Kind::kOther;
 };
-
-using IsSought = std::function<bool(const YAMLScalar* target)>;
 
 /// The sought object that an entry of a list stands for: what it refers to, itself or with one of its fields.
 /// An entry that only mentions an object somewhere deeper says something else as well, and so does an

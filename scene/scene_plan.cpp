@@ -85,6 +85,8 @@ const YAMLScalar* ScenePlan::GetOwner(const YAMLScalar* file_id) const {
   const auto object = objects_.find(file_id);
   if (object != objects_.end()) return owner_in(Version(object->second));
   const auto& [base, left, right] = edits_.versions;
+  const auto has_changed = [&](const SideChanges& changes) { return changes.Changed(file_id); };
+  if (base.HasKey(file_id) && std::ranges::none_of(edits_.changes, has_changed)) return owner_in(base);
   if (!left.HasKey(file_id)) return owner_in(right.HasKey(file_id) ? right : base);
   const YAMLScalar* of_left = owner_in(left);
   if (!right.HasKey(file_id) || !base.HasKey(file_id)) return of_left;
