@@ -34,6 +34,18 @@ void Thread::Thread_Helper(Thread* self) {
   }
 }
 
+void RunBoth(bool threads, const std::function<void()>& first, const std::function<void()>& second) {
+  Thread thread;
+  if (threads) {
+    thread.Start(first);
+  } else {
+    first();
+  }
+  second();
+  thread.Join();
+  thread.CheckForExceptions();
+}
+
 bool AreWorthThreads(const std::vector<std::string>& paths) {
   constexpr off_t kManyBytes = 1 << 18;
   off_t bytes = 0;

@@ -36,6 +36,10 @@ class Thread {
   std::exception_ptr exception_;
 };
 
+/// Runs two functions that share nothing that either changes: at the same time if `threads`, the second on
+/// the calling thread. Throws what they threw, the second first.
+void RunBoth(bool threads, const std::function<void()>& first, const std::function<void()>& second);
+
 /// Whether threads bring more than they cost where these files are read, compared and written. A thread has
 /// storage of its own to set up and to give back, which takes as long as reading some ten kilobytes. True
 /// also where a size isn't known, as that of a pipe.

@@ -1,5 +1,6 @@
 #include <algorithm>
 #include <iterator>
+#include <unordered_set>
 #include <vector>
 
 #include "fixups/reference_search.h"
@@ -23,11 +24,13 @@ class ReferenceRepair {
                   RecordingConflictResolver& resolver)
       : vanishing_(settled.vanishing), merged_(merged), resolver_(resolver) {}
 
-  void Repair(const YAMLScalar* file_id, YAMLNode* object) {
+  /// Returns whether there was something to repair.
+  bool Repair(const YAMLScalar* file_id, YAMLNode* object) {
     path_ = {file_id};
     is_repaired_ = false;
     Walk(object);
     if (is_repaired_) object->RebuildHash(false);
+    return is_repaired_;
   }
 
  private:
@@ -70,10 +73,6 @@ class ReferenceRepair {
   bool is_repaired_ = false;
 };
 
-}  // namespace
-
-namespace {
-
 // The objects that may refer to one of some others. Also those that nobody touched: a side may have left a
 // reference behind.
 std::vector<YAMLMapping::Slot> FindReferring(const ReferenceSearch& search, const VexelObjects& objects,
@@ -85,31 +84,31 @@ std::vector<YAMLMapping::Slot> FindReferring(const ReferenceSearch& search, cons
   const auto may_refer = [&](const YAMLMapping::Slot& slot) { return search.MayRefer(*slot.value); };
   std::vector<YAMLMapping::Slot> referring;
   std::vector<YAMLMapping::Slot> in_second_half;
-  Thread thread;
-  if (threads)
-    thread.Start([&] { std::copy_if(all.begin(), middle, std::back_inserter(referring), may_refer); });
-  std::copy_if(middle, all.end(), std::back_inserter(in_second_half), may_refer);
-  if (threads) thread.Join();
-  thread.CheckForExceptions();
+  RunBoth(
+      threads, [&] { std::copy_if(all.begin(), middle, std::back_inserter(referring), may_refer); },
+      [&] { std::copy_if(middle, all.end(), std::back_inserter(in_second_half), may_refer); });
   referring.insert(referring.end(), in_second_half.begin(), in_second_half.end());
   return referring;
 }
 
 }  // namespace
 
-void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver,
-                      bool threads) {
+void CheckMergedScene(SettledScene& settled, const VexelObjects& base, VexelObjects& merged,
+                      RecordingConflictResolver& resolver, bool threads) {
   std::vector<const YAMLScalar*> lost;
   std::ranges::copy_if(settled.vanishing, std::back_inserter(lost),
                        [&](const YAMLScalar* file_id) { return !merged.HasKey(file_id); });
+  std::unordered_set<const YAMLScalar*> differing(settled.touched.begin(), settled.touched.end());
   if (!lost.empty()) {
     ReferenceRepair repair(settled, merged, resolver);
     const ReferenceSearch search(lost);
-    for (const auto& [file_id, object] : FindReferring(search, merged, threads))
-      repair.Repair(file_id, object);
+    for (const auto& [file_id, object] : FindReferring(search, merged, threads)) {
+      if (repair.Repair(file_id, object)) differing.insert(file_id);
+    }
   }
+  const SameAsIn same = {base, [&](const YAMLScalar* file_id) { return !differing.contains(file_id); }};
   size_t known_count = 0;
-  for (SceneFault& fault : CheckScene(merged, settled.touched)) {
+  for (SceneFault& fault : CheckScene(merged, same, settled.touched)) {
     if (settled.known_faults.contains(fault)) {
       if (known_count++ < kMostNamed) {
         settled.notes.push_back("Warning: " + fault.file_id->GetText() + ' ' + fault.text +

@@ -29,6 +29,12 @@ const YAMLScalar* TargetOf(const YAMLNode* entry) {
   return GetLocalTarget(pair->First());
 }
 
+const YAMLSequence* GetList(const VexelObjects& objects, const YAMLScalar* file_id, const YAMLScalar* key) {
+  const YAMLMapping* body = GetBody(objects.Get(file_id));
+  const YAMLNode* value = body == nullptr ? nullptr : body->Get(key);
+  return value == nullptr ? nullptr : value->AsSequence();
+}
+
 // One list in one version.
 struct ListVersion {
   const YAMLSequence* list = nullptr;
@@ -37,9 +43,7 @@ struct ListVersion {
 
   ListVersion() = default;
   ListVersion(const VexelObjects& objects, const YAMLScalar* file_id, const YAMLScalar* key) {
-    const YAMLMapping* body = GetBody(objects.Get(file_id));
-    const YAMLNode* value = body == nullptr ? nullptr : body->Get(key);
-    list = value == nullptr ? nullptr : value->AsSequence();
+    list = GetList(objects, file_id, key);
     if (list == nullptr) return;
     for (const YAMLNode* entry : list->GetItems()) {
       const YAMLScalar* target = TargetOf(entry);
@@ -122,6 +126,25 @@ class ListMaker {
     return concerned_[place->second];
   }
 
+  // Whether nothing was done to the list, and nothing else came or went: so it is for nearly all objects that
+  // somebody edited.
+  bool IsAsEver(const Concerned& place) const {
+    const YAMLSequence* list = GetList(edits_.versions.base, place.file_id, place.key);
+    if (list == nullptr) return false;
+    for (const SceneSide side : {SceneSide::kLeft, SceneSide::kRight}) {
+      if (edits_.Changes(side).LeftAlone(place.file_id)) continue;
+      const YAMLSequence* other = GetList(edits_.Version(side), place.file_id, place.key);
+      if (other == nullptr || !list->HasSameContent(*other)) return false;
+    }
+    std::unordered_set<const YAMLScalar*> listed;
+    for (const YAMLNode* entry : list->GetItems()) {
+      const YAMLScalar* target = TargetOf(entry);
+      if (target != nullptr && listed.insert(target).second && !HangsAt(target, place)) return false;
+    }
+    return std::ranges::all_of(place.members,
+                               [&](const YAMLScalar* member) { return listed.contains(member); });
+  }
+
   ListVersions ReadVersions(const Concerned& place) const {
     const SceneVersions& versions = edits_.versions;
     return {ListVersion(versions.base, place.file_id, place.key),
@@ -189,6 +212,7 @@ class ListMaker {
 
   // Nothing where the engine arrives at the same list.
   std::optional<DerivedList> MakeList(const Concerned& place) {
+    if (IsAsEver(place)) return std::nullopt;
     const ListVersions all = ReadVersions(place);
     const ListVersions versions = InPlan(place, all);
     const ObjectLinks links = ReadLinks(Somewhere(place.file_id));

@@ -88,10 +88,9 @@ const YAMLScalar* GetLocalTarget(const YAMLNode* value) {
   const YAMLMapping* reference = value == nullptr ? nullptr : value->AsMapping();
   if (reference == nullptr || reference->GetFolded() != nullptr || reference->HasDuplicateKeys())
     return nullptr;
-  if (reference->HasKey(YAMLScalar::guid)) return nullptr;
   const YAMLNode* file_id = reference->Get(YAMLScalar::fileID);
   const YAMLScalar* target = file_id == nullptr ? nullptr : file_id->AsScalar();
-  return IsNullReference(target) ? nullptr : target;
+  return IsNullReference(target) || reference->HasKey(YAMLScalar::guid) ? nullptr : target;
 }
 
 ObjectLinks ReadLinks(const YAMLNode* object) {

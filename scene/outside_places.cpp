@@ -177,7 +177,8 @@ void OutsidePlaces::SettleFate(const Fate& fate, const VexelObjects& base, Vexel
   const FileIDs going(fate.going.begin(), fate.going.end());
   const ReferenceSearch was_there(fate.removed);
   const ReferenceSearch is_to_go(going);
-  for (const YAMLScalar* file_id : fate.changed_by_deleter) {
+  // (Where nothing stays, what the deleter did to its own objects stands.)
+  for (const YAMLScalar* file_id : fate.staying.empty() ? FileIDs() : fate.changed_by_deleter) {
     const YAMLNode* object = base.Get(file_id);
     if (object != nullptr && was_there.MayRefer(*object)) settle(file_id);
   }

@@ -23,7 +23,7 @@ SafeMergeResult SafeMerge(SceneDocuments& documents, RecordingConflictResolver& 
   result.merged = MergeIntoCopy(base, diffs, resolver, timer);
   TimerStat step(timer, "Post process merged changes");
   if (options.keep_comparable) result.unrepaired.reset(result.merged->Clone());
-  CheckMergedScene(settled, *result.merged, resolver, options.threads);
+  CheckMergedScene(settled, base, *result.merged, resolver, options.threads);
   result.notes = std::move(settled.notes);
   result.breaks_dependency = ReportBrokenDependencies(*result.merged, left, right, resolver);
   if (options.keep_comparable) result.repaired.reset(result.merged->Clone());

@@ -16,10 +16,11 @@ using Kind = ObjectLinks::Kind;
 
 class SceneChecker {
  public:
-  explicit SceneChecker(const VexelObjects& objects) : objects_(objects) {}
+  explicit SceneChecker(const VexelObjects& objects, const SameAsIn* same = nullptr)
+      : objects_(objects), same_(same) {}
 
   void Check(const YAMLScalar* file_id) {
-    const YAMLNode* object = objects_.Get(file_id);
+    const YAMLNode* object = Get(file_id);
     const YAMLMapping* body = GetBody(object);
     if (body == nullptr) return;
     file_id_ = file_id;
@@ -41,12 +42,16 @@ class SceneChecker {
   std::vector<SceneFault> Take() { return std::move(faults_); }
 
  private:
+  const YAMLNode* Get(const YAMLScalar* file_id) const {
+    return (same_ != nullptr && same_->is_same(file_id) ? same_->objects : objects_).Get(file_id);
+  }
+
   void Add(std::string text) { faults_.push_back({file_id_, std::move(text)}); }
 
   // How often the list of another object names this one.
   void CheckListed(const YAMLScalar* holder, const YAMLScalar* key, const std::string& what) {
     if (holder == nullptr) return;
-    const YAMLNode* object = objects_.Get(holder);
+    const YAMLNode* object = Get(holder);
     const YAMLMapping* body = GetBody(object);
     // A stripped object has no lists.
     if (body == nullptr || ReadLinks(object).is_stripped) return;
@@ -82,7 +87,7 @@ class SceneChecker {
   void CheckComponents(const YAMLMapping& body) {
     size_t transforms = 0;
     for (const YAMLScalar* target : Targets(body, YAMLScalar::mComponent)) {
-      const ObjectLinks links = ReadLinks(objects_.Get(target));
+      const ObjectLinks links = ReadLinks(Get(target));
       transforms += links.kind == Kind::kTransform ? 1 : 0;
       if (objects_.HasKey(target) && links.owner != file_id_) {
         Add("lists the component " + target->GetText() + ", which is none of it");
@@ -93,7 +98,7 @@ class SceneChecker {
 
   void CheckChildren(const YAMLMapping& body) {
     for (const YAMLScalar* target : Targets(body, ChildrenKey())) {
-      const ObjectLinks links = ReadLinks(objects_.Get(target));
+      const ObjectLinks links = ReadLinks(Get(target));
       const YAMLScalar* father =
           links.is_stripped && links.father != nullptr ? FatherIn(objects_, links.father) : links.father;
       if (objects_.HasKey(target) && father != file_id_) {
@@ -110,6 +115,7 @@ class SceneChecker {
   }
 
   const VexelObjects& objects_;
+  const SameAsIn* same_;
   const YAMLScalar* file_id_ = nullptr;
   // How often the lists that were asked name each object.
   std::map<std::pair<const YAMLScalar*, const YAMLScalar*>, std::unordered_map<const YAMLScalar*, size_t>>
@@ -124,6 +130,13 @@ class SceneChecker {
 std::vector<SceneFault> CheckScene(const VexelObjects& objects,
                                    const std::vector<const YAMLScalar*>& file_ids) {
   SceneChecker checker(objects);
+  for (const YAMLScalar* file_id : file_ids) checker.Check(file_id);
+  return checker.Take();
+}
+
+std::vector<SceneFault> CheckScene(const VexelObjects& objects, const SameAsIn& same,
+                                   const std::vector<const YAMLScalar*>& file_ids) {
+  SceneChecker checker(objects, &same);
   for (const YAMLScalar* file_id : file_ids) checker.Check(file_id);
   return checker.Take();
 }

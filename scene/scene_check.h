@@ -1,6 +1,7 @@
 #pragma once
 
 #include <compare>
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -21,6 +22,17 @@ struct SceneFault {
 /// is stripped has its prefab instance, and references within the file lead to objects. In the order of
 /// `file_ids`; those that the scene lacks are passed over.
 std::vector<SceneFault> CheckScene(const VexelObjects& objects,
+                                   const std::vector<const YAMLScalar*>& file_ids);
+
+/// Where other objects may be looked at instead, for whoever checks several versions of a scene: to read an
+/// object takes long, and most are the same in all.
+struct SameAsIn {
+  const VexelObjects& objects;
+  std::function<bool(const YAMLScalar* file_id)> is_same;
+};
+
+/// The same, with what is the same elsewhere looked at there.
+std::vector<SceneFault> CheckScene(const VexelObjects& objects, const SameAsIn& same,
                                    const std::vector<const YAMLScalar*>& file_ids);
 
 /// The same for all objects.

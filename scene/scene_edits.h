@@ -10,7 +10,8 @@ namespace vexel_yaml {
 
 /// Three versions of a scene, and what each side did to it.
 struct SceneEdits {
-  explicit SceneEdits(const SceneVersions& versions);
+  /// `threads`: looks at both sides at the same time.
+  SceneEdits(const SceneVersions& versions, bool threads);
 
   const VexelObjects& Version(SceneSide side) const {
     return side == SceneSide::kLeft ? versions.left : versions.right;

@@ -90,28 +90,24 @@ std::set<SceneFault> FindKnownFaults(const SceneEdits& edits, bool threads) {
     const SideChanges& changes = edits.Changes(side);
     FileIDs file_ids = changes.changed;
     file_ids.insert(file_ids.end(), changes.added.begin(), changes.added.end());
-    return CheckScene(edits.Version(side), file_ids);
+    const SameAsIn same = {edits.versions.base, [&](const YAMLScalar* id) { return changes.LeftAlone(id); }};
+    return CheckScene(edits.Version(side), same, file_ids);
   };
   std::vector<SceneFault> in_left;
-  Thread thread;
-  const auto check_left = [&] { in_left = check_side(SceneSide::kLeft); };
-  if (threads) {
-    thread.Start(check_left);
-  } else {
-    check_left();
-  }
+  std::vector<SceneFault> in_right;
+  RunBoth(
+      threads, [&] { in_left = check_side(SceneSide::kLeft); },
+      [&] { in_right = check_side(SceneSide::kRight); });
   std::set<SceneFault> faults;
   const auto add = [&](const std::vector<SceneFault>& found) { faults.insert(found.begin(), found.end()); };
-  add(check_side(SceneSide::kRight));
+  add(in_left);
+  add(in_right);
   // What one side removed or both changed may come back as base has it.
   for (const SideChanges& changes : edits.changes) add(CheckScene(edits.versions.base, changes.removed));
   FileIDs changed_by_both;
   std::ranges::copy_if(edits.changes[0].changed, std::back_inserter(changed_by_both),
                        [&](const YAMLScalar* file_id) { return edits.changes[1].Changed(file_id); });
   add(CheckScene(edits.versions.base, changed_by_both));
-  if (threads) thread.Join();
-  thread.CheckForExceptions();
-  add(in_left);
   return faults;
 }
 
@@ -158,7 +154,7 @@ bool HaveBothDoneTheSame(const SceneEdits& edits) {
 }  // namespace
 
 SettledScene SettleScene(SceneVersions versions, RecordingConflictResolver& resolver, bool threads) {
-  const SceneEdits edits(versions);
+  const SceneEdits edits(versions, threads);
   SettledScene settled = WhatToCheck(edits, threads);
   if (HaveBothDoneTheSame(edits)) {
     // Whatever it is, also something that is broken.

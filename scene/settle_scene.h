@@ -30,8 +30,8 @@ struct SettledScene {
 SettledScene SettleScene(SceneVersions versions, RecordingConflictResolver& resolver, bool threads);
 
 /// Repairs what the merge broke in a merged scene and has one repair; records and notes everything else as
-/// pending.
-void CheckMergedScene(SettledScene& settled, VexelObjects& merged, RecordingConflictResolver& resolver,
-                      bool threads);
+/// pending. `base`: as it was settled; the merged scene differs from it only in what was touched.
+void CheckMergedScene(SettledScene& settled, const VexelObjects& base, VexelObjects& merged,
+                      RecordingConflictResolver& resolver, bool threads);
 
 }  // namespace vexel_yaml

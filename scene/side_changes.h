@@ -28,6 +28,8 @@ struct SideChanges {
   bool Added(const YAMLScalar* file_id) const { return Is(file_id, Kind::kAdded); }
   bool Changed(const YAMLScalar* file_id) const { return Is(file_id, Kind::kChanged); }
   bool IsEmpty() const { return kinds.empty(); }
+  /// Whether the side has the object as base has it, or lacks it as base does.
+  bool LeftAlone(const YAMLScalar* file_id) const { return !kinds.contains(file_id); }
 
  private:
   bool Is(const YAMLScalar* file_id, Kind kind) const {
@@ -36,7 +38,8 @@ struct SideChanges {
   }
 };
 
-/// Objects whose fields only stand in another order count as changed.
+/// Objects whose fields only stand in another order count as changed. To be called before any object of the
+/// two versions is read: whether one of two is tells nothing then.
 SideChanges FindChanges(const VexelObjects& base, const VexelObjects& side);
 
 /// Whether one side edited the object itself: what follows from other objects (its children, its components,

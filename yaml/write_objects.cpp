@@ -79,12 +79,8 @@ void WriteObjects(VexelObjects& objects, std::ostream& out, bool threads) {
     const Slots first = TakePiece(rest);
     const Slots second = threads ? TakePiece(rest) : Slots();
     std::ostringstream second_text;
-    Thread thread;
-    if (!second.empty()) thread.Start([&] { WriteAll(second, second_text); });
-    WriteAll(first, out);
-    if (second.empty()) continue;
-    thread.Join();
-    thread.CheckForExceptions();
+    RunBoth(
+        !second.empty(), [&] { WriteAll(second, second_text); }, [&] { WriteAll(first, out); });
     out << second_text.view();
   }
   out.flush();

@@ -97,7 +97,7 @@ TEST(CheckMergedScene, AReferenceThatASideLeftBehindIsCleared) {
   const std::string script = Script(5, "target: {fileID: 10}");
   Settled settled(script + Thing(10) + Thing(20), script + Thing(20), script + Thing(10));
   const auto merged = ObjectsFromText(script);
-  CheckMergedScene(settled.scene, *merged, settled.resolver, false);
+  CheckMergedScene(settled.scene, *merged, *merged, settled.resolver, false);
   EXPECT_THAT(CheckScene(*merged), IsEmpty());
 }
 
