@@ -49,6 +49,8 @@ struct Contest {
   /// part of.
   const YAMLScalar* node = nullptr;
   bool is_about_owner = false;
+
+  bool IsSettled() const { return resolution != MergeResolve::kConflict; }
 };
 
 /// Finds them, circles aside, in no particular order.

@@ -6,10 +6,12 @@
 
 #include "fixups/component_dependencies.h"
 #include "fixups/engine_keys.h"
+#include "rules/path_step.h"
 #include "scene/holders.h"
 #include "scene/object_links.h"
 #include "scene/place_walk.h"
 #include "scene/same_fields.h"
+#include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
 
@@ -40,6 +42,35 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
     });
   }
   return targets;
+}
+
+// Counts the references to an object at and below a node, by their places; the elements of a list share one.
+void CountPlaces(const YAMLNode* node, const YAMLScalar* target, FieldPath& path,
+                 std::map<FieldPath, size_t>& places) {
+  if (node == nullptr) return;
+  if (const YAMLMapping* mapping = node->AsMapping()) {
+    if (GetLocalTarget(mapping) == target) ++places[path];
+    if (mapping->HasDuplicateKeys()) return;
+    for (const auto& [key, value] : *mapping) {
+      const PathStep step(path, key);
+      CountPlaces(value, target, path, places);
+    }
+  } else if (const YAMLSequence* sequence = node->AsSequence()) {
+    for (const YAMLNode* item : sequence->GetItems()) CountPlaces(item, target, path, places);
+  }
+}
+
+// Whether an object refers to another one where it did not in base.
+bool RefersAnew(const YAMLNode* object, const YAMLNode* base, const YAMLScalar* target) {
+  std::map<FieldPath, size_t> places;
+  std::map<FieldPath, size_t> before;
+  FieldPath path;
+  CountPlaces(GetBody(object), target, path, places);
+  CountPlaces(GetBody(base), target, path, before);
+  return std::ranges::any_of(places, [&](const auto& place) {
+    const auto known = before.find(place.first);
+    return known == before.end() || known->second < place.second;
+  });
 }
 
 FileIDs ChildrenOf(const YAMLNode* object) {
@@ -172,17 +203,15 @@ class DeedSearch {
 
   void LookAtReferences(const YAMLScalar* file_id) {
     if (deleted_.Get().empty()) return;
-    std::unordered_set<const YAMLScalar*> known;
-    bool has_looked = false;
     const YAMLScalar* reached = Reached(file_id);
     for (const YAMLScalar* target : OwnTargets(other_.Get(file_id))) {
       if (deleted_.Find(target) == Deletions::kNone) continue;
       // What was added to a thing comes and goes with it; a part of it may have been moved out, though.
       const bool is_inside = reached != nullptr && deleted_.Find(reached) == deleted_.Find(target);
       if (is_inside && reached != file_id) continue;
-      if (!has_looked) known = OwnTargets(base_.Get(file_id));
-      has_looked = true;
-      if (!known.contains(target)) Add(Deed::Kind::kRefers, file_id, target);
+      if (RefersAnew(other_.Get(file_id), base_.Get(file_id), target)) {
+        Add(Deed::Kind::kRefers, file_id, target);
+      }
     }
   }
 

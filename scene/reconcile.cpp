@@ -14,8 +14,6 @@ namespace {
 using FileIDs = std::vector<const YAMLScalar*>;
 using Source = ScenePlan::Source;
 
-bool IsSettled(const Contest& contest) { return contest.resolution != MergeResolve::kConflict; }
-
 // Whether a contest is about an object itself.
 bool Decides(const Contest& contest, const YAMLScalar* node) {
   if (!contest.deleted) return contest.node == node && !contest.is_about_owner;
@@ -55,12 +53,12 @@ class Reconciliation {
       if (contest.left == nullptr) contest.left = EditsInShort(edits_, SceneSide::kLeft, others);
       if (contest.right == nullptr) contest.right = EditsInShort(edits_, SceneSide::kRight, others);
       Decide(resolver_, contest);
-      if (IsSettled(contest) && chosen == MergeResolve::kConflict) chosen = contest.resolution;
+      if (contest.IsSettled() && chosen == MergeResolve::kConflict) chosen = contest.resolution;
       added.push_back(std::move(contest));
     }
     // They are one: who has settled one of them has settled the others.
     for (Contest& contest : added) {
-      if (chosen != MergeResolve::kConflict && !IsSettled(contest))
+      if (chosen != MergeResolve::kConflict && !contest.IsSettled())
         contest.resolution = contest.side = chosen;
       contests_.push_back(std::move(contest));
     }
@@ -100,7 +98,8 @@ class Reconciliation {
     });
   }
 
-  // A thing stands without what was moved below it, while another choice wants that moved.
+  // A thing stands without what was moved below it, while another choice wants that moved. Where somebody
+  // chose both, and the thing as it is in base, the thing is there to be moved below.
   bool FixExcluded() {
     bool has_changed = false;
     for (Contest& contest : contests_) {
@@ -110,7 +109,9 @@ class Reconciliation {
         for (Contest& other : contests_) {
           const bool moves = &other != &contest && Decides(other, node) && SourceOf(other) != Source::kNone &&
                              FatherIn(plan_.Version(SourceOf(other)), node) == wanted;
-          if (moves) has_changed |= SettleExcluded(contest, other);
+          const bool is_chosen =
+              contest.IsSettled() && other.IsSettled() && SourceOf(contest) == Source::kBase;
+          if (moves && !is_chosen) has_changed |= SettleExcluded(contest, other);
         }
       }
     }
@@ -119,11 +120,11 @@ class Reconciliation {
 
   // What is settled goes first, of two the first one. Returns whether something changed.
   static bool SettleExcluded(Contest& thing, Contest& move) {
-    if (IsSettled(thing) && IsSettled(move)) {
+    if (thing.IsSettled() && move.IsSettled()) {
       const bool is_thing_first = &thing < &move;
       return Retreat({is_thing_first ? &thing : &move, is_thing_first ? &move : &thing});
     }
-    return StepBack(IsSettled(move) ? thing : move);
+    return StepBack(move.IsSettled() ? thing : move);
   }
 
   bool FixMissingFather() {
@@ -188,11 +189,11 @@ class Reconciliation {
   // one, those who haven't chosen make way. Returns whether something changed.
   static bool Retreat(const std::vector<Contest*>& concerned) {
     const auto settled =
-        std::ranges::count_if(concerned, [](Contest* contest) { return IsSettled(*contest); });
-    const auto makes_way = [](Contest* contest) { return !IsSettled(*contest) && StepBack(*contest); };
+        std::ranges::count_if(concerned, [](Contest* contest) { return contest->IsSettled(); });
+    const auto makes_way = [](Contest* contest) { return !contest->IsSettled() && StepBack(*contest); };
     if (settled < 2 && std::ranges::any_of(concerned.rbegin(), concerned.rend(), makes_way)) return true;
     const auto last = std::find_if(concerned.rbegin(), concerned.rend(),
-                                   [](Contest* contest) { return IsSettled(*contest); });
+                                   [](Contest* contest) { return contest->IsSettled(); });
     if (last == concerned.rend()) return false;
     Contest& contest = **last;
     contest.resolution = MergeResolve::kConflict;

@@ -110,6 +110,11 @@ void ScenePlan::Follow(const std::vector<Contest>& contests) {
   FollowUncontested(SceneSide::kLeft, contested);
   FollowUncontested(SceneSide::kRight, contested);
   for (const auto& [deletion, parts] : deletions) FollowRest(parts);
+  chosen_.clear();
+  for (const Contest& contest : contests) {
+    if (contest.deleted && contest.IsSettled())
+      chosen_.insert(contest.deleted->objects.begin(), contest.deleted->objects.end());
+  }
   for (const Contest& contest : contests) {
     if (contest.deleted) FollowDeletion(contest);
   }
@@ -155,7 +160,10 @@ void ScenePlan::FollowDeletion(const Contest& contest) {
   if (source == SourceOf(OtherSide(deleted.by))) return;
   // Without what the other side made of it.
   for (const YAMLScalar* file_id : deleted.additions) objects_[file_id] = Source::kNone;
-  for (const YAMLScalar* node : deleted.moved_in) fathers_[node] = Source::kBase;
+  for (const YAMLScalar* node : deleted.moved_in) {
+    if (source != Source::kBase || !contest.IsSettled() || !chosen_.contains(node))
+      fathers_[node] = Source::kBase;
+  }
 }
 
 // What a side took out of a thing before it deleted that belongs to it as long as the thing is there.

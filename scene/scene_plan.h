@@ -65,6 +65,8 @@ class ScenePlan {
   std::set<std::pair<SceneSide, size_t>> kept_;
   std::set<const YAMLScalar*> restored_;
   std::set<const YAMLScalar*> uprooted_;
+  // What somebody decided about as a thing, or a part of one.
+  std::set<const YAMLScalar*> chosen_;
   std::unordered_map<const YAMLScalar*, Source> objects_;
   std::unordered_map<const YAMLScalar*, Source> fathers_;
   std::unordered_map<const YAMLScalar*, Source> owners_;

@@ -93,6 +93,26 @@ TEST(SettleScene, OfTwoChoicesThatExcludeOneAnotherTheFirstOneStands) {
   EXPECT_THAT(settled.scene.notes, ElementsAre(HasSubstr("together with what stands at 10")));
 }
 
+TEST(SettleScene, SomethingCanBeKeptBelowAThingThatStaysAsInBase) {
+  const std::string base =
+      Thing(10, "{fileID: 21}, {fileID: 31}") + Thing(20, "", 11) + Thing(30, "", 11) + Thing(40);
+  const std::string left =
+      Thing(10) + Thing(20, "{fileID: 31}", 41) + Thing(30, "", 21) + Thing(40, "{fileID: 21}");
+  const std::string choices = "left 30\nright 40\n";
+  EXPECT_THAT(Settled(base, left, Thing(10), choices + "left 20\n").Pending(), ElementsAre("40"));
+  const Settled settled(base, left, Thing(10), choices + "base 20\n");
+  EXPECT_THAT(settled.Pending(), IsEmpty());
+  EXPECT_TRUE(settled.Has(20) && settled.Has(30) && !settled.Has(40));
+}
+
+TEST(SettleScene, ANewReferenceIsAnEditThoughTheObjectHadAnother) {
+  const auto fields = [](const std::string& target) {
+    return Script(5, "target: {fileID: " + target + "}\n  lamps:\n  - {fileID: 10}");
+  };
+  const std::string right = Script(5, "target: {fileID: 0}\n  lamps: []");
+  EXPECT_THAT(Settled(fields("0") + Thing(10), fields("10") + Thing(10), right).Pending(), ElementsAre("10"));
+}
+
 TEST(CheckMergedScene, AReferenceThatASideLeftBehindIsCleared) {
   const std::string script = Script(5, "target: {fileID: 10}");
   Settled settled(script + Thing(10) + Thing(20), script + Thing(20), script + Thing(10));
