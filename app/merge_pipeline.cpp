@@ -101,7 +101,7 @@ class MergeRun {
 
   void MergeScenes() {
     SafeMergeResult result = SafeMerge(documents_, resolver_, {.threads = threads_}, timer_);
-    for (const std::string& note : result.notes) WriteErrorLine(note);
+    for (const SceneNote& note : result.notes) WriteErrorLine(note.text);
     merged_ = std::move(result.merged);
     breaks_dependency_ = result.breaks_dependency;
     for (const std::string& line : DescribeUnmatchedChoices(resolver_, *merged_)) WriteErrorLine(line);

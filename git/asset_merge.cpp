@@ -155,7 +155,7 @@ void AssetMerge::TakeDecisions(const Decisions& decisions) {
 bool AssetMerge::MergeScenes() {
   TimerStat silent("", nullptr);
   SafeMergeResult result = SafeMerge(*documents_, resolver_, {.threads = threads_}, silent);
-  for (const std::string& note : result.notes) {
+  for (const auto& [file_id, note] : result.notes) {
     // That nothing hangs on what is undecided is no news.
     if (versions_.mark.empty() || note.find(versions_.mark) == std::string::npos) std::cerr << note << '\n';
   }

@@ -6,6 +6,7 @@
 
 #include "merge/recording_conflict_resolver.h"
 #include "scene/scene_documents.h"
+#include "scene/settle_scene.h"
 #include "yaml/yaml_error.h"
 
 namespace vexel_yaml {
@@ -42,8 +43,7 @@ struct MergedFiles {
   std::unique_ptr<SceneDocuments> committed;
   /// Why the merge failed after both sides had been compared with base; empty where it didn't.
   std::string error;
-  /// Lines of the merge for people.
-  std::vector<std::string> notes;
+  std::vector<SceneNote> notes;
 };
 
 /// Merges the three files as the merge command does, conflicts to base. Throws what reading and diffing

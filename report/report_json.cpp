@@ -202,7 +202,7 @@ std::string ReportJson(const MergedFiles& files, const std::string& title) {
     pending += cards.back()["pending"].get<size_t>();
   }
   Json notes = Json::array();
-  for (const std::string& note : files.notes) notes.push_back(OnOneLine(note));
+  for (const SceneNote& note : files.notes) notes.push_back(OnOneLine(note.text));
   return Dump({{"version", kReportJsonVersion},
                {"title", OnOneLine(title)},
                {"pending", pending},

@@ -111,19 +111,19 @@ void CheckMergedScene(SettledScene& settled, const VexelObjects& base, VexelObje
   for (SceneFault& fault : CheckScene(merged, same, settled.touched)) {
     if (settled.known_faults.contains(fault)) {
       if (known_count++ < kMostNamed) {
-        settled.notes.push_back("Warning: " + fault.file_id->GetText() + ' ' + fault.text +
-                                ", as before the merge");
+        settled.notes.push_back({fault.file_id, "Warning: " + fault.file_id->GetText() + ' ' + fault.text +
+                                                    ", as before the merge"});
       }
       continue;
     }
-    settled.notes.push_back(fault.file_id->GetText() + ' ' + fault.text +
-                            ": please repair this object by hand");
+    settled.notes.push_back(
+        {fault.file_id, fault.file_id->GetText() + ' ' + fault.text + ": please repair this object by hand"});
     resolver.AddRecord(
         {{fault.file_id}, ConflictType::kBothChange, MergeResolve::kConflict, nullptr, nullptr});
   }
   if (known_count > kMostNamed) {
-    settled.notes.push_back("Warning: " + std::to_string(known_count - kMostNamed) +
-                            " more faults are as before the merge");
+    settled.notes.push_back({nullptr, "Warning: " + std::to_string(known_count - kMostNamed) +
+                                          " more faults are as before the merge"});
   }
 }
 

@@ -2,7 +2,6 @@
 
 #include "fixups/post_process.h"
 #include "fixups/state_machine_transitions.h"
-#include "scene/settle_scene.h"
 
 namespace vexel_yaml {
 

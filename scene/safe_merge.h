@@ -7,6 +7,7 @@
 #include "merge/recording_conflict_resolver.h"
 #include "platform/timer_stat.h"
 #include "scene/scene_documents.h"
+#include "scene/settle_scene.h"
 #include "yaml/vexel_objects.h"
 
 namespace vexel_yaml {
@@ -23,8 +24,7 @@ struct SafeMergeResult {
   /// The same in the form of the versions, before and after the repairs; null unless asked for.
   std::unique_ptr<VexelObjects> unrepaired;
   std::unique_ptr<VexelObjects> repaired;
-  /// Lines for people: choices that could not be carried out, and what is broken.
-  std::vector<std::string> notes;
+  std::vector<SceneNote> notes;
   /// Whether a broken component dependency is pending.
   bool breaks_dependency = false;
 };

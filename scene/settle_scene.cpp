@@ -48,10 +48,11 @@ Records WhatGoesAlong(const SceneEdits& edits, const ScenePlan& plan, const std:
 }
 
 void Record(std::vector<Contest>& contests, const Records& along, RecordingConflictResolver& resolver,
-            std::vector<std::string>& notes) {
+            std::vector<SceneNote>& notes) {
   for (Contest& contest : contests) {
     if (!contest.reason.empty()) {
-      notes.push_back(PathToString(contest.path) + " is pending again: " + contest.reason);
+      notes.push_back(
+          {contest.path.front(), PathToString(contest.path) + " is pending again: " + contest.reason});
     }
     resolver.AddRecord(
         {std::move(contest.path), contest.type, contest.resolution, contest.left, contest.right});

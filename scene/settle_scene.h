@@ -11,6 +11,12 @@
 
 namespace vexel_yaml {
 
+/// A line for people: a choice of theirs that is pending again, or what is broken.
+struct SceneNote {
+  const YAMLScalar* file_id;  ///< The object that it is about; null for one about several.
+  std::string text;
+};
+
 /// What has to be looked at once the engine has merged a settled scene.
 struct SettledScene {
   /// The objects that somebody edited, each once.
@@ -19,8 +25,7 @@ struct SettledScene {
   std::unordered_set<const YAMLScalar*> vanishing;
   /// What was broken in some version already.
   std::set<SceneFault> known_faults;
-  /// Lines for people: why a choice of theirs is pending again.
-  std::vector<std::string> notes;
+  std::vector<SceneNote> notes;
 };
 
 /// Settles whatever the engine can't decide place by place: what happens to things that one side deleted and

@@ -152,7 +152,7 @@ def shows_random_scenes_as_a_whole_merge_does():
                     "--theirs", "theirs", "--ours", "ours", "-o", "record")
         chosen = view.folder / "chosen"
         choices = {}
-        for _ in range(4):
+        for _ in range(8):
             _, state = view.get("state")
             words = {"theirs": "left", "ours": "right", "base": "base"}
             chosen.write_text("Conflict handling:\n" + "".join(f"{words[choices[p]]} {p}\n" for p in sorted(choices)))
@@ -164,7 +164,7 @@ def shows_random_scenes_as_a_whole_merge_does():
             open_places = [row["path"] for row in rows(state).values() if row["pending"]]
             if not open_places:
                 break
-            choice = {path: rng.choice(list(words)) for path in open_places}
+            choice = {path: rng.choice(list(words)) for path in rng.sample(open_places, rng.randint(1, len(open_places)))}
             choices.update(choice)
             view.choose(**choice)
         if view.post("save", file=0)[0] == 200:

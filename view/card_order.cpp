@@ -14,9 +14,6 @@ void CardOrder::Arrange(std::vector<ReportCard>& cards) {
     }
     previous = card.file_id;
   }
-  std::unordered_map<const YAMLScalar*, size_t> places;
-  for (const YAMLScalar* key : cards_) places.emplace(key, places.size());
-  std::ranges::sort(cards, {}, [&](const ReportCard& card) { return places.at(card.file_id); });
 }
 
 void CardOrder::ArrangeRows(ReportObject& object) {

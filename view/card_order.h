@@ -12,9 +12,12 @@ namespace vexel_yaml {
 /// Keeps cards and their rows where they were first shown: what somebody has just settled must not jump away.
 class CardOrder {
  public:
-  /// Puts the cards of a merge, and their rows, into that order. New cards go behind the ones that they came
-  /// behind, new rows to the end of their object.
+  /// Puts the rows of the cards of a merge into that order, and the keys of new cards behind the ones that
+  /// they came behind; new rows go to the end of their object.
   void Arrange(std::vector<ReportCard>& cards);
+
+  /// The keys of all cards that ever were, in their order.
+  const std::vector<const YAMLScalar*>& GetKeys() const { return cards_; }
 
  private:
   void ArrangeRows(ReportObject& object);

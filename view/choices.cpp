@@ -20,13 +20,9 @@ void Choices::Choose(const std::vector<Change>& changes) {
   Redo();
 }
 
-void Choices::Undo() {
-  if (CanUndo()) Apply(steps_[--done_].before);
-}
+const std::vector<Choices::Change>& Choices::Undo() { return Apply(steps_[--done_].before); }
 
-void Choices::Redo() {
-  if (CanRedo()) Apply(steps_[done_++].after);
-}
+const std::vector<Choices::Change>& Choices::Redo() { return Apply(steps_[done_++].after); }
 
 std::vector<RecordingConflictResolver::RecordResolve> Choices::GetResolutions() const {
   std::vector<RecordingConflictResolver::RecordResolve> resolutions;
@@ -34,7 +30,7 @@ std::vector<RecordingConflictResolver::RecordResolve> Choices::GetResolutions() 
   return resolutions;
 }
 
-void Choices::Apply(const std::vector<Change>& changes) {
+const std::vector<Choices::Change>& Choices::Apply(const std::vector<Change>& changes) {
   for (const Change& change : changes) {
     if (change.choice) {
       chosen_[change.path] = *change.choice;
@@ -42,6 +38,7 @@ void Choices::Apply(const std::vector<Change>& changes) {
       chosen_.erase(change.path);
     }
   }
+  return changes;
 }
 
 }  // namespace vexel_yaml

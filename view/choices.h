@@ -25,8 +25,9 @@ class Choices {
   void Choose(const std::vector<Change>& changes);
   bool CanUndo() const { return done_ > 0; }
   bool CanRedo() const { return done_ < steps_.size(); }
-  void Undo();
-  void Redo();
+  /// These return what changes with the step; there must be one.
+  const std::vector<Change>& Undo();
+  const std::vector<Change>& Redo();
 
   const std::map<std::string, MergeResolve>& Get() const { return chosen_; }
   /// As a merge takes them.
@@ -38,7 +39,7 @@ class Choices {
     std::vector<Change> after;
   };
 
-  void Apply(const std::vector<Change>& changes);
+  const std::vector<Change>& Apply(const std::vector<Change>& changes);
 
   std::map<std::string, MergeResolve> chosen_;
   std::vector<Step> steps_;

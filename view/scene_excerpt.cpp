@@ -1,12 +1,16 @@
 #include "view/scene_excerpt.h"
 
+#include <algorithm>
 #include <array>
+#include <iterator>
 #include <unordered_set>
 #include <vector>
 
 #include "fixups/reference_search.h"
 #include "scene/object_links.h"
+#include "scene/scene_versions.h"
 #include "scene/side_changes.h"
+#include "yaml/folded_object.h"
 
 namespace vexel_yaml {
 
@@ -18,8 +22,8 @@ class ExcerptMaker {
  public:
   explicit ExcerptMaker(const SceneDocuments& whole) : versions_{&whole.base, &whole.left, &whole.right} {}
 
-  std::unordered_set<const YAMLScalar*> Choose() {
-    const FileIDs edited = FindEdited();
+  std::unordered_set<const YAMLScalar*> Choose(const FileIDs& edited) {
+    kept_.insert(edited.begin(), edited.end());
     for (const YAMLScalar* file_id : edited) {
       AddReferences(file_id);
       AddHolders(file_id);
@@ -43,27 +47,6 @@ class ExcerptMaker {
   }
 
  private:
-  FileIDs FindEdited() {
-    FileIDs edited;
-    FileIDs vanishing;
-    for (const VexelObjects* side : {versions_[1], versions_[2]}) {
-      const SideChanges changes = FindChanges(*versions_[0], *side);
-      for (const FileIDs* file_ids : {&changes.removed, &changes.changed, &changes.added}) {
-        for (const YAMLScalar* file_id : *file_ids) {
-          if (kept_.insert(file_id).second) edited.push_back(file_id);
-        }
-        if (file_ids != &changes.changed)
-          vanishing.insert(vanishing.end(), file_ids->begin(), file_ids->end());
-      }
-    }
-    const ReferenceSearch search(vanishing);
-    for (const auto& [file_id, object] : *versions_[0]) {
-      const bool refers = !vanishing.empty() && search.MayRefer(*object);
-      if (refers && kept_.insert(file_id).second) edited.push_back(file_id);
-    }
-    return edited;
-  }
-
   FileIDs AddReferences(const YAMLScalar* file_id) {
     FileIDs targets;
     for (const VexelObjects* version : versions_) {
@@ -95,12 +78,31 @@ class ExcerptMaker {
 
 }  // namespace
 
-void MakeExcerpt(const SceneDocuments& whole, SceneDocuments& excerpt) {
+FileIDs FindEdited(const SceneDocuments& scene) {
+  FileIDs edited;
+  FileIDs vanishing;
+  std::unordered_set<const YAMLScalar*> seen;
+  for (const SideChanges& changes :
+       {FindChanges(scene.base, scene.left), FindChanges(scene.base, scene.right)}) {
+    for (const FileIDs* file_ids : {&changes.removed, &changes.changed, &changes.added}) {
+      std::ranges::copy_if(*file_ids, std::back_inserter(edited),
+                           [&](const YAMLScalar* file_id) { return seen.insert(file_id).second; });
+      if (file_ids != &changes.changed) vanishing.insert(vanishing.end(), file_ids->begin(), file_ids->end());
+    }
+  }
+  const ReferenceSearch search(vanishing);
+  for (const auto& [file_id, object] : scene.base) {
+    const bool refers = !vanishing.empty() && search.MayRefer(*object);
+    if (refers && seen.insert(file_id).second) edited.push_back(file_id);
+  }
+  return edited;
+}
+
+void MakeExcerpt(const SceneDocuments& whole, const FileIDs& edited, SceneDocuments& excerpt) {
   std::unordered_set<const YAMLScalar*> kept;
   {
-    // A look at an object unfolds it, and what is unfolded in one version alone counts as edited.
     const std::unique_ptr<SceneDocuments> looked_at = whole.Copy();
-    kept = ExcerptMaker(*looked_at).Choose();
+    kept = ExcerptMaker(*looked_at).Choose(edited);
   }
   const std::unique_ptr<SceneDocuments> trimmed = whole.Copy();
   for (VexelObjects* version : {&trimmed->base, &trimmed->left, &trimmed->right}) {
@@ -110,6 +112,19 @@ void MakeExcerpt(const SceneDocuments& whole, SceneDocuments& excerpt) {
     }
     for (const YAMLScalar* file_id : dropped) version->Remove(file_id);
   }
+  for (const YAMLScalar* file_id : edited) kept.erase(file_id);
+  for (const YAMLScalar* file_id : kept) {
+    const YAMLNode* object = trimmed->base.Get(file_id);
+    for (VexelObjects* side : {&trimmed->left, &trimmed->right}) {
+      const bool is_edited =
+          object != nullptr && side->HasKey(file_id) && !HaveSameText(*object, side->GetRef(file_id));
+      if (is_edited) SetEntry(*side, file_id, object->Clone());
+    }
+  }
+  std::erase_if(trimmed->renumbered, [&](const RenumberedObject& object) {
+    return !trimmed->base.HasKey(object.new_id) && !trimmed->left.HasKey(object.new_id) &&
+           !trimmed->right.HasKey(object.new_id);
+  });
   // Copied once more, it has no gaps.
   trimmed->CopyTo(excerpt);
 }

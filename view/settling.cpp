@@ -1,10 +1,13 @@
 #include "view/settling.h"
 
 #include <algorithm>
+#include <iterator>
 #include <stdexcept>
 
 #include "merge/conflict_record_file.h"
 #include "report/report_json.h"
+#include "scene/object_links.h"
+#include "scene/scene_versions.h"
 #include "view/finished_file.h"
 #include "view/scene_excerpt.h"
 
@@ -31,13 +34,14 @@ Settling::Settling(const ViewFile& file) : file_(file) {
   ReadVersions(config, whole_);
   files_.safe = config.safe;
   if (file.safe && !file.is_review) {
-    MakeExcerpt(whole_, files_.untouched);
+    MakeExcerpt(whole_, FindEdited(*whole_.Copy()), files_.untouched);
+    groups_.emplace(files_.untouched);
   } else {
     whole_.CopyTo(files_.untouched);
   }
   CompareVersions(files_, false);
-  whole_.CopyTo(shown_);
-  Merge();
+  whole_.CopyTo(versions_);
+  MergeAll();
   TakeOverResolutions();
 }
 
@@ -61,20 +65,16 @@ bool Settling::Choose(const std::vector<Choices::Change>& changes) {
   };
   if (file_.is_review || changes.empty() || !std::ranges::all_of(changes, is_possible)) return false;
   choices_.Choose(changes);
-  Merge();
+  Merge(changes);
   return true;
 }
 
 void Settling::Undo() {
-  if (!choices_.CanUndo()) return;
-  choices_.Undo();
-  Merge();
+  if (choices_.CanUndo()) Merge(choices_.Undo());
 }
 
 void Settling::Redo() {
-  if (!choices_.CanRedo()) return;
-  choices_.Redo();
-  Merge();
+  if (choices_.CanRedo()) Merge(choices_.Redo());
 }
 
 // What was chosen on the page comes first: of several resolutions for a place the first one counts.
@@ -84,23 +84,108 @@ Resolutions Settling::AllResolutions() const {
   return all;
 }
 
-void Settling::Merge() {
+void Settling::Merge(const std::vector<Choices::Change>& changes) {
+  // Above that the whole excerpt takes no longer.
+  constexpr size_t kFewGroups = 8;
   ++revision_;
-  names_.reset();
+  std::set<const EditGroups::Group*> groups;
+  for (const Choices::Change& change : changes) {
+    groups.insert(groups_ ? groups_->Find(StringToPath(change.path).front()) : nullptr);
+  }
+  const bool are_known = !groups.contains(nullptr) && groups.size() <= kFewGroups && files_.error.empty();
+  const auto merge = [this](const EditGroups::Group* group) { return MergeGroup(*group); };
+  if (!are_known || !std::ranges::all_of(groups, merge)) MergeAll();
+}
+
+void Settling::MergeAll() {
   if (file_.is_review) {
     files_.merged.reset(files_.read.left.Clone());
     files_.unrepaired.reset(files_.read.left.Clone());
   } else {
     MergeRead(files_, AllResolutions());
   }
-  std::vector<const VexelObjects*> versions = {&shown_.right, &shown_.left, &shown_.base};
+  RenewNames();
+  shown_.clear();
+  objects_.clear();
+  places_.clear();
+  group_of_card_.clear();
+  pending_ = 0;
+  std::vector<ReportCard> cards = MakeCardsOf(files_);
+  AddPlaces(cards);
+  if (groups_ && !AreOfTheirGroups(cards, nullptr)) groups_.reset();
+  shown_.push_back({std::move(cards)});
+}
+
+// Whether nothing outside of the group has to do with it. Else everything has to be merged.
+bool Settling::MergeGroup(const EditGroups::Group& group) {
+  std::unique_ptr<MergedFiles>& part = parts_[&group];
+  if (part == nullptr) {
+    part = std::make_unique<MergedFiles>();
+    part->safe = true;
+    MakeExcerpt(files_.untouched, group, part->untouched);
+    CompareVersions(*part, false);
+  }
+  const auto is_elsewhere = [&](const YAMLScalar* file_id) { return groups_->Find(file_id) != &group; };
+  Resolutions resolutions = AllResolutions();
+  std::erase_if(resolutions, [&](const RecordingConflictResolver::RecordResolve& resolution) {
+    return resolution.pattern.front() != YAMLScalar::star && is_elsewhere(resolution.pattern.front());
+  });
+  MergeRead(*part, std::move(resolutions));
+  if (part->merged == nullptr) return false;
+  const bool is_renamed = TakeOver(group, *part);
+  std::vector<ReportCard> cards = MakeCardsOf(*part);
+  if (!AreOfTheirGroups(cards, &group)) return false;
+  for (const YAMLScalar* file_id : group) ForgetPlaces(file_id);
+  AddPlaces(cards);
+  std::erase_if(files_.notes, [&](const SceneNote& note) { return !is_elsewhere(note.file_id); });
+  std::ranges::copy_if(part->notes, std::back_inserter(files_.notes),
+                       [&](const SceneNote& note) { return !is_elsewhere(note.file_id); });
+  shown_.push_back({std::move(cards), &group, is_renamed});
+  return true;
+}
+
+// Returns whether objects have other names or places than before.
+bool Settling::TakeOver(const EditGroups::Group& group, const MergedFiles& part) {
+  const auto what_is_said = [&] {
+    std::vector<std::pair<std::string, const YAMLScalar*>> said;
+    for (const YAMLScalar* file_id : group) {
+      said.emplace_back(names_->GetOwnName(file_id), FatherIn(*files_.merged, file_id));
+    }
+    return said;
+  };
+  const auto before = what_is_said();
+  for (const YAMLScalar* file_id : group) {
+    const YAMLNode* object = part.merged->Get(file_id);
+    SetEntry(*files_.merged, file_id, object == nullptr ? nullptr : object->Clone());
+  }
+  RenewNames();
+  return what_is_said() != before;
+}
+
+void Settling::RenewNames() {
+  std::vector<const VexelObjects*> versions = {&versions_.right, &versions_.left, &versions_.base};
   if (files_.merged != nullptr) versions.insert(versions.begin(), files_.merged.get());
   names_.emplace(std::move(versions));
-  std::vector<ReportObject> objects = CollectReport(files_, *names_, NamesInNotes(file_));
+  names_->SetScriptClasses(scripts_);
+}
+
+std::vector<ReportCard> Settling::MakeCardsOf(const MergedFiles& files) {
+  std::vector<ReportObject> objects = CollectReport(files, *names_, NamesInNotes(file_));
   FindScripts(objects);
   for (ReportObject& object : objects) object.class_name = names_->GetClass(object.file_id);
-  CountConflicts(objects);
-  cards_ = MakeCards(std::move(objects), *names_);
+  return MakeCards(std::move(objects), *names_);
+}
+
+// Whether each card stands for objects of one group alone, of `group` unless that is null.
+bool Settling::AreOfTheirGroups(const std::vector<ReportCard>& cards, const EditGroups::Group* group) {
+  return std::ranges::all_of(cards, [&](const ReportCard& card) {
+    const EditGroups::Group* its_group = groups_->Find(card.objects.front().file_id);
+    return its_group != nullptr && (group == nullptr || its_group == group) &&
+           group_of_card_.emplace(card.file_id, its_group).first->second == its_group &&
+           std::ranges::all_of(card.objects, [&](const ReportObject& object) {
+             return groups_->Find(object.file_id) == its_group;
+           });
+  });
 }
 
 void Settling::FindScripts(const std::vector<ReportObject>& objects) {
@@ -110,20 +195,35 @@ void Settling::FindScripts(const std::vector<ReportObject>& objects) {
     const std::string guid = names_->GetScriptGuid(object.file_id);
     if (!guid.empty() && looked_for_.insert(guid).second) unknown.insert(guid);
   }
-  if (!unknown.empty()) scripts_.merge(file_.script_search(unknown));
+  if (unknown.empty()) return;
+  scripts_.merge(file_.script_search(unknown));
   names_->SetScriptClasses(scripts_);
 }
 
-void Settling::CountConflicts(const std::vector<ReportObject>& objects) {
-  pending_ = 0;
-  places_.clear();
-  for (const ReportObject& object : objects) {
-    for (const ReportRow& row : object.rows) {
-      pending_ += row.pending ? 1 : 0;
-      std::string path = ChoicePath(row);
-      if (!path.empty()) places_.insert(std::move(path));
+void Settling::AddPlaces(const std::vector<ReportCard>& cards) {
+  for (const ReportCard& card : cards) {
+    for (const ReportObject& object : card.objects) {
+      Places& places = objects_[object.file_id];
+      for (const ReportRow& row : object.rows) {
+        places.pending += row.pending ? 1 : 0;
+        std::string path = ChoicePath(row);
+        if (path.empty()) continue;
+        ++places_[path];
+        places.paths.push_back(std::move(path));
+      }
+      pending_ += places.pending;
     }
   }
+}
+
+void Settling::ForgetPlaces(const YAMLScalar* file_id) {
+  const auto found = objects_.find(file_id);
+  if (found == objects_.end()) return;
+  pending_ -= found->second.pending;
+  for (const std::string& path : found->second.paths) {
+    if (--places_[path] == 0) places_.erase(path);
+  }
+  objects_.erase(found);
 }
 
 void Settling::Save() {

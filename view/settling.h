@@ -1,14 +1,18 @@
 #pragma once
 
 #include <functional>
+#include <map>
+#include <memory>
 #include <optional>
 #include <set>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 #include "report/conflict_names.h"
 #include "report/report_cards.h"
 #include "view/choices.h"
+#include "view/edit_groups.h"
 
 namespace vexel_yaml {
 
@@ -36,9 +40,19 @@ struct ViewFile {
   std::function<void(const std::string& text, const std::string& record)> store = {};
 };
 
-/// The settling of one file: read once, merged anew with every choice. For one thread at a time.
+/// The settling of one file: read once, merged anew with every choice, as far as that choice goes. For one
+/// thread at a time.
 class Settling {
  public:
+  /// What a merge showed.
+  struct Shown {
+    std::vector<ReportCard> cards;
+    /// The objects of which nothing holds any more that was shown before; null for all.
+    const EditGroups::Group* group = nullptr;
+    /// Whether objects of other groups may be called otherwise now.
+    bool is_renamed = false;
+  };
+
   /// Reads and merges. The rules and the type information are loaded. Throws what ReadForReport throws.
   explicit Settling(const ViewFile& file);
 
@@ -48,15 +62,16 @@ class Settling {
   void Redo();
   const Choices& GetChoices() const { return choices_; }
 
-  /// Goes up with every merge.
+  /// Goes up with every step.
   size_t GetRevision() const { return revision_; }
   size_t CountPending() const { return pending_; }
   /// The conflicts that there are, settled ones included.
   size_t CountConflicts() const { return places_.size(); }
   /// Why there is no result; empty where there is one.
   const std::string& GetError() const { return files_.error; }
-  const std::vector<std::string>& GetNotes() const { return files_.notes; }
-  std::vector<ReportCard> TakeCards() { return std::move(cards_); }
+  const std::vector<SceneNote>& GetNotes() const { return files_.notes; }
+  /// What was merged since the last call, in that order. The cards' nodes live until the next step.
+  std::vector<Shown> TakeShown() { return std::move(shown_); }
   ObjectNames& GetNames() { return *names_; }
 
   /// Keeps the result with `ViewFile::store`. Throws std::runtime_error with a text for people where
@@ -64,28 +79,47 @@ class Settling {
   void Save();
 
  private:
+  // What can be chosen about in one object.
+  struct Places {
+    size_t pending = 0;
+    std::vector<std::string> paths;
+  };
+
   void TakeOverResolutions();
   std::vector<RecordingConflictResolver::RecordResolve> AllResolutions() const;
-  void Merge();
+  void Merge(const std::vector<Choices::Change>& changes);
+  void MergeAll();
+  bool MergeGroup(const EditGroups::Group& group);
+  bool TakeOver(const EditGroups::Group& group, const MergedFiles& part);
+  void RenewNames();
+  std::vector<ReportCard> MakeCardsOf(const MergedFiles& files);
+  bool AreOfTheirGroups(const std::vector<ReportCard>& cards, const EditGroups::Group* group);
   void FindScripts(const std::vector<ReportObject>& objects);
-  void CountConflicts(const std::vector<ReportObject>& objects);
+  void AddPlaces(const std::vector<ReportCard>& cards);
+  void ForgetPlaces(const YAMLScalar* file_id);
 
   const ViewFile file_;
   /// As it was read, and for everybody who looks at it.
   SceneDocuments whole_;
-  SceneDocuments shown_;
-  /// Of all that was read, or of what a merge looks at.
+  SceneDocuments versions_;
+  /// Of all that was read, or of what a merge looks at. Its merged objects and notes are those of the last
+  /// merges.
   MergedFiles files_;
+  /// What can be merged by itself; nothing where nothing can.
+  std::optional<EditGroups> groups_;
+  std::map<const EditGroups::Group*, std::unique_ptr<MergedFiles>> parts_;
+  std::unordered_map<const YAMLScalar*, const EditGroups::Group*> group_of_card_;
   /// What was chosen before the page, as far as it can't be taken back there.
   std::vector<RecordingConflictResolver::RecordResolve> resolutions_ = file_.resolutions;
   Choices choices_;
   ScriptClasses scripts_;
   std::set<std::string> looked_for_;
   std::optional<ObjectNames> names_;
-  std::vector<ReportCard> cards_;
-  /// What can be chosen about.
-  std::set<std::string> places_;
-  size_t revision_ = 0;
+  std::vector<Shown> shown_;
+  std::unordered_map<const YAMLScalar*, Places> objects_;
+  /// What can be chosen about, and in how many rows.
+  std::map<std::string, size_t> places_;
+  size_t revision_ = 1;
   size_t pending_ = 0;
 };
 

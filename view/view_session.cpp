@@ -2,9 +2,12 @@
 
 #include <algorithm>
 #include <charconv>
+#include <iterator>
 #include <nlohmann/json.hpp>
+#include <set>
 #include <unordered_map>
 #include <unordered_set>
+#include <utility>
 
 #include "report/report_json.h"
 #include "report/value_text.h"
@@ -77,31 +80,35 @@ class ViewSession::OpenFile {
 
   // Returns the keys of the cards that are new or other than before.
   std::vector<std::string> TakeCards() {
-    std::vector<ReportCard> cards = settling_.TakeCards();
-    order_.Arrange(cards);
-    std::unordered_map<std::string, Shown> shown;
-    std::vector<std::string> changed;
-    keys_.clear();
-    for (ReportCard& card : cards) {
-      std::string key = Cleaned(card.file_id->GetText());
-      const auto before = shown_.find(key);
-      // Most cards are as they were, and making JSON of them would take as long as the merge.
-      if (before != shown_.end() && before->second.card == card) {
-        shown.insert(shown_.extract(before));
-      } else {
-        std::string text = CardJson(card, settling_.GetNames());
-        shown.emplace(key, Shown{std::move(card), std::move(text)});
-        changed.push_back(key);
+    std::set<const YAMLScalar*> changed;
+    for (Settling::Shown& merged : settling_.TakeShown()) {
+      order_.Arrange(merged.cards);
+      std::unordered_map<const YAMLScalar*, Told> before = Forget(merged.group);
+      for (ReportCard& card : merged.cards) {
+        const YAMLScalar* key = card.file_id;
+        const auto known = before.find(key);
+        // Most cards are as they were, and making JSON of them would take as long as the merge.
+        const bool is_same = known != before.end() && known->second.card == card;
+        std::string text = is_same ? std::move(known->second.text) : CardJson(card, settling_.GetNames());
+        if (!is_same) changed.insert(key);
+        told_.insert_or_assign(key, Told{std::move(card), std::move(text)});
       }
-      keys_.push_back(std::move(key));
+      if (merged.is_renamed) Rename(changed);
     }
-    shown_ = std::move(shown);
-    return changed;
+    keys_.clear();
+    std::vector<std::string> changed_keys;
+    for (const YAMLScalar* key : order_.GetKeys()) {
+      if (!told_.contains(key)) continue;
+      keys_.push_back(Cleaned(key->GetText()));
+      if (changed.contains(key)) changed_keys.push_back(keys_.back());
+      numbers_[keys_.back()] = key;
+    }
+    return changed_keys;
   }
 
   Settling& GetSettling() { return settling_; }
   const std::vector<std::string>& GetKeys() const { return keys_; }
-  const std::string& GetText(const std::string& key) const { return shown_.at(key).text; }
+  const std::string& GetText(const std::string& key) const { return told_.at(numbers_.at(key)).text; }
   bool IsSaved() const { return is_saved_; }
   void Save() {
     settling_.Save();
@@ -109,16 +116,45 @@ class ViewSession::OpenFile {
   }
 
  private:
-  Settling settling_;
-  CardOrder order_;
-  struct Shown {
-    // Its cells' nodes are those of a merge that is forgotten.
+  struct Told {
     ReportCard card;
     std::string text;
   };
-  // The cards' keys in their order, and what the page was told.
+
+  // Takes out the cards of a group, or all.
+  std::unordered_map<const YAMLScalar*, Told> Forget(const EditGroups::Group* group) {
+    if (group == nullptr) return std::exchange(told_, {});
+    std::unordered_map<const YAMLScalar*, Told> forgotten;
+    const std::unordered_set<const YAMLScalar*> gone(group->begin(), group->end());
+    for (auto told = told_.begin(); told != told_.end();) {
+      const auto next = std::next(told);
+      // A card is of one group.
+      if (gone.contains(told->second.card.objects.front().file_id)) forgotten.insert(told_.extract(told));
+      told = next;
+    }
+    return forgotten;
+  }
+
+  // Says where the things of other groups are found now.
+  void Rename(std::set<const YAMLScalar*>& changed) {
+    ObjectNames& names = settling_.GetNames();
+    for (auto& [key, told] : told_) {
+      std::string path = names.GetPath(key);
+      if (told.card.path == path) continue;
+      told.card.path = std::move(path);
+      told.card.name = names.GetOwnName(key);
+      told.text = CardJson(told.card, names);
+      changed.insert(key);
+    }
+  }
+
+  Settling settling_;
+  CardOrder order_;
+  // What the page was told, by the cards' file IDs.
+  std::unordered_map<const YAMLScalar*, Told> told_;
+  // The cards' keys in their order, and which file IDs they stand for.
   std::vector<std::string> keys_;
-  std::unordered_map<std::string, Shown> shown_;
+  std::unordered_map<std::string, const YAMLScalar*> numbers_;
   bool is_saved_ = false;
 };
 
@@ -133,7 +169,7 @@ Json NamesOf(const ViewFile& file) {
 
 Json HeadOf(const ViewFile& file, Settling& settling) {
   Json notes = Json::array();
-  for (const std::string& note : settling.GetNotes()) notes.push_back(OnOneLine(note));
+  for (const SceneNote& note : settling.GetNotes()) notes.push_back(OnOneLine(note.text));
   return {{"version", kReportJsonVersion},
           {"mode", file.is_review ? "review" : "merge"},
           {"title", OnOneLine(file.title)},

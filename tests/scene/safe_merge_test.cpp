@@ -163,8 +163,9 @@ TEST(SafeMerge, FaultsFromBeforeAreNamedButNoConflict) {
   const SafelyMerged merged(base, edited, base + Lamp(10));
   EXPECT_THAT(merged.Pending(), IsEmpty());
   ASSERT_THAT(merged.result.notes, SizeIs(11));
-  EXPECT_EQ(merged.result.notes.front(), "Warning: 100 refers to 9, which isn't there, as before the merge");
-  EXPECT_EQ(merged.result.notes.back(), "Warning: 2 more faults are as before the merge");
+  EXPECT_EQ(merged.result.notes.front().text,
+            "Warning: 100 refers to 9, which isn't there, as before the merge");
+  EXPECT_EQ(merged.result.notes.back().text, "Warning: 2 more faults are as before the merge");
   // Right's new reference leads nowhere since left has deleted its object: that is the merge's own fault.
   const SafelyMerged cleared(Script("  of: {fileID: 0}\n") + Lamp(10), Script("  of: {fileID: 0}\n"),
                              Script("  of: {fileID: 12}\n") + Lamp(10), "left 10\n");

@@ -12,6 +12,7 @@ namespace vexel_yaml {
 namespace {
 
 using ::testing::ElementsAre;
+using ::testing::Field;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 
@@ -90,7 +91,8 @@ TEST(SettleScene, OfTwoChoicesThatExcludeOneAnotherTheFirstOneStands) {
   const Settled settled(base, left, right, "right 10\nleft 31.Transform.m_Father\n");
   EXPECT_THAT(settled.Pending(), ElementsAre("31.Transform.m_Father"));
   EXPECT_FALSE(settled.Has(10));
-  EXPECT_THAT(settled.scene.notes, ElementsAre(HasSubstr("together with what stands at 10")));
+  EXPECT_THAT(settled.scene.notes,
+              ElementsAre(Field(&SceneNote::text, HasSubstr("together with what stands at 10"))));
 }
 
 TEST(SettleScene, SomethingCanBeKeptBelowAThingThatStaysAsInBase) {
