@@ -76,9 +76,11 @@ struct Occurrences {
 
 class Aligner {
  public:
-  Aligner(NumberedLists lists, bool has_keys)
+  // `has_slots`: whether elements with keys may be known by their place, too.
+  Aligner(NumberedLists lists, bool has_keys, bool has_slots)
       : lists_(std::move(lists)),
         has_keys_(has_keys),
+        has_slots_(has_slots),
         left_(lists_.base.size(), lists_.left.size()),
         right_(lists_.base.size(), lists_.right.size()) {}
 
@@ -89,6 +91,7 @@ class Aligner {
     if (are_unique) {
       MatchById(left, left_);
       MatchById(right, right_);
+      if (has_slots_) MatchSlots(left, right);
     } else if (!MatchBetweenAnchors(base, left, right)) {
       return std::nullopt;
     }
@@ -104,6 +107,15 @@ class Aligner {
       const uint32_t partner = side.index[lists_.base[i]];
       if (partner != kNoIndex) match.Pair(i, partner);
     }
+  }
+
+  // Not what one side put where the other put it elsewhere: that is an order.
+  void MatchSlots(const Occurrences& left, const Occurrences& right) {
+    MatchReplacedByBoth(left_, lists_.left, right_, lists_.right, [&](uint32_t in_left, uint32_t in_right) {
+      const uint32_t left_in_right = right.index[lists_.left[in_left]];
+      const uint32_t right_in_left = left.index[lists_.right[in_right]];
+      return (left_in_right == kNoIndex && right_in_left == kNoIndex) || left_in_right == in_right;
+    });
   }
 
   // Among equal elements only those are told apart that stand between the same unique ones: on each stretch
@@ -184,7 +196,9 @@ class Aligner {
     ListAlignment result;
     result.has_keys = has_keys_;
     for (uint32_t i = 0; i < lists_.base.size(); ++i) {
-      result.elements.push_back({i, left_.ToSide(i), right_.ToSide(i)});
+      const uint32_t in_left = left_.ToSide(i);
+      const bool is_replaced = has_keys_ && in_left != kNoIndex && lists_.left[in_left] != lists_.base[i];
+      result.elements.push_back({i, in_left, right_.ToSide(i), is_replaced});
     }
     std::vector<bool> is_paired(lists_.right.size(), false);
     for (uint32_t i = 0; i < lists_.left.size(); ++i) {
@@ -200,6 +214,7 @@ class Aligner {
 
   const NumberedLists lists_;
   const bool has_keys_;
+  const bool has_slots_;
   SideMatch left_;
   SideMatch right_;
   // For each element that left added, the one that right added as the same.
@@ -212,7 +227,10 @@ std::optional<ListAlignment> AlignLists(const FieldPath& path, const YAMLSequenc
                                         const YAMLSequence& left, const YAMLSequence& right) {
   std::optional<NumberedLists> by_keys = NumberByKeys(path, base, left, right);
   const bool has_keys = by_keys.has_value();
-  return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(base, left, right), has_keys).Align();
+  const bool has_slots =
+      has_keys && &YAMLSequenceRemapper::ChooseKeyPaths(path) == &YAMLSequenceRemapper::defaultPath;
+  return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(base, left, right), has_keys, has_slots)
+      .Align();
 }
 
 }  // namespace vexel_yaml

@@ -16,6 +16,8 @@ struct AlignedElement {
   uint32_t base = kNoIndex;
   uint32_t left = kNoIndex;
   uint32_t right = kNoIndex;
+  /// Whether both sides put something in the place of an element that has a key: other elements.
+  bool is_replaced = false;
 };
 
 struct ListAlignment {
@@ -27,6 +29,9 @@ struct ListAlignment {
 };
 
 /// Lines up the elements of the list at `path` in three versions.
+///
+/// A list of references may be a set or a row of slots. What both sides put in the place of one reference is
+/// taken for a slot, of which there are not suddenly two.
 ///
 /// Without keys, several answers are often possible. None is given where they would make a merge differ: a
 /// run of elements that both sides replaced by different numbers of others, equal elements of which one went,

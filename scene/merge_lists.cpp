@@ -66,7 +66,7 @@ class ListMerge {
       if (settler_.AreSame(values.base, values.right)) return CopyOf(values.left);
       if (settler_.AreSame(values.left, values.right)) return CopyOf(values.left);
       // What only its place tells is taken as a whole: it may be another element.
-      if (!alignment_.has_keys || values.left == nullptr || values.right == nullptr) {
+      if (!alignment_.has_keys || element.is_replaced || values.left == nullptr || values.right == nullptr) {
         return CopyOf(values.Get(settler_.Decide(ConflictType::kBothChange, values)));
       }
     }

@@ -152,4 +152,23 @@ bool MatchByPlace(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMa
   return true;
 }
 
+void MatchReplacedByBoth(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMatch& right,
+                         const std::vector<uint32_t>& right_ids,
+                         const std::function<bool(uint32_t left, uint32_t right)>& may_pair) {
+  SideMatch left_by_place = left, right_by_place = right;
+  const GapMatcher left_gaps(left_by_place, left_ids), right_gaps(right_by_place, right_ids);
+  for (uint32_t i = 0; i < left.BaseSize(); ++i) {
+    const GapMatcher::Gap* a = left_gaps.Find(i);
+    const GapMatcher::Gap* b = right_gaps.Find(i);
+    if (a == nullptr || b == nullptr || a->begin != b->begin || a->end != b->end) continue;
+    bool is_replaced = a->fate == Fate::kEdited && b->fate == Fate::kEdited;
+    for (uint32_t k = 0; is_replaced && k < a->count; ++k) is_replaced = may_pair(a->first + k, b->first + k);
+    for (uint32_t k = 0; is_replaced && k < a->count; ++k) {
+      left.Pair(a->begin + k, a->first + k);
+      right.Pair(b->begin + k, b->first + k);
+    }
+    i = a->end - 1;
+  }
+}
+
 }  // namespace vexel_yaml

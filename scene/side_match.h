@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <vector>
 
 #include "scene/list_alignment.h"
@@ -59,6 +60,12 @@ class SideMatch {
   std::vector<uint32_t> to_side_;
   std::vector<uint32_t> to_base_;
 };
+
+/// The same only where both sides replaced the same run, and `may_pair` holds for what they put there, index
+/// by index.
+void MatchReplacedByBoth(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMatch& right,
+                         const std::vector<uint32_t>& right_ids,
+                         const std::function<bool(uint32_t left, uint32_t right)>& may_pair);
 
 /// Whether two elements, each added by another side, were put between the same elements of base.
 bool AreSame(const Place& a, const Place& b);

@@ -121,6 +121,20 @@ TEST(SettleValues, ElementsWithoutKeysAreKnownByTheirPlace) {
   EXPECT_EQ(field.Merge("[1, 2]", "[9, 2]", "[9, 1]"), "[9, 9]") << "right removes 2 and adds 9";
 }
 
+TEST(SettleValues, WhatBothPutInThePlaceOfOneReferenceIsAConflict) {
+  const auto list = [](const std::string& ids) {
+    std::string text = "[";
+    for (const char id : ids) text += std::string(text.size() > 1 ? ", " : "") + "{fileID: " + id + "}";
+    return text + "]";
+  };
+  const Field plain;
+  ExpectConflict(plain, list("12"), list("32"), list("42"), "f.0", list("32"), list("42"), list("12"));
+  // The same, one that went and one that came elsewhere, and what a rule calls a set: none of them.
+  EXPECT_EQ(plain.Merge(list("12"), list("32"), list("342")), list("342"));
+  EXPECT_EQ(plain.Merge(list("12"), list("23"), list("24")), list("234"));
+  EXPECT_EQ(Field{"[arrays]\nset *.C.f fileID\n"}.Merge(list("12"), list("32"), list("42")), list("342"));
+}
+
 TEST(SettleValues, TwoReordersAreAConflictWhereTheOrderMeansSomething) {
   ExpectConflict(Field(), "[1, 2, 3]", "[3, 1, 2]", "[2, 1, 3]", "f", "[3, 1, 2]", "[2, 1, 3]", "[1, 2, 3]");
   EXPECT_EQ(Field().Merge("[1, 2, 3]", "[3, 1, 2]", "[1, 2, 3, 4]"), "[3, 4, 1, 2]");
