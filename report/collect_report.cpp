@@ -1,10 +1,14 @@
 #include <algorithm>
 #include <map>
+#include <set>
+#include <unordered_map>
 
 #include "report/record_patterns.h"
+#include "report/report_places.h"
 #include "report/report_rows.h"
 #include "report/shown_diff.h"
 #include "report/side_walk.h"
+#include "yaml/yaml_alloc.h"
 
 namespace vexel_yaml {
 
@@ -12,37 +16,6 @@ namespace {
 
 using Kind = ReportCell::Kind;
 using Record = RecordingConflictResolver::Record;
-
-// What the index of an element that base lacks begins with, so that no element of base has the same path.
-constexpr char kNewElement = '+';
-
-bool IsNewElement(const YAMLScalar* step) {
-  const std::string& text = step->GetText();
-  return text.size() > 1 && text[0] == kNewElement && text[1] >= '0' && text[1] <= '9';
-}
-
-// What stands at `path` below `node`; the path leads through mappings and lists. Null for a new element.
-const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path) {
-  for (const YAMLScalar* step : path) {
-    if (node == nullptr) return nullptr;
-    if (const YAMLMapping* mapping = node->AsMapping()) {
-      node = mapping->HasDuplicateKeys() ? nullptr : mapping->Get(step);
-    } else if (const YAMLSequence* sequence = node->AsSequence()) {
-      const auto index = static_cast<size_t>(step->GetIntValue());
-      node = !IsNewElement(step) && index < sequence->Size() ? sequence->GetItems()[index] : nullptr;
-    } else {
-      return nullptr;
-    }
-  }
-  return node;
-}
-
-// What an override of a prefab instance is about, empty for another value.
-std::string PropertyOf(const YAMLNode* element) {
-  const YAMLNode* property = NodeAt(element, {YAMLScalar::Lookup("propertyPath")});
-  return property == nullptr || property->AsScalar() == nullptr ? std::string()
-                                                                : property->AsScalar()->GetText();
-}
 
 std::string_view SettledState(MergeResolve resolution) {
   switch (resolution) {
@@ -55,10 +28,23 @@ std::string_view SettledState(MergeResolve resolution) {
   }
 }
 
+// What an edit makes of a value; null for nothing. Given to nobody, as what operations hold.
+const YAMLNode* After(const YAMLNode* value, const Operation* edit) {
+  if (edit == nullptr || value == nullptr) return value;
+  auto* holder = YAMLAlloc<YAMLMapping>::create(false);
+  holder->Insert(YAMLScalar::underscore, value->Clone());
+  edit->Apply(*holder, YAMLScalar::underscore);
+  return holder->Get(YAMLScalar::underscore);
+}
+
 class Collector {
  public:
   Collector(const MergedFiles& files, ObjectNames& names, const SideWords& sides)
-      : files_(files), names_(names), sides_(sides), patterns_(files.resolver) {}
+      : files_(files), names_(names), sides_(sides), patterns_(files.resolver) {
+    for (const Record& record : files.resolver.GetRecords()) {
+      if (IsPartOfReference(record.path)) ++reference_records_[Above(record.path)];
+    }
+  }
 
   std::vector<ReportObject> Collect() {
     AddSide(&ReportRow::left, &ReportObject::left, *files_.diffs.left, files_.read.left);
@@ -149,11 +135,15 @@ class Collector {
     // The order of the keys has records, too.
     if (!pending && record.path.front() == YAMLScalar::underscore) return;
     const FieldPath* const known = KnownPlace(record);
-    const FieldPath place = known != nullptr ? *known : PlaceOfPart(record.path);
+    const FieldPath place = PlaceOfWhole(known != nullptr ? *known : PlaceOfPart(record.path));
     const bool is_new = std::ranges::any_of(place, IsNewElement);
     ReportRow& row = rows_.RowAt(place);
-    AddOperation(record.left, row, row.left);
-    AddOperation(record.right, row, row.right);
+    if (place.size() >= record.path.size()) {
+      AddOperation(record.left, row, row.left);
+      AddOperation(record.right, row, row.right);
+    }
+    if (files_.settled != nullptr) ShowElement(record, row);
+    if (is_new) row.overridden = OverriddenBy(place);
     if (known == nullptr && is_new) {
       row.note = "Part of what both sides added to the list";
       // No walk over the result comes by here.
@@ -163,6 +153,7 @@ class Collector {
       if (is_right || is_left) row.result = is_right ? row.right : row.left;
     }
     row.pending |= pending;
+    if (pending) NoteWhatWaits(record, place);
     row.state = pending ? "conflict" : SettledState(record.resolution);
     row.record_path = patterns_.For(record);
     if (record.type == ConflictType::kTransformCycle) {
@@ -196,6 +187,74 @@ class Collector {
     return path;
   }
 
+  // People know a reference as one value, of which a record may name a part.
+  FieldPath PlaceOfWhole(FieldPath path) {
+    const auto records = reference_records_.find(Above(path));
+    const bool is_only_one = records != reference_records_.end() && records->second == 1;
+    return is_only_one && IsPartOfReference(path) && rows_.Find(records->first) != nullptr ? records->first
+                                                                                           : path;
+  }
+
+  // The walks know an element that nothing identifies by its content: an edited one is gone for them, and
+  // another one came. The record knows that they are one.
+  void ShowElement(const Record& record, ReportRow& row) {
+    const YAMLNode* list = NodeAt(&files_.read.base, Above(row.path));
+    const YAMLNode* base = NodeAt(&files_.read.base, row.path);
+    if (base == nullptr || list->AsSequence() == nullptr) return;
+    const auto cell_of = [&](const Operation* edit) {
+      const YAMLNode* node = After(base, edit);
+      if (node == nullptr) return ReportCell{Kind::kRemoved, {}, {}};
+      return ValueCell(row.path, node, edit == nullptr ? Kind::kUnchanged : Kind::kChanged, names_);
+    };
+    row.base = cell_of(nullptr);
+    row.left = cell_of(record.left);
+    row.right = cell_of(record.right);
+    ReportCell chosen = record.resolution == MergeResolve::kLeft    ? row.left
+                        : record.resolution == MergeResolve::kRight ? row.right
+                                                                    : row.base;
+    if (IsInResult(Above(row.path), chosen)) row.result = std::move(chosen);
+  }
+
+  // Whether the merged list at `path` has what a choice asked for: a repair may have taken it out again.
+  bool IsInResult(const FieldPath& path, const ReportCell& cell) const {
+    const YAMLNode* list = NodeAt(files_.merged.get(), path);
+    if (list == nullptr || list->AsSequence() == nullptr) return false;
+    return cell.node == nullptr ||
+           std::ranges::any_of(list->AsSequence()->GetItems(),
+                               [&](const YAMLNode* item) { return item->HasSameContent(*cell.node); });
+  }
+
+  // What a new element overrides, empty for another one.
+  std::string OverriddenBy(const FieldPath& place) const {
+    const auto step = std::ranges::find_if(place, IsNewElement);
+    FieldPath path(place.begin(), step);
+    path.push_back(YAMLScalar::Lookup((*step)->GetText().substr(1)));
+    const std::string in_left = PropertyOf(NodeAt(&files_.read.left, path));
+    return in_left.empty() ? PropertyOf(NodeAt(&files_.read.right, path)) : in_left;
+  }
+
+  // What nothing is decided about as long as a record is pending: the values around its place, and the
+  // objects that its edits name.
+  void NoteWhatWaits(const Record& record, FieldPath place) {
+    for (place = Above(place); place.size() > 1; place = Above(place)) around_pending_.insert(place);
+    for (const Operation* operation : {record.left, record.right}) {
+      if (operation == nullptr || operation->GetKind() != Operation::Kind::kChangeMapping) continue;
+      const YAMLMappingDiff* diff = static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
+      for (const YAMLMappingDiff::Entry& entry : diff->GetEntries()) {
+        if (files_.read.left.HasKey(entry.key) || files_.read.right.HasKey(entry.key))
+          waiting_.emplace(entry.key, record.path.front());
+      }
+    }
+  }
+
+  bool IsWaiting(ReportRow& row) {
+    if (rows_.IsInConflict(row.path) || around_pending_.contains(row.path)) return true;
+    const auto found = waiting_.find(row.path.front());
+    if (found == waiting_.end()) return false;
+    if (row.note.empty()) row.note = "Goes with the conflict at " + names_.Describe(found->second);
+    return true;
+  }
+
   // A record may be about a place that no walk has shown: an object as a whole, or a part of one that both
   // sides added.
   void AddOperation(const Operation* operation, ReportRow& row, ReportCell& cell) {
@@ -226,8 +285,8 @@ class Collector {
     row.base = ValueCell(path, from, Kind::kUnchanged, names_);
     // Of the many overrides of a prefab instance, which tell people nothing by their numbers.
     const FieldPath element(path.begin(), path.end() - 1);
-    const std::string property = PropertyOf(NodeAt(&files_.read.base, element));
-    if (!property.empty()) row.note = "Overrides " + property;
+    row.overridden = PropertyOf(NodeAt(&files_.read.base, element));
+    if (!row.overridden.empty()) row.note = "Overrides " + row.overridden;
   }
 
   void Finish(ReportObject& object) {
@@ -267,7 +326,7 @@ class Collector {
       return;
     }
     JudgeRow(row, sides_);
-    if (row.state == "not taken" && rows_.IsInConflict(row.path)) row.state = "in conflict";
+    if (row.state == "not taken" && IsWaiting(row)) row.state = "in conflict";
   }
 
   static void FillFromBase(const ReportRow& row, ReportCell& cell) {
@@ -306,6 +365,11 @@ class Collector {
   ReportRows rows_{names_};
   RecordPatterns patterns_;
   SideWalk::Places places_;
+  std::set<FieldPath> around_pending_;
+  // Objects, and the thing whose conflict decides about each.
+  std::unordered_map<const YAMLScalar*, const YAMLScalar*> waiting_;
+  // How many records there are about parts of each reference.
+  std::map<FieldPath, size_t> reference_records_;
   // Elements of lists, and the versions that they went out of.
   std::map<FieldPath, std::vector<ReportCell ReportRow::*>> gone_;
 };

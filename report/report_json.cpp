@@ -94,12 +94,19 @@ bool IsSwitchRow(const ReportRow& row) {
          });
 }
 
+// What is the same in objects of one class; empty for a whole object.
+std::string PropertyName(const ReportRow& row) {
+  if (!row.overridden.empty()) return "override of " + row.overridden;
+  return row.path.size() < 2 ? std::string() : PathToString({row.path.begin() + 1, row.path.end()});
+}
+
 Json RowJson(const ReportRow& row, ObjectNames& names) {
   Json json = {{"key", Cleaned(PathToString(row.path))}};
   const std::string path = ChoicePath(row);
   if (!path.empty()) json["path"] = path;
   json["field"] = row.path.size() < 2 ? std::string() : Cleaned(row.path.back()->GetText());
-  json["label"] = OnOneLine(FieldLabel(row.path));
+  json["label"] = OnOneLine(row.overridden.empty() ? FieldLabel(row.path) : PropertyLabel(row.overridden));
+  json["property"] = Cleaned(PropertyName(row));
   json["state"] = StateText(row.state);
   json["note"] = OnOneLine(row.note);
   json["pending"] = row.pending;

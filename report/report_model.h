@@ -50,6 +50,8 @@ struct ReportRow {
   std::string record_path;
   bool repaired = false;
   std::string note;
+  /// What an override of a prefab instance is about, such as "m_Color.r"; empty for other places.
+  std::string overridden = {};
 
   bool operator==(const ReportRow& other) const = default;
 };

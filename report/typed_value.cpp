@@ -1,7 +1,7 @@
 #include "report/typed_value.h"
 
 #include <algorithm>
-#include <cmath>
+#include <charconv>
 #include <string_view>
 
 namespace vexel_yaml {
@@ -56,8 +56,10 @@ bool TakeColour(const YAMLMapping& mapping, TypedValue& value) {
   constexpr std::string_view kParts = "rgba";
   if (!HoldsNumbers(mapping, kParts)) return false;
   for (size_t i = 0; i < kParts.size(); ++i) {
-    value.colour[i] = ScalarAt(mapping, kParts.substr(i, 1))->GetFloatValue();
-    if (!std::isfinite(value.colour[i])) return false;
+    const std::string& text = ScalarAt(mapping, kParts.substr(i, 1))->GetText();
+    // As it is written: a float is another number once it has more digits.
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value.colour[i]);
+    if (error != std::errc()) return false;
   }
   value.kind = Kind::kColour;
   return true;
@@ -94,6 +96,21 @@ bool TakeReference(const YAMLMapping& mapping, ObjectNames& names, TypedValue& v
 bool IsIndex(std::string_view key) {
   if (key.starts_with('+')) key.remove_prefix(1);
   return !key.empty() && std::ranges::all_of(key, IsDigit);
+}
+
+// What people call it where others have another name than the field.
+std::string Word(std::string_view key) {
+  if (key == "m_Father" || key == "m_TransformParent") return "Parent";
+  return Readable(key);
+}
+
+void AddToLabel(std::string_view key, std::string& label) {
+  if (!label.empty()) label += " \u203A ";
+  if (IsIndex(key)) {
+    label += "Element " + std::string(key.substr(key.starts_with('+') ? 1 : 0));
+  } else {
+    label += Word(key);
+  }
 }
 
 }  // namespace
@@ -156,10 +173,16 @@ std::string FieldLabel(const FieldPath& path) {
   if (path.back() == YAMLScalar::fileIDPlaceHolderName) return "File ID";
   if (path.back() == YAMLScalar::strippedPrefabPlaceHolderName) return "Stripped mark";
   std::string label;
-  for (size_t i = path.size() == 2 ? 1 : 2; i < path.size(); ++i) {
-    const std::string& key = path[i]->GetText();
-    if (!label.empty()) label += " \u203A ";
-    label += IsIndex(key) ? "Element " + key.substr(key.starts_with('+') ? 1 : 0) : Readable(key);
+  for (size_t i = path.size() == 2 ? 1 : 2; i < path.size(); ++i) AddToLabel(path[i]->GetText(), label);
+  return label;
+}
+
+std::string PropertyLabel(std::string_view property) {
+  std::string label;
+  while (!property.empty()) {
+    const std::string_view key = property.substr(0, property.find('.'));
+    AddToLabel(key, label);
+    property.remove_prefix(std::min(key.size() + 1, property.size()));
   }
   return label;
 }

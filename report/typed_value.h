@@ -38,6 +38,9 @@ bool IsSwitch(const FieldPath& path);
 /// and the class, which `path` begins with. "Whole object" for a path of nothing else.
 std::string FieldLabel(const FieldPath& path);
 
+/// The same for the property that an override is about, such as "Local Position › Y" for "m_LocalPosition.y".
+std::string PropertyLabel(std::string_view property);
+
 /// A key as people read it.
 std::string Readable(std::string_view key);
 

@@ -187,7 +187,7 @@ function sayEffects(words, {open, repaired, settled}, refused, notes) {
   if (open.length > 0) also.push(`This brought up ${plural(open.length, "other conflict")}.`);
   if (settled > 0) also.push(`${plural(settled, "other conflict")} ${settled === 1 ? "is" : "are"} settled by this, too.`);
   if (repaired.length > 0) also.push(`The merge repaired ${plural(repaired.length, "other place")}.`);
-  also.push(...notes.slice(0, 2));
+  also.push(...notes.slice(0, 2).map((note) => `${note}.`));
   const counts = state.pending === 0 ? "Nothing is open any more: you can save." : `${state.pending} open.`;
   const row = [...refused, ...open, ...repaired][0] ?? null;
   say([words, ...also, counts].join(" "), {important: also.length > 0 || state.pending === 0, row});

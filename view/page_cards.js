@@ -43,13 +43,18 @@ function sideButtons(names, what, data) {
 
 // Those rows are alike that are about one field of one kind of component.
 function fieldKey(object, row) {
-  return JSON.stringify([object.class, object.script, row.field]);
+  return row.property && JSON.stringify([object.class, object.script, row.property]);
 }
 
 // A side that left a place alone has there what was before.
 function cellOf(row, side) {
   const leftAlone = row[side].kind === "unchanged" && row[side].text === "" && side !== "result";
   return leftAlone ? row.base : row[side];
+}
+
+// What both added stays whatever is taken: base has nothing to take in its place.
+function canTake(row, side) {
+  return side !== "base" || row.base.text !== "" || row.theirs.kind !== "added" || row.ours.kind !== "added";
 }
 
 function choiceCell(row, side, names) {
@@ -80,11 +85,12 @@ function makeRow(object, row, {names, merging, alike, fresh}) {
     setData(element, {path: row.path});
     element.tabIndex = -1;
     element.classList.add(row.pending ? "conflict" : "settled");
-    const count = alike(fieldKey(object, row));
+    const field = fieldKey(object, row);
+    const count = field === "" ? 0 : alike(field);
     if (count > 1) {
       const many = make("details", "alike", make("summary", "", `all ${count} of this field`));
-      many.append(...sideButtons(names, "all conflicts of this field", {field: fieldKey(object, row)}));
-      head.append(setData(many, {field: fieldKey(object, row)}));
+      many.append(...sideButtons(names, "all conflicts of this field", {field}));
+      head.append(setData(many, {field}));
     }
   }
   if (row.repaired) element.classList.add("repaired");
@@ -97,7 +103,7 @@ function makeRow(object, row, {names, merging, alike, fresh}) {
     if (side === "result") {
       cell.append(...resultCell(row, merging));
     } else {
-      cell.append(settles ? choiceCell(row, side, names) : cellContent(cellOf(row, side), side, row.base));
+      cell.append(settles && canTake(row, side) ? choiceCell(row, side, names) : cellContent(cellOf(row, side), side, row.base));
     }
     cell.append(...wholeText(row[side]));
     element.append(cell);

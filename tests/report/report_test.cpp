@@ -66,7 +66,8 @@ TEST(ReadableHeaders, OnlyHeaderLinesOfReadableFilesChange) {
   EXPECT_EQ(readable("--- !v!1 &5\n<<<<<<<\n{"), "--- !v!1 &5\n<<<<<<<\n{");
 }
 
-std::string PageOf(const std::string& base, const std::string& left, const std::string& right) {
+std::string PageOf(const std::string& base, const std::string& left, const std::string& right,
+                   const std::vector<std::string>& options = {}) {
   // A folder for each test, since CTest runs them side by side.
   const std::string test = ::testing::UnitTest::GetInstance()->current_test_info()->name();
   const std::string folder = ::testing::TempDir() + test + "/";
@@ -74,8 +75,13 @@ std::string PageOf(const std::string& base, const std::string& left, const std::
   std::ofstream(folder + "base") << kHeader << base;
   std::ofstream(folder + "left") << kHeader << left;
   std::ofstream(folder + "right") << kHeader << right;
-  const int status = RunReport({"vexel-merge-report", folder + "base", folder + "left", "-o", folder + "page",
-                                "--rules", "/dev/null", "--title", "</title>\xFF", "--", folder + "right"});
+  std::vector<std::string> arguments = {"vexel-merge-report", folder + "base", folder + "left", "-o",
+                                        folder + "page"};
+  arguments.insert(arguments.end(), options.begin(), options.end());
+  for (const char* argument : {"--rules", "/dev/null", "--title", "</title>\xFF", "--"})
+    arguments.emplace_back(argument);
+  arguments.push_back(folder + "right");
+  const int status = RunReport(arguments);
   const ScopedRules emptied("");
   std::ifstream file(folder + "page");
   std::string page{std::istreambuf_iterator<char>(file), {}};
@@ -123,6 +129,20 @@ TEST(Report, ShowsEveryChangeAtItsOwnPlace) {
                 body("t: [a, c, d]\n  x.b: 1\n  x:\n    b: 3"));
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.t"), HasSubstr("|new order: [c, a]|+ d|+ d|from right|"));
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.x.b"), "x.b|1|2|unchanged|2|from left|");
+}
+
+TEST(Report, ShowsWhatARecordIsAboutAsOneValue) {
+  const auto script = [](const std::string& speed, const std::string& key) {
+    return Object(114, 1, "MonoBehaviour", "speeds: [1, " + speed + ", 3]\n  key: {fileID: " + key + "}");
+  };
+  const std::string keys = Lamp(10, "A", 0) + Lamp(20, "B", 0) + Lamp(30, "C", 0);
+  const std::string page =
+      PageOf(keys + script("2", "10"), keys + script("5", "20"), keys + script("7", "30"), {"--safe"});
+  EXPECT_EQ(Row(page, 1, "MonoBehaviour.speeds.1"), "speeds.1|2|5|7|2|conflict1.MonoBehaviour.speeds.1|");
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.speeds"), HasSubstr("|in conflict|"));
+  EXPECT_EQ(Row(page, 1, "MonoBehaviour.key"),
+            "key|{fileID: 10} A|{fileID: 20} B|{fileID: 30} C|{fileID: 10} A|"
+            "conflict1.MonoBehaviour.key.fileID|");
 }
 
 // Left removes the lamp that right renames, and adds another one to the pier that right removes.

@@ -43,6 +43,7 @@ TEST(FieldLabel, ReadsAsPeopleWrite) {
   EXPECT_EQ(label("1.Transform.m_LocalPosition"), "Local Position");
   EXPECT_EQ(label("1.MonoBehaviour.waves.2.useHDRColor2D"), "Waves \u203A Element 2 \u203A Use HDR Color2D");
   EXPECT_EQ(label("1"), "Whole object");
+  EXPECT_EQ(PropertyLabel("m_LocalPosition.y"), "Local Position \u203A Y");
   EXPECT_TRUE(IsSwitch(PathFromText("1.GameObject.m_IsActive")));
   EXPECT_TRUE(IsSwitch(PathFromText("1.Light.m_Enabled")));
   EXPECT_FALSE(IsSwitch(PathFromText("1.Island.m_Island")));

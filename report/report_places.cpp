@@ -1,0 +1,42 @@
+#include "report/report_places.h"
+
+#include "yaml/yaml_sequence.h"
+
+namespace vexel_yaml {
+
+bool IsNewElement(const YAMLScalar* step) {
+  const std::string& text = step->GetText();
+  return text.size() > 1 && text[0] == kNewElement && text[1] >= '0' && text[1] <= '9';
+}
+
+const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path) {
+  for (const YAMLScalar* step : path) {
+    if (node == nullptr) return nullptr;
+    if (const YAMLMapping* mapping = node->AsMapping()) {
+      node = mapping->HasDuplicateKeys() ? nullptr : mapping->Get(step);
+    } else if (const YAMLSequence* sequence = node->AsSequence()) {
+      const auto index = static_cast<size_t>(step->GetIntValue());
+      node = !IsNewElement(step) && index < sequence->Size() ? sequence->GetItems()[index] : nullptr;
+    } else {
+      return nullptr;
+    }
+  }
+  return node;
+}
+
+std::string PropertyOf(const YAMLNode* element) {
+  const YAMLNode* property = NodeAt(element, {YAMLScalar::Lookup("propertyPath")});
+  return property == nullptr || property->AsScalar() == nullptr ? std::string()
+                                                                : property->AsScalar()->GetText();
+}
+
+bool IsPartOfReference(const FieldPath& path) {
+  return path.size() > 2 && (path.back() == YAMLScalar::fileID || path.back() == YAMLScalar::guid);
+}
+
+FieldPath Above(FieldPath path) {
+  path.pop_back();
+  return path;
+}
+
+}  // namespace vexel_yaml

@@ -1,0 +1,27 @@
+#pragma once
+
+#include <string>
+
+#include "yaml/yaml_mapping.h"
+#include "yaml/yaml_scalar.h"
+
+namespace vexel_yaml {
+
+/// What the index of an element that base lacks begins with, so that no element of base has the same path.
+inline constexpr char kNewElement = '+';
+
+bool IsNewElement(const YAMLScalar* step);
+
+/// What stands at `path` below `node`; the path leads through mappings and lists. Null for a new element.
+const YAMLNode* NodeAt(const YAMLNode* node, const FieldPath& path);
+
+/// What an override of a prefab instance is about, empty for another value.
+std::string PropertyOf(const YAMLNode* element);
+
+/// Whether a path leads to one of the scalars that make up a reference.
+bool IsPartOfReference(const FieldPath& path);
+
+/// The path without its last component; it must have one.
+FieldPath Above(FieldPath path);
+
+}  // namespace vexel_yaml
