@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
+#include "report/named_note.h"
 #include "report/typed_value.h"
 #include "report/value_text.h"
 
@@ -209,7 +210,7 @@ std::string ReportJson(const MergedFiles& files, const std::string& title) {
     pending += cards.back()["pending"].get<size_t>();
   }
   Json notes = Json::array();
-  for (const SceneNote& note : files.notes) notes.push_back(OnOneLine(note.text));
+  for (const SceneNote& note : files.notes) notes.push_back(NamedNote(note.text, names));
   return Dump({{"version", kReportJsonVersion},
                {"title", OnOneLine(title)},
                {"pending", pending},

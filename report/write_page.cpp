@@ -225,7 +225,8 @@ void WriteSummary(std::ostream& out, const PageHead& head, const std::vector<Rep
   WriteSideSummary(out, kRight, head.right_path, objects);
   out << "</tbody></table>\n<ul class=\"states\" aria-label=\"Changes by state\">\n";
   const size_t pending = CountRows(objects, [](const ReportRow& row) { return row.pending; });
-  WriteState(out, pending == 1 ? "conflict to settle" : "conflicts to settle", "conflict", pending);
+  const std::string word = pending == 1 ? "conflict" : "conflicts";
+  WriteState(out, word + (head.shows_committed ? " in the merge" : " to settle"), "conflict", pending);
   WriteState(out, "settled", "",
              CountRows(objects, [](const ReportRow& row) { return row.state.starts_with("settled"); }));
   WriteState(out, "repaired", "repaired",

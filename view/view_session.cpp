@@ -9,6 +9,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "report/named_note.h"
 #include "report/report_json.h"
 #include "report/value_text.h"
 #include "view/card_order.h"
@@ -169,7 +170,8 @@ Json NamesOf(const ViewFile& file) {
 
 Json HeadOf(const ViewFile& file, Settling& settling) {
   Json notes = Json::array();
-  for (const SceneNote& note : settling.GetNotes()) notes.push_back(OnOneLine(note.text));
+  for (const SceneNote& note : settling.GetNotes())
+    notes.push_back(NamedNote(note.text, settling.GetNames()));
   return {{"version", kReportJsonVersion},
           {"mode", file.is_review ? "review" : "merge"},
           {"title", OnOneLine(file.title)},

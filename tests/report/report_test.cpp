@@ -4,6 +4,7 @@
 #include <filesystem>
 #include <fstream>
 
+#include "report/named_note.h"
 #include "report/object_names.h"
 #include "report/readable_headers.h"
 #include "report/report_command.h"
@@ -45,6 +46,8 @@ TEST(ObjectNames, PathsFollowTheHierarchyThroughGapsAndLoops) {
   EXPECT_EQ(path(28) + " " + path(34) + " " + path(58), "Harbour/Pier B/A " + std::string(97, 'x') + "...");
   EXPECT_EQ(path(94) + " " + path(60) + path(999), "Harbour/Pier/Boat Bare");
   EXPECT_EQ(names.Describe(YAMLScalar::Lookup("28")), "Light of Harbour/Pier");
+  EXPECT_EQ(NamedNote("24.Transform.m_Father is pending again: not with what stands at 10, 77 or 1", names),
+            "Harbour/Pier \u203A Parent is pending again: not with what stands at Harbour, 77 or 1");
 }
 
 TEST(ValueText, KeepsTextsOnOneLineAndInUtf8) {
