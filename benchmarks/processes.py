@@ -24,6 +24,7 @@ class Programs:
         build = build.resolve()
         self.merge = str(build / "app/VexelYAMLMerge")
         self.report = str(build / "app/vexel-merge-report")
+        self.view = str(build / "app/vexel-merge-view")
         self.git_helper = str(build / "app/vexel-merge-git")
         self.make_scene = str(build / "benchmarks/make_scene")
         self.text_floor = str(build / "benchmarks/text_floor")

@@ -6,6 +6,7 @@ from typing import Callable
 
 import git_settings
 import lists
+import page
 from processes import BrokenRun, run
 
 
@@ -84,6 +85,13 @@ def scene_and_small_one(objects, folder, programs, _rows):
             **scene(30_000, 1, folder / "small", programs, prefix="small ")}
 
 
+def page_of_scene(folder, programs, _rows):
+    files = files_in(folder)
+    page.scene_with_conflicts(programs, files)
+    commands = merge_commands(folder, programs, files)
+    return {**commands, "choice": partial(page.choices, programs, files, str(folder / "merged.vexel"))}
+
+
 def list_files(kind, counts, folder, programs, _rows):
     commands = {}
     for count in counts:
@@ -102,6 +110,7 @@ LARGE = Setting(partial(scene_and_small_one, 300_000))
 LARGEST = Setting(partial(scene_and_small_one, 1_000_000), is_large=True)
 # Both sides edit: one per cent of ten objects would be none.
 PREFAB = Setting(partial(scene, 10, 20), repeats=10)
+PAGE = Setting(page_of_scene)
 KEYED = Setting(partial(list_files, "keyed", (10_000, 100_000)))
 EQUAL = Setting(partial(list_files, "equal", (10_000,)))
 UNEQUAL = Setting(partial(list_files, "unequal", (10_000,)))
@@ -115,6 +124,7 @@ ALL = [
     Row("merge-floor", "merge / text floor", ONE_PERCENT, 2.0, "merge", "text floor"),
     Row("merge-memory", "peak memory / size of the three inputs", ONE_PERCENT, 1.5, "merge", "inputs", what="memory"),
     Row("safe", "merge --safe / merge", ONE_PERCENT, 1.3, "safe", "merge"),
+    Row("choice", "20 conflicts more: a choice on the page / merge", PAGE, 0.5, "choice", "merge"),
     Row("strip", "strip / text floor of two files", ONE_PERCENT, 2.5, "strip", "text floor of two"),
     Row("diff", "diff / text floor of two files", ONE_PERCENT, 2.5, "diff", "text floor of two"),
     Row("report", "vexel-merge-report / merge", ONE_PERCENT, 1.5, "report", "merge"),
