@@ -16,16 +16,6 @@ namespace {
 
 using Names = std::vector<std::string>;
 
-constexpr size_t kMostNames = 5;
-
-std::string ListOf(const Names& names) {
-  std::string text;
-  for (size_t i = 0; i < std::min(names.size(), kMostNames); ++i)
-    text += (i == 0 ? "" : ", ") + OnOneLine(names[i]);
-  if (names.size() > kMostNames) text += " and " + std::to_string(names.size() - kMostNames) + " more";
-  return text;
-}
-
 class Preview {
  public:
   Preview(MergedCommits merged, std::string branch)

@@ -2,7 +2,7 @@
 
 #include <cstddef>
 #include <functional>
-#include <set>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -22,7 +22,8 @@ class Questions {
 
   /// What stands at the places `kept` is not asked about. Neither `prompt` nor `entry`, what is remembered of
   /// the file, is owned, nor are these.
-  Questions(Prompt& prompt, const RecordEntry& entry, const std::set<std::string>& kept, Merge merge)
+  Questions(Prompt& prompt, const RecordEntry& entry, const std::map<std::string, std::string>& kept,
+            Merge merge)
       : prompt_(prompt), entry_(entry), kept_(kept), merge_(std::move(merge)) {}
 
   /// Asks until nothing is left or the user has had enough: about what is open or, if `again`, about all.
@@ -61,7 +62,7 @@ class Questions {
 
   Prompt& prompt_;
   const RecordEntry& entry_;
-  const std::set<std::string>& kept_;
+  const std::map<std::string, std::string>& kept_;
   const Merge merge_;
   std::vector<Question> questions_;
   std::vector<Step> steps_;

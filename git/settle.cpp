@@ -1,6 +1,7 @@
 #include "git/settle.h"
 
 #include <algorithm>
+#include <map>
 #include <set>
 #include <vector>
 
@@ -55,7 +56,7 @@ class Settling {
     TellBaseless();
     entry_.conflicts = ConflictsAfter(*merge_, versions_.asset, entry_.names, entry_.conflicts);
     for (RecordedConflict& conflict : entry_.conflicts) {
-      if (by_hand_.contains(conflict.place)) conflict.is_settled = true;
+      if (edits_.settled.contains(conflict.place)) conflict.is_settled = true;
     }
     if (entry_.CountPending() == 0) status_ = AssetMerge::kMerged;
     return {status_, std::move(merge_), std::move(text_), std::move(entry_)};
@@ -76,7 +77,7 @@ class Settling {
     AssetMerge merge(versions_);
     if (merge.RunQuietly(context_.settings) == AssetMerge::kFailed) {
       if (!choice_.side.empty() && !choice_.pattern.empty()) {
-        entry_.hash = HashOf(TextOf(versions_.right));
+        entry_.hash = HashOfAsset(asset, TextOf(versions_.right));
         has_failed_ = true;
         return true;
       }
@@ -86,7 +87,7 @@ class Settling {
       return false;
     }
     merged_ = merge.GetText();
-    entry_.hash = HashOf(merged_);
+    entry_.hash = HashOfAsset(asset, merged_);
     entry_.conflicts = ConflictsAfter(merge, asset, entry_.names, {});
     if (!choice_.side.empty() || choice_.prompt != nullptr || choice_.decided) return true;
     record_ = context_.records.Leave(
@@ -95,63 +96,69 @@ class Settling {
     return !record_.empty();
   }
 
-  std::string HashOf(std::string text) const {
-    return Line(RunProgram(HashCall(versions_.asset, std::move(text))));
-  }
-
   // What somebody has made of the asset since it was merged. False where it can't be kept, which has been
   // said.
   bool FindEdits() {
+    edits_ = {};
+    if (choice_.force) return true;
+    std::optional<HandEdits> edits = FindHandEdits(versions_, entry_, merged_, context_.settings);
+    if (!edits) return false;
+    edits_ = std::move(*edits);
+    if (edits_.text.empty() || !choice_.seen || edits_.text == *choice_.seen) return true;
     const std::string& asset = versions_.asset;
-    edited_.clear();
-    by_hand_.clear();
-    if (choice_.force || !FileExists("./" + asset)) return true;
-    const std::string text = TextOf("./" + asset);
-    if (text == merged_ || HashOf(text) == (merged_.empty() ? entry_.hash : HashOf(merged_))) return true;
-    if (HasMarkers(asset)) {
-      Complain(asset + " was merged as text; say --force to merge it anew, and lose what was edited since");
-      return false;
-    }
-    if (merged_.empty()) {
-      Complain(asset + " was edited after the merge; to take it so: " +
-               ResolveCall(asset, "resolve --as-is") + ", or say --force to lose the edits");
-      return false;
-    }
-    edited_ = text;
-    std::vector<RecordedConflict> conflicts = entry_.conflicts;
-    for (RecordedConflict& conflict : conflicts) conflict.is_settled = false;
-    const auto sides = [&] { return SideTexts{TextOf(versions_.base), TextOf(versions_.left)}; };
-    MarkSettledByHand(merged_, edited_, context_.settings, sides, conflicts);
-    for (const RecordedConflict& conflict : conflicts) {
-      if (conflict.is_settled) by_hand_.insert(conflict.place);
-    }
-    return true;
+    Complain(asset + " was edited by hand since the page was opened; save again to keep that, too: " +
+             EditedObjects(asset, merged_, edits_, context_.settings));
+    return false;
   }
 
   // Merges what was edited by hand with what the new merge makes of the conflicts.
   bool CarryEdits() {
     text_ = merge_->GetText();
-    if (edited_.empty()) return true;
+    if (edits_.text.empty()) return true;
     if (text_ == merged_) {
-      text_ = edited_;
-      return true;
+      text_ = edits_.text;
+      return AreChoicesKept();
     }
     ScratchFolder scratch;
     AssetMerge carried({versions_.asset, scratch.Write("merged", merged_), scratch.Write("chosen", text_),
-                        scratch.Write("edited", edited_)});
+                        scratch.Write("edited", edits_.text)});
     const int status = carried.RunQuietly(context_.settings);
     if (status == AssetMerge::kMerged) {
       text_ = carried.GetText();
-      return true;
+      return AreChoicesKept();
     }
     if (status == AssetMerge::kFailed) {
       carried.SayMessages();
     } else {
       SayConflicts(versions_.asset, ConflictsAfter(carried, versions_.asset, {"chosen now", "edited"}, {}));
     }
-    Complain(versions_.asset +
-             " was edited by hand, and that doesn't go with the choice; say --force to lose " + "the edits");
+    ComplainOfEdits(versions_.asset);
     return false;
+  }
+
+  // What is chosen can be what the merge had before the edit: then the edit alone would stand there.
+  bool AreChoicesKept() const {
+    std::vector<RecordedConflict> chosen;
+    const std::map<std::string, std::string> choices = merge_->GetChoices();
+    for (const RecordedConflict& conflict : entry_.conflicts) {
+      const NamedPlace place = {conflict.place, NamedPlace::NameIn(conflict.text)};
+      const bool is_new =
+          !conflict.is_settled || (!choice_.pattern.empty() && IsMeant(place, choice_.pattern));
+      if (!is_new || !edits_.settled.contains(place.place) || !choices.contains(place.place)) continue;
+      chosen.push_back(conflict);
+      chosen.back().is_settled = false;
+    }
+    const auto sides = [&] { return SideTexts{TextOf(versions_.base), TextOf(versions_.left)}; };
+    const auto lost = FindSettledByHand(merge_->GetText(), text_, context_.settings, sides, chosen);
+    for (const RecordedConflict& conflict : chosen) {
+      if (lost.contains(conflict.place)) ComplainOfEdits(NamedPlace::NameIn(conflict.text));
+    }
+    return lost.empty();
+  }
+
+  static void ComplainOfEdits(const std::string& what) {
+    Complain(what +
+             " was edited by hand, and that doesn't go with the choice; say --force to lose the edits");
   }
 
   bool Merge(const std::string& decided) {
@@ -189,7 +196,7 @@ class Settling {
     // Where nothing is open, minds can be changed about all of it.
     const bool asks_again = entry_.CountPending() == 0;
     Questions questions(
-        *choice_.prompt, entry_, by_hand_, [&](const std::vector<std::string>& chosen, bool is_blank) {
+        *choice_.prompt, entry_, edits_.settled, [&](const std::vector<std::string>& chosen, bool is_blank) {
           return Merge(is_blank ? std::string() : DecidedIn(record_, chosen)) ? merge_.get() : nullptr;
         });
     if (!questions.Ask(asks_again)) return false;
@@ -202,7 +209,7 @@ class Settling {
 
   bool HasOpen() {
     return std::ranges::any_of(merge_->GetConflicts(), [&](const NamedConflict& conflict) {
-      return !by_hand_.contains(conflict.place);
+      return !edits_.settled.contains(conflict.place);
     });
   }
 
@@ -240,7 +247,7 @@ class Settling {
       }
       if (!is_new || merges == kMostMerges) break;
     }
-    const bool is_merged = status_ == AssetMerge::kMerged || !by_hand_.empty();
+    const bool is_merged = status_ == AssetMerge::kMerged || !edits_.settled.empty();
     if (!chosen.empty() || (is_merged && choice_.pattern.empty())) return true;
     Complain("no conflict in " + versions_.asset + " fits '" + choice_.pattern + "'" +
              SuggestionFor(choice_.pattern, places));
@@ -248,7 +255,9 @@ class Settling {
   }
 
   // Whoever has settled a conflict by hand doesn't mean it without naming it.
-  bool IsKept(const std::string& place) const { return choice_.pattern.empty() && by_hand_.contains(place); }
+  bool IsKept(const std::string& place) const {
+    return choice_.pattern.empty() && edits_.settled.contains(place);
+  }
 
   const AssetVersions& versions_;
   const SettleContext& context_;
@@ -257,25 +266,15 @@ class Settling {
   // Whether the merge has failed without a choice.
   bool has_failed_ = false;
   RecordEntry entry_;
-  // How the last merge left the file, and what it has become since; empty where it is still that.
+  // How the last merge left the file, and what it has become since.
   std::string merged_;
-  std::string edited_;
-  std::set<std::string> by_hand_;
+  HandEdits edits_;
   std::string text_;
   std::unique_ptr<AssetMerge> merge_;
   int status_ = AssetMerge::kFailed;
 };
 
 }  // namespace
-
-bool HasMarkers(const std::string& asset) {
-  const std::string text = TextOf("./" + asset);
-  return text.starts_with("<<<<<<< ") || text.find("\n<<<<<<< ") != std::string::npos;
-}
-
-std::string HashOfAsset(const std::string& asset) {
-  return Line(RunProgram(HashCall(asset, TextOf("./" + asset))));
-}
 
 bool PutAsset(const std::string& asset, std::string_view text) {
   if (IsPlain(asset) && PutFile("./" + asset, text)) return true;

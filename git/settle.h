@@ -7,6 +7,7 @@
 
 #include "git/asset_merge.h"
 #include "git/conflict_records.h"
+#include "git/hand_edits.h"
 #include "git/settings.h"
 
 namespace vexel_yaml {
@@ -27,6 +28,8 @@ struct Choice {
   bool as_is = false;
   /// What has been decided already, instead of what the record says: the text of another one.
   std::optional<std::string> decided = std::nullopt;
+  /// The work tree's file as whoever has decided that has seen it: no other edits are kept unasked.
+  std::optional<std::string> seen = std::nullopt;
 };
 
 /// What settling needs to know of the repository.
@@ -63,11 +66,5 @@ Settlement Settle(const AssetVersions& versions, const SettleContext& context);
 
 /// Writes the work tree's file. Returns whether it could; else it has said so.
 bool PutAsset(const std::string& asset, std::string_view text);
-
-/// Whether the work tree's file has what a merge of texts leaves at a conflict.
-bool HasMarkers(const std::string& asset);
-
-/// The blob that git would make of the work tree's file; empty where there is none.
-std::string HashOfAsset(const std::string& asset);
 
 }  // namespace vexel_yaml

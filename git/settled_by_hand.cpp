@@ -6,6 +6,7 @@
 
 #include "git/asset_merge.h"
 #include "merge/conflict_record_file.h"
+#include "report/value_text.h"
 #include "rules/path_step.h"
 #include "scene/holders.h"
 #include "scene/list_alignment.h"
@@ -63,12 +64,22 @@ class PlaceComparison {
   PlaceComparison& operator=(const PlaceComparison&) = delete;
 
   bool IsSame(const FieldPath& place) {
+    found_ = nullptr;
     if (place.size() == 1) return IsSameObject(ResolveEscapes(place.front()));
     for (const YAMLScalar* component : place) {
       if (ReadElementName(component->GetText()) && component != place.front()) ReadSides();
     }
     FieldPath path;
     return IsSameBelow({&merged_, &later_, &base_, &theirs_}, place, path);
+  }
+
+  // What was compared last, as it stands in the later version.
+  std::string LaterText() const {
+    constexpr size_t kMostOfValue = 100;
+    if (found_ == nullptr) return {};
+    const YAMLScalar* scalar = found_->AsScalar();
+    return Shortened(OnOneLine(scalar == nullptr ? found_->GetYAMLString() : scalar->GetText()),
+                     kMostOfValue);
   }
 
  private:
@@ -110,11 +121,11 @@ class PlaceComparison {
 
   // `path` is the part of the place that has been walked.
   bool IsSameBelow(const Versions& at, const FieldPath& place, FieldPath& path) {
-    if (path.size() == place.size()) return HaveSameFields(path, at.merged, at.later);
+    if (path.size() == place.size()) return AreSame(path, at);
     const YAMLScalar* component = place[path.size()];
     if (const YAMLSequence* list = ListIn(at.merged)) return IsSameElement(*list, at, place, path);
     const YAMLMapping* mapping = at.merged == nullptr ? nullptr : at.merged->AsMapping();
-    if (mapping == nullptr || mapping->HasDuplicateKeys()) return HaveSameFields(path, at.merged, at.later);
+    if (mapping == nullptr || mapping->HasDuplicateKeys()) return AreSame(path, at);
     const YAMLScalar* key = mapping->Get(component) != nullptr || ValueOf(at.later, component) != nullptr
                                 ? component
                                 : ResolveEscapes(component);
@@ -141,12 +152,18 @@ class PlaceComparison {
                            place, path);
       }
     }
+    return AreSame(path, at);
+  }
+
+  bool AreSame(FieldPath& path, const Versions& at) {
+    found_ = at.later;
     return HaveSameFields(path, at.merged, at.later);
   }
 
   const bool is_safe_;
   const std::function<SideTexts()>& sides_;
   bool are_sides_read_ = false;
+  const YAMLNode* found_ = nullptr;
   DocumentCache cache_;
   VexelObjects merged_;
   VexelObjects later_;
@@ -156,14 +173,18 @@ class PlaceComparison {
 
 }  // namespace
 
-void MarkSettledByHand(const std::string& merged, const std::string& later, const MergeSettings& settings,
-                       const std::function<SideTexts()>& sides, std::vector<RecordedConflict>& conflicts) {
-  if (merged == later) return;
+std::map<std::string, std::string> FindSettledByHand(const std::string& merged, const std::string& later,
+                                                     const MergeSettings& settings,
+                                                     const std::function<SideTexts()>& sides,
+                                                     const std::vector<RecordedConflict>& conflicts) {
+  std::map<std::string, std::string> settled;
+  if (merged == later) return settled;
   try {
     LoadRulesAndTypes(settings);
     PlaceComparison comparison(merged, later, settings.is_safe, sides);
-    for (RecordedConflict& conflict : conflicts) {
-      if (!conflict.is_settled) conflict.is_settled = !comparison.IsSame(StringToPath(conflict.place));
+    for (const RecordedConflict& conflict : conflicts) {
+      if (conflict.is_settled || comparison.IsSame(StringToPath(conflict.place))) continue;
+      settled.emplace(conflict.place, comparison.LaterText());
     }
   } catch (const std::bad_alloc&) {
     throw;
@@ -172,6 +193,13 @@ void MarkSettledByHand(const std::string& merged, const std::string& later, cons
   } catch (const std::exception&) {
     // The same for rules that can't be read.
   }
+  return settled;
+}
+
+void MarkSettledByHand(const std::string& merged, const std::string& later, const MergeSettings& settings,
+                       const std::function<SideTexts()>& sides, std::vector<RecordedConflict>& conflicts) {
+  const auto settled = FindSettledByHand(merged, later, settings, sides, conflicts);
+  for (RecordedConflict& conflict : conflicts) conflict.is_settled |= settled.contains(conflict.place);
 }
 
 }  // namespace vexel_yaml

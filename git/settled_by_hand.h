@@ -1,6 +1,7 @@
 #pragma once
 
 #include <functional>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -24,5 +25,11 @@ struct SideTexts {
 /// in theirs; without them the whole list is compared. Where a text can't be read, nothing is marked.
 void MarkSettledByHand(const std::string& merged, const std::string& later, const MergeSettings& settings,
                        const std::function<SideTexts()>& sides, std::vector<RecordedConflict>& conflicts);
+
+/// The places of those that it would mark, each with what stands there in `later`, in short and on one line.
+std::map<std::string, std::string> FindSettledByHand(const std::string& merged, const std::string& later,
+                                                     const MergeSettings& settings,
+                                                     const std::function<SideTexts()>& sides,
+                                                     const std::vector<RecordedConflict>& conflicts);
 
 }  // namespace vexel_yaml

@@ -2,10 +2,12 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <iostream>
 #include <sstream>
 
 #include "platform/terminal_output.h"
+#include "report/value_text.h"
 
 namespace vexel_yaml {
 
@@ -55,6 +57,15 @@ void Say(std::string_view message) { Print(std::cerr, STDERR_FILENO, message); }
 void Tell(std::string_view message) { Print(std::cout, STDOUT_FILENO, message); }
 
 std::string Shown(const std::string& name) { return isatty(STDERR_FILENO) != 0 ? Escaped(name) : name; }
+
+std::string ListOf(const std::vector<std::string>& names) {
+  constexpr size_t kMostNames = 5;
+  std::string text;
+  for (size_t i = 0; i < std::min(names.size(), kMostNames); ++i)
+    text += (i == 0 ? "" : ", ") + OnOneLine(names[i]);
+  if (names.size() > kMostNames) text += " and " + std::to_string(names.size() - kMostNames) + " more";
+  return text;
+}
 
 void Complain(std::string_view message) { Say("error: " + std::string(message)); }
 

@@ -3,6 +3,7 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace vexel_yaml {
 
@@ -25,6 +26,9 @@ void Tell(std::string_view message);
 
 /// The name as a part of several lines that go to standard error.
 std::string Shown(const std::string& name);
+
+/// A few of these names in a line, and how many more there are.
+std::string ListOf(const std::vector<std::string>& names);
 
 /// Says it as an error.
 void Complain(std::string_view message);

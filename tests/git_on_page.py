@@ -125,6 +125,40 @@ def check_resolve():
     expect("the file that was given up", is_unmerged("A.vexel"), True)
 
 
+def lamp(state, field):
+    rows = [row for card in state["cards"] for part in card["objects"] for row in part["rows"]]
+    return next(row for row in rows if row["field"] == field)
+
+
+def check_hand_edits():
+    run("git", "config", "rerere.enabled", "false")
+    conflict()
+    write(77, 10, "A.vexel")
+    process, page = opened("resolve", "--web", "A.vexel")
+    state = page.state()
+    row = lamp(state, "m_Intensity")
+    expect("a conflict that was settled by hand",
+           (state["pending"], row["state"], row["result"]["text"], "path" in row, state["notes"]),
+           (0, "settled by hand", "77", False, ["Edits made by hand are kept: Lamp"]))
+    expect("its save", page.post("save", file=0)[0], 200)
+    expect("the end", process.wait(30), 0)
+    expect("what is staged", run("git", "show", ":A.vexel"), SCENE.format(77, 10))
+
+    conflict()
+    process, page = opened("resolve", "--web", "A.vexel")
+    page.take("base")
+    write(77, 10, "A.vexel")
+    for what, words in (("shown", "save again to keep that, too: Lamp"), ("kept by a choice", "m_Intensity was edited by hand")):
+        status, answer = page.post("save", file=0)
+        expect(f"an edit that isn't {what}", (status, words in answer["error"], is_unmerged("A.vexel")), (409, True, True))
+    write(2, 11, "A.vexel")
+    expect("another edit", page.post("save", file=0)[0], 409)
+    expect("which is kept now", page.post("save", file=0)[0], 200)
+    expect("what is staged", run("git", "show", ":A.vexel"), SCENE.format(2, 11))
+    process.wait(30)
+    run("git", "config", "rerere.enabled", "true")
+
+
 def check_mergetool(browser):
     run("git", "config", "rerere.enabled", "false")
     conflict()
@@ -205,6 +239,7 @@ def main():
         commit("theirs", 4, 10, "A.vexel", "B.vexel")
         commit("ours", 9, 10, "A.vexel", "B.vexel")
         check_resolve()
+        check_hand_edits()
         check_mergetool(browser)
         check_review()
         os.chdir(folder)

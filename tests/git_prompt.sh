@@ -64,6 +64,11 @@ lamps 7 1 1 >"$file"
 check "the rest is asked about" answer to
 check "and merged with them" is_at 7 2 3
 again
+again
+lamps 7 1 1 >"$file"
+check "base's value is a choice, too, that an edit doesn't go with" \
+  refuses vexel-merge-git resolve --base --path '11.Light.m_Range' "$file" 2>/dev/null
+check "the edit stays" is_at 7 1 1
 mkfifo "$work/answers"
 vexel-merge-git resolve -p <"$work/answers" >"$work/out" 2>"$work/err" &
 {

@@ -7,6 +7,7 @@
 #include "merge/conflict_record_file.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "report/record_patterns.h"
 #include "scene/safe_merge.h"
 #include "yaml/write_objects.h"
 
@@ -31,7 +32,12 @@ FinishedFile FinishFile(const SceneDocuments& read, bool safe,
   WriteObjects(*merged, text, true);
   std::ostringstream record;
   OutputConflictRecords(record, resolver, false);
-  return {std::move(text).str(), std::move(record).str(), resolver.HasPendingConflicts()};
+  FinishedFile finished = {std::move(text).str(), std::move(record).str(), {}};
+  const RecordPatterns patterns(resolver);
+  for (const RecordingConflictResolver::Record& made : resolver.GetRecords()) {
+    if (made.resolution == MergeResolve::kConflict) finished.pending.push_back(patterns.For(made));
+  }
+  return finished;
 }
 
 void StoreResult(const std::string& path, const std::string& text, const std::string& record_path,

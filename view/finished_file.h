@@ -11,7 +11,8 @@ namespace vexel_yaml {
 struct FinishedFile {
   std::string text;
   std::string record;
-  bool has_pending = false;
+  /// The places of the conflicts that nobody has settled.
+  std::vector<std::string> pending;
 };
 
 /// Merges what has been read as the merge command does with these resolutions. Throws what merging and

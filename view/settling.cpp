@@ -171,9 +171,25 @@ void Settling::RenewNames() {
 
 std::vector<ReportCard> Settling::MakeCardsOf(const MergedFiles& files) {
   std::vector<ReportObject> objects = CollectReport(files, *names_, NamesInNotes(file_));
+  ShowSettledByHand(objects);
   FindScripts(objects);
   for (ReportObject& object : objects) object.class_name = names_->GetClass(object.file_id);
   return MakeCards(std::move(objects), *names_);
+}
+
+// Its record is still pending, since none of the sides counts there.
+void Settling::ShowSettledByHand(std::vector<ReportObject>& objects) const {
+  if (file_.settled_by_hand.empty()) return;
+  for (ReportObject& object : objects) {
+    for (ReportRow& row : object.rows) {
+      const auto settled = file_.settled_by_hand.find(row.record_path);
+      if (settled == file_.settled_by_hand.end()) continue;
+      row.pending = false;
+      row.state = "settled by hand";
+      row.result = {ReportCell::Kind::kChanged, settled->second, {}};
+    }
+    object.pending = std::ranges::any_of(object.rows, &ReportRow::pending);
+  }
 }
 
 // Whether each card stands for objects of one group alone, of `group` unless that is null.
@@ -235,7 +251,8 @@ void Settling::Save() {
   }
   try {
     const FinishedFile finished = FinishFile(whole_, file_.safe, AllResolutions());
-    if (finished.has_pending)
+    const auto is_by_hand = [&](const std::string& path) { return file_.settled_by_hand.contains(path); };
+    if (!std::ranges::all_of(finished.pending, is_by_hand))
       throw std::runtime_error("The whole file has conflicts that its changed parts don't show");
     file_.store(finished.text, finished.record);
   } catch (const YAMLError& error) {

@@ -33,6 +33,11 @@ struct ViewFile {
   std::string base_name = {};
   std::string theirs_name = {};
   std::string ours_name = {};
+  /// The places of conflicts that are settled elsewhere, such as by hand in the file, with what stands there:
+  /// they are shown, and there is nothing to choose.
+  std::map<std::string, std::string> settled_by_hand = {};
+  /// What is to be said about the file beside the merge's own notes; may be empty.
+  std::string note = {};
   /// Finds the classes of scripts; may be empty.
   ScriptSearch script_search = {};
   /// Keeps a finished file and the text of its record; throws a std::exception or YAMLError that says why it
@@ -93,6 +98,7 @@ class Settling {
   bool TakeOver(const EditGroups::Group& group, const MergedFiles& part);
   void RenewNames();
   std::vector<ReportCard> MakeCardsOf(const MergedFiles& files);
+  void ShowSettledByHand(std::vector<ReportObject>& objects) const;
   bool AreOfTheirGroups(const std::vector<ReportCard>& cards, const EditGroups::Group* group);
   void FindScripts(const std::vector<ReportObject>& objects);
   void AddPlaces(const std::vector<ReportCard>& cards);

@@ -170,6 +170,7 @@ Json NamesOf(const ViewFile& file) {
 
 Json HeadOf(const ViewFile& file, Settling& settling) {
   Json notes = Json::array();
+  if (!file.note.empty()) notes.push_back(OnOneLine(file.note));
   for (const SceneNote& note : settling.GetNotes())
     notes.push_back(NamedNote(note.text, settling.GetNames()));
   return {{"version", kReportJsonVersion},

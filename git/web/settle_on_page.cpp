@@ -4,6 +4,7 @@
 #include <iostream>
 #include <memory>
 #include <stdexcept>
+#include <utility>
 
 #include "git/captured_errors.h"
 #include "git/decided_lines.h"
@@ -81,6 +82,37 @@ ViewFile PageFile(const AssetVersions& versions, const MergeSettings& settings,
   return file;
 }
 
+// Takes what was edited by hand over. False where it can't be kept, which has been said.
+bool ShowHandEdits(const AssetVersions& versions, const MergeSettings& settings, const Repository& repository,
+                   ViewFile& file) {
+  const ConflictRecords records(repository);
+  if (records.Find(versions.asset).empty()) return true;
+  const std::string merged = records.MergedText(versions.asset);
+  const auto edits = FindHandEdits(versions, records.Entry(versions.asset), merged, settings);
+  if (!edits) return false;
+  file.settled_by_hand = edits->settled;
+  if (edits->text.empty()) return true;
+  file.note = "Edits made by hand are kept: " + EditedObjects(versions.asset, merged, *edits, settings);
+  return true;
+}
+
+// The choice of whoever has settled the file on the page. What was edited meanwhile is shown by a refusal.
+class PageChoice {
+ public:
+  explicit PageChoice(const std::string& asset) : path_("./" + asset), seen_(TextOf(path_)) {}
+
+  Choice Next(const std::string& record) {
+    Choice choice;
+    choice.decided = record;
+    choice.seen = std::exchange(seen_, TextOf(path_));
+    return choice;
+  }
+
+ private:
+  const std::string path_;
+  std::string seen_;
+};
+
 // A file with its versions, which are there as long as the page is.
 class ResolvedFile {
  public:
@@ -96,22 +128,25 @@ class ResolvedFile {
       Complain(asset_ + " was merged as text: edit it, and 'git add' it");
       return false;
     }
-    ViewFile& file = files.emplace_back(PageFile(versions, settings_, repository_));
+    ViewFile file = PageFile(versions, settings_, repository_);
+    if (!force_ && !ShowHandEdits(versions, settings_, repository_, file)) return false;
     file.store = [this](const std::string&, const std::string& record) { Store(record); };
+    files.push_back(std::move(file));
     return true;
   }
 
  private:
   // Merged once more with what has been decided, as by any other way to settle it.
-  void Store(const std::string& record) const {
+  void Store(const std::string& record) {
     if (!stages_.AreSame()) {
       throw std::runtime_error(asset_ +
                                " is no longer in the conflict that it was in when the page was opened");
     }
-    Choice choice;
-    choice.force = force_;
-    choice.decided = record;
-    OrThrow([&] { return Resolving(repository_, settings_, choice).Resolve(asset_); });
+    OrThrow([&] {
+      Choice choice = choice_.Next(record);
+      choice.force = force_;
+      return Resolving(repository_, settings_, choice).Resolve(asset_);
+    });
   }
 
   const Repository& repository_;
@@ -119,6 +154,7 @@ class ResolvedFile {
   const std::string asset_;
   const bool force_;
   const StageFiles stages_;
+  PageChoice choice_{asset_};
   ScratchFolder scratch_{repository_};
 };
 
@@ -150,11 +186,11 @@ int MergetoolOnPage(const std::vector<std::string>& arguments) {
   const MergeSettings settings = SettingsQuery().Get();
   const Repository repository;
   LoadForPage(settings);
+  PageChoice choice(versions.asset);
   ViewFile file = PageFile(versions, settings, repository);
+  if (!ShowHandEdits(versions, settings, repository, file)) return 1;
   file.store = [&](const std::string&, const std::string& record) {
-    Choice choice;
-    choice.decided = record;
-    OrThrow([&] { return SettleForMergetool(versions, choice) == AssetMerge::kMerged; });
+    OrThrow([&] { return SettleForMergetool(versions, choice.Next(record)) == AssetMerge::kMerged; });
   };
   return ShowPage({file}, PageOptions({}, true));
 }
