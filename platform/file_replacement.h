@@ -41,6 +41,9 @@ class FileReplacement {
 
   std::ostream& Stream() { return *stream_; }
 
+  /// Whether `Commit` writes it in place, which can still fail for want of room.
+  bool IsInPlace() const { return target_descriptor_ >= 0; }
+
   /// Ends the writing and brings the text to the disk, while the destination stays as it was: the step that
   /// fails on a full disk. Throws FileError.
   void Finish();

@@ -39,7 +39,7 @@ def node(name, number, father, children, fields=""):
 class View:
     """A running program, and what its page would ask."""
 
-    def __init__(self, versions, *options, **environment):
+    def __init__(self, versions, *options, merged=None, **environment):
         self.folder = Path(tempfile.mkdtemp(dir=WORK))
         self.versions = []
         for name, text in zip(("base", "left", "right"), versions):
@@ -51,7 +51,7 @@ class View:
         self.merged.write_text("as it was\n")
         if "BROWSER" not in environment:
             options += ("--no-browser",)
-        self.program = subprocess.Popen([VIEW, *options, "--", *self.versions, str(self.merged)],
+        self.program = subprocess.Popen([VIEW, *options, "--", *self.versions, merged or str(self.merged)],
                                         stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True,
                                         env={**os.environ, **environment})
         self.address = self.program.stdout.readline().strip()
@@ -277,13 +277,23 @@ def ends_with_its_page():
 
 
 def says_what_is_wrong():
-    view = View(examples(), "--idle-timeout", "8", "-o", "/nowhere/record")
-    view.choose(**{LIGHT: "ours", DELAY: "ours"})
-    status, answer = view.post("save", file=0)
-    expect("a record that can't be written", (status, "/nowhere/record" in answer["error"]), (409, True))
-    expect("the program left alone", view.end(), (1, "as it was\n"))
-    broken = subprocess.run([VIEW, *view.versions[:2], "/nowhere/right", "merged"], capture_output=True, text=True)
-    expect("a file that can't be read", (broken.returncode, broken.stdout, broken.stderr.count("\n")), (1, "", 1))
+    for record, other in (("/dev/full", "the result"), ("record", "the record")):
+        view = View(examples(), "--idle-timeout", "8", "-o", record, merged="/dev/full" if record == "record" else None)
+        Path("record").write_text("as it was\n")
+        view.choose(**{LIGHT: "ours", DELAY: "ours"})
+        status, answer = view.post("save", file=0)
+        expect(f"no room beside {other}", (status, "/dev/full" in answer["error"]), (409, True))
+        expect("the program left alone", view.end(), (1, "as it was\n"))
+        expect("its record", Path("record").read_text(), "as it was\n")
+
+    os.symlink(view.versions[1], "link")
+    for what, *arguments in (("a file that can't be read", *view.versions[:2], "/nowhere/right", "merged"),
+                             ("a record that can't be written", "-o", "/nowhere/record", *view.versions, "merged"),
+                             ("a result that can't be written", *view.versions, "/nowhere/merged"),
+                             ("a record in the result's place", "-o", "./merged", *view.versions, "merged"),
+                             ("a record in a version's place", "-o", "link", *view.versions, "merged")):
+        done = subprocess.run([VIEW, "--no-browser", "--idle-timeout", "8", *arguments], capture_output=True, text=True)
+        expect(what, (done.returncode, done.stdout, done.stderr.count("\n")), (1, "", 1))
 
 
 with tempfile.TemporaryDirectory() as WORK:

@@ -1,7 +1,9 @@
 #include "view/finished_file.h"
 
+#include <filesystem>
 #include <optional>
 #include <sstream>
+#include <system_error>
 
 #include "fixups/post_process.h"
 #include "merge/conflict_record_file.h"
@@ -40,6 +42,13 @@ FinishedFile FinishFile(const SceneDocuments& read, bool safe,
   return finished;
 }
 
+void CheckDestination(const std::string& path) {
+  const std::string native = VexelToNativePath(path);
+  std::error_code error;
+  // It would wait for its reader.
+  if (!std::filesystem::is_fifo(native, error)) FileReplacement{native};
+}
+
 void StoreResult(const std::string& path, const std::string& text, const std::string& record_path,
                  const std::string& record) {
   // Neither before both are on the disk, and the result last: whoever sees it may stage it.
@@ -52,8 +61,11 @@ void StoreResult(const std::string& path, const std::string& text, const std::st
   FileReplacement result(VexelToNativePath(path));
   result.Stream() << text;
   result.Finish();
+  // What is written in place may still find no room.
+  const bool is_in_place = result.IsInPlace();
+  if (is_in_place) result.Commit();
   if (record_file) record_file->Commit();
-  result.Commit();
+  if (!is_in_place) result.Commit();
 }
 
 }  // namespace vexel_yaml

@@ -20,6 +20,9 @@ struct FinishedFile {
 FinishedFile FinishFile(const SceneDocuments& read, bool safe,
                         std::vector<RecordingConflictResolver::RecordResolve> resolutions);
 
+/// Throws FileError for a path that nothing could be written to, as far as that can be told without writing.
+void CheckDestination(const std::string& path);
+
 /// Replaces the file at `path`, and that of the record unless its path is empty; both or, as far as that can
 /// be told before, none. Throws FileError.
 void StoreResult(const std::string& path, const std::string& text, const std::string& record_path,

@@ -1,11 +1,15 @@
 #include "view/view_command.h"
 
 #include <charconv>
+#include <filesystem>
 #include <iostream>
 #include <new>
 #include <string_view>
+#include <system_error>
 
 #include "platform/error_channel.h"
+#include "platform/file_replacement.h"
+#include "platform/files.h"
 #include "platform/temporary_files.h"
 #include "report/value_text.h"
 #include "rules/setup.h"
@@ -111,9 +115,33 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   return parsed;
 }
 
+// Whether both are one file, or would be.
+bool AreSame(const std::string& path, const std::string& other) {
+  const auto first = std::filesystem::absolute(FollowLinks(VexelToNativePath(path)));
+  const auto second = std::filesystem::absolute(FollowLinks(VexelToNativePath(other)));
+  std::error_code error;
+  // A terminal, or what takes everything, can be both.
+  if (std::filesystem::exists(first, error) && !std::filesystem::is_regular_file(first, error)) return false;
+  return std::filesystem::equivalent(first, second, error) ||
+         std::filesystem::weakly_canonical(first, error) == std::filesystem::weakly_canonical(second, error);
+}
+
+// Throws what speaks against writing to the destinations, so that nobody settles conflicts for nothing.
+void CheckDestinations(const Arguments& arguments) {
+  CheckDestination(arguments.merged);
+  if (arguments.record.empty()) return;
+  const ViewFile& file = arguments.file;
+  for (const std::string& path : {file.base_path, file.left_path, file.right_path, arguments.merged}) {
+    if (AreSame(arguments.record, path))
+      throw std::runtime_error("the record (-o) would replace '" + path + "'");
+  }
+  CheckDestination(arguments.record);
+}
+
 int View(Arguments arguments) {
   const TempFilesGuard guard;
   TimerStat silent("", nullptr);
+  CheckDestinations(arguments);
   SetupRulesAndTypes(arguments.rules, arguments.type_info, silent);
   if (!arguments.resolutions.empty()) arguments.file.resolutions = ReadResolutions(arguments.resolutions);
   arguments.file.store = [&](const std::string& text, const std::string& record) {
