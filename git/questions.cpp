@@ -19,28 +19,34 @@ std::string InWordsOfPeople(const std::string& word) {
 
 bool Questions::Ask(bool again) {
   if (!Begin(again)) return false;
-  size_t at = 0;
-  while (at < questions_.size()) {
-    if (!IsWanted(questions_[at])) {
-      ++at;
-      continue;
-    }
-    const Prompt::Reply reply = AskAbout(at);
+  for (std::optional<size_t> next = FindNext(0); next; next = FindNext(*next)) {
+    const Prompt::Reply reply = AskAbout(*next);
     switch (reply.answer) {
       case Prompt::Answer::kQuit:
         return true;
       case Prompt::Answer::kBack:
-        if (!GoBack(at)) return false;
+        if (!GoBack(*next)) return false;
         break;
       case Prompt::Answer::kSkip:
-        steps_.push_back({at++, {}});
+        steps_.push_back({*next, {}});
         break;
       default:
-        if (!Take(at, WordOf(reply.answer), reply.is_for_thing)) return false;
-        if (!questions_[at].chosen.empty()) ++at;
+        if (!Take(*next, WordOf(reply.answer), reply.is_for_thing)) return false;
     }
   }
   return true;
+}
+
+// From the beginning again behind the last one: an answer can open an earlier question once more.
+std::optional<size_t> Questions::FindNext(size_t from) const {
+  const auto is_skipped = [&](size_t at) {
+    return std::ranges::any_of(steps_, [&](const Step& s) { return s.at == at && s.chosen.empty(); });
+  };
+  for (size_t i = 0; i < questions_.size(); ++i) {
+    const size_t at = (from + i) % questions_.size();
+    if (IsWanted(questions_[at]) && !is_skipped(at)) return at;
+  }
+  return std::nullopt;
 }
 
 bool Questions::Begin(bool again) {

@@ -3,6 +3,7 @@
 #include <cstddef>
 #include <functional>
 #include <map>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -47,6 +48,8 @@ class Questions {
   };
 
   bool Begin(bool again);
+  /// The first one from there on that is to be asked about; nothing where none is left.
+  std::optional<size_t> FindNext(size_t from) const;
   void TellHeading();
   Prompt::Reply AskAbout(size_t at);
   bool Take(size_t at, const std::string& side, bool is_for_thing);

@@ -200,7 +200,7 @@ class Settling {
           return Merge(is_blank ? std::string() : DecidedIn(record_, chosen)) ? merge_.get() : nullptr;
         });
     if (!questions.Ask(asks_again)) return false;
-    if (!questions.HaveDecided() && (choice_.prompt->HasQuit() || HasOpen())) {
+    if (!questions.HaveDecided() && HasOpen()) {
       Say("Nothing is settled in " + versions_.asset);
       return false;
     }

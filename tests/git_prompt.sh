@@ -46,7 +46,8 @@ check "the file is staged" test -z "$(git ls-files -u)"
 check "a mind can be changed before the commit" answer sosq
 check "knowing what it was" grep -qFx '  now     theirs' "$work/out"
 check "for one place alone" is_at 2 3 2
-check "who quits then changes nothing" refuses answer sq
+check "who quits then changes nothing" answer sq
+check "and is told that nothing is left" grep -q "Resolved $file$" "$work/out"
 check "it is still staged" is_at 2 3 2
 
 again
