@@ -93,6 +93,7 @@ void TellTools(const MergeConfig& config) {
   set("VEXEL_RULES", config.rules_file);
   set("VEXEL_TYPE_INFO", config.type_info_file);
   set("VEXEL_CHOICES", config.merge_file);
+  set("VEXEL_RECORD", config.conflict_file);
   set("VEXEL_SAFE", config.safe ? "1" : "");
 }
 

@@ -35,6 +35,7 @@ settle_on_page() {
   [ -z "${VEXEL_RULES-}" ] || set -- "$@" --rules "$VEXEL_RULES"
   [ -z "${VEXEL_TYPE_INFO-}" ] || set -- "$@" --typeInfo "$VEXEL_TYPE_INFO"
   [ -z "${VEXEL_CHOICES-}" ] || set -- "$@" -i "$VEXEL_CHOICES"
+  [ -z "${VEXEL_RECORD-}" ] || set -- "$@" -o "$VEXEL_RECORD"
   # Standard output is for the records of the merge.
   use "${VEXEL_DATA_FILES-}/vexel-merge-view" "$@" -- "$VEXEL_BASE" "$VEXEL_LEFT" "$VEXEL_RIGHT" "$result" >&2
 }

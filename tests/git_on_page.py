@@ -202,8 +202,9 @@ def check_others(browser):
         write(*values, f"{name}.vexel")
     merge = ("VexelYAMLMerge", "merge", "-h", "--safe", "base.vexel", "left.vexel", "right.vexel", "out.vexel")
     run(*merge, status=1, CI="true", TERM="dumb", **page)
-    run(*merge, **page)
+    run(*merge[:4], "-o", "record", *merge[4:], **page)
     expect("the result of the default tools", Path("out.vexel").read_text(), SCENE.format(9, 20))
+    expect("its record", "Right 11.Light.m_Intensity\n" in Path("record").read_text(), True)
     run("hg", "init", "hg")
     os.chdir("hg")
     for name in ("base", "left", "right"):
