@@ -89,10 +89,11 @@ constexpr std::string_view kCellNames[] = {"base", "theirs", "ours", "result"};
 
 // Only where no version holds anything else: a field may be named like a switch and count something.
 bool IsSwitchRow(const ReportRow& row) {
-  return IsSwitch(row.path) && std::ranges::all_of(kCells, [&](const auto cell) {
-           const YAMLNode* node = (row.*cell).node;
-           return node == nullptr || node == YAMLScalar::zero || node == YAMLScalar::one;
-         });
+  const auto is_on_or_off = [](const ReportCell& cell) {
+    return cell.node == nullptr || cell.node == YAMLScalar::zero || cell.node == YAMLScalar::one;
+  };
+  return IsSwitch(row.path) && is_on_or_off(row.committed) &&
+         std::ranges::all_of(kCells, [&](const auto cell) { return is_on_or_off(row.*cell); });
 }
 
 // What is the same in objects of one class; empty for a whole object.
@@ -101,7 +102,7 @@ std::string PropertyName(const ReportRow& row) {
   return row.path.size() < 2 ? std::string() : PathToString({row.path.begin() + 1, row.path.end()});
 }
 
-Json RowJson(const ReportRow& row, ObjectNames& names) {
+Json RowJson(const ReportRow& row, ObjectNames& names, bool shows_committed) {
   Json json = {{"key", Cleaned(PathToString(row.path))}};
   const std::string path = ChoicePath(row);
   if (!path.empty()) json["path"] = path;
@@ -118,12 +119,13 @@ Json RowJson(const ReportRow& row, ObjectNames& names) {
   for (size_t i = 0; i < std::size(kCells); ++i) {
     json[std::string(kCellNames[i])] = CellJson(row.*kCells[i], is_switch, names);
   }
+  if (shows_committed) json["committed"] = CellJson(row.committed, is_switch, names);
   return json;
 }
 
-Json ObjectJson(const ReportObject& object, ObjectNames& names) {
+Json ObjectJson(const ReportObject& object, ObjectNames& names, bool shows_committed) {
   Json rows = Json::array();
-  for (const ReportRow& row : object.rows) rows.push_back(RowJson(row, names));
+  for (const ReportRow& row : object.rows) rows.push_back(RowJson(row, names, shows_committed));
   const std::string script = names.GetScriptClass(names.GetScriptGuid(object.file_id));
   return {{"id", Cleaned(object.file_id->GetText())},
           {"class", OnOneLine(object.class_name)},
@@ -132,14 +134,14 @@ Json ObjectJson(const ReportObject& object, ObjectNames& names) {
           {"rows", std::move(rows)}};
 }
 
-Json Card(const ReportCard& card, ObjectNames& names) {
+Json Card(const ReportCard& card, ObjectNames& names, bool shows_committed) {
   Json sides = Json::array();
   Json kinds = Json::array();
   Json objects = Json::array();
   size_t pending = 0;
   size_t settled = 0;
   for (const ReportObject& object : card.objects) {
-    objects.push_back(ObjectJson(object, names));
+    objects.push_back(ObjectJson(object, names, shows_committed));
     for (const ReportRow& row : object.rows) {
       pending += row.pending ? 1 : 0;
       settled += row.state.starts_with(kSettled) ? 1 : 0;
@@ -199,14 +201,14 @@ std::string ChoicePath(const ReportRow& row) {
   return path;
 }
 
-std::string CardJson(const ReportCard& card, ObjectNames& names) { return Dump(Card(card, names)); }
+std::string CardJson(const ReportCard& card, ObjectNames& names) { return Dump(Card(card, names, false)); }
 
 std::string ReportJson(const MergedFiles& files, const std::string& title) {
   ObjectNames names = NamesOf(files);
   Json cards = Json::array();
   size_t pending = 0;
   for (const ReportCard& card : MakeCards(CollectReport(files, names, {"theirs", "ours"}), names)) {
-    cards.push_back(Card(card, names));
+    cards.push_back(Card(card, names, files.committed != nullptr));
     pending += cards.back()["pending"].get<size_t>();
   }
   Json notes = Json::array();

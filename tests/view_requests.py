@@ -125,6 +125,8 @@ def settles_as_merge_does(*mode):
     subprocess.run([MERGE, "merge", "-h", "--force", "--fallback", "none", *mode, "-i", "record", "-o", os.devnull,
                     *view.versions, again], check=True)
     expect("the merge with the same choices is the same", again.read_text() == merged, True)
+    report = subprocess.run([REPORT, "--json", *mode, "--committed", again, *view.versions], capture_output=True, check=True)
+    expect("what a report says of it in the end", rows(json.loads(report.stdout))[LIGHT]["committed"]["text"], "4")
 
 
 def a_choice_settles_what_follows():
