@@ -51,12 +51,17 @@ std::string KeysText(const YAMLMappingDiff& diff) {
   return text;
 }
 
+// Null for any other operation, or none.
+const YAMLMappingDiff* ChangedMapping(const Operation* operation) {
+  if (operation == nullptr || operation->GetKind() != Operation::Kind::kChangeMapping) return nullptr;
+  return static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
+}
+
 // The fields of an object: it has one entry, which is its body.
 const YAMLMappingDiff& BodyDiff(const YAMLMappingDiff& object) {
   if (object.GetEntries().size() != 1) return object;
-  const Operation* body = object.GetEntries().front().operation;
-  if (body == nullptr || body->GetKind() != Operation::Kind::kChangeMapping) return object;
-  return *static_cast<const ChangeMappingOperation*>(body)->GetDiff();
+  const YAMLMappingDiff* body = ChangedMapping(object.GetEntries().front().operation);
+  return body == nullptr ? object : *body;
 }
 
 const YAMLScalar* NewScalar(const Operation* operation) {
@@ -236,7 +241,11 @@ class ConflictNamer {
       case Operation::Kind::kChangeMapping: {
         const YAMLMappingDiff& diff = *static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
         if (record.path.size() > 1) {
-          if (IsAboutFather(record.path) && NewTarget(diff) != nullptr) return MoveText(NewTarget(diff));
+          if (IsAboutFather(record.path) && NewTarget(diff) != nullptr) {
+            return "moves it" + WhereText(NewTarget(diff));
+          }
+          const std::string moves = IsAboutFather(record.path) ? OtherMovesText(diff) : std::string();
+          if (!moves.empty()) return moves;
           std::string values = NewTarget(diff) == nullptr ? ScalarsText(diff) : NewTargetText(diff);
           return OnOneLine(values.empty() ? MappingText(diff) : values);
         }
@@ -280,8 +289,24 @@ class ConflictNamer {
     return NewScalar(change);
   }
 
-  std::string MoveText(const YAMLScalar* father) {
-    return IsNullReference(father) ? "moves it to the top" : "moves it below " + PlaceText(father);
+  std::string WhereText(const YAMLScalar* father) {
+    return IsNullReference(father) ? " to the top" : " below " + PlaceText(father);
+  }
+
+  // A side can have its part in a circle without having moved this object. The diff is by file IDs then.
+  std::string OtherMovesText(const YAMLMappingDiff& diff) {
+    std::string text;
+    for (const YAMLMappingDiff::Entry& entry : diff.GetEntries()) {
+      const Operation* father = nullptr;
+      if (const YAMLMappingDiff* fields = ChangedMapping(entry.operation)) {
+        father = BodyDiff(*fields).Get(YAMLScalar::mFather);
+      }
+      const YAMLMappingDiff* reference = ChangedMapping(father);
+      const YAMLScalar* target = reference == nullptr ? nullptr : NewTarget(*reference);
+      if (target == nullptr) continue;
+      text += (text.empty() ? "moves " : ", ") + PlaceText(entry.key) + WhereText(target);
+    }
+    return text;
   }
 
   std::string NewTargetText(const YAMLMappingDiff& diff) {

@@ -115,5 +115,9 @@ check "which is asked again after an answer that contradicts the first one" \
   grep -q '  not settled by that: Object 2 > Transform > m_Father$' "$work/out"
 check "it is announced" grep -q '^  open now: Object 2 > Transform > m_Father$' <(sed 's/.*? //' "$work/out")
 check "it says where to" grep -qFx '  ours    moves it below Object 3' "$work/out"
+git reset -q --hard && commit theirs objects 21 31 0 && commit ours objects 0 0 11
+again
+check "who moved others into a circle is said to" refuses answer q
+check "by their names" grep -qFx '  ours    moves Object 3 below Object 1' "$work/out"
 
 end_of_checks "people are asked"
