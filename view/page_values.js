@@ -50,8 +50,6 @@ function shownValue(value, before) {
       return make("span", "", swatch(value), " ", partsOf(colourParts(value), parts(colourParts)));
     case "boolean":
       return make("span", value.on ? "switch on" : "switch", value.on ? "on" : "off");
-    case "enum":
-      return value.name ? make("span", "", value.name, " ", make("span", "quiet", value.number)) : null;
     case "reference":
       return reference(value);
     default:
