@@ -44,6 +44,9 @@ class Page:
         answer = connection.getresponse()
         return answer.status, json.loads(answer.read() or b"{}")
 
+    def save(self, file=0):
+        return self.post("save", file=file, revision=self.state(file)["revision"])
+
     def take(self, side, file=0):
         state = self.state(file)
         rows = [row for card in state["cards"] for part in card["objects"] for row in part["rows"] if row["pending"]]
@@ -55,7 +58,7 @@ def settle_as_browser(side, address):
     # The first address leads to the page's own.
     page = Page(urllib.request.urlopen(address, timeout=60).geturl())
     page.take(side)
-    page.post("save", file=0)
+    page.save()
 
 
 def run(*command, status=0, **env):
@@ -99,17 +102,17 @@ def check_resolve():
     state = page.state()
     expect("the sides", state["names"], {"base": "", "theirs": "Test, theirs", "ours": "Test, ours"})
     expect("the files", [file["title"] for file in state["files"]], ["A.vexel", "B.vexel"])
-    expect("what is saved too early", page.post("save", file=0)[0], 409)
+    expect("what is saved too early", page.save()[0], 409)
     page.take("theirs")
-    expect("the next file", page.post("save", file=0), (200, {"saved": True, "next": 1}))
+    expect("the next file", page.save(), (200, {"saved": True, "next": 1}))
     expect("what is still in conflict", [is_unmerged(file) for file in ("A.vexel", "B.vexel")], [False, True])
     page.take("ours", file=1)
     write(7, 7, "B.vexel")
-    status, answer = page.post("save", file=1)
+    status, answer = page.save(1)
     expect("a save over edits", (status, "edited by hand" in answer["error"]), (409, True))
     expect("the edited file", Path("B.vexel").read_text(), SCENE.format(7, 7))
     run("git", "checkout", "-q", "-m", "--", "B.vexel")
-    expect("a save without them", page.post("save", file=1)[0], 200)
+    expect("a save without them", page.save(1)[0], 200)
     expect("the end", process.wait(30), 0)
     run("git", "add", "notes.txt")
     run("git", "commit", "-q", "-m", "merged")
@@ -140,7 +143,7 @@ def check_hand_edits():
     expect("a conflict that was settled by hand",
            (state["pending"], row["state"], row["result"]["text"], "path" in row, state["notes"]),
            (0, "settled by hand", "77", False, ["Edits made by hand are kept: Lamp"]))
-    expect("its save", page.post("save", file=0)[0], 200)
+    expect("its save", page.save()[0], 200)
     expect("the end", process.wait(30), 0)
     expect("what is staged", run("git", "show", ":A.vexel"), SCENE.format(77, 10))
 
@@ -149,11 +152,11 @@ def check_hand_edits():
     page.take("base")
     write(77, 10, "A.vexel")
     for what, words in (("shown", "save again to keep that, too: Lamp"), ("kept by a choice", "m_Intensity was edited by hand")):
-        status, answer = page.post("save", file=0)
+        status, answer = page.save()
         expect(f"an edit that isn't {what}", (status, words in answer["error"], is_unmerged("A.vexel")), (409, True, True))
     write(2, 11, "A.vexel")
-    expect("another edit", page.post("save", file=0)[0], 409)
-    expect("which is kept now", page.post("save", file=0)[0], 200)
+    expect("another edit", page.save()[0], 409)
+    expect("which is kept now", page.save()[0], 200)
     expect("what is staged", run("git", "show", ":A.vexel"), SCENE.format(2, 11))
     process.wait(30)
     run("git", "config", "rerere.enabled", "true")

@@ -57,6 +57,7 @@ class View:
         self.address = self.program.stdout.readline().strip()
         host, self.secret = self.address.removeprefix("http://").rstrip("/").split("/")
         self.port = int(host.split(":")[1])
+        self.revision = 1
 
     def raw(self, method, path, body=None, **headers):
         connection = http.client.HTTPConnection("127.0.0.1", self.port, timeout=60)
@@ -66,14 +67,20 @@ class View:
 
     def get(self, place):
         answer, body = self.raw("GET", f"/{self.secret}/{place}")
-        return answer.status, json.loads(body)
+        return self.read(answer, body)
 
     def post(self, place, **request):
+        request = {"file": 0, "revision": self.revision, **request}
         answer, body = self.raw("POST", f"/{self.secret}/{place}", json.dumps(request), Content_Type="application/json")
-        return answer.status, json.loads(body)
+        return self.read(answer, body)
+
+    def read(self, answer, body):
+        content = json.loads(body)
+        self.revision = content.get("revision", self.revision)
+        return answer.status, content
 
     def choose(self, **choices):
-        return self.post("choose", file=0, choices=[{"path": path, "choice": side} for path, side in choices.items()])
+        return self.post("choose", choices=[{"path": path, "choice": side} for path, side in choices.items()])
 
     def end(self):
         """The exit status, and what is at the destination."""
@@ -100,17 +107,20 @@ def settles_as_merge_does(*mode):
     light = rows(state)[LIGHT]
     expect("their light", light["theirs"], {"kind": "changed", "text": "4", "value": {"type": "number", "number": "4"}})
     expect("its name", (light["label"], light["path"], light["choice"]), ("Intensity", LIGHT, None))
-    expect("a save too early", view.post("save", file=0), (409, {"error": "2 conflicts are not settled yet"}))
+    expect("a save too early", view.post("save"), (409, {"error": "2 conflicts are not settled yet"}))
 
     status, delta = view.choose(**{LIGHT: "theirs"})
     expect("a choice", (status, delta["pending"], [card["key"] for card in delta["changed"]]), (200, 1, ["100300"]))
     expect("a settled place", rows(delta, "changed")[LIGHT]["result"]["text"], "4")
-    expect("a choice from an old page", view.post("choose", file=0, revision=1, choices=[])[0], 409)
+    for place in ("choose", "undo", "redo", "save"):
+        expect(f"{place} from an old page", view.post(place, revision=1, choices=[])[0], 409)
+        answer, _ = view.raw("POST", f"/{view.secret}/{place}", '{"file": 0, "choices": []}', Content_Type="application/json")
+        expect(f"{place} from any page", answer.status, 400)
     view.choose(**{DELAY: "ours", LIGHT: "base"})
-    _, state = view.post("undo", file=0)
+    _, state = view.post("undo")
     expect("what is taken back", (state["pending"], state["can_undo"], state["can_redo"]), (1, True, True))
     _, before = view.get("state")
-    _, state = view.post("redo", file=0)
+    _, state = view.post("redo")
     expect("what is done again", (state["pending"], state["can_redo"]), (0, False))
     view.choose(**{LIGHT: None})
     _, state = view.get("state")
@@ -118,7 +128,7 @@ def settles_as_merge_does(*mode):
     expect("the order", [card["key"] for card in state["cards"]], [card["key"] for card in before["cards"]])
     view.choose(**{LIGHT: "theirs"})
 
-    expect("the save", view.post("save", file=0), (200, {"saved": True, "next": None}))
+    expect("the save", view.post("save"), (200, {"saved": True, "next": None}))
     status, merged = view.end()
     expect("the status of the saved merge", status, 0)
     again = view.folder / "again"
@@ -169,7 +179,7 @@ def shows_random_scenes_as_a_whole_merge_does():
             choice = {path: rng.choice(list(words)) for path in rng.sample(open_places, rng.randint(1, len(open_places)))}
             choices.update(choice)
             view.choose(**choice)
-        if view.post("save", file=0)[0] == 200:
+        if view.post("save")[0] == 200:
             saved += 1
             again = view.folder / "again"
             subprocess.run([MERGE, "merge", "--safe", "-h", "--force", "--fallback", "none", "-i", chosen, "-o", os.devnull,
@@ -224,7 +234,8 @@ def refuses_others():
     expect("what the page may do", page.headers["Content-Security-Policy"].split(";")[0], "default-src 'none'")
 
     expect("a path trick", view.raw("GET", inside + "../../etc/passwd")[0].status, 404)
-    expect("no such file", view.get("state?file=1")[0], 404)
+    for file, status in (("1", 404), ("9" * 30, 400), ("1x", 400)):
+        expect(f"no such file as {file}", view.get(f"state?file={file}")[0], status)
     for body in ("", "[]", "{", '{"choices": 1}', '{"choices": [{"path": "1.x"}]}', "[" * 100_000):
         answer, _ = view.raw("POST", inside + "choose", body, Content_Type="application/json")
         expect(f"the request {body[:40]}", answer.status, 400)
@@ -283,7 +294,7 @@ def says_what_is_wrong():
         view = View(examples(), "--idle-timeout", "8", "-o", record, merged="/dev/full" if record == "record" else None)
         Path("record").write_text("as it was\n")
         view.choose(**{LIGHT: "ours", DELAY: "ours"})
-        status, answer = view.post("save", file=0)
+        status, answer = view.post("save")
         expect(f"no room beside {other}", (status, "/dev/full" in answer["error"]), (409, True))
         expect("the program left alone", view.end(), (1, "as it was\n"))
         expect("its record", Path("record").read_text(), "as it was\n")

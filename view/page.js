@@ -279,14 +279,16 @@ function act(job) {
   });
 }
 
+// What a change is asked for on.
+const shownNow = () => ({file: state.file, revision: state.revision});
+
 function choose(find, words) {
   act(async () => {
     const choices = find();
     if (choices.length === 0) return;
     const {notes} = state;
     const chosen = new Set(choices.map((choice) => choice.path));
-    const body = {file: state.file, revision: state.revision, choices};
-    const found = applyChanges(await ask("choose", body), chosen);
+    const found = applyChanges(await ask("choose", {...shownNow(), choices}), chosen);
     const [{choice}] = choices;
     const refused = choice === null ? [] : allRows().filter((row) => row.pending && chosen.has(row.path));
     const newNotes = state.notes.filter((note) => !notes.includes(note));
@@ -307,7 +309,7 @@ function chooseRows(rows, side, words) {
 
 function step(which, words) {
   act(async () => {
-    applyChanges(await ask(which, {file: state.file}), new Set());
+    applyChanges(await ask(which, shownNow()), new Set());
     say(`${words} ${state.pending} open.`);
   });
 }
@@ -316,21 +318,24 @@ function save() {
   if (byId("save").disabled) return;
   act(async () => {
     const {title} = state;
-    const {next} = await ask("save", {file: state.file});
+    const {next} = await ask("save", shownNow());
     if (next === null) end("Saved", `${title} is saved. You can close this window.`);
     else await load(next, `${title} is saved.`);
   });
 }
 
+const unsavedFiles = () => state.files.filter((file) => file.unsaved).map((file) => file.title);
+
 function giveUp() {
-  const settled = state.conflicts - state.pending;
+  const unsaved = unsavedFiles();
   const really = () => act(async () => {
     await ask("give-up", {});
     end(state.mode === "merge" ? "Given up" : "Closed", "You can close this window.");
   });
-  if (state.mode !== "merge" || (settled === 0 && !state.can_undo)) return really();
+  if (unsaved.length === 0) return really();
   const question = byId("question");
-  question.children[1].textContent = `What you chose for ${state.title} is lost, and the file stays as it was.${
+  const stay = unsaved.length === 1 ? "the file stays as it was" : "these files stay as they were";
+  question.children[1].textContent = `What you chose for ${unsaved.join(", ")} is lost, and ${stay}.${
     state.files.some((file) => file.saved) ? " Files that are saved stay saved." : ""}`;
   question.returnValue = "";
   question.onclose = () => question.returnValue === "give up" && really();

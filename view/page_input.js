@@ -125,7 +125,7 @@ bars.observe(byId("bars"));
 bars.observe(byId("bar"));
 
 window.addEventListener("beforeunload", (event) => {
-  if (!ended && !main.inert && state?.can_undo) event.preventDefault();
+  if (!ended && !main.inert && state !== null && unsavedFiles().length > 0) event.preventDefault();
 });
 // A page that comes back out of the browser's memory may have missed what was done since.
 window.addEventListener("pageshow", (event) => event.persisted && location.reload());

@@ -181,12 +181,17 @@ class ViewServer {
     } else if (place == "redo") {
       Reply(response, [&] { return session_.Redo(body); });
     } else if (place == "save") {
-      Reply(response, [&] { return session_.Save(body); });
-      const std::lock_guard lock(mutex_);
-      if (session_.IsFinished()) lifetime_.End();
+      Reply(response, [&] {
+        std::string saved = session_.Save(body);
+        if (session_.IsFinished()) lifetime_.End();
+        return saved;
+      });
     } else if (place == "give-up") {
-      response.set_content("{}", "application/json");
-      lifetime_.End();
+      Reply(response, [&] {
+        session_.GiveUp();
+        lifetime_.End();
+        return std::string("{}");
+      });
     } else {
       response.status = 404;
     }

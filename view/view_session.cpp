@@ -26,10 +26,10 @@ Json Parse(std::string_view body) {
   return json;
 }
 
-size_t NumberAt(const Json& json, const char* key, size_t otherwise) {
+size_t NumberAt(const Json& json, const char* key) {
   const auto found = json.find(key);
-  if (found == json.end()) return otherwise;
-  if (!found->is_number_unsigned()) throw RequestError(400, std::string(key) + " is no number");
+  if (found == json.end() || !found->is_number_unsigned())
+    throw RequestError(400, std::string(key) + " is no number");
   return found->get<size_t>();
 }
 
@@ -108,6 +108,7 @@ class ViewSession::OpenFile {
   }
 
   Settling& GetSettling() { return settling_; }
+  bool HasUnsavedChoices() const { return !is_saved_ && settling_.GetChoices().CanUndo(); }
   const std::vector<std::string>& GetKeys() const { return keys_; }
   const std::string& GetText(const std::string& key) const { return told_.at(numbers_.at(key)).text; }
   bool IsSaved() const { return is_saved_; }
@@ -221,7 +222,8 @@ Json ViewSession::Head(size_t file) {
     OpenFile* open = open_[i].get();
     files.push_back({{"title", OnOneLine(files_[i].title)},
                      {"pending", open == nullptr ? Json() : Json(open->GetSettling().CountPending())},
-                     {"saved", open != nullptr && open->IsSaved()}});
+                     {"saved", open != nullptr && open->IsSaved()},
+                     {"unsaved", open != nullptr && open->HasUnsavedChoices()}});
   }
   head["files"] = std::move(files);
   head["file"] = file;
@@ -231,8 +233,9 @@ Json ViewSession::Head(size_t file) {
 std::string ViewSession::State(std::string_view file) {
   size_t number = FirstUnsaved(0) % files_.size();
   const char* const end = file.data() + file.size();
-  if (!file.empty() && std::from_chars(file.data(), end, number).ptr != end) {
-    throw RequestError(400, "file is no number");
+  if (!file.empty()) {
+    const auto [rest, error] = std::from_chars(file.data(), end, number);
+    if (error != std::errc() || rest != end) throw RequestError(400, "file is no number");
   }
   const OpenFile& open = Open(number);
   std::vector<std::string_view> cards;
@@ -240,20 +243,26 @@ std::string ViewSession::State(std::string_view file) {
   return WithCards(Head(number), "cards", cards);
 }
 
-template <typename Step>
-std::string ViewSession::Change(const Json& request, Step step) {
-  const size_t file = NumberAt(request, "file", 0);
+ViewSession::OpenFile& ViewSession::OpenToChange(const Json& request) {
+  const size_t file = NumberAt(request, "file");
+  const size_t revision = NumberAt(request, "revision");
+  if (is_given_up_) throw RequestError(409, "It was given up");
   OpenFile& open = Open(file);
   if (files_[file].is_review)
     throw RequestError(409, "Two versions are compared: there is nothing to choose");
   if (open.IsSaved()) throw RequestError(409, "The file is saved already");
-  if (NumberAt(request, "revision", open.GetSettling().GetRevision()) != open.GetSettling().GetRevision()) {
-    throw RequestError(409, "Another window has changed something meanwhile: load the page again");
-  }
+  if (revision != open.GetSettling().GetRevision())
+    throw RequestError(409, "Another window has changed something meanwhile: look at it again");
+  return open;
+}
+
+template <typename Step>
+std::string ViewSession::Change(const Json& request, Step step) {
+  OpenFile& open = OpenToChange(request);
   const std::vector<std::string> before = open.GetKeys();
   step(open.GetSettling());
   const std::vector<std::string> changed = open.TakeCards();
-  Json head = Head(file);
+  Json head = Head(NumberAt(request, "file"));
   Json gone = Json::array();
   const std::unordered_set<std::string> there(open.GetKeys().begin(), open.GetKeys().end());
   for (const std::string& key : before) {
@@ -284,15 +293,15 @@ std::string ViewSession::Redo(std::string_view body) {
 }
 
 std::string ViewSession::Save(std::string_view body) {
-  const size_t file = NumberAt(Parse(body), "file", 0);
-  OpenFile& open = Open(file);
-  if (open.IsSaved()) throw RequestError(409, "The file is saved already");
+  const Json request = Parse(body);
   try {
-    open.Save();
+    OpenToChange(request).Save();
+  } catch (const RequestError&) {
+    throw;
   } catch (const std::runtime_error& error) {
     throw RequestError(409, OnOneLine(error.what()));
   }
-  const size_t next = FirstUnsaved(file);
+  const size_t next = FirstUnsaved(NumberAt(request, "file"));
   return Dump({{"saved", true}, {"next", next == files_.size() ? Json() : Json(next)}});
 }
 

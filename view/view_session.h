@@ -33,12 +33,15 @@ class ViewSession {
 
   /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved.
   std::string State(std::string_view file);
-  /// These take a request's body and return what has changed.
+  /// These take a request's body, which names the file and its revision, and return what has changed. A page
+  /// that shows an older revision is refused.
   std::string Choose(std::string_view body);
   std::string Undo(std::string_view body);
   std::string Redo(std::string_view body);
   /// Returns which file comes next, if any.
   std::string Save(std::string_view body);
+  /// Nothing is changed or saved from now on.
+  void GiveUp() { is_given_up_ = true; }
 
   /// Whether every file has been saved.
   bool IsFinished() const;
@@ -47,6 +50,7 @@ class ViewSession {
   class OpenFile;
 
   OpenFile& Open(size_t file);
+  OpenFile& OpenToChange(const nlohmann::ordered_json& request);
   size_t FirstUnsaved(size_t from) const;
   nlohmann::ordered_json Head(size_t file);
   template <typename Step>
@@ -55,6 +59,7 @@ class ViewSession {
   const std::vector<ViewFile> files_;
   // Null for what nobody has looked at yet.
   std::vector<std::unique_ptr<OpenFile>> open_;
+  bool is_given_up_ = false;
 };
 
 }  // namespace vexel_yaml
