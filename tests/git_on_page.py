@@ -104,7 +104,7 @@ def check_resolve():
     expect("the files", [file["title"] for file in state["files"]], ["A.vexel", "B.vexel"])
     expect("what is saved too early", page.save()[0], 409)
     page.take("theirs")
-    expect("the next file", page.save(), (200, {"saved": True, "next": 1}))
+    expect("the next file", page.save(), (200, {"saved": True, "next": 1, "unread": []}))
     expect("what is still in conflict", [is_unmerged(file) for file in ("A.vexel", "B.vexel")], [False, True])
     page.take("ours", file=1)
     write(7, 7, "B.vexel")
@@ -160,6 +160,27 @@ def check_hand_edits():
     expect("what is staged", run("git", "show", ":A.vexel"), SCENE.format(2, 11))
     process.wait(30)
     run("git", "config", "rerere.enabled", "true")
+
+
+def check_unreadable():
+    run("git", "reset", "-q", "--hard")
+    for branch, value, end in (("sound", 5, ""), ("broken", 8, "  m_Name: [\n")):
+        run("git", "checkout", "-q", "-B", branch, "start")
+        write(value, 10, "A.vexel", "B.vexel")
+        Path("A.vexel").write_text(Path("A.vexel").read_text() + end)
+        run("git", "commit", "-q", "-a", "-m", branch)
+    run("git", "merge", "-q", "sound", status=1)
+    process, page = opened("resolve", "--web")
+    state = page.state("")
+    expect("what is shown first", (state["title"], state["pending"]), ("B.vexel", 1))
+    state = page.state(0)
+    expect("a file that can't be read", (state["cards"], state["error"] == "", state["files"][0]["error"] == ""),
+           ([], False, False))
+    page.take("theirs", file=1)
+    status, answer = page.save(1)
+    expect("the other file is saved", (status, answer["next"], len(answer["unread"])), (200, None, 1))
+    expect("the end with a file that can't be read", process.wait(30), 1)
+    expect("what is still in conflict", [is_unmerged(file) for file in ("A.vexel", "B.vexel")], [True, False])
 
 
 def check_mergetool(browser):
@@ -244,6 +265,9 @@ def main():
         commit("ours", 9, 10, "A.vexel", "B.vexel")
         check_resolve()
         check_hand_edits()
+        check_unreadable()
+        run("git", "reset", "-q", "--hard")
+        run("git", "checkout", "-q", "ours")
         check_mergetool(browser)
         check_review()
         os.chdir(folder)

@@ -128,7 +128,7 @@ def settles_as_merge_does(*mode):
     expect("the order", [card["key"] for card in state["cards"]], [card["key"] for card in before["cards"]])
     view.choose(**{LIGHT: "theirs"})
 
-    expect("the save", view.post("save"), (200, {"saved": True, "next": None}))
+    expect("the save", view.post("save"), (200, {"saved": True, "next": None, "unread": []}))
     status, merged = view.end()
     expect("the status of the saved merge", status, 0)
     again = view.folder / "again"

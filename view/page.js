@@ -77,7 +77,7 @@ function showFiles() {
   byId("next-file").hidden = !several;
   if (!several) return;
   byId("files").firstElementChild.replaceChildren(...state.files.map((file, index) => {
-    const words = file.saved ? "saved" : file.pending > 0 ? `${file.pending} open` : "";
+    const words = file.error !== "" ? "can't be read" : file.saved ? "saved" : file.pending > 0 ? `${file.pending} open` : "";
     const choice = button(file.title, {file: index});
     if (words !== "") choice.append(" ", make("span", file.saved ? "badge" : "badge conflict", words));
     if (index === state.file) choice.setAttribute("aria-current", "true");
@@ -107,17 +107,19 @@ function showHead() {
   byId("bars").hidden = false;
   byId("hint").hidden = !merging || state.conflicts === 0;
   byId("error").hidden = state.error === "";
-  byId("error").textContent = state.error === "" ? "" : `The merge failed: ${state.error}`;
+  const failed = state.files[state.file].error === "" ? "The merge failed" : "The file can't be read";
+  byId("error").textContent = state.error === "" ? "" : `${failed}: ${state.error}`;
   byId("notes").hidden = state.notes.length === 0;
   byId("notes").firstElementChild.textContent = plural(state.notes.length, "note");
   byId("notes").lastElementChild.replaceChildren(...state.notes.map((note) => make("li", "", note)));
   document.body.classList.toggle("review", !merging);
-  byId("settled").textContent = state.conflicts === 0 ? "Nothing is in conflict" : `${settled} of ${state.conflicts} settled`;
+  const nothing = state.error === "" ? "Nothing is in conflict" : "There is no result";
+  byId("settled").textContent = state.conflicts === 0 ? nothing : `${settled} of ${state.conflicts} settled`;
   byId("pending").textContent = String(state.pending);
   const bar = byId("progress").querySelector("progress");
   byId("pending").parentElement.hidden = state.conflicts === 0;
   bar.max = Math.max(1, state.conflicts);
-  bar.value = state.conflicts === 0 ? 1 : settled;
+  bar.value = state.conflicts > 0 ? settled : state.error === "" ? 1 : 0;
   byId("undo").disabled = !state.can_undo;
   byId("redo").disabled = !state.can_redo;
   byId("previous").disabled = byId("next").disabled = state.conflicts === 0;
@@ -318,8 +320,9 @@ function save() {
   if (byId("save").disabled) return;
   act(async () => {
     const {title} = state;
-    const {next} = await ask("save", shownNow());
-    if (next === null) end("Saved", `${title} is saved. You can close this window.`);
+    const {next, unread} = await ask("save", shownNow());
+    const also = unread.length === 0 ? "" : ` What can't be read is not: ${unread.join("; ")}.`;
+    if (next === null) end("Saved", `${title} is saved.${also} You can close this window.`);
     else await load(next, `${title} is saved.`);
   });
 }

@@ -30,7 +30,7 @@ function showShown() {
   const count = order.filter((key) => isShown(cards.get(key))).length;
   byId("shown").textContent = `${count} of ${plural(order.length, "object")}`;
   byId("filters").hidden = order.length < 2 && !filtering();
-  byId("nothing").hidden = count > 0;
+  byId("nothing").hidden = count > 0 || state.error !== "";
   byId("nothing").textContent = order.length > 0 ? "Nothing matches the filters." : "Nothing changed.";
 }
 

@@ -77,7 +77,8 @@ byId("files").addEventListener("click", (event) => {
 });
 byId("next-file").addEventListener("click", () => {
   const count = state.files.length;
-  const next = Array.from({length: count}, (_, i) => (state.file + 1 + i) % count).find((i) => !state.files[i].saved);
+  const others = Array.from({length: count}, (_, i) => (state.file + 1 + i) % count);
+  const next = others.find((i) => !state.files[i].saved && state.files[i].error === "");
   if (next !== undefined) act(() => load(next, " "));
 });
 byId("previous").addEventListener("click", () => goBy(-1));

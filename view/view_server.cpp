@@ -96,8 +96,6 @@ class ViewServer {
       : is_review_(files.front().is_review),
         session_(std::move(files)),
         lifetime_(seconds(options.idle_seconds)) {
-    // Before anybody is sent to a page: what can't be read is said in the terminal.
-    session_.State("");
     server_.set_default_headers({{"Content-Security-Policy", Policy()},
                                  {"X-Content-Type-Options", "nosniff"},
                                  {"X-Frame-Options", "DENY"},
@@ -126,7 +124,9 @@ class ViewServer {
     lifetime_.End();
     server_.End();
     serving.Join();
-    return is_review_ || session_.IsFinished() ? 0 : 1;
+    const std::vector<std::string> unread = session_.GetUnread();
+    for (const std::string& error : unread) WriteErrorLine(error);
+    return session_.IsFinished() || (is_review_ && unread.empty()) ? 0 : 1;
   }
 
  private:
@@ -183,7 +183,7 @@ class ViewServer {
     } else if (place == "save") {
       Reply(response, [&] {
         std::string saved = session_.Save(body);
-        if (session_.IsFinished()) lifetime_.End();
+        if (session_.IsOver()) lifetime_.End();
         return saved;
       });
     } else if (place == "give-up") {

@@ -19,8 +19,8 @@ struct ViewServerOptions {
 /// is given up or closed. Prints its address as one line on standard output.
 ///
 /// Returns 0 where all files were saved, or where nothing was to be saved (two versions that are compared),
-/// else 1. The rules and the type information are loaded. Throws what opening the first file throws, and
-/// std::runtime_error where no port can be opened.
+/// else 1. A file that can't be read is shown as such, and named on standard error in the end. The rules and
+/// the type information are loaded. Throws std::runtime_error where no file can be read or no port opened.
 int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options);
 
 }  // namespace vexel_yaml

@@ -169,16 +169,19 @@ Json NamesOf(const ViewFile& file) {
   return {{"base", base}, {"theirs", theirs}, {"ours", OnOneLine(file.ours_name)}};
 }
 
-Json HeadOf(const ViewFile& file, Settling& settling) {
+Json HeadOf(const ViewFile& file) {
+  return {{"version", kReportJsonVersion},
+          {"mode", file.is_review ? "review" : "merge"},
+          {"title", OnOneLine(file.title)},
+          {"names", NamesOf(file)}};
+}
+
+Json StandOf(const ViewFile& file, Settling& settling) {
   Json notes = Json::array();
   if (!file.note.empty()) notes.push_back(OnOneLine(file.note));
   for (const SceneNote& note : settling.GetNotes())
     notes.push_back(NamedNote(note.text, settling.GetNames()));
-  return {{"version", kReportJsonVersion},
-          {"mode", file.is_review ? "review" : "merge"},
-          {"title", OnOneLine(file.title)},
-          {"names", NamesOf(file)},
-          {"revision", settling.GetRevision()},
+  return {{"revision", settling.GetRevision()},
           {"pending", settling.CountPending()},
           {"conflicts", settling.CountConflicts()},
           {"can_undo", settling.GetChoices().CanUndo()},
@@ -187,42 +190,74 @@ Json HeadOf(const ViewFile& file, Settling& settling) {
           {"notes", std::move(notes)}};
 }
 
+// Of a file that can't be read.
+Json NothingFor(const std::string& error) {
+  return {{"revision", 0},     {"pending", 0},      {"conflicts", 0}, {"can_undo", false},
+          {"can_redo", false}, {"error", error}, {"notes", Json::array()}};
+}
+
 }  // namespace
 
-ViewSession::ViewSession(std::vector<ViewFile> files) : files_(std::move(files)), open_(files_.size()) {}
+ViewSession::ViewSession(std::vector<ViewFile> files)
+    : files_(std::move(files)), open_(files_.size()), errors_(files_.size()) {
+  Open(FirstToSettle() % files_.size());
+}
 
 ViewSession::~ViewSession() = default;
 
-ViewSession::OpenFile& ViewSession::Open(size_t file) {
+ViewSession::OpenFile* ViewSession::TryToOpen(size_t file) {
   if (file >= files_.size()) throw RequestError(404, "There is no such file");
-  if (open_[file] == nullptr) {
-    try {
-      open_[file] = std::make_unique<OpenFile>(files_[file]);
-    } catch (const YAMLError& error) {
-      throw RequestError(409, OnOneLine(files_[file].title + ": " + Explained(error)));
-    }
+  if (open_[file] != nullptr || !errors_[file].empty()) return open_[file].get();
+  try {
+    open_[file] = std::make_unique<OpenFile>(files_[file]);
+  } catch (const std::bad_alloc&) {
+    throw;
+  } catch (const YAMLError& error) {
+    errors_[file] = OnOneLine(Explained(error));
+  } catch (const std::exception& error) {
+    errors_[file] = OnOneLine(Explained(error));
   }
-  return *open_[file];
+  return open_[file].get();
 }
 
-size_t ViewSession::FirstUnsaved(size_t from) const {
+ViewSession::OpenFile& ViewSession::Open(size_t file) {
+  OpenFile* open = TryToOpen(file);
+  if (open == nullptr) throw RequestError(409, OnOneLine(files_[file].title) + ": " + errors_[file]);
+  return *open;
+}
+
+size_t ViewSession::FirstToSettle(size_t from) {
   for (size_t i = 0; i < files_.size(); ++i) {
     const size_t file = (from + i) % files_.size();
-    if (open_[file] == nullptr || !open_[file]->IsSaved()) return file;
+    const OpenFile* open = TryToOpen(file);
+    if (open != nullptr && !open->IsSaved()) return file;
   }
   return files_.size();
 }
 
-bool ViewSession::IsFinished() const { return FirstUnsaved(0) == files_.size(); }
+std::vector<std::string> ViewSession::GetUnread() const {
+  std::vector<std::string> unread;
+  for (size_t i = 0; i < files_.size(); ++i) {
+    if (!errors_[i].empty()) unread.push_back(OnOneLine(files_[i].title) + ": " + errors_[i]);
+  }
+  return unread;
+}
+
+bool ViewSession::IsFinished() const {
+  return std::ranges::all_of(open_, [](const auto& open) { return open != nullptr && open->IsSaved(); });
+}
 
 Json ViewSession::Head(size_t file) {
-  Json head = HeadOf(files_[file], Open(file).GetSettling());
+  OpenFile* shown = TryToOpen(file);
+  Json head = HeadOf(files_[file]);
+  head.update(shown == nullptr ? NothingFor(errors_[file]) : StandOf(files_[file], shown->GetSettling()));
   Json files = Json::array();
   for (size_t i = 0; i < files_.size(); ++i) {
     OpenFile* open = open_[i].get();
     files.push_back({{"title", OnOneLine(files_[i].title)},
                      {"pending", open == nullptr ? Json() : Json(open->GetSettling().CountPending())},
                      {"saved", open != nullptr && open->IsSaved()},
+                     {"error", errors_[i]},
                      {"unsaved", open != nullptr && open->HasUnsavedChoices()}});
   }
   head["files"] = std::move(files);
@@ -231,22 +266,26 @@ Json ViewSession::Head(size_t file) {
 }
 
 std::string ViewSession::State(std::string_view file) {
-  size_t number = FirstUnsaved(0) % files_.size();
+  size_t number = 0;
   const char* const end = file.data() + file.size();
-  if (!file.empty()) {
+  if (file.empty()) {
+    number = FirstToSettle() % files_.size();
+  } else {
     const auto [rest, error] = std::from_chars(file.data(), end, number);
     if (error != std::errc() || rest != end) throw RequestError(400, "file is no number");
   }
-  const OpenFile& open = Open(number);
+  const OpenFile* open = TryToOpen(number);
   std::vector<std::string_view> cards;
-  for (const std::string& key : open.GetKeys()) cards.push_back(open.GetText(key));
+  if (open != nullptr) {
+    for (const std::string& key : open->GetKeys()) cards.push_back(open->GetText(key));
+  }
   return WithCards(Head(number), "cards", cards);
 }
 
 ViewSession::OpenFile& ViewSession::OpenToChange(const Json& request) {
   const size_t file = NumberAt(request, "file");
   const size_t revision = NumberAt(request, "revision");
-  if (is_given_up_) throw RequestError(409, "It was given up");
+  if (is_over_) throw RequestError(409, "It was given up, or saved");
   OpenFile& open = Open(file);
   if (files_[file].is_review)
     throw RequestError(409, "Two versions are compared: there is nothing to choose");
@@ -292,6 +331,11 @@ std::string ViewSession::Redo(std::string_view body) {
   return Change(Parse(body), [](Settling& settling) { settling.Redo(); });
 }
 
+void ViewSession::GiveUp() {
+  if (is_over_) throw RequestError(409, "It was given up, or saved");
+  is_over_ = true;
+}
+
 std::string ViewSession::Save(std::string_view body) {
   const Json request = Parse(body);
   try {
@@ -301,8 +345,9 @@ std::string ViewSession::Save(std::string_view body) {
   } catch (const std::runtime_error& error) {
     throw RequestError(409, OnOneLine(error.what()));
   }
-  const size_t next = FirstUnsaved(NumberAt(request, "file"));
-  return Dump({{"saved", true}, {"next", next == files_.size() ? Json() : Json(next)}});
+  const size_t next = FirstToSettle(NumberAt(request, "file"));
+  is_over_ = next == files_.size();
+  return Dump({{"saved", true}, {"next", is_over_ ? Json() : Json(next)}, {"unread", GetUnread()}});
 }
 
 }  // namespace vexel_yaml

@@ -28,38 +28,48 @@ std::string ErrorJson(std::string_view message);
 /// that make no sense throw RequestError.
 class ViewSession {
  public:
+  /// Reads files until one can be read, and throws RequestError with what is wrong with the first if none can.
   explicit ViewSession(std::vector<ViewFile> files);
   ~ViewSession();
 
-  /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved.
+  /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved. One
+  /// that can't be read has an error in place of cards.
   std::string State(std::string_view file);
   /// These take a request's body, which names the file and its revision, and return what has changed. A page
   /// that shows an older revision is refused.
   std::string Choose(std::string_view body);
   std::string Undo(std::string_view body);
   std::string Redo(std::string_view body);
-  /// Returns which file comes next, if any.
+  /// Returns which file comes next, if any. Where none does, it is over.
   std::string Save(std::string_view body);
-  /// Nothing is changed or saved from now on.
-  void GiveUp() { is_given_up_ = true; }
+  void GiveUp();
 
+  /// Whether nothing can be changed or saved any more.
+  bool IsOver() const { return is_over_; }
   /// Whether every file has been saved.
   bool IsFinished() const;
+  /// What can't be read, as far as that was tried, and why.
+  std::vector<std::string> GetUnread() const;
 
  private:
   class OpenFile;
 
+  // Null for a file that can't be read.
+  OpenFile* TryToOpen(size_t file);
   OpenFile& Open(size_t file);
   OpenFile& OpenToChange(const nlohmann::ordered_json& request);
-  size_t FirstUnsaved(size_t from) const;
+  // Goes around once; the number of all files where nothing is left.
+  size_t FirstToSettle(size_t from = 0);
   nlohmann::ordered_json Head(size_t file);
   template <typename Step>
   std::string Change(const nlohmann::ordered_json& request, Step step);
 
   const std::vector<ViewFile> files_;
-  // Null for what nobody has looked at yet.
+  // Null for what can't be read, or nobody has looked at yet.
   std::vector<std::unique_ptr<OpenFile>> open_;
-  bool is_given_up_ = false;
+  // Empty for what can be read, or nobody has looked at yet.
+  std::vector<std::string> errors_;
+  bool is_over_ = false;
 };
 
 }  // namespace vexel_yaml
