@@ -359,7 +359,7 @@ function end(title, text) {
 function lost() {
   if (ended) return;
   byId("bars").inert = main.inert = true;
-  say("The program that opened this page has ended, or can't be reached. What isn't saved is lost with it.", {failure: true});
+  say("The program that opened this page can't be reached. If it has ended, what isn't saved is lost.", {failure: true});
 }
 
 function there() {

@@ -128,6 +128,10 @@ bars.observe(byId("bar"));
 window.addEventListener("beforeunload", (event) => {
   if (!ended && !main.inert && state !== null && unsavedFiles().length > 0) event.preventDefault();
 });
+// As JSON it names its origin, without which the program refuses it.
+window.addEventListener("pagehide", () => {
+  if (!ended) navigator.sendBeacon("bye", new Blob(["{}"], {type: "application/json"}));
+});
 // A page that comes back out of the browser's memory may have missed what was done since.
 window.addEventListener("pageshow", (event) => event.persisted && location.reload());
 

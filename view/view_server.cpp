@@ -23,8 +23,9 @@ using std::chrono::seconds;
 
 // Long enough for the page to be loaded again.
 constexpr seconds kTimeWithoutPage{5};
-constexpr seconds kTimeAfterBye{2};
 constexpr seconds kHeartbeat{1};
+// By how much a page's good-bye may come before it is noticed that it has gone.
+constexpr seconds kTimeToGo{10};
 
 // For how long the page is shown.
 class Lifetime {
@@ -39,7 +40,7 @@ class Lifetime {
   void PageCame() {
     const std::lock_guard lock(mutex_);
     ++pages_;
-    grace_ = kTimeWithoutPage;
+    bye_.reset();
   }
 
   void PageWent() {
@@ -49,11 +50,16 @@ class Lifetime {
     changed_.notify_all();
   }
 
-  // A page that says good-bye will hardly come again.
-  void HurryUp() {
+  // A page that is closed or loaded again says so; one whose connection has broken can't.
+  void PageSaidBye() {
     const std::lock_guard lock(mutex_);
-    grace_ = kTimeAfterBye;
+    bye_ = Clock::now();
     changed_.notify_all();
+  }
+
+  void SetUnsaved(bool has_unsaved) {
+    const std::lock_guard lock(mutex_);
+    has_unsaved_ = has_unsaved;
   }
 
   void End() {
@@ -73,18 +79,25 @@ class Lifetime {
     while (!is_ended_) {
       const Clock::time_point now = Clock::now();
       if (now >= last_request_ + idle_) return;
-      if (gone_since_ && pages_ == 0 && now >= *gone_since_ + grace_) return;
+      if (IsClosed(now)) return;
       changed_.wait_for(lock, seconds(1));
     }
   }
 
  private:
+  // For good: whoever has made choices comes back for them when the connection has broken.
+  bool IsClosed(Clock::time_point now) const {
+    if (!gone_since_ || pages_ > 0 || now < *gone_since_ + kTimeWithoutPage) return false;
+    return !has_unsaved_ || (bye_ && *bye_ + kTimeToGo >= *gone_since_);
+  }
+
   std::mutex mutex_;
   std::condition_variable changed_;
   const seconds idle_;
   Clock::time_point last_request_ = Clock::now();
   std::optional<Clock::time_point> gone_since_;
-  seconds grace_ = kTimeWithoutPage;
+  std::optional<Clock::time_point> bye_;
+  bool has_unsaved_ = false;
   int pages_ = 0;
   bool is_ended_ = false;
 };
@@ -150,6 +163,7 @@ class ViewServer {
       response.status = error.GetStatus();
       response.set_content(ErrorJson(error.what()), "application/json");
     }
+    lifetime_.SetUnsaved(session_.HasUnsavedChoices());
   }
 
   void OnGet(const Request& request, Response& response) {
@@ -170,10 +184,12 @@ class ViewServer {
     lifetime_.NoteRequest();
     const std::string_view place = server_.GetPlace(request);
     const std::string_view body = request.body;
-    if (place == "bye") return lifetime_.HurryUp();
     if (!request.get_header_value("Content-Type").starts_with("application/json")) {
       response.status = 400;
       response.set_content(ErrorJson("The request is no JSON"), "application/json");
+    } else if (place == "bye") {
+      lifetime_.PageSaidBye();
+      response.set_content("{}", "application/json");
     } else if (place == "choose") {
       Reply(response, [&] { return session_.Choose(body); });
     } else if (place == "undo") {
@@ -202,9 +218,10 @@ class ViewServer {
     lifetime_.PageCame();
     response.set_chunked_content_provider(
         "text/event-stream",
-        [this](size_t, httplib::DataSink& sink) {
-          constexpr std::string_view kComment = ":\n\n";
-          if (!sink.write(kComment.data(), kComment.size())) return false;
+        [this](size_t offset, httplib::DataSink& sink) {
+          // A browser by itself waits longer before it connects again than a page may be away.
+          const std::string_view event = offset == 0 ? "retry: 500\n\n" : ":\n\n";
+          if (!sink.write(event.data(), event.size())) return false;
           if (!lifetime_.WaitForHeartbeat()) sink.done();
           return true;
         },

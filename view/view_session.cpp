@@ -247,6 +247,11 @@ bool ViewSession::IsFinished() const {
   return std::ranges::all_of(open_, [](const auto& open) { return open != nullptr && open->IsSaved(); });
 }
 
+bool ViewSession::HasUnsavedChoices() const {
+  return std::ranges::any_of(
+      open_, [](const auto& open) { return open != nullptr && open->HasUnsavedChoices(); });
+}
+
 Json ViewSession::Head(size_t file) {
   OpenFile* shown = TryToOpen(file);
   Json head = HeadOf(files_[file]);

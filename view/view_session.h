@@ -48,6 +48,8 @@ class ViewSession {
   bool IsOver() const { return is_over_; }
   /// Whether every file has been saved.
   bool IsFinished() const;
+  /// Whether a file has choices that were made here and are not saved.
+  bool HasUnsavedChoices() const;
   /// What can't be read, as far as that was tried, and why.
   std::vector<std::string> GetUnread() const;
 
