@@ -59,11 +59,19 @@ void Settling::TakeOverResolutions() {
   }
 }
 
-bool Settling::Choose(const std::vector<Choices::Change>& changes) {
+bool Settling::Choose(std::vector<Choices::Change> changes) {
+  const bool has_patterns = !resolutions_.empty();
   const auto is_possible = [&](const Choices::Change& change) {
-    return places_.contains(change.path) || (!change.choice && choices_.Get().contains(change.path));
+    const bool is_place = places_.contains(change.path);
+    if (change.choice) return is_place;
+    // What nobody has chosen here is settled by a pattern, or follows from another choice.
+    return choices_.Get().contains(change.path) || (is_place && has_patterns);
   };
   if (file_.is_review || changes.empty() || !std::ranges::all_of(changes, is_possible)) return false;
+  for (Choices::Change& change : changes) {
+    // A pattern would settle it again.
+    if (!change.choice && has_patterns) change.choice = MergeResolve::kConflict;
+  }
   choices_.Choose(changes);
   Merge(changes);
   return true;

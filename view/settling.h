@@ -62,7 +62,7 @@ class Settling {
   explicit Settling(const ViewFile& file);
 
   /// Where a choice is none of those that can be made, nothing changes and false is returned.
-  bool Choose(const std::vector<Choices::Change>& changes);
+  bool Choose(std::vector<Choices::Change> changes);
   void Undo();
   void Redo();
   const Choices& GetChoices() const { return choices_; }

@@ -192,7 +192,7 @@ Json StandOf(const ViewFile& file, Settling& settling) {
 
 // Of a file that can't be read.
 Json NothingFor(const std::string& error) {
-  return {{"revision", 0},     {"pending", 0},      {"conflicts", 0}, {"can_undo", false},
+  return {{"revision", 0},     {"pending", 0},   {"conflicts", 0},        {"can_undo", false},
           {"can_redo", false}, {"error", error}, {"notes", Json::array()}};
 }
 
@@ -248,8 +248,8 @@ bool ViewSession::IsFinished() const {
 }
 
 bool ViewSession::HasUnsavedChoices() const {
-  return std::ranges::any_of(
-      open_, [](const auto& open) { return open != nullptr && open->HasUnsavedChoices(); });
+  return std::ranges::any_of(open_,
+                             [](const auto& open) { return open != nullptr && open->HasUnsavedChoices(); });
 }
 
 Json ViewSession::Head(size_t file) {
@@ -324,7 +324,7 @@ std::string ViewSession::Choose(std::string_view body) {
   const std::vector<Choices::Change> changes = ChangesIn(request);
   return Change(request, [&](Settling& settling) {
     if (!settling.Choose(changes))
-      throw RequestError(400, "There is nothing to choose at one of these places");
+      throw RequestError(400, "One of these places is no conflict, or is settled by another choice");
   });
 }
 

@@ -28,12 +28,13 @@ std::string ErrorJson(std::string_view message);
 /// that make no sense throw RequestError.
 class ViewSession {
  public:
-  /// Reads files until one can be read, and throws RequestError with what is wrong with the first if none can.
+  /// Reads files until one can be read, and throws RequestError with what is wrong with the first if none
+  /// can.
   explicit ViewSession(std::vector<ViewFile> files);
   ~ViewSession();
 
-  /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved. One
-  /// that can't be read has an error in place of cards.
+  /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved.
+  /// One that can't be read has an error in place of cards.
   std::string State(std::string_view file);
   /// These take a request's body, which names the file and its revision, and return what has changed. A page
   /// that shows an older revision is refused.
