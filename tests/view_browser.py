@@ -1,6 +1,7 @@
 #!/usr/bin/env python3
 # Settles conflicts on the page of the built program, in a real browser: view_browser.py <folder of the programs>
 
+import json
 import os
 import subprocess
 import sys
@@ -210,6 +211,10 @@ def give_up(bench):
     expect("the file", view.merged.read_text(), "as it was\n")
 
     view = bench.start(versions)
+    view.page.click(view.tile(LAMP, "ours"))
+    view.open(0, "settled")
+    view.page.call("refresh")
+    view.page.wait("document.getElementById('pending').textContent === '0'", "it is there when the page is loaded again")
     view.page.call("url", url="about:blank")
     view.ends_with(1, "the page was left")
     expect("the file", view.merged.read_text(), "as it was\n")
@@ -218,6 +223,24 @@ def give_up(bench):
     view.process.kill()
     view.page.wait("document.getElementById('cards').inert && document.querySelector('#notice.failure') !== null",
                    "that the program is gone is said")
+
+
+def two_windows(bench):
+    view = bench.start({"base": lamp(1, 2), "left": lamp(1, 3), "right": lamp(1, 4)})
+    page = view.page
+    page.click(view.tile(LAMP, "theirs"))
+    view.open(0, "settled")
+    page.script("return fetch('choose', {method: 'POST', headers: {'Content-Type': 'application/json'}, body: arguments[0]})"
+                ".then(answer => answer.json())",
+                json.dumps({"file": 0, "revision": 2, "choices": [{"path": LAMP, "choice": "ours"}]}))
+    page.click("#save")
+    page.wait("document.querySelector('#notice.failure') !== null", "the save of what is not shown is refused")
+    expect("why", "Another window" in view.text("#notice"), True)
+    expect("what the other window chose is shown", view.taken(), {LAMP: "ours"})
+    expect("nothing is saved", view.merged.read_text(), "as it was\n")
+    page.click("#save")
+    view.ends_with(0, "saved")
+    expect("what was shown is saved", "m_Intensity: 4" in view.merged.read_text(), True)
 
 
 def hostile_values(bench):
@@ -273,6 +296,13 @@ def from_conflict_to_commit(bench):
     expect("the branch", "darker" in view.text("thead .theirs"), True)
     page.click(view.tile(LAMP, "theirs"))
     view.open(0, "the first file")
+    page.click("#next-file")
+    view.open(1, "the second one meanwhile")
+    page.click("#give-up")
+    expect("what would be lost is named", "What you chose for Harbour.vexel is lost" in view.text("#question"), True)
+    page.click("#question [autofocus]")
+    page.click("#files [data-file='0']")
+    view.open(0, "the first file again")
     page.click("#save")
     view.open(1, "the next file comes up")
     page.click(view.tile(LAMP, "ours"))
@@ -282,6 +312,17 @@ def from_conflict_to_commit(bench):
     git("commit", "-q", "--no-edit")
     expect("what is committed", [line for name in ("Harbour", "Island") for line in git("show", f"HEAD:{name}.vexel")
                                  .splitlines() if "Intensity" in line], ["  m_Intensity: 1", "  m_Intensity: 7"])
+
+    view = bench.open(folder, "vexel-merge-git", "review", "--no-browser", "HEAD^^..HEAD")
+    expect("what changed", [view.text(f".object {part}") for part in ("thead .base", "td.base", "thead .result", "td.result")],
+           ["HEAD^^", "5", "HEAD", "1"])
+    page.click("#next-file")
+    page.wait("document.querySelector('td.result')?.innerText === '7'", "the other file")
+    expect("there is nothing to choose", page.script(
+        "return Array.from(document.querySelectorAll('[data-choice], [data-take], #save, #undo, #progress'))"
+        ".filter(part => part.checkVisibility()).length"), 0)
+    page.click("#give-up")
+    view.ends_with(0, "it is closed")
 
 
 class Bench:
@@ -313,7 +354,7 @@ def main(programs):
         bench = Bench(programs, page, root)
         try:
             for test in (settle_and_save, choices_for_many, many_in_one_object, what_a_choice_brings_up, give_up,
-                         hostile_values, from_conflict_to_commit):
+                         two_windows, hostile_values, from_conflict_to_commit):
                 started = time.monotonic()
                 test(bench)
                 print(f"{test.__name__}: {time.monotonic() - started:.1f} s")

@@ -2,6 +2,7 @@
 # Settles conflicts with vexel-merge-view as its page does, and attacks it as other pages and programs may:
 #   view_requests.py <VexelYAMLMerge> <vexel-merge-view> <vexel-merge-report> <examples> [<random scenes>]
 
+import ctypes
 import http.client
 import json
 import os
@@ -13,6 +14,7 @@ import subprocess
 import sys
 import tempfile
 import time
+from concurrent.futures import ThreadPoolExecutor
 from pathlib import Path
 
 sys.path.insert(0, str(Path(__file__).resolve().parent / "scene_editor"))
@@ -150,8 +152,26 @@ def a_choice_settles_what_follows():
     expect("what is open", (state["pending"], places), (2, ["11.Transform.m_Father", "21.Transform.m_Father"]))
     _, delta = view.choose(**{places[0]: "ours"})
     expect("both at once", (delta["pending"], rows(delta, "changed")[places[1]]["choice"]), (0, "ours"))
+    expect("opening what follows from it", view.choose(**{places[1]: None})[0], 400)
     view.post("give-up")
     expect("what is given up", view.end(), (1, "as it was\n"))
+
+
+def a_pattern_can_be_taken_back():
+    Path("patterns").write_text("Conflict handling:\nleft *.Light.m_Intensity\nright *.*.*\n")
+    view = View(examples(), "-i", "patterns")
+    _, state = view.get("state")
+    expect("what is settled", (state["pending"], rows(state)[LIGHT]["choice"], rows(state)[DELAY]["choice"]),
+           (0, "theirs", "ours"))
+    _, delta = view.choose(**{LIGHT: None})
+    expect("what is open again", (delta["pending"], rows(delta, "changed")[LIGHT]["state"]), (1, "conflict"))
+    _, delta = view.choose(**{LIGHT: "ours"})
+    expect("what is chosen instead", (delta["pending"], rows(delta, "changed")[LIGHT]["choice"]), (0, "ours"))
+    view.post("undo")
+    _, delta = view.post("undo")
+    expect("the pattern again", (delta["pending"], rows(delta, "changed")[LIGHT]["choice"]), (0, "theirs"))
+    view.post("save")
+    expect("what is saved", "m_Intensity: 4\n" in view.end()[1], True)
 
 
 def shows_random_scenes_as_a_whole_merge_does():
@@ -241,8 +261,14 @@ def refuses_others():
         expect(f"the request {body[:40]}", answer.status, 400)
     expect("no such place", view.choose(**{LIGHT: "ours", "*.Light.m_Intensity": "ours"})[0], 400)
     expect("a form", view.raw("POST", inside + "choose", "{}", Content_Type="text/plain")[0].status, 400)
-    expect("a large body", view.raw("POST", inside + "choose", "x" * (5 << 20), Content_Type="application/json")[0].status,
-           413)
+    answer, body = view.raw("POST", inside + "choose", Content_Type="application/json", Content_Length=str(33 << 20))
+    expect("a large body", (answer.status, json.loads(body)), (413, {"error": "These are too many choices at once"}))
+    expect("a place that is none", "error" in json.loads(view.raw("GET", inside + "x")[1]), True)
+    answer, body = view.raw("GET", inside + "state", Range="bytes=" + "0-," * 2000 + "0-")
+    expect("parts of an answer", (answer.status, len(body) < 100_000), (200, True))
+    many = [{"path": path, "choice": "ours"} for path in (LIGHT, DELAY) for _ in range(30_000)]
+    expect("many choices", view.post("choose", choices=many)[1]["pending"], 0)
+    view.post("undo")
     expect("what is open after all that", view.get("state")[1]["pending"], 2)
 
     # Every connection that the program lets in, half of them in the middle of a request.
@@ -261,9 +287,19 @@ def refuses_others():
     expect("what is given up", view.end(), (1, "as it was\n"))
 
 
+def open_page(view):
+    events = socket.create_connection(("127.0.0.1", view.port), 60)
+    events.sendall(f"GET /{view.secret}/events HTTP/1.1\r\nHost: 127.0.0.1:{view.port}\r\n\r\n".encode())
+    said = b""
+    while b"retry: 500\n\n" not in said:
+        said += events.recv(100) or sys.exit(f"a page is told {said}")
+    return events
+
+
 def ends_with_its_page():
     listing = Path(WORK) / "browser"
-    listing.write_text("#!/bin/sh\nprintf %s \"$2\" >\"$1.called.new\"; mv \"$1.called.new\" \"$1.called\"\n")
+    # The second line is only written by who dies of a broken pipe.
+    listing.write_text("#!/bin/sh\nsh -c 'kill -PIPE $$' || : >\"$1.pipe\"\nprintf %s \"$2\" >\"$1.called.new\"; mv \"$1.called.new\" \"$1.called\"\n")
     listing.chmod(0o700)
     view = View(examples(), BROWSER=f"{listing} {listing} %s:other", DISPLAY=":0", SSH_CONNECTION="")
     called = Path(f"{listing}.called")
@@ -276,17 +312,24 @@ def ends_with_its_page():
     expect("its address leads to the page", (answer.status, answer.headers["Location"]), (303, f"/{view.secret}/"))
     expect("its address the second time", view.raw("GET", path)[0].status, 404)
 
-    def open_page():
-        events = socket.create_connection(("127.0.0.1", view.port))
-        events.sendall(f"GET /{view.secret}/events HTTP/1.1\r\nHost: 127.0.0.1:{view.port}\r\n\r\n".encode())
-        return events if events.recv(100) else None
-
-    open_page().close()
-    again = open_page()
+    expect("a broken pipe for the browser", Path(f"{listing}.pipe").exists(), True)
+    open_page(view).close()
+    again = open_page(view)
     time.sleep(6)
     expect("the program while its page was loaded again", view.program.poll(), None)
     again.close()
     expect("the program without its page", view.end(), (1, "as it was\n"))
+
+    view = View(examples(), BROWSER="/nowhere/browser", DISPLAY=":0", SSH_CONNECTION="")
+    view.choose(**{LIGHT: "ours"})
+    open_page(view).close()
+    time.sleep(8)
+    expect("the program while a connection with choices is broken", view.program.poll(), None)
+    again = open_page(view)
+    view.post("bye")
+    again.close()
+    expect("the program without its page", view.end(), (1, "as it was\n"))
+    expect("how to do without a browser", "Open this address" in view.program.stderr.read(), True)
 
 
 def says_what_is_wrong():
@@ -307,6 +350,48 @@ def says_what_is_wrong():
                              ("a record in a version's place", "-o", "link", *view.versions, "merged")):
         done = subprocess.run([VIEW, "--no-browser", "--idle-timeout", "8", *arguments], capture_output=True, text=True)
         expect(what, (done.returncode, done.stdout, done.stderr.count("\n")), (1, "", 1))
+    with open("/dev/full", "w") as full:
+        unprinted = subprocess.run([VIEW, "--no-browser", *view.versions, "merged"], stdout=full, stderr=subprocess.PIPE,
+                                   text=True, timeout=60)
+    expect("an address that can't be printed", (unprinted.returncode, unprinted.stderr),
+           (1, "vexel-merge-view: Cannot print the address of the page\n"))
+
+
+def ends_where_nobody_can_be_let_in():
+    """As where the system has no room for another connection. Not everywhere a program may reach into its child."""
+    view = View(examples())
+    events = open_page(view)
+    system = ctypes.CDLL(None).syscall
+    pidfd_open, pidfd_getfd, process = 434, 438, Path("/proc", str(view.program.pid))
+    numbers = [entry.name for entry in (process / "fd").glob("*") if os.readlink(entry).startswith("socket:")]
+    flags = [int((process / "fdinfo" / number).read_text().split("flags:")[1].split()[0], 8) for number in numbers]
+    expect("sockets that its children would get", [flag for flag in flags if not flag & os.O_CLOEXEC], [])
+    copies = [system(pidfd_getfd, system(pidfd_open, view.program.pid, 0), int(number), 0) for number in numbers]
+    listening = [copy for copy in (socket.socket(fileno=copy) for copy in copies if copy >= 0)
+                 if copy.getsockopt(socket.SOL_SOCKET, socket.SO_ACCEPTCONN)]
+    if not listening:
+        print("not checked: the end of what listens")
+        return view.program.kill()
+    listening[0].shutdown(socket.SHUT_RDWR)
+    expect("the end", view.end(), (1, "as it was\n"))
+    expect("what is said", view.program.stderr.read(), "No more requests of the page can be accepted\n")
+    events.close()
+
+
+def gives_up_or_saves():
+    """Never both, where the one comes while the other goes on."""
+    os.mkfifo("pipe")
+    view = View(examples(), "-o", "pipe")
+    view.choose(**{LIGHT: "ours", DELAY: "ours"})
+    with ThreadPoolExecutor() as threads:
+        saving = threads.submit(view.post, "save")
+        # The record is waiting for its reader.
+        time.sleep(1)
+        giving_up = threads.submit(view.post, "give-up")
+        time.sleep(1)
+        Path("pipe").read_text()
+        expect("which one is done", (saving.result()[0], giving_up.result()[0]), (200, 409))
+    expect("the status", view.end()[0], 0)
 
 
 with tempfile.TemporaryDirectory() as WORK:
@@ -314,8 +399,12 @@ with tempfile.TemporaryDirectory() as WORK:
     settles_as_merge_does("--safe")
     settles_as_merge_does()
     a_choice_settles_what_follows()
+    a_pattern_can_be_taken_back()
     shows_random_scenes_as_a_whole_merge_does()
     hostile_values_stay_text()
     refuses_others()
     ends_with_its_page()
     says_what_is_wrong()
+    gives_up_or_saves()
+    if sys.platform == "linux":
+        ends_where_nobody_can_be_let_in()

@@ -8,8 +8,8 @@
 
 namespace vexel_yaml {
 
-/// What a request's body may hold: thousands of choices.
-inline constexpr size_t kMostOfBody = size_t{4} << 20;
+/// What a request's body may hold: some hundred thousand choices.
+inline constexpr size_t kMostOfBody = size_t{32} << 20;
 
 /// One connection to the page. A peer that is slow or never reads is given up after a while, and what it may
 /// send is limited, so that it costs no more than a thread for that time.

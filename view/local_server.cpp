@@ -12,6 +12,7 @@
 #include <system_error>
 #include <thread>
 
+#include "platform/error_channel.h"
 #include "view/connection.h"
 
 namespace vexel_yaml {
@@ -47,6 +48,8 @@ bool IsSame(std::string_view a, std::string_view b) {
 // A thread for each connection, so that none waits for another. The server closes those that are too many.
 class ConnectionThreads final : public httplib::TaskQueue {
  public:
+  explicit ConnectionThreads(std::function<void()> when_ending) : when_ending_(std::move(when_ending)) {}
+
   void enqueue(std::function<void()> serve) override {
     {
       const std::lock_guard lock(mutex_);
@@ -66,11 +69,13 @@ class ConnectionThreads final : public httplib::TaskQueue {
   }
 
   void shutdown() override {
+    when_ending_();
     std::unique_lock lock(mutex_);
     ended_.wait(lock, [this] { return running_ == 0; });
   }
 
  private:
+  const std::function<void()> when_ending_;
   std::mutex mutex_;
   std::condition_variable ended_;
   size_t running_ = 0;
@@ -79,7 +84,6 @@ class ConnectionThreads final : public httplib::TaskQueue {
 }  // namespace
 
 LocalServer::LocalServer() : secret_(MakeSecret()), ticket_(MakeSecret()) {
-  new_task_queue = [] { return new ConnectionThreads; };
   set_address_family(AF_INET);
   // Without the library's own SO_REUSEPORT, by which two servers would share a port and its requests.
   set_socket_options([](socket_t socket) {
@@ -123,18 +127,34 @@ std::string_view LocalServer::GetPlace(const httplib::Request& request) const {
   return std::string_view(request.path).substr(kSecretLength + 2);
 }
 
-void LocalServer::Serve() { listen_after_bind(); }
+void LocalServer::Serve(std::function<void()> when_ending) {
+  const auto close = [this, when_ending = std::move(when_ending)] {
+    {
+      const AutoLock lock(mutex_);
+      is_closed_ = true;
+      if (!is_ending_) WriteErrorLine("No more requests of the page can be accepted");
+    }
+    when_ending();
+  };
+  new_task_queue = [close] { return new ConnectionThreads(close); };
+  listen_after_bind();
+}
 
 void LocalServer::End() {
+  const auto is_closed = [this] {
+    const AutoLock lock(mutex_);
+    return is_closed_;
+  };
   // Not before it has begun, which the library would not notice.
-  while (!is_running()) std::this_thread::sleep_for(std::chrono::milliseconds(1));
+  while (!is_running() && !is_closed()) std::this_thread::sleep_for(std::chrono::milliseconds(1));
   {
     const AutoLock lock(mutex_);
     is_ending_ = true;
     // What is being answered may be finished.
     for (const OpenConnection& connection : connections_) ::shutdown(connection.socket, SHUT_RD);
   }
-  stop();
+  // Where the library has ended by itself it would close a descriptor that may be another's by now.
+  if (!is_closed()) stop();
 }
 
 bool LocalServer::IsTrusted(const httplib::Request& request) const {
@@ -151,9 +171,13 @@ bool LocalServer::process_and_close_socket(socket_t socket) {
     place = connections_.insert(connections_.end(), {socket});
     if (is_ending_) ::shutdown(socket, SHUT_RD);
   }
+  // Not for the programs that saving starts.
+  fcntl(socket, F_SETFD, FD_CLOEXEC);
   Connection connection(socket);
   bool is_closed = false;
   const bool is_done = process_request(connection, true, is_closed, [&](httplib::Request& request) {
+    // The library would send each of them, thousands of times the whole for one request.
+    request.ranges.clear();
     if (!IsTrusted(request)) return;
     const AutoLock lock(mutex_);
     place->is_trusted = true;
@@ -177,6 +201,8 @@ void LocalServer::CloseOldest() {
 bool LocalServer::IsFromHere(const httplib::Request& request) const {
   const std::string port = ':' + std::to_string(port_);
   const auto is_own = [&](std::string_view host) {
+    // Which is the port of an address that names none.
+    if (port_ == 80 && (host == "127.0.0.1" || host == "localhost")) return true;
     return host == "127.0.0.1" + port || host == "localhost" + port;
   };
   if (request.get_header_value_count("Host") != 1 || !is_own(request.get_header_value("Host"))) return false;
@@ -199,10 +225,10 @@ bool LocalServer::TakeTicket(std::string_view path) {
 
 httplib::Server::HandlerResponse LocalServer::Judge(const httplib::Request& request,
                                                     httplib::Response& response) {
-  const bool is_trusted = IsTrusted(request);
-  if (is_trusted && IsFromHere(request) && (request.method == "GET" || request.method == "POST")) {
+  if (IsFromPage(request) && (request.method == "GET" || request.method == "POST")) {
     return HandlerResponse::Unhandled;
   }
+  const bool is_trusted = IsTrusted(request);
   response.status = is_trusted ? 403 : 404;
   if (!is_trusted && request.method == "GET" && IsFromHere(request) && TakeTicket(request.path)) {
     response.set_redirect('/' + secret_ + '/', 303);

@@ -2,6 +2,7 @@
 
 #include <httplib.h>
 
+#include <functional>
 #include <list>
 #include <string>
 #include <string_view>
@@ -35,8 +36,12 @@ class LocalServer final : public httplib::Server {
   /// What follows the secret in a request's path.
   std::string_view GetPlace(const httplib::Request& request) const;
 
-  /// Serves until `End`. To be called once, after `Bind`.
-  void Serve();
+  /// Whether a request shows the secret, and doesn't come from another page.
+  bool IsFromPage(const httplib::Request& request) const { return IsTrusted(request) && IsFromHere(request); }
+
+  /// Serves until `End`. To be called once, after `Bind`. `when_ending` is called as soon as nobody new is
+  /// let in, be it that the system refuses to.
+  void Serve(std::function<void()> when_ending);
   /// From any thread. Ends what goes on.
   void End();
 
@@ -60,6 +65,8 @@ class LocalServer final : public httplib::Server {
   // The oldest ones first.
   std::list<OpenConnection> connections_;
   bool is_ending_ = false;
+  // By itself or because of `End`.
+  bool is_closed_ = false;
 };
 
 }  // namespace vexel_yaml

@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <spawn.h>
 
+#include <csignal>
 #include <cstdlib>
 #include <sstream>
 #include <string_view>
@@ -40,7 +41,7 @@ std::vector<std::string> BrowserCommand(const std::string& address) {
 
 }  // namespace
 
-void OpenBrowser(const std::string& address) {
+bool OpenBrowser(const std::string& address) {
   std::vector<std::string> command = BrowserCommand(address);
   std::vector<char*> arguments;
   for (std::string& argument : command) arguments.push_back(argument.data());
@@ -54,12 +55,19 @@ void OpenBrowser(const std::string& address) {
   posix_spawnattr_t attributes;
   posix_spawnattr_init(&attributes);
   // Ctrl-C in the terminal is for this program, and not for a browser full of other pages.
-  posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETPGROUP);
+  posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETPGROUP | POSIX_SPAWN_SETSIGDEF);
   posix_spawnattr_setpgroup(&attributes, 0);
+  // This program ignores it.
+  sigset_t broken_pipe;
+  sigemptyset(&broken_pipe);
+  sigaddset(&broken_pipe, SIGPIPE);
+  posix_spawnattr_setsigdefault(&attributes, &broken_pipe);
   pid_t process = 0;
-  posix_spawnp(&process, arguments.front(), &actions, &attributes, arguments.data(), environ);
+  const int error =
+      posix_spawnp(&process, arguments.front(), &actions, &attributes, arguments.data(), environ);
   posix_spawnattr_destroy(&attributes);
   posix_spawn_file_actions_destroy(&actions);
+  return error == 0;
 }
 
 }  // namespace vexel_yaml

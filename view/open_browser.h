@@ -4,7 +4,8 @@
 
 namespace vexel_yaml {
 
-/// Starts the browser that the person prefers, and doesn't wait for it. That none starts is no error.
-void OpenBrowser(const std::string& address);
+/// Starts the browser that the person prefers, and doesn't wait for it. Returns false where it can't be
+/// started.
+bool OpenBrowser(const std::string& address);
 
 }  // namespace vexel_yaml

@@ -5,6 +5,7 @@
 #include <iostream>
 #include <mutex>
 #include <optional>
+#include <stdexcept>
 
 #include "platform/display.h"
 #include "platform/error_channel.h"
@@ -119,16 +120,22 @@ class ViewServer {
                                  {"Cross-Origin-Embedder-Policy", "require-corp"}});
     server_.Get(".*", [this](const Request& request, Response& response) { OnGet(request, response); });
     server_.Post(".*", [this](const Request& request, Response& response) { OnPost(request, response); });
+    server_.set_error_handler([this](const Request& request, Response& response) {
+      if (!server_.IsFromPage(request) || response.status == 403 || !response.body.empty()) return;
+      const bool is_large = response.status == 413;
+      response.set_content(ErrorJson(is_large ? "These are too many choices at once" : "This can't be done"),
+                           "application/json");
+    });
     server_.Bind(options.port);
   }
 
   int Run(bool opens_browser) {
-    Thread serving;
-    serving.Start([this] { server_.Serve(); });
     std::cout << server_.GetAddress() << std::endl;
-    if (opens_browser && HasDisplay()) {
-      OpenBrowser(server_.GetOneTimeAddress());
-    } else if (opens_browser) {
+    // Not with the whole work done, when the output is flushed at the end.
+    if (!std::cout) throw std::runtime_error("Cannot print the address of the page");
+    Thread serving;
+    serving.Start([this] { server_.Serve([this] { lifetime_.End(); }); });
+    if (opens_browser && !(HasDisplay() && OpenBrowser(server_.GetOneTimeAddress()))) {
       const std::string port = std::to_string(server_.GetPort());
       WriteErrorLine("Open this address in a browser. From another machine, first: ssh -L " + port +
                      ":127.0.0.1:" + port + " and this machine's name");
