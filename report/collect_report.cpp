@@ -8,7 +8,6 @@
 #include "report/report_rows.h"
 #include "report/shown_diff.h"
 #include "report/side_walk.h"
-#include "yaml/yaml_alloc.h"
 
 namespace vexel_yaml {
 
@@ -26,15 +25,6 @@ std::string_view SettledState(MergeResolve resolution) {
     default:
       return "settled: base";
   }
-}
-
-// What an edit makes of a value; null for nothing. Given to nobody, as what operations hold.
-const YAMLNode* After(const YAMLNode* value, const Operation* edit) {
-  if (edit == nullptr || value == nullptr) return value;
-  auto* holder = YAMLAlloc<YAMLMapping>::create(false);
-  holder->Insert(YAMLScalar::underscore, value->Clone());
-  edit->Apply(*holder, YAMLScalar::underscore);
-  return holder->Get(YAMLScalar::underscore);
 }
 
 class Collector {
@@ -247,6 +237,13 @@ class Collector {
     }
   }
 
+  bool IsAboutObjects(const Operation& operation) const {
+    const YAMLMappingDiff* diff = static_cast<const ChangeMappingOperation&>(operation).GetDiff();
+    return std::ranges::any_of(diff->GetEntries(), [&](const YAMLMappingDiff::Entry& entry) {
+      return files_.read.base.HasKey(entry.key);
+    });
+  }
+
   bool IsWaiting(ReportRow& row) {
     if (rows_.IsInConflict(row.path) || around_pending_.contains(row.path)) return true;
     const auto found = waiting_.find(row.path.front());
@@ -270,6 +267,9 @@ class Collector {
         return;
       }
       case Operation::Kind::kChangeMapping:
+        // What it did to other objects, which make a circle with this one: here it left everything alone.
+        if (row.path.size() > 1 && IsAboutObjects(*operation)) return;
+        [[fallthrough]];
       case Operation::Kind::kChangeSequence:
         cell = ChangedInside();
         if (!row.base.text.empty()) return;

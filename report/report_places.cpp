@@ -1,5 +1,6 @@
 #include "report/report_places.h"
 
+#include "yaml/yaml_alloc.h"
 #include "yaml/yaml_sequence.h"
 
 namespace vexel_yaml {
@@ -37,6 +38,14 @@ bool IsPartOfReference(const FieldPath& path) {
 FieldPath Above(FieldPath path) {
   path.pop_back();
   return path;
+}
+
+const YAMLNode* After(const YAMLNode* value, const Operation* edit) {
+  if (edit == nullptr || value == nullptr) return value;
+  auto* holder = YAMLAlloc<YAMLMapping>::create(false);
+  holder->Insert(YAMLScalar::underscore, value->Clone());
+  edit->Apply(*holder, YAMLScalar::underscore);
+  return holder->Get(YAMLScalar::underscore);
 }
 
 }  // namespace vexel_yaml

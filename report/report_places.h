@@ -2,6 +2,7 @@
 
 #include <string>
 
+#include "diff/operation.h"
 #include "yaml/yaml_mapping.h"
 #include "yaml/yaml_scalar.h"
 
@@ -20,6 +21,9 @@ std::string PropertyOf(const YAMLNode* element);
 
 /// Whether a path leads to one of the scalars that make up a reference.
 bool IsPartOfReference(const FieldPath& path);
+
+/// What an edit makes of a value; null for nothing. Never given back, like what operations hold.
+const YAMLNode* After(const YAMLNode* value, const Operation* edit);
 
 /// The path without its last component; it must have one.
 FieldPath Above(FieldPath path);
