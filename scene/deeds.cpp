@@ -1,6 +1,7 @@
 #include "scene/deeds.h"
 
 #include <algorithm>
+#include <optional>
 #include <unordered_map>
 #include <unordered_set>
 
@@ -44,33 +45,38 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
   return targets;
 }
 
-// Counts the references to an object at and below a node, by their places; the elements of a list share one.
-void CountPlaces(const YAMLNode* node, const YAMLScalar* target, FieldPath& path,
-                 std::map<FieldPath, size_t>& places) {
+// Counts the references at and below a node by their places, with the target behind each path; the elements
+// of a list share one.
+void CountPlaces(const YAMLNode* node, FieldPath& path, std::map<FieldPath, size_t>& places) {
   if (node == nullptr) return;
   if (const YAMLMapping* mapping = node->AsMapping()) {
-    if (GetLocalTarget(mapping) == target) ++places[path];
+    if (const YAMLScalar* target = GetLocalTarget(mapping)) {
+      const PathStep step(path, target);
+      ++places[path];
+    }
     if (mapping->HasDuplicateKeys()) return;
     for (const auto& [key, value] : *mapping) {
       const PathStep step(path, key);
-      CountPlaces(value, target, path, places);
+      CountPlaces(value, path, places);
     }
   } else if (const YAMLSequence* sequence = node->AsSequence()) {
-    for (const YAMLNode* item : sequence->GetItems()) CountPlaces(item, target, path, places);
+    for (const YAMLNode* item : sequence->GetItems()) CountPlaces(item, path, places);
   }
 }
 
-// Whether an object refers to another one where it did not in base.
-bool RefersAnew(const YAMLNode* object, const YAMLNode* base, const YAMLScalar* target) {
+// What an object refers to where it did not in base.
+std::unordered_set<const YAMLScalar*> NewTargets(const YAMLNode* object, const YAMLNode* base) {
   std::map<FieldPath, size_t> places;
   std::map<FieldPath, size_t> before;
   FieldPath path;
-  CountPlaces(GetBody(object), target, path, places);
-  CountPlaces(GetBody(base), target, path, before);
-  return std::ranges::any_of(places, [&](const auto& place) {
-    const auto known = before.find(place.first);
-    return known == before.end() || known->second < place.second;
-  });
+  CountPlaces(GetBody(object), path, places);
+  CountPlaces(GetBody(base), path, before);
+  std::unordered_set<const YAMLScalar*> targets;
+  for (const auto& [place, count] : places) {
+    const auto known = before.find(place);
+    if (known == before.end() || known->second < count) targets.insert(place.back());
+  }
+  return targets;
 }
 
 FileIDs ChildrenOf(const YAMLNode* object) {
@@ -203,15 +209,15 @@ class DeedSearch {
 
   void LookAtReferences(const YAMLScalar* file_id) {
     if (deleted_.Get().empty()) return;
+    std::optional<std::unordered_set<const YAMLScalar*>> added;
     const YAMLScalar* reached = Reached(file_id);
     for (const YAMLScalar* target : OwnTargets(other_.Get(file_id))) {
       if (deleted_.Find(target) == Deletions::kNone) continue;
       // What was added to a thing comes and goes with it; a part of it may have been moved out, though.
       const bool is_inside = reached != nullptr && deleted_.Find(reached) == deleted_.Find(target);
       if (is_inside && reached != file_id) continue;
-      if (RefersAnew(other_.Get(file_id), base_.Get(file_id), target)) {
-        Add(Deed::Kind::kRefers, file_id, target);
-      }
+      if (!added) added = NewTargets(other_.Get(file_id), base_.Get(file_id));
+      if (added->contains(target)) Add(Deed::Kind::kRefers, file_id, target);
     }
   }
 
