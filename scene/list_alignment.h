@@ -31,7 +31,8 @@ struct ListAlignment {
 /// Lines up the elements of the list at `path` in three versions.
 ///
 /// A list of references may be a set or a row of slots. What both sides put in the place of one reference is
-/// taken for a slot, of which there are not suddenly two.
+/// taken for a slot, of which there are not suddenly two: runs of equal length, of others that the other side
+/// doesn't have.
 ///
 /// Without keys, several answers are often possible. None is given where they would make a merge differ: a
 /// run of elements that both sides replaced by different numbers of others, equal elements of which one went,
