@@ -8,8 +8,8 @@
 #include <sstream>
 
 #include "fixups/post_process.h"
+#include "git/asset_names.h"
 #include "git/captured_errors.h"
-#include "git/script_classes.h"
 #include "git/shown_text.h"
 #include "git/undecided_places.h"
 #include "git/work_files.h"
@@ -53,6 +53,10 @@ bool HasElement(const FieldPath& path) {
            const size_t digits = text.starts_with('+') ? 1 : 0;
            return text.size() > digits && text.find_first_not_of("0123456789", digits) == std::string::npos;
          });
+}
+
+bool IsListEdit(const Operation* edit) {
+  return edit != nullptr && edit->GetKind() == Operation::Kind::kChangeSequence;
 }
 
 void Replace(std::string& text, const std::string& name, const std::string& by) {
@@ -210,10 +214,12 @@ void AssetMerge::SayMessages() const { vexel_yaml::SayMessages(messages_, versio
 
 const std::vector<NamedConflict>& AssetMerge::GetConflicts() {
   if (conflicts_) return *conflicts_;
-  // A safe merge changes what it has read, and an element of a list is known by what was there before.
+  // A safe merge changes what it has read, and the elements of a list are known by what was there before.
   SceneDocuments unchanged;
-  const bool has_elements =
-      std::ranges::any_of(resolver_.GetRecords(), [](const auto& record) { return HasElement(record.path); });
+  const auto is_about_list = [](const auto& record) {
+    return HasElement(record.path) || IsListEdit(record.left) || IsListEdit(record.right);
+  };
+  const bool has_elements = std::ranges::any_of(resolver_.GetRecords(), is_about_list);
   if (has_elements) {
     const CapturedErrors said_before;
     TimerStat silent("", nullptr);
@@ -221,7 +227,7 @@ const std::vector<NamedConflict>& AssetMerge::GetConflicts() {
   }
   const SceneDocuments& shown = has_elements ? unchanged : *documents_;
   conflicts_ = NameConflicts(resolver_, {shown.base, shown.left, shown.right, is_read_safe_.value_or(false)},
-                             FindScriptClasses);
+                             FindAssetNames);
   if (!versions_.mark.empty()) std::ranges::for_each(*conflicts_, [&](auto& c) { NameUndecided(c); });
   return *conflicts_;
 }

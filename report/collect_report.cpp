@@ -101,7 +101,7 @@ class Collector {
       if (path.size() == 1 || from == nullptr) {
         row.note = change.kind == Kind::kRemoved ? "Removed by the repairs" : "Added by the repairs";
       } else {
-        row.note = "Before the repair: " + ValueCell(path, from, Kind::kUnchanged, names_).text;
+        row.note = "Before the repair: " + ValueCell(path, from, Kind::kUnchanged, names_).ForPeople();
       }
       if (row.result.kind == Kind::kUnchanged && change.kind != Kind::kUnchanged) row.result = change;
     };
@@ -297,8 +297,9 @@ class Collector {
       if (files_.committed != nullptr) Inherit(row, &ReportRow::committed, &files_.committed->left);
     }
     for (const ReportRow& row : object.rows) rows_.MarkAbove(row);
-    for (ReportRow& row : object.rows) FinishRow(row);
-    for (const ReportRow& row : object.rows) {
+    for (ReportRow& row : object.rows) {
+      FinishRow(row);
+      TellApart(row, names_);
       object.pending |= row.pending;
       object.repaired |= row.repaired;
     }
@@ -332,6 +333,7 @@ class Collector {
   static void FillFromBase(const ReportRow& row, ReportCell& cell) {
     cell.text = row.base.text;
     cell.full = row.base.full;
+    cell.shown = row.base.shown;
     cell.node = row.base.node;
   }
 

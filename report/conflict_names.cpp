@@ -7,9 +7,11 @@
 #include "diff/yaml_mapping_diff.h"
 #include "diff/yaml_sequence_diff.h"
 #include "fixups/engine_keys.h"
+#include "report/list_edit_text.h"
 #include "report/override_names.h"
 #include "report/record_patterns.h"
 #include "report/report_model.h"
+#include "report/report_places.h"
 #include "report/value_text.h"
 
 namespace vexel_yaml {
@@ -92,18 +94,6 @@ std::string MappingText(const YAMLMappingDiff& diff) {
   return keys.empty() ? "reorders it" : "edits " + keys;
 }
 
-std::string ListText(const ChangeSequenceOperation& operation) {
-  size_t added = 0;
-  for (const auto& [index, edit] : operation.GetDiff()->GetEntries()) {
-    if (edit != nullptr && edit->GetKind() == Operation::Kind::kAdd) ++added;
-  }
-  const size_t edited = operation.GetDiff()->GetEntries().size() - added;
-  if (added == 0 && edited == 0) return "removes from it or reorders it";
-  const std::string adds = "adds " + std::to_string(added);
-  const std::string edits = "edits " + std::to_string(edited);
-  return added == 0 ? edits + " of it" : edited == 0 ? adds + " to it" : adds + " to it, " + edits + " of it";
-}
-
 std::string FullText(const Operation* operation) {
   if (operation == nullptr) return {};
   std::ostringstream text;
@@ -117,13 +107,17 @@ class ConflictNamer {
   ConflictNamer(const RecordingConflictResolver& resolver, const ComparedVersions& versions)
       : patterns_(resolver), versions_(versions), names_({&versions.right, &versions.left, &versions.base}) {}
 
-  void FindScripts(const std::vector<const Record*>& records, const ScriptSearch& search) {
+  void FindAssets(const std::vector<const Record*>& records, const AssetSearch& search) {
     std::set<std::string> guids;
     for (const Record* record : records) {
-      std::string guid = names_.GetScriptGuid(record->path.front());
-      if (!guid.empty()) guids.insert(std::move(guid));
+      guids.insert(names_.GetScriptGuid(record->path.front()));
+      if (record->path.size() == 1) continue;
+      const YAMLNode* base = ValueAt(record->path);
+      for (const YAMLNode* value : {base, ValueAfter(base, record->left), ValueAfter(base, record->right)})
+        CollectGuids(value, guids);
     }
-    if (!guids.empty()) names_.SetScriptClasses(search(guids));
+    guids.erase("");
+    if (!guids.empty()) names_.SetAssetNames(search(guids));
   }
 
   NamedConflict Name(const Record& record) {
@@ -142,19 +136,32 @@ class ConflictNamer {
       conflict.name += " > " + FieldText(path);
     }
     const YAMLNode* base_value = overridden ? overridden->base_value : ValueAt(path);
-    if (record.type == ConflictType::kBothAdd) {
-      conflict.was = "nothing";
-      if (versions_.are_scenes) conflict.was += " (theirs stands until settled)";
-    } else if (path.size() > 1 && base_value != nullptr) {
-      conflict.was = IsAboutFather(path) ? FatherText(*base_value) : WasText(*base_value);
+    Describe(record, base_value, conflict);
+    // Things of one name, or long lists that differ at their ends.
+    if (conflict.theirs == conflict.ours || conflict.was == conflict.theirs ||
+        conflict.was == conflict.ours) {
+      with_ = NamedWith::kFileIDs;
+      Describe(record, base_value, conflict);
+      with_ = NamedWith::kNothing;
     }
-    conflict.theirs = SideText(record, record.left, true);
-    conflict.ours = SideText(record, record.right, false);
     conflict.edits = BaseContent(path) + '\n' + FullText(record.left) + '\n' + FullText(record.right);
     return conflict;
   }
 
  private:
+  // What there was, and what the sides did.
+  void Describe(const Record& record, const YAMLNode* base_value, NamedConflict& conflict) {
+    const FieldPath& path = record.path;
+    if (record.type == ConflictType::kBothAdd) {
+      conflict.was = "nothing";
+      if (versions_.are_scenes) conflict.was += " (theirs stands until settled)";
+    } else if (path.size() > 1 && base_value != nullptr) {
+      conflict.was = IsAboutFather(path) ? FatherText(*base_value) : WasText(path, *base_value);
+    }
+    conflict.theirs = SideText(record, record.left, true);
+    conflict.ours = SideText(record, record.right, false);
+  }
+
   // The object, and its class where the path to it doesn't say it all.
   std::string ObjectText(const YAMLScalar* file_id) {
     const std::string path = OnOneLine(names_.GetPath(file_id));
@@ -217,12 +224,40 @@ class ConflictNamer {
 
   std::string PlaceText(const YAMLScalar* file_id) {
     const std::string name = OnOneLine(names_.Describe(file_id));
-    return name.empty() ? "object " + file_id->GetText() : Shortened(name, kMostOfValue);
+    if (name.empty()) return "object " + file_id->GetText();
+    return with_ == NamedWith::kNothing ? Shortened(name, kMostOfValue)
+                                        : name + " (" + file_id->GetText() + ")";
   }
 
-  std::string WasText(const YAMLNode& value) {
-    const std::string text = OnOneLine(ValueText(&value, names_, kMostOfValue));
+  std::string WasText(const FieldPath& path, const YAMLNode& value) {
+    const std::string text = ValueText(path, value);
     return value.AsScalar() == nullptr && text.ends_with(kEllipsis) ? std::string() : text;
+  }
+
+  // A value at a place. Of a reference, a record may name a part alone.
+  std::string ValueText(const FieldPath& path, const YAMLNode& value) {
+    std::string text;
+    if (const YAMLSequence* list = value.AsSequence()) {
+      for (const std::string& element : NamedElements(*list, names_, with_))
+        text += (text.empty() ? "" : ", ") + element;
+      text = '[' + text + ']';
+    } else {
+      text = PartOfReference(path, value.AsScalar());
+      if (text.empty()) text = OnOneLine(NamedText(&value, names_, with_));
+    }
+    return with_ == NamedWith::kNothing ? Shortened(text, kMostOfValue) : text;
+  }
+
+  std::string PartOfReference(const FieldPath& path, const YAMLScalar* part) {
+    if (part == nullptr || !IsPartOfReference(path)) return {};
+    if (path.back() == YAMLScalar::guid) return OnOneLine(names_.GetAssetName(part->GetText()));
+    const YAMLNode* whole = ValueAt(Above(path));
+    if (whole == nullptr || !IsReference(whole) || whole->AsMapping()->HasKey(YAMLScalar::guid)) return {};
+    return TargetText(part);
+  }
+
+  std::string TargetText(const YAMLScalar* file_id) {
+    return IsNullReference(file_id) ? "none" : PlaceText(file_id);
   }
 
   std::string SideText(const Record& record, const Operation* operation, bool is_left) {
@@ -235,9 +270,9 @@ class ConflictNamer {
         return "removes it";
       case Operation::Kind::kAdd:
         if (record.path.size() == 1) return "adds it";
-        return "adds " + NewValueText(record, static_cast<const AddOperation*>(operation)->GetValue());
+        return "adds " + ValueText(record.path, *static_cast<const AddOperation*>(operation)->GetValue());
       case Operation::Kind::kChange:
-        return NewValueText(record, static_cast<const ChangeOperation*>(operation)->GetValue());
+        return ValueText(record.path, *static_cast<const ChangeOperation*>(operation)->GetValue());
       case Operation::Kind::kChangeMapping: {
         const YAMLMappingDiff& diff = *static_cast<const ChangeMappingOperation*>(operation)->GetDiff();
         if (record.path.size() > 1) {
@@ -246,14 +281,18 @@ class ConflictNamer {
           }
           const std::string moves = IsAboutFather(record.path) ? OtherMovesText(diff) : std::string();
           if (!moves.empty()) return moves;
-          std::string values = NewTarget(diff) == nullptr ? ScalarsText(diff) : NewTargetText(diff);
+          const YAMLNode* reference = ValueAfter(ValueAt(record.path), operation);
+          if (reference != nullptr) return ValueText(record.path, *reference);
+          const std::string values =
+              NewTarget(diff) == nullptr ? ScalarsText(diff) : TargetText(NewTarget(diff));
           return OnOneLine(values.empty() ? MappingText(diff) : values);
         }
         const std::string parts = PartsText(diff, names_.GetPath(record.path.front()));
         return OnOneLine(parts.empty() ? MappingText(BodyDiff(diff)) : parts);
       }
       case Operation::Kind::kChangeSequence:
-        return ListText(*static_cast<const ChangeSequenceOperation*>(operation));
+        return ListEditText(*static_cast<const ChangeSequenceOperation*>(operation), ValueAt(record.path),
+                            names_, with_);
     }
     return {};
   }
@@ -309,23 +348,10 @@ class ConflictNamer {
     return text;
   }
 
-  std::string NewTargetText(const YAMLMappingDiff& diff) {
-    const YAMLScalar* file_id = NewTarget(diff);
-    const std::string target = names_.Describe(file_id);
-    return "{fileID: " + file_id->GetText() +
-           (target.empty() ? "}" : "} (" + Shortened(target, kMostOfValue) + ")");
-  }
-
-  std::string NewValueText(const Record& record, const YAMLNode* value) {
-    std::string text = OnOneLine(ValueText(value, names_, kMostOfValue));
-    if (record.path.back() != YAMLScalar::fileID || value->AsScalar() == nullptr) return text;
-    const std::string target = OnOneLine(names_.Describe(value->AsScalar()));
-    return target.empty() ? text : text + " (" + Shortened(target, kMostOfValue) + ")";
-  }
-
   const RecordPatterns patterns_;
   const ComparedVersions versions_;
   ObjectNames names_;
+  NamedWith with_ = NamedWith::kNothing;
 };
 
 // Two lamps of one name can stand beside one another.
@@ -344,13 +370,13 @@ std::string WithName(std::string_view side, std::string_view name) {
 }  // namespace
 
 std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver,
-                                         const ComparedVersions& versions, const ScriptSearch& search) {
+                                         const ComparedVersions& versions, const AssetSearch& search) {
   std::vector<const Record*> pending;
   for (const Record& record : resolver.GetRecords()) {
     if (record.resolution == MergeResolve::kConflict) pending.push_back(&record);
   }
   ConflictNamer namer(resolver, versions);
-  namer.FindScripts(pending, search);
+  namer.FindAssets(pending, search);
   std::vector<NamedConflict> conflicts;
   for (const Record* record : pending) conflicts.push_back(namer.Name(*record));
   TellApart(conflicts);

@@ -1,8 +1,5 @@
 #pragma once
 
-#include <functional>
-#include <map>
-#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -30,14 +27,10 @@ struct NamedConflict {
   std::string edits;
 };
 
-/// The classes of scripts by the guids that objects refer to them with; those that aren't found are missing.
-using ScriptClasses = std::map<std::string, std::string>;
-using ScriptSearch = std::function<ScriptClasses(const std::set<std::string>& guids)>;
-
-/// The pending conflicts of a merge of these versions, in the order of its records. Where scripts are among
-/// them, `search` is asked once.
+/// The pending conflicts of a merge of these versions, in the order of its records. Where scripts and other
+/// assets are among them, `search` is asked once.
 std::vector<NamedConflict> NameConflicts(const RecordingConflictResolver& resolver,
-                                         const ComparedVersions& versions, const ScriptSearch& search);
+                                         const ComparedVersions& versions, const AssetSearch& search);
 
 /// The conflict in one line; the sides' own names stand in brackets where they have some.
 std::string ConflictLine(const NamedConflict& conflict, std::string_view theirs, std::string_view ours);

@@ -16,7 +16,7 @@ std::string Named(std::string_view word, ObjectNames& names) {
   const FieldPath path = StringToPath(std::string(word));
   const std::string name = path.empty() ? std::string() : names.Describe(path.front());
   if (name.empty()) return std::string(word);
-  return path.size() < 3 ? name : name + " \u203A " + FieldLabel(path);
+  return path.size() < 3 ? name : name + " > " + FieldLabel(path);
 }
 
 }  // namespace

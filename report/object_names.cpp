@@ -14,6 +14,7 @@ namespace {
 // Longer paths would tell nobody anything, and cost much where thousands of objects have one.
 constexpr size_t kMostNames = 50;
 constexpr size_t kMostOfName = 100;
+constexpr std::string_view kScriptSuffix = ".cs";
 
 const YAMLScalar* NameKey() {
   static const YAMLScalar* const key = YAMLScalar::Lookup("m_Name");
@@ -64,6 +65,28 @@ const YAMLScalar* LocalReference(const YAMLNode* value) {
   return IsNullReference(file_id->AsScalar()) ? nullptr : file_id->AsScalar();
 }
 
+bool IsReference(const YAMLNode* value) {
+  const YAMLMapping* mapping = value == nullptr ? nullptr : value->AsMapping();
+  if (mapping == nullptr || mapping->GetFolded() != nullptr || mapping->HasDuplicateKeys()) return false;
+  const YAMLNode* file_id = mapping->Get(YAMLScalar::fileID);
+  const YAMLNode* guid = mapping->Get(YAMLScalar::guid);
+  if (file_id == nullptr || file_id->AsScalar() == nullptr || mapping->Size() > 3) return false;
+  return guid == nullptr ? mapping->Size() == 1 : guid->AsScalar() != nullptr;
+}
+
+void CollectGuids(const YAMLNode* value, std::set<std::string>& guids) {
+  if (value == nullptr) return;
+  if (const YAMLSequence* list = value->AsSequence()) {
+    for (const YAMLNode* item : list->GetItems()) CollectGuids(item, guids);
+  } else if (IsReference(value)) {
+    const std::string guid = TextOf(value->AsMapping()->Get(YAMLScalar::guid));
+    if (!guid.empty()) guids.insert(guid);
+  } else if (const YAMLMapping* mapping = value->AsMapping();
+             mapping != nullptr && mapping->GetFolded() == nullptr && !mapping->HasDuplicateKeys()) {
+    for (const YAMLMapping::Slot& slot : *mapping) CollectGuids(slot.value, guids);
+  }
+}
+
 const YAMLMapping* ObjectNames::Body(const YAMLScalar* file_id) const {
   for (const VexelObjects* version : versions_) {
     const YAMLMapping* object = GetSubmapping(*version, file_id);
@@ -79,9 +102,9 @@ std::string ObjectNames::GetScriptGuid(const YAMLScalar* file_id) const {
 }
 
 std::string ObjectNames::GetClass(const YAMLScalar* file_id) const {
-  if (!script_classes_.empty()) {
-    const auto found = script_classes_.find(GetScriptGuid(file_id));
-    if (found != script_classes_.end()) return found->second;
+  if (!asset_names_.empty()) {
+    std::string script = GetScriptClass(GetScriptGuid(file_id));
+    if (!script.empty()) return script;
   }
   for (const VexelObjects* version : versions_) {
     const YAMLMapping* object = GetSubmapping(*version, file_id);
@@ -93,8 +116,16 @@ std::string ObjectNames::GetClass(const YAMLScalar* file_id) const {
 }
 
 std::string ObjectNames::GetScriptClass(const std::string& guid) const {
-  const auto found = script_classes_.find(guid);
-  return found == script_classes_.end() ? std::string() : found->second;
+  const auto found = asset_names_.find(guid);
+  if (found == asset_names_.end() || !found->second.ends_with(kScriptSuffix)) return {};
+  return found->second.substr(0, found->second.size() - kScriptSuffix.size());
+}
+
+std::string ObjectNames::GetAssetName(const std::string& guid) const {
+  std::string script = GetScriptClass(guid);
+  if (!script.empty()) return script;
+  const auto found = asset_names_.find(guid);
+  return found == asset_names_.end() ? std::string() : found->second;
 }
 
 const YAMLScalar* ObjectNames::GetWhole(const YAMLScalar* file_id) const {
@@ -197,7 +228,15 @@ std::string ObjectNames::Describe(const YAMLScalar* file_id) {
   std::string name = GetClass(file_id);
   const std::string& path = GetPath(file_id);
   if (path.empty()) return name;
-  return name == "GameObject" || IsTransform(name) ? path : name + " of " + path;
+  return name.empty() || name == "GameObject" || IsTransform(name) ? path : path + " > " + name;
+}
+
+std::string ObjectNames::DescribeTarget(const YAMLNode* reference) {
+  if (!IsReference(reference)) return {};
+  const YAMLMapping* mapping = reference->AsMapping();
+  if (mapping->HasKey(YAMLScalar::guid)) return GetAssetName(TextOf(mapping->Get(YAMLScalar::guid)));
+  const YAMLScalar* target = LocalReference(reference);
+  return target == nullptr ? "none" : Describe(target);
 }
 
 }  // namespace vexel_yaml

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <functional>
 #include <map>
+#include <set>
 #include <string>
 #include <unordered_map>
 #include <vector>
@@ -8,6 +10,11 @@
 #include "yaml/vexel_objects.h"
 
 namespace vexel_yaml {
+
+/// The names of assets' files, such as "Brick.mat", by the guids that objects refer to them with.
+using AssetNames = std::map<std::string, std::string>;
+/// Finds the names of assets; those that aren't found are missing.
+using AssetSearch = std::function<AssetNames(const std::set<std::string>& guids)>;
 
 /// What people call the objects of an asset, where they only carry file IDs.
 ///
@@ -23,11 +30,14 @@ class ObjectNames {
   /// The guid of the script that the object is an instance of; empty for any other object.
   std::string GetScriptGuid(const YAMLScalar* file_id) const;
 
-  /// Makes the instances of these scripts, by guid, go by their classes.
-  void SetScriptClasses(std::map<std::string, std::string> classes) { script_classes_ = std::move(classes); }
+  /// Makes other assets, by guid, go by the names of their files, and the instances of scripts by their
+  /// classes, which have the files' names.
+  void SetAssetNames(AssetNames names) { asset_names_ = std::move(names); }
 
   /// The class of a script, empty for one that isn't known.
   std::string GetScriptClass(const std::string& guid) const;
+  /// The name of another asset, for a script its class; empty for one that isn't known.
+  std::string GetAssetName(const std::string& guid) const;
 
   /// What people take the object for a part of: a component's game object, the prefab instance that brought
   /// it along, or else the object itself.
@@ -46,9 +56,13 @@ class ObjectNames {
   /// where nothing is named.
   const std::string& GetPath(const YAMLScalar* file_id);
 
-  /// Path and class in a few words, such as "Light of Harbour/Pier"; game objects and transforms, which stand
+  /// Path and class in a few words, such as "Harbour/Pier > Light"; game objects and transforms, which stand
   /// for their place, go by the path alone. Empty for an unknown object.
   std::string Describe(const YAMLScalar* file_id);
+
+  /// What people call what a reference leads to, "none" for nothing. Empty for something unknown, and for a
+  /// value that is no reference.
+  std::string DescribeTarget(const YAMLNode* reference);
 
  private:
   /// The object's fields, null for an unknown object.
@@ -68,8 +82,15 @@ class ObjectNames {
   std::vector<const VexelObjects*> versions_;
   std::unordered_map<const YAMLScalar*, Step> steps_;
   std::unordered_map<const YAMLScalar*, std::string> paths_;
-  std::map<std::string, std::string> script_classes_;
+  AssetNames asset_names_;
 };
+
+/// Whether a value is a reference and nothing more: an element of a list may hold a file ID among other
+/// fields.
+bool IsReference(const YAMLNode* value);
+
+/// Adds the guids of the assets that a value refers to.
+void CollectGuids(const YAMLNode* value, std::set<std::string>& guids);
 
 /// The file ID of a reference within the file, null for any other value and for a reference to nothing.
 const YAMLScalar* LocalReference(const YAMLNode* value);

@@ -51,7 +51,7 @@ Json ValueJson(const ReportCell& cell, bool is_switch, ObjectNames& names) {
     case Kind::kNone:
       return nullptr;
     case Kind::kText:
-      return {{"type", "text"}};
+      return value.is_empty ? Json{{"type", "text"}, {"empty", true}} : Json{{"type", "text"}};
     case Kind::kNumber:
       if (is_switch) return {{"type", "boolean"}, {"on", value.number == "1"}};
       return {{"type", "number"}, {"number", value.number}};
@@ -78,6 +78,7 @@ Json ValueJson(const ReportCell& cell, bool is_switch, ObjectNames& names) {
 Json CellJson(const ReportCell& cell, bool is_switch, ObjectNames& names) {
   Json json = {{"kind", KindWord(cell.kind)}, {"text", Cleaned(cell.text)}};
   if (!cell.full.empty()) json["full"] = Cleaned(cell.full);
+  if (!cell.shown.empty()) json["shown"] = Cleaned(cell.shown);
   // A list's cell tells its edits, and a mark inside says no more than that.
   json["value"] = cell.kind == ReportCell::Kind::kEdited ? Json() : ValueJson(cell, is_switch, names);
   return json;

@@ -4,6 +4,8 @@
 #include <set>
 #include <unordered_map>
 
+#include "report/side_walk.h"
+
 namespace vexel_yaml {
 
 namespace {
@@ -68,6 +70,21 @@ void JudgeRow(ReportRow& row, const SideWords& sides) {
   row.note = !lost_right  ? sides.left + "'s new order was not taken"
              : !lost_left ? sides.right + "'s new order was not taken"
                           : "Neither side's new order was taken";
+}
+
+void TellApart(ReportRow& row, ObjectNames& names) {
+  ReportCell* const cells[] = {&row.base, &row.left, &row.right, &row.result, &row.committed};
+  const auto looks_like_another = [&](const ReportCell* cell) {
+    return !cell->shown.empty() && std::ranges::any_of(cells, [&](const ReportCell* other) {
+      return other->shown == cell->shown && (other->text != cell->text || other->full != cell->full);
+    });
+  };
+  if (std::ranges::none_of(cells, looks_like_another)) return;
+  for (ReportCell* cell : cells) {
+    // Of a list's edits, the exact text has the file IDs.
+    cell->shown.clear();
+    if (cell->kind != Kind::kEdited) ShowNamed(*cell, names, NamedWith::kFileIDs);
+  }
 }
 
 std::string_view DependencyText(const RecordingConflictResolver::Record& record) {

@@ -19,6 +19,10 @@ struct ReportCell {
   std::string text;
   /// The whole text where `text` is only the start of it, else empty.
   std::string full;
+  /// What people see of it, where that is another text: with names in place of file IDs, and lists whole, on
+  /// a line an element. Two values can be the same in it.
+  std::string shown = {};
+  const std::string& ForPeople() const { return shown.empty() ? text : shown; }
 
   /// Of a list whose elements came, went or moved: those of base that are still there, in their order now.
   std::vector<uint32_t> order = {};
@@ -28,7 +32,7 @@ struct ReportCell {
   const YAMLNode* node = nullptr;
 
   bool operator==(const ReportCell& other) const {
-    return kind == other.kind && text == other.text && full == other.full;
+    return kind == other.kind && text == other.text && full == other.full && shown == other.shown;
   }
 };
 
@@ -95,6 +99,9 @@ inline constexpr std::string_view kChangedInside = "changed inside";
 /// Tells what became of a place that no record settles, from what its cells say, and notes it where an order
 /// got lost.
 void JudgeRow(ReportRow& row, const SideWords& sides);
+
+/// Gives values of a row that only look the same what tells them apart.
+void TellApart(ReportRow& row, ObjectNames& names);
 
 /// Why a record is about components that need or exclude one another, from its side's point of view; empty
 /// for other records.

@@ -1,5 +1,9 @@
 #include "report/report_places.h"
 
+#include <algorithm>
+
+#include "diff/yaml_mapping_diff.h"
+#include "report/object_names.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_sequence.h"
 
@@ -46,6 +50,29 @@ const YAMLNode* After(const YAMLNode* value, const Operation* edit) {
   holder->Insert(YAMLScalar::underscore, value->Clone());
   edit->Apply(*holder, YAMLScalar::underscore);
   return holder->Get(YAMLScalar::underscore);
+}
+
+namespace {
+
+// An edit of something around the reference, such as the moves that make a circle, can't be made in it.
+bool IsReferenceEdit(const Operation& edit) {
+  if (edit.GetKind() != Operation::Kind::kChangeMapping) return false;
+  const auto& entries = static_cast<const ChangeMappingOperation&>(edit).GetDiff()->GetEntries();
+  return std::ranges::all_of(entries, [](const YAMLMappingDiff::Entry& entry) {
+    return entry.key == YAMLScalar::fileID || entry.key == YAMLScalar::guid || entry.key->GetText() == "type";
+  });
+}
+
+}  // namespace
+
+const YAMLNode* ValueAfter(const YAMLNode* base, const Operation* edit) {
+  if (edit == nullptr || edit->GetKind() == Operation::Kind::kRemove) return nullptr;
+  const auto kind = edit->GetKind();
+  if (kind == Operation::Kind::kAdd || kind == Operation::Kind::kChange)
+    return static_cast<const ValuedOperation*>(edit)->GetValue();
+  if (base == nullptr) return nullptr;
+  const bool is_list = kind == Operation::Kind::kChangeSequence && base->AsSequence() != nullptr;
+  return is_list || (IsReference(base) && IsReferenceEdit(*edit)) ? After(base, edit) : nullptr;
 }
 
 }  // namespace vexel_yaml

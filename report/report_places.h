@@ -25,6 +25,9 @@ bool IsPartOfReference(const FieldPath& path);
 /// What an edit makes of a value; null for nothing. Never given back, like what operations hold.
 const YAMLNode* After(const YAMLNode* value, const Operation* edit);
 
+/// What stands in base's place after an edit, for edits of references, lists and whole values; else null.
+const YAMLNode* ValueAfter(const YAMLNode* base, const Operation* edit);
+
 /// The path without its last component; it must have one.
 FieldPath Above(FieldPath path);
 

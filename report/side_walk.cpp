@@ -55,11 +55,47 @@ const YAMLNode* ValueAt(const YAMLNode* node, const YAMLScalar* key) {
   return mapping == nullptr || mapping->HasDuplicateKeys() ? nullptr : mapping->Get(key);
 }
 
+// Whether an element of a list says what it is in a line of its own.
+bool FitsIntoLine(const YAMLNode* element) {
+  if (element == nullptr) return true;
+  if (const YAMLScalar* scalar = element->AsScalar()) return scalar->GetText().size() <= kMostOfElement;
+  const YAMLMapping* mapping = element->AsMapping();
+  return mapping != nullptr && !mapping->HasDuplicateKeys() &&
+         (IsReference(mapping) || (mapping->Size() == 1 && IsReference(mapping->First())));
+}
+
+// The place in the changed list from which on, and that before which, something stands elsewhere than before.
+std::pair<size_t, size_t> Moved(const std::vector<uint32_t>& origins, size_t from_size, size_t to_size) {
+  size_t begin = 0;
+  while (begin < to_size && origins[begin] == begin) ++begin;
+  size_t end = to_size;
+  while (end > begin && from_size + end >= to_size && origins[end - 1] == from_size + end - 1 - to_size)
+    --end;
+  return {begin, end};
+}
+
+// The part of a list that is in another order now, with dots for the rest.
+std::string OrderText(const std::vector<std::string>& list, std::pair<size_t, size_t> moved) {
+  std::string text = moved.first > 0 ? std::string(kEllipsis) : std::string();
+  for (size_t i = moved.first; i < moved.second; ++i) text += (text.empty() ? "" : ", ") + list[i];
+  return moved.second < list.size() ? text + ", " + std::string(kEllipsis) : text;
+}
+
 const YAMLNode* ElementAt(const YAMLSequence& sequence, size_t index) {
   return index < sequence.Size() ? sequence.GetItems()[index] : nullptr;
 }
 
 }  // namespace
+
+void ShowNamed(ReportCell& cell, ObjectNames& names, NamedWith with) {
+  if (cell.node == nullptr) return;
+  if (const YAMLSequence* list = cell.node->AsSequence()) {
+    if (list->Size() > 0 && std::ranges::all_of(list->GetItems(), FitsIntoLine))
+      cell.shown = NamedText(list, names, with);
+  } else if (cell.node->AsMapping() != nullptr || cell.node == YAMLScalar::empty) {
+    cell.shown = Shortened(NamedText(cell.node, names, with), kMostOfValue);
+  }
+}
 
 ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, ObjectNames& names) {
   ReportCell cell{kind, {}, {}};
@@ -70,12 +106,14 @@ ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Ki
     return cell;
   }
   const YAMLSequence* list = node == nullptr ? nullptr : node->AsSequence();
+  ShowNamed(cell, names, NamedWith::kNothing);
   if (list != nullptr && list->Size() > kMostElements) {
     cell.text = std::to_string(list->Size()) + " elements";
     cell.full = FullText(*list);
     return cell;
   }
   cell.text = ValueText(node, names, kMostOfValue);
+  if (cell.shown == cell.text) cell.shown.clear();
   if (node == nullptr || !cell.text.ends_with(kEllipsis)) return cell;
   cell.full = FullText(*node);
   // The value's own dots.
@@ -118,32 +156,39 @@ void SideWalk::WalkOperation(const Operation& operation, const YAMLNode* from, c
            *to->AsMapping());
       return;
     case Operation::Kind::kChangeSequence:
-      WalkSequence(static_cast<const ChangeSequenceOperation&>(operation), *from->AsSequence(),
-                   *to->AsSequence());
+      WalkList(static_cast<const ChangeSequenceOperation&>(operation), *from->AsSequence(),
+               *to->AsSequence());
       return;
   }
 }
 
 // An edit inside an element that stays is a change of its own; what came, went or moved is one of the list.
-void SideWalk::WalkSequence(const ChangeSequenceOperation& operation, const YAMLSequence& from,
-                            const YAMLSequence& to) {
+void SideWalk::WalkList(const ChangeSequenceOperation& operation, const YAMLSequence& from,
+                        const YAMLSequence& to) {
   const YAMLSequenceRemapper* remapper = operation.GetRemapper();
   const std::vector<uint32_t> origins = Origins(remapper, from.Size(), to.Size());
   ReportCell edits{ReportCell::Kind::kEdited, {}, {}};
   bool shortened = false;
-  const auto add_edit = [&](std::string_view word, const YAMLNode* value) {
+  const auto add = [&](std::string_view word, const YAMLNode* value, const std::string& named) {
     const std::string whole = OnOneLine(ValueText(value, names_, std::string::npos));
     const std::string start = Shortened(whole, kMostOfElement);
     shortened |= start.size() < whole.size();
     const std::string_view line_break = edits.text.empty() ? "" : "\n";
     edits.text.append(line_break).append(word).append(start);
     edits.full.append(line_break).append(word).append(whole);
+    edits.shown.append(line_break).append(word).append(named);
+  };
+  const std::vector<std::string> before = NamedElements(from, names_);
+  const std::vector<std::string> after = NamedElements(to, names_);
+  const auto add_edit = [&](std::string_view word, const YAMLSequence& list, size_t index) {
+    const std::vector<std::string>& named = &list == &from ? before : after;
+    add(word, ElementAt(list, index), index < named.size() ? Shortened(named[index], kMostOfElement) : "");
   };
   const bool was_in_list = std::exchange(in_list_, true);
   if (remapper != nullptr) {
     for (size_t i = 0; i < remapper->GetMapping().size(); ++i) {
       if (remapper->GetMapping()[i] == YAMLSequenceRemapper::kDropped) {
-        add_edit("- ", ElementAt(from, i));
+        add_edit("- ", from, i);
         MarkGone(i);
       }
     }
@@ -152,10 +197,10 @@ void SideWalk::WalkSequence(const ChangeSequenceOperation& operation, const YAML
     const auto at = static_cast<size_t>(index);
     const uint32_t origin = origins.at(at);
     if (element->GetKind() == Operation::Kind::kRemove) {
-      add_edit("- ", ElementAt(from, origin));
+      add_edit("- ", from, origin);
       MarkGone(origin);
     } else if (element->GetKind() == Operation::Kind::kAdd || origin == YAMLSequenceRemapper::kDropped) {
-      add_edit("+ ", ElementAt(to, at));
+      add_edit("+ ", to, at);
     } else {
       WalkAt(YAMLScalar::Lookup(IntToString(static_cast<int>(origin))), *element, ElementAt(from, origin),
              ElementAt(to, at));
@@ -166,9 +211,11 @@ void SideWalk::WalkSequence(const ChangeSequenceOperation& operation, const YAML
   in_list_ = was_in_list;
   edits.order = origins;
   std::erase(edits.order, YAMLSequenceRemapper::kDropped);
-  if (!std::ranges::is_sorted(edits.order)) add_edit(kNewOrder, &to);
+  if (!std::ranges::is_sorted(edits.order))
+    add(kNewOrder, &to, OrderText(after, Moved(origins, from.Size(), to.Size())));
   if (edits.text.empty()) return;
   if (!shortened) edits.full.clear();
+  if (edits.shown == edits.text) edits.shown.clear();
   found_(path_, std::move(edits), &from);
 }
 

@@ -27,12 +27,12 @@ class SideWalk {
 
   /// Walks over the changes that make `to` of `from`, both whole files.
   void Walk(const YAMLMappingDiff& diff, const YAMLMapping& from, const YAMLMapping& to);
+  /// The same for one list, whose place is the empty path.
+  void WalkList(const ChangeSequenceOperation& operation, const YAMLSequence& from, const YAMLSequence& to);
 
  private:
   void WalkAt(const YAMLScalar* key, const Operation& operation, const YAMLNode* from, const YAMLNode* to);
   void WalkOperation(const Operation& operation, const YAMLNode* from, const YAMLNode* to);
-  void WalkSequence(const ChangeSequenceOperation& operation, const YAMLSequence& from,
-                    const YAMLSequence& to);
   void MarkGone(size_t index);
   void RememberInner(const Operation& operation);
 
@@ -43,6 +43,10 @@ class SideWalk {
   FieldPath path_;
   bool in_list_ = false;
 };
+
+/// Makes a cell show its value by names. Long texts, and lists of what takes more than a line, stay as they
+/// are.
+void ShowNamed(ReportCell& cell, ObjectNames& names, NamedWith with);
 
 /// What `node` is at `path`: a whole object counts its fields.
 ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, ObjectNames& names);

@@ -77,20 +77,12 @@ bool TakeVector(const YAMLMapping& mapping, TypedValue& value) {
   return false;
 }
 
-bool TakeReference(const YAMLMapping& mapping, ObjectNames& names, TypedValue& value) {
-  const YAMLScalar* file_id = ScalarAt(mapping, "fileID");
-  if (file_id == nullptr || mapping.Size() > 3) return false;
-  const YAMLScalar* guid = ScalarAt(mapping, "guid");
-  if (mapping.Size() > 1 && guid == nullptr) return false;
+void TakeReference(const YAMLMapping& mapping, ObjectNames& names, TypedValue& value) {
+  if (!IsReference(&mapping)) return;
   value.kind = Kind::kReference;
-  value.id = file_id->GetText();
-  if (guid != nullptr) value.guid = guid->GetText();
-  if (guid != nullptr) {
-    value.name = names.GetScriptClass(value.guid);
-  } else if (const YAMLScalar* target = LocalReference(&mapping)) {
-    value.name = names.Describe(target);
-  }
-  return true;
+  value.id = ScalarAt(mapping, "fileID")->GetText();
+  if (const YAMLScalar* guid = ScalarAt(mapping, "guid")) value.guid = guid->GetText();
+  if (!value.guid.empty() || LocalReference(&mapping) != nullptr) value.name = names.DescribeTarget(&mapping);
 }
 
 bool IsIndex(std::string_view key) {
@@ -120,6 +112,7 @@ TypedValue TypedValueOf(const YAMLNode* node, ObjectNames& names) {
   if (node == nullptr) return value;
   value.kind = Kind::kText;
   if (const YAMLScalar* scalar = node->AsScalar()) {
+    value.is_empty = scalar->GetText().empty();
     if (!IsNumber(scalar->GetText())) return value;
     value.kind = Kind::kNumber;
     value.number = scalar->GetText();

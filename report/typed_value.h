@@ -15,6 +15,8 @@ struct TypedValue {
   enum class Kind { kNone, kText, kNumber, kVector, kColour, kReference };
 
   Kind kind = Kind::kNone;
+  /// Of a text.
+  bool is_empty = false;
   /// Of a number, as it is written.
   std::string number;
   /// Of a vector: the names of its parts, and the numbers as they are written.

@@ -1,6 +1,7 @@
 #include "report/value_text.h"
 
 #include <algorithm>
+#include <map>
 #include <sstream>
 
 #include "diff/yaml_diff_output.h"
@@ -10,6 +11,7 @@ namespace vexel_yaml {
 namespace {
 
 constexpr size_t kMostOfOperation = 60;
+constexpr std::string_view kEmptyText = "(empty)";
 
 bool IsContinuation(char byte) { return (static_cast<unsigned char>(byte) & 0xC0) == 0x80; }
 
@@ -121,6 +123,77 @@ class ValueWriter {
   std::string text_;
 };
 
+// The reference that an element of a list consists of, as it is or, as in a list of components, under a name
+// of its own; else null.
+const YAMLNode* ReferenceIn(const YAMLNode* element) {
+  if (IsReference(element)) return element;
+  const YAMLMapping* entry = element == nullptr ? nullptr : element->AsMapping();
+  if (entry == nullptr || entry->HasDuplicateKeys() || entry->Size() != 1) return nullptr;
+  return IsReference(entry->First()) ? entry->First() : nullptr;
+}
+
+std::string Joined(const std::vector<std::string>& texts, std::string_view separator) {
+  std::string joined;
+  for (const std::string& text : texts) joined.append(joined.empty() ? "" : separator).append(text);
+  return joined;
+}
+
+// Writes a value as people know it.
+class NamedWriter {
+ public:
+  NamedWriter(ObjectNames& names, bool has_ids) : names_(names), has_ids_(has_ids) {}
+
+  std::string Text(const YAMLNode* value) {
+    if (value == nullptr) return {};
+    if (const YAMLScalar* scalar = value->AsScalar()) {
+      return scalar == YAMLScalar::empty ? std::string(kEmptyText) : scalar->GetText();
+    }
+    if (const YAMLSequence* list = value->AsSequence()) return '[' + Joined(Elements(*list), ", ") + ']';
+    std::string name = TargetText(value, has_ids_);
+    return name.empty() ? MappingText(*value->AsMapping()) : name;
+  }
+
+  std::vector<std::string> Elements(const YAMLSequence& list) {
+    std::map<std::string, size_t> counts;
+    for (const YAMLNode* item : list.GetItems()) ++counts[names_.DescribeTarget(ReferenceIn(item))];
+    std::vector<std::string> elements;
+    for (const YAMLNode* item : list.GetItems()) {
+      const YAMLNode* reference = ReferenceIn(item);
+      const bool has_id = has_ids_ || counts[names_.DescribeTarget(reference)] > 1;
+      const std::string name = TargetText(reference, has_id);
+      elements.push_back(OnOneLine(name.empty() ? Text(item) : name));
+    }
+    return elements;
+  }
+
+ private:
+  std::string TargetText(const YAMLNode* reference, bool has_id) {
+    std::string name = names_.DescribeTarget(reference);
+    if (name.empty() || !has_id) return name;
+    const YAMLMapping& parts = *reference->AsMapping();
+    name += " (" + parts.Get(YAMLScalar::fileID)->AsScalar()->GetText();
+    if (const YAMLNode* guid = parts.Get(YAMLScalar::guid)) name += " in " + guid->AsScalar()->GetText();
+    return name + ")";
+  }
+
+  std::string MappingText(const YAMLMapping& mapping) {
+    std::string text;
+    const auto add = [&](const YAMLMapping::Slot& slot) {
+      if (slot.key->IsPseudoKey()) return;
+      text += (text.empty() ? "" : ", ") + slot.key->GetText() + ": " + Text(slot.value);
+    };
+    if (mapping.HasDuplicateKeys()) {
+      for (const YAMLMapping::Slot& slot : mapping.GetDuplicatePairs()) add(slot);
+    } else {
+      for (const YAMLMapping::Slot& slot : mapping) add(slot);
+    }
+    return '{' + text + '}';
+  }
+
+  ObjectNames& names_;
+  const bool has_ids_;
+};
+
 }  // namespace
 
 std::string Shortened(std::string_view text, size_t most) {
@@ -153,6 +226,16 @@ std::string ValueText(const YAMLNode* value, ObjectNames& names, size_t most) {
   ValueWriter writer(names, most);
   writer.Write(value);
   return Shortened(writer.GetText(), most);
+}
+
+std::string NamedText(const YAMLNode* value, ObjectNames& names, NamedWith with) {
+  const YAMLSequence* list = value == nullptr ? nullptr : value->AsSequence();
+  if (list != nullptr && list->Size() > 0) return Joined(NamedElements(*list, names, with), "\n");
+  return NamedWriter(names, with == NamedWith::kFileIDs).Text(value);
+}
+
+std::vector<std::string> NamedElements(const YAMLSequence& list, ObjectNames& names, NamedWith with) {
+  return NamedWriter(names, with == NamedWith::kFileIDs).Elements(list);
 }
 
 std::string OperationText(const Operation& operation) {

@@ -68,10 +68,14 @@ std::string_view FirstLines(std::string_view text) {
 }
 
 void WriteText(std::ostream& out, const ReportCell& cell) {
-  const std::string_view start = FirstLines(cell.text);
-  const std::string_view full = cell.full.empty() && start.size() < cell.text.size() ? cell.text : cell.full;
+  const std::string& text = cell.ForPeople();
+  const std::string_view start = FirstLines(text);
+  const bool is_whole_list =
+      !cell.shown.empty() && cell.node != nullptr && cell.node->AsSequence() != nullptr;
+  const std::string_view more = is_whole_list ? std::string_view() : cell.full;
+  const std::string_view full = start.size() < text.size() ? text : more;
   if (full.empty()) {
-    out << "<span class=\"value\">" << Escaped{cell.text} << "</span>";
+    out << "<span class=\"value\">" << Escaped{text} << "</span>";
     return;
   }
   out << "<details><summary><span class=\"value\">" << Escaped{start} << "</span></summary><pre>"

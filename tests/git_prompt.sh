@@ -120,4 +120,22 @@ again
 check "who moved others into a circle is said to" refuses answer q
 check "by their names" grep -qFx '  ours    moves Object 3 below Object 1' "$work/out"
 
+# Lists and references, by the names of what they lead to: one side removes a list that the other one reorders.
+# wall GUID TARGET...
+wall() {
+  objects 0 0 0
+  printf -- '--- !v!114 &40\nMonoBehaviour:\n  m_Material: {fileID: 2, guid: %032d, type: 2}\n  m_Wall: 1\n' "$1"
+  [ $# -eq 1 ] || { echo '  m_Targets:' && printf '  - {fileID: %s}\n' "${@:2}"; }
+}
+git reset -q --hard && git checkout -q main && wall 1 10 21 30 >"$file"
+for guid in 1 2 3; do printf 'fileFormatVersion: 2\nguid: %032d\n' "$guid" >"Brick$guid.mat.meta"; done
+git add -A && git commit -q -m wall
+commit theirs wall 2
+commit ours wall 3 10 30 21
+again
+check "a list is asked about" refuses answer ss
+check "by its elements' names" grep -qFx '  was     [Object 1, Object 2, Object 3]' "$work/out"
+check "so that orders differ" grep -qFx '  ours    new order: ..., Object 3, Object 2' "$work/out"
+check "another asset goes by its file" grep -qFx '  theirs  Brick2.mat' "$work/out"
+
 end_of_checks "people are asked"

@@ -223,7 +223,7 @@ function searchedText(card) {
     for (const row of object.rows) {
       texts.push(row.label, row.field, row.note);
       for (const cell of [row.base, row.theirs, row.ours, row.result]) {
-        texts.push(cell?.text, cell?.full, cell?.value?.name);
+        texts.push(cell?.text, cell?.full, cell?.shown);
       }
     }
   }

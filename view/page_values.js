@@ -32,14 +32,14 @@ function swatch({r, g, b, a = 1}) {
   return element;
 }
 
-function reference(value) {
-  if (value.name) return make("span", "reference", make("span", "arrow", "→ "), value.name);
-  if (!value.guid && (value.id === "0" || value.id === "")) return make("span", "none", "nothing");
+function reference(value, shown) {
+  if (value.name) return make("span", "reference", make("span", "arrow", "→ "), shown ?? value.name);
+  if (!value.guid && (value.id === "0" || value.id === "")) return make("span", "none", "none");
   return null;
 }
 
 // What a value is as people see it, or null where its text says it best.
-function shownValue(value, before) {
+function shownValue({value, shown}, before) {
   const parts = (of) => (before?.type === value.type ? of(before) : undefined);
   switch (value?.type) {
     case "number":
@@ -51,37 +51,53 @@ function shownValue(value, before) {
     case "boolean":
       return make("span", value.on ? "switch on" : "switch", value.on ? "on" : "off");
     case "reference":
-      return reference(value);
+      return reference(value, shown);
     default:
-      return null;
+      return value?.empty ? make("span", "none", "empty") : null;
   }
 }
 
+const mostLines = 6;
 const kindWords = {added: "added", removed: "removed"};
 
 // What stands in a cell, without the part that is only unfolded.
 function cellContent(cell, side, base) {
   const content = make("span", `value ${cell.kind}`);
   if (kindWords[cell.kind]) content.append(make("b", cell.kind, kindWords[cell.kind]), " ");
-  const value = cell.value === null ? null : shownValue(cell.value, side === "base" ? null : base?.value);
+  const value = shownValue(cell, side === "base" ? null : base?.value);
   if (value !== null) {
     content.append(value);
   } else if (cell.text !== "") {
-    content.append(cell.text);
+    content.append(firstLines(cell));
   } else if (!kindWords[cell.kind]) {
     content.append(make("span", "none", "not there"));
   }
   return content;
 }
 
+const linesOf = (cell) => (cell.shown ?? cell.text).split("\n");
+
+function firstLines(cell) {
+  const lines = linesOf(cell);
+  return lines.length <= mostLines ? lines.join("\n") : [...lines.slice(0, mostLines), `${lines.length - mostLines} more`].join("\n");
+}
+
+// What is left out of a cell, or only told in part.
+function restOf(cell) {
+  if (cell.shown === undefined) return cell.full;
+  if (linesOf(cell).length > mostLines) return cell.shown;
+  return /\.\.\.$/m.test(cell.shown) ? cell.full : undefined;
+}
+
 // The whole of a long value, read only when somebody wants to see it.
 function wholeText(cell) {
-  if (!cell.full) return [];
+  const whole = restOf(cell);
+  if (!whole) return [];
   const text = make("pre");
   text.tabIndex = 0;
   const details = make("details", "whole", make("summary", "", "all of it"), text);
   details.addEventListener("toggle", () => {
-    text.textContent = details.open ? cell.full : "";
+    text.textContent = details.open ? whole : "";
   });
   return [details];
 }

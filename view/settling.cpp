@@ -174,14 +174,13 @@ void Settling::RenewNames() {
   std::vector<const VexelObjects*> versions = {&versions_.right, &versions_.left, &versions_.base};
   if (files_.merged != nullptr) versions.insert(versions.begin(), files_.merged.get());
   names_.emplace(std::move(versions));
-  names_->SetScriptClasses(scripts_);
+  names_->SetAssetNames(assets_);
 }
 
 std::vector<ReportCard> Settling::MakeCardsOf(const MergedFiles& files) {
   std::vector<ReportObject> objects = CollectReport(files, *names_, NamesInNotes(file_));
+  if (FindAssets(objects)) objects = CollectReport(files, *names_, NamesInNotes(file_));
   ShowSettledByHand(objects);
-  FindScripts(objects);
-  for (ReportObject& object : objects) object.class_name = names_->GetClass(object.file_id);
   return MakeCards(std::move(objects), *names_);
 }
 
@@ -212,16 +211,24 @@ bool Settling::AreOfTheirGroups(const std::vector<ReportCard>& cards, const Edit
   });
 }
 
-void Settling::FindScripts(const std::vector<ReportObject>& objects) {
-  if (file_.script_search == nullptr) return;
-  std::set<std::string> unknown;
+// Whether objects and values have other names now.
+bool Settling::FindAssets(const std::vector<ReportObject>& objects) {
+  if (file_.asset_search == nullptr) return false;
+  std::set<std::string> guids;
   for (const ReportObject& object : objects) {
-    const std::string guid = names_->GetScriptGuid(object.file_id);
-    if (!guid.empty() && looked_for_.insert(guid).second) unknown.insert(guid);
+    guids.insert(names_->GetScriptGuid(object.file_id));
+    for (const ReportRow& row : object.rows) {
+      for (const ReportCell* cell : {&row.base, &row.left, &row.right, &row.result})
+        CollectGuids(cell->node, guids);
+    }
   }
-  if (unknown.empty()) return;
-  scripts_.merge(file_.script_search(unknown));
-  names_->SetScriptClasses(scripts_);
+  std::erase_if(guids,
+                [&](const std::string& guid) { return guid.empty() || !looked_for_.insert(guid).second; });
+  if (guids.empty()) return false;
+  const size_t known = assets_.size();
+  assets_.merge(file_.asset_search(guids));
+  names_->SetAssetNames(assets_);
+  return assets_.size() > known;
 }
 
 void Settling::AddPlaces(const std::vector<ReportCard>& cards) {

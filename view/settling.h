@@ -38,8 +38,8 @@ struct ViewFile {
   std::map<std::string, std::string> settled_by_hand = {};
   /// What is to be said about the file beside the merge's own notes; may be empty.
   std::string note = {};
-  /// Finds the classes of scripts; may be empty.
-  ScriptSearch script_search = {};
+  /// Finds the names of other assets; may be empty.
+  AssetSearch asset_search = {};
   /// Keeps a finished file and the text of its record; throws a std::exception or YAMLError that says why it
   /// could not, and then nothing has changed.
   std::function<void(const std::string& text, const std::string& record)> store = {};
@@ -100,7 +100,7 @@ class Settling {
   std::vector<ReportCard> MakeCardsOf(const MergedFiles& files);
   void ShowSettledByHand(std::vector<ReportObject>& objects) const;
   bool AreOfTheirGroups(const std::vector<ReportCard>& cards, const EditGroups::Group* group);
-  void FindScripts(const std::vector<ReportObject>& objects);
+  bool FindAssets(const std::vector<ReportObject>& objects);
   void AddPlaces(const std::vector<ReportCard>& cards);
   void ForgetPlaces(const YAMLScalar* file_id);
 
@@ -118,7 +118,7 @@ class Settling {
   /// What was chosen before the page, as far as it can't be taken back there.
   std::vector<RecordingConflictResolver::RecordResolve> resolutions_ = file_.resolutions;
   Choices choices_;
-  ScriptClasses scripts_;
+  AssetNames assets_;
   std::set<std::string> looked_for_;
   std::optional<ObjectNames> names_;
   std::vector<Shown> shown_;

@@ -3,7 +3,7 @@
 #include "git/git_call.h"
 #include "git/merged_commits.h"
 #include "git/repository.h"
-#include "git/script_classes.h"
+#include "git/asset_names.h"
 #include "git/shown_text.h"
 #include "git/stage_files.h"
 #include "git/web/page_options.h"
@@ -80,7 +80,7 @@ class Review {
     ViewFile file = {asset, before, after, {}, true};
     file.base_name = range_.from_name;
     file.theirs_name = range_.to_name;
-    file.script_search = FindScriptClasses;
+    file.asset_search = FindAssetNames;
     files.push_back(std::move(file));
   }
 

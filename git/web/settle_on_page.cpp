@@ -14,7 +14,7 @@
 #include "git/repository.h"
 #include "git/resolve_arguments.h"
 #include "git/resolving.h"
-#include "git/script_classes.h"
+#include "git/asset_names.h"
 #include "git/shown_text.h"
 #include "git/web/page_options.h"
 #include "git/work_files.h"
@@ -71,7 +71,7 @@ ViewFile PageFile(const AssetVersions& versions, const MergeSettings& settings,
   file.safe = settings.is_safe;
   file.theirs_name = names.theirs;
   file.ours_name = names.ours;
-  file.script_search = FindScriptClasses;
+  file.asset_search = FindAssetNames;
   const std::string record = ConflictRecords(repository).Find(versions.asset);
   if (record.empty()) return file;
   try {

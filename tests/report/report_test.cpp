@@ -45,9 +45,9 @@ TEST(ObjectNames, PathsFollowTheHierarchyThroughGapsAndLoops) {
   const auto path = [&](int id) { return names.GetPath(YAMLScalar::Lookup(std::to_string(id))); };
   EXPECT_EQ(path(28) + " " + path(34) + " " + path(58), "Harbour/Pier B/A " + std::string(97, 'x') + "...");
   EXPECT_EQ(path(94) + " " + path(60) + path(999), "Harbour/Pier/Boat Bare");
-  EXPECT_EQ(names.Describe(YAMLScalar::Lookup("28")), "Light of Harbour/Pier");
+  EXPECT_EQ(names.Describe(YAMLScalar::Lookup("28")), "Harbour/Pier > Light");
   EXPECT_EQ(NamedNote("24.Transform.m_Father is pending again: not with what stands at 10, 77 or 1", names),
-            "Harbour/Pier \u203A Parent is pending again: not with what stands at Harbour, 77 or 1");
+            "Harbour/Pier > Parent is pending again: not with what stands at Harbour, 77 or 1");
 }
 
 TEST(ValueText, KeepsTextsOnOneLineAndInUtf8) {
@@ -116,7 +116,7 @@ TEST(Report, ShowsWhatEachSideDidAndNothingOfAFileAsMarkup) {
   EXPECT_THAT(Row(page, 28, "Light.&lt;i&gt;"), HasSubstr("|&lt;script&gt;&#39;&lt;/script&gt;\uFFFD&amp;|"));
   EXPECT_EQ(Row(page, 28, "Light.m_Intensity"), "m_Intensity|1|2|3|1|conflict28.Light.m_Intensity|");
   EXPECT_THAT(Row(page, 14, "Transform.m_Father"), HasSubstr("|conflict repaired14.Transform.m_Father|"));
-  EXPECT_THAT(Row(page, 24, "Transform.m_Father"), HasSubstr("{fileID: 14} Pier|from left|"));
+  EXPECT_THAT(Row(page, 24, "Transform.m_Father"), HasSubstr("|none|Pier|unchanged|Pier|from left|"));
 }
 
 TEST(Report, ShowsEveryChangeAtItsOwnPlace) {
@@ -130,7 +130,7 @@ TEST(Report, ShowsEveryChangeAtItsOwnPlace) {
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.m_Things"), HasSubstr("|changed inside|+ {fileID: 9}|merged|"));
   page = PageOf(body("t: [a, c]\n  x.b: 1\n  x:\n    b: 1"), body("t: [c, a]\n  x.b: 2\n  x:\n    b: 1"),
                 body("t: [a, c, d]\n  x.b: 1\n  x:\n    b: 3"));
-  EXPECT_THAT(Row(page, 1, "MonoBehaviour.t"), HasSubstr("|new order: [c, a]|+ d|+ d|from right|"));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.t"), HasSubstr("|new order: c, a|+ d|+ d|from right|"));
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.x.b"), "x.b|1|2|unchanged|2|from left|");
 }
 
@@ -144,8 +144,24 @@ TEST(Report, ShowsWhatARecordIsAboutAsOneValue) {
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.speeds.1"), "speeds.1|2|5|7|2|conflict1.MonoBehaviour.speeds.1|");
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.speeds"), HasSubstr("|in conflict|"));
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.key"),
-            "key|{fileID: 10} A|{fileID: 20} B|{fileID: 30} C|{fileID: 10} A|"
-            "conflict1.MonoBehaviour.key.fileID|");
+            "key|A|B|C|A|conflict1.MonoBehaviour.key.fileID|");
+}
+
+TEST(Report, TellsThingsOfOneNameApart) {
+  const auto scene = [](const std::string& target, const std::string& list) {
+    return Lamp(10, "A", 0) + Lamp(20, "A", 0) + Lamp(30, "B", 0) +
+           Object(114, 1, "MonoBehaviour", "key: {fileID: " + target + "}\n  keys: [" + list + "]");
+  };
+  const auto lamps = [](const std::string& ids) {
+    std::string list;
+    for (const char id : ids) list += std::string(list.empty() ? "" : ", ") + "{fileID: " + id + "0}";
+    return list;
+  };
+  const std::string page =
+      PageOf(scene("10", lamps("123")), scene("20", lamps("213")), scene("30", lamps("132")), {"--safe"});
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.key"), HasSubstr("|A (10)|A (20)|B (30)|"));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.keys"),
+              HasSubstr("|A (10)\nA (20)\nB|new order: A (20), A (10), ...|new order: ..., B, A (20)|"));
 }
 
 // Left removes the lamp that right renames, and adds another one to the pier that right removes.

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "report/value_text.h"
 #include "tests/support/yaml_text.h"
 
 namespace vexel_yaml {
@@ -32,10 +33,14 @@ TEST(TypedValue, ShowsNothingAsWhatItIsNot) {
 TEST(TypedValue, NamesWhatAReferenceLeadsTo) {
   const auto scene = ObjectsFromText("--- !v!1 &10\nGameObject:\n  m_Name: Pier\n");
   ObjectNames names({scene.get()});
-  names.SetScriptClasses({{"0123", "GullSpawner"}});
+  names.SetAssetNames({{"0123", "GullSpawner.cs"}, {"4567", "Brick.mat"}});
   EXPECT_EQ(TypedValueOf(ValueFromText("{fileID: 10}").get(), names).name, "Pier");
   EXPECT_EQ(TypedValueOf(ValueFromText("{fileID: 10, guid: 0123}").get(), names).name, "GullSpawner");
   EXPECT_EQ(TypedValueOf(ValueFromText("{fileID: 0}").get(), names).name, "");
+  const auto shown = [&](std::string_view text) { return NamedText(ValueFromText(text).get(), names); };
+  EXPECT_EQ(shown("[component: {fileID: 10}, {fileID: 0}, {fileID: 7}, \"\"]"),
+            "Pier\nnone\n{fileID: 7}\n(empty)");
+  EXPECT_EQ(shown("{on: {fileID: 2, guid: 4567, type: 2}, n: [{fileID: 10}]}"), "{on: Brick.mat, n: [Pier]}");
 }
 
 TEST(FieldLabel, ReadsAsPeopleWrite) {

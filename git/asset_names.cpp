@@ -1,4 +1,4 @@
-#include "git/script_classes.h"
+#include "git/asset_names.h"
 
 #include <algorithm>
 #include <string_view>
@@ -9,10 +9,10 @@ namespace vexel_yaml {
 
 namespace {
 
-constexpr std::string_view kSuffix = ".cs.meta";
+constexpr std::string_view kSuffix = ".meta";
 constexpr std::string_view kBefore = "guid: ";
-// A scene in which everything is in conflict has more lines than anybody reads.
-constexpr size_t kMostGuids = 100;
+// To compare each line with more of them takes longer than to read all guids.
+constexpr size_t kMostPatterns = 100;
 
 bool IsGuid(const std::string& text) {
   return text.size() == 32 && text.find_first_not_of("0123456789abcdef") == std::string::npos;
@@ -20,18 +20,19 @@ bool IsGuid(const std::string& text) {
 
 }  // namespace
 
-ScriptClasses FindScriptClasses(const std::set<std::string>& guids) {
+AssetNames FindAssetNames(const std::set<std::string>& guids) {
   ProgramCall call = GitCall(
       {"grep", "-z", "-o", "-G", "-I", "--full-name", "--no-color", "--no-line-number", "--no-column"});
   call.errors = ProgramCall::Errors::kDropped;
-  size_t count = 0;
+  std::set<std::string> patterns;
   for (const std::string& guid : guids) {
-    if (!IsGuid(guid) || ++count > kMostGuids) continue;
-    call.arguments.insert(call.arguments.end(), {"-e", "^" + std::string(kBefore) + guid});
+    if (IsGuid(guid)) patterns.insert("^" + std::string(kBefore) + guid);
   }
-  if (count == 0) return {};
+  if (patterns.empty()) return {};
+  if (patterns.size() > kMostPatterns) patterns = {"^" + std::string(kBefore) + "[0-9a-f]*"};
+  for (const std::string& pattern : patterns) call.arguments.insert(call.arguments.end(), {"-e", pattern});
   call.arguments.insert(call.arguments.end(), {"--", "*" + std::string(kSuffix)});
-  ScriptClasses classes;
+  AssetNames names;
   // A path and a line each.
   std::string output = RunProgram(call).output;
   std::ranges::replace(output, '\n', '\0');
@@ -39,9 +40,10 @@ ScriptClasses FindScriptClasses(const std::set<std::string>& guids) {
   for (size_t i = 0; i + 1 < pieces.size(); i += 2) {
     const std::string name = pieces[i].substr(pieces[i].rfind('/') + 1);
     if (!name.ends_with(kSuffix) || !pieces[i + 1].starts_with(kBefore)) continue;
-    classes.emplace(pieces[i + 1].substr(kBefore.size()), name.substr(0, name.size() - kSuffix.size()));
+    std::string guid = pieces[i + 1].substr(kBefore.size());
+    if (guids.contains(guid)) names.emplace(std::move(guid), name.substr(0, name.size() - kSuffix.size()));
   }
-  return classes;
+  return names;
 }
 
 }  // namespace vexel_yaml
