@@ -20,15 +20,12 @@ from pathlib import Path
 sys.path.insert(0, str(Path(__file__).resolve().parent / "scene_editor"))
 import edits  # noqa: E402
 import scene  # noqa: E402
+from browser import expect  # noqa: E402
+from view_program import View  # noqa: E402
 
 MERGE, VIEW, REPORT, EXAMPLES = *map(os.path.abspath, sys.argv[1:4]), Path(sys.argv[4]).resolve()
 PAIRS = int(sys.argv[5]) if len(sys.argv) > 5 else 25
 HOSTILE = "<img src=x onerror=alert(1)>\u202e\u0001\t\"'</script>"
-
-
-def expect(what, got, wanted):
-    if got != wanted:
-        sys.exit(f"{what}: {got!r} instead of {wanted!r}")
 
 
 def node(name, number, father, children, fields=""):
@@ -36,59 +33,6 @@ def node(name, number, father, children, fields=""):
     return (f"--- !v!1 &{number}0\nGameObject:\n  m_Component:\n  - component: {{fileID: {number}1}}\n"
             f"  m_Name: {json.dumps(name)}\n  m_IsActive: 1\n{fields}--- !v!4 &{number}1\nTransform:\n"
             f"  m_GameObject: {{fileID: {number}0}}\n  m_Children:{kids}\n  m_Father: {{fileID: {father}}}\n")
-
-
-class View:
-    """A running program, and what its page would ask."""
-
-    def __init__(self, versions, *options, merged=None, **environment):
-        self.folder = Path(tempfile.mkdtemp(dir=WORK))
-        self.versions = []
-        for name, text in zip(("base", "left", "right"), versions):
-            self.versions.append(str(self.folder / name))
-            if isinstance(text, str):
-                text = ("%YAML 1.1\n%TAG !v! tag:vexel.com,2011:\n" + text).encode()
-            Path(self.versions[-1]).write_bytes(text)
-        self.merged = self.folder / "merged.vexel"
-        self.merged.write_text("as it was\n")
-        if "BROWSER" not in environment:
-            options += ("--no-browser",)
-        self.program = subprocess.Popen([VIEW, *options, "--", *self.versions, merged or str(self.merged)],
-                                        stdout=subprocess.PIPE, stderr=subprocess.PIPE, text=True,
-                                        env={**os.environ, **environment})
-        self.address = self.program.stdout.readline().strip()
-        host, self.secret = self.address.removeprefix("http://").rstrip("/").split("/")
-        self.port = int(host.split(":")[1])
-        self.revision = 1
-
-    def raw(self, method, path, body=None, **headers):
-        connection = http.client.HTTPConnection("127.0.0.1", self.port, timeout=60)
-        connection.request(method, path, body, {name.replace("_", "-"): text for name, text in headers.items()})
-        answer = connection.getresponse()
-        return answer, answer.read()
-
-    def get(self, place):
-        answer, body = self.raw("GET", f"/{self.secret}/{place}")
-        return self.read(answer, body)
-
-    def post(self, place, **request):
-        request = {"file": 0, "revision": self.revision, **request}
-        answer, body = self.raw("POST", f"/{self.secret}/{place}", json.dumps(request), Content_Type="application/json")
-        return self.read(answer, body)
-
-    def read(self, answer, body):
-        content = json.loads(body)
-        self.revision = content.get("revision", self.revision)
-        return answer.status, content
-
-    def choose(self, **choices):
-        return self.post("choose", choices=[{"path": path, "choice": side} for path, side in choices.items()])
-
-    def end(self):
-        """The exit status, and what is at the destination."""
-        status = self.program.wait(60)
-        expect("nothing is left beside the files", [p.name for p in self.folder.iterdir() if "MERGE" in p.name], [])
-        return status, self.merged.read_text()
 
 
 def rows(state, cards="cards"):
@@ -155,6 +99,18 @@ def a_choice_settles_what_follows():
     expect("opening what follows from it", view.choose(**{places[1]: None})[0], 400)
     view.post("give-up")
     expect("what is given up", view.end(), (1, "as it was\n"))
+
+
+def a_name_changes_wherever_it_is_shown():
+    def scene_with(name, target):
+        return (node(name, 1, 0, []) + node("Hook", 2, 0, []) + "--- !v!1 &30\nGameObject:\n  m_Name: Wall\n"
+                f"--- !v!114 &31\nMonoBehaviour:\n  m_GameObject: {{fileID: 30}}\n  targets:{target}\n")
+    view = View([scene_with("Crane", " []"), scene_with("Big Crane", "\n  - {fileID: 11}\n  - {fileID: 21}"),
+                 scene_with("Tall Crane", " []")])
+    view.get("state")
+    _, delta = view.choose(**{"10.GameObject.m_Name": "theirs"})
+    expect("what other cards call it", rows(delta, "changed")["31.MonoBehaviour.targets"]["result"]["shown"],
+           "+ Big Crane\n+ Hook")
 
 
 def a_pattern_can_be_taken_back():
@@ -399,6 +355,7 @@ with tempfile.TemporaryDirectory() as WORK:
     settles_as_merge_does("--safe")
     settles_as_merge_does()
     a_choice_settles_what_follows()
+    a_name_changes_wherever_it_is_shown()
     a_pattern_can_be_taken_back()
     shows_random_scenes_as_a_whole_merge_does()
     hostile_values_stay_text()

@@ -139,8 +139,8 @@ bool Settling::MergeGroup(const EditGroups::Group& group) {
     return resolution.pattern.front() != YAMLScalar::star && is_elsewhere(resolution.pattern.front());
   });
   MergeRead(*part, std::move(resolutions));
-  if (part->merged == nullptr) return false;
-  const bool is_renamed = TakeOver(group, *part);
+  if (part->merged == nullptr || !HasSameNames(group, *part)) return false;
+  TakeOver(group, *part);
   std::vector<ReportCard> cards = MakeCardsOf(*part);
   if (!AreOfTheirGroups(cards, &group)) return false;
   for (const YAMLScalar* file_id : group) ForgetPlaces(file_id);
@@ -148,26 +148,26 @@ bool Settling::MergeGroup(const EditGroups::Group& group) {
   std::erase_if(files_.notes, [&](const SceneNote& note) { return !is_elsewhere(note.file_id); });
   std::ranges::copy_if(part->notes, std::back_inserter(files_.notes),
                        [&](const SceneNote& note) { return !is_elsewhere(note.file_id); });
-  shown_.push_back({std::move(cards), &group, is_renamed});
+  shown_.push_back({std::move(cards), &group});
   return true;
 }
 
-// Returns whether objects have other names or places than before.
-bool Settling::TakeOver(const EditGroups::Group& group, const MergedFiles& part) {
-  const auto what_is_said = [&] {
-    std::vector<std::pair<std::string, const YAMLScalar*>> said;
-    for (const YAMLScalar* file_id : group) {
-      said.emplace_back(names_->GetOwnName(file_id), FatherIn(*files_.merged, file_id));
-    }
-    return said;
-  };
-  const auto before = what_is_said();
+// Whether a merge of a group leaves its objects their names and places, which others may show.
+bool Settling::HasSameNames(const EditGroups::Group& group, const MergedFiles& part) {
+  const ObjectNames before({files_.merged.get()});
+  const ObjectNames after({part.merged.get()});
+  return std::ranges::all_of(group, [&](const YAMLScalar* file_id) {
+    return before.GetOwnName(file_id) == after.GetOwnName(file_id) &&
+           FatherIn(*files_.merged, file_id) == FatherIn(*part.merged, file_id);
+  });
+}
+
+void Settling::TakeOver(const EditGroups::Group& group, const MergedFiles& part) {
   for (const YAMLScalar* file_id : group) {
     const YAMLNode* object = part.merged->Get(file_id);
     SetEntry(*files_.merged, file_id, object == nullptr ? nullptr : object->Clone());
   }
   RenewNames();
-  return what_is_said() != before;
 }
 
 void Settling::RenewNames() {

@@ -54,8 +54,6 @@ class Settling {
     std::vector<ReportCard> cards;
     /// The objects of which nothing holds any more that was shown before; null for all.
     const EditGroups::Group* group = nullptr;
-    /// Whether objects of other groups may be called otherwise now.
-    bool is_renamed = false;
   };
 
   /// Reads and merges. The rules and the type information are loaded. Throws what ReadForReport throws.
@@ -95,7 +93,8 @@ class Settling {
   void Merge(const std::vector<Choices::Change>& changes);
   void MergeAll();
   bool MergeGroup(const EditGroups::Group& group);
-  bool TakeOver(const EditGroups::Group& group, const MergedFiles& part);
+  bool HasSameNames(const EditGroups::Group& group, const MergedFiles& part);
+  void TakeOver(const EditGroups::Group& group, const MergedFiles& part);
   void RenewNames();
   std::vector<ReportCard> MakeCardsOf(const MergedFiles& files);
   void ShowSettledByHand(std::vector<ReportObject>& objects) const;

@@ -94,7 +94,6 @@ class ViewSession::OpenFile {
         if (!is_same) changed.insert(key);
         told_.insert_or_assign(key, Told{std::move(card), std::move(text)});
       }
-      if (merged.is_renamed) Rename(changed);
     }
     keys_.clear();
     std::vector<std::string> changed_keys;
@@ -135,19 +134,6 @@ class ViewSession::OpenFile {
       told = next;
     }
     return forgotten;
-  }
-
-  // Says where the things of other groups are found now.
-  void Rename(std::set<const YAMLScalar*>& changed) {
-    ObjectNames& names = settling_.GetNames();
-    for (auto& [key, told] : told_) {
-      std::string path = names.GetPath(key);
-      if (told.card.path == path) continue;
-      told.card.path = std::move(path);
-      told.card.name = names.GetOwnName(key);
-      told.text = CardJson(told.card, names);
-      changed.insert(key);
-    }
   }
 
   Settling settling_;
