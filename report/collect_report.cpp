@@ -3,6 +3,7 @@
 #include <set>
 #include <unordered_map>
 
+#include "report/natural_order.h"
 #include "report/record_patterns.h"
 #include "report/report_places.h"
 #include "report/report_rows.h"
@@ -50,7 +51,7 @@ class Collector {
     std::ranges::stable_sort(rows_.Objects(), [](const ReportObject& a, const ReportObject& b) {
       if (a.pending != b.pending) return a.pending;
       if (a.path.empty() != b.path.empty()) return b.path.empty();
-      return a.path < b.path;
+      return ComesBefore(a.path, b.path);
     });
     return std::move(rows_.Objects());
   }

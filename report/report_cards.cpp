@@ -1,8 +1,9 @@
 #include "report/report_cards.h"
 
 #include <algorithm>
-#include <tuple>
 #include <unordered_map>
+
+#include "report/natural_order.h"
 
 namespace vexel_yaml {
 
@@ -21,8 +22,9 @@ std::vector<ReportCard> MakeCards(std::vector<ReportObject> objects, ObjectNames
     std::ranges::sort(card.objects, [&](const ReportObject& a, const ReportObject& b) {
       const bool is_part_a = a.file_id != card.file_id;
       const bool is_part_b = b.file_id != card.file_id;
-      return std::tie(is_part_a, a.class_name, a.file_id->GetText()) <
-             std::tie(is_part_b, b.class_name, b.file_id->GetText());
+      if (is_part_a != is_part_b) return is_part_b;
+      if (a.class_name != b.class_name) return a.class_name < b.class_name;
+      return ComesBefore(a.file_id->GetText(), b.file_id->GetText());
     });
   }
   return cards;

@@ -96,6 +96,8 @@ def settle_and_save(bench):
         "return getComputedStyle(document.querySelector(arguments[0] + ' .swatch span')).backgroundColor",
         view.tile(COLOUR, "theirs")), "rgb(255, 128, 0)")
 
+    page.keys([CONTROL, "s"])
+    expect("which is said", view.text("#notice p"), "It can't be saved yet: 3 conflicts still open.")
     page.click(view.tile(LAMP, "theirs"))
     view.open(2, "a click settles")
     page.click(view.tile(LAMP, "theirs"))
@@ -115,6 +117,7 @@ def settle_and_save(bench):
     page.keys("b")
     view.open(0, "and the last one")
     taken = view.taken()
+    expect("the word for base is the column's", view.text(f'[data-path="{COLOUR}"] .badge'), "settled: before")
     expect("each has the side that was meant", taken, {LAMP: "theirs", SECOND: "ours", COLOUR: "base"})
     page.keys([SHIFT, "T"])
     page.wait(f"document.querySelector('[data-path=\"{COLOUR}\"] [aria-pressed=true]').dataset.choice === 'theirs'",

@@ -124,8 +124,8 @@ function showHead() {
   byId("redo").disabled = !state.can_redo;
   byId("previous").disabled = byId("next").disabled = state.conflicts === 0;
   byId("names").textContent = merging ? `${capital(sideTitle(state.names, "theirs"))}, ${sideTitle(state.names, "ours")}` : "";
-  byId("save").disabled = state.pending > 0 || state.error !== "" || state.files[state.file].saved;
-  byId("save").title = state.pending > 0 ? `${plural(state.pending, "conflict")} still open` : "";
+  byId("save").disabled = whyNotSaved() !== "";
+  byId("save").title = whyNotSaved();
   byId("give-up").textContent = merging ? "Give up" : "Close";
   const options = byId("side").options;
   options[1].textContent = sideTitle(state.names, "theirs");
@@ -316,8 +316,16 @@ function step(which, words) {
   });
 }
 
+// Empty where it can be saved.
+function whyNotSaved() {
+  if (state.mode !== "merge") return "There is nothing to save: two versions are compared.";
+  if (state.error !== "") return `There is no result to save: ${state.error}.`;
+  if (state.files[state.file].saved) return "It is saved already.";
+  return state.pending > 0 ? `It can't be saved yet: ${plural(state.pending, "conflict")} still open.` : "";
+}
+
 function save() {
-  if (byId("save").disabled) return;
+  if (whyNotSaved() !== "") return say(whyNotSaved(), {important: true});
   act(async () => {
     const {title} = state;
     const {next, unread} = await ask("save", shownNow());

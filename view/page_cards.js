@@ -69,7 +69,8 @@ function choiceCell(row, side, names) {
 function resultCell(row, merging) {
   const content = [cellContent(row.result, "result", row.base)];
   const kind = row.pending ? "conflict" : row.choice !== null ? "settled" : row.state;
-  if (merging && row.state !== "") content.push(make("span", `badge ${kind}`, row.pending ? "open" : row.state));
+  const words = row.pending ? "open" : row.choice !== null ? `settled: ${sideWords[row.choice]}` : row.state;
+  if (merging && words !== "") content.push(make("span", `badge ${kind}`, words));
   if (row.repaired && row.state !== "repaired") content.push(make("span", "badge repaired", "repaired"));
   return content;
 }

@@ -1,10 +1,12 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
 
 #include "report/named_note.h"
+#include "report/natural_order.h"
 #include "report/object_names.h"
 #include "report/readable_headers.h"
 #include "report/report_command.h"
@@ -14,6 +16,7 @@
 namespace vexel_yaml {
 namespace {
 
+using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::Not;
 
@@ -48,6 +51,14 @@ TEST(ObjectNames, PathsFollowTheHierarchyThroughGapsAndLoops) {
   EXPECT_EQ(names.Describe(YAMLScalar::Lookup("28")), "Harbour/Pier > Light");
   EXPECT_EQ(NamedNote("24.Transform.m_Father is pending again: not with what stands at 10, 77 or 1", names),
             "Harbour/Pier > Parent is pending again: not with what stands at Harbour, 77 or 1");
+}
+
+TEST(NaturalOrder, CountsAsPeopleDo) {
+  std::vector<std::string> names = {"Lamp 1000", "Lamp b",     "Lamp", "Lamp 20",
+                                    "Lamp 020",  "Lamp 100/A", "9",    "Lamp 100"};
+  std::ranges::sort(names, ComesBefore);
+  EXPECT_THAT(names, ElementsAre("9", "Lamp", "Lamp 020", "Lamp 20", "Lamp 100", "Lamp 100/A", "Lamp 1000",
+                                 "Lamp b"));
 }
 
 TEST(ValueText, KeepsTextsOnOneLineAndInUtf8) {
@@ -143,8 +154,7 @@ TEST(Report, ShowsWhatARecordIsAboutAsOneValue) {
       PageOf(keys + script("2", "10"), keys + script("5", "20"), keys + script("7", "30"), {"--safe"});
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.speeds.1"), "speeds.1|2|5|7|2|conflict1.MonoBehaviour.speeds.1|");
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.speeds"), HasSubstr("|in conflict|"));
-  EXPECT_EQ(Row(page, 1, "MonoBehaviour.key"),
-            "key|A|B|C|A|conflict1.MonoBehaviour.key.fileID|");
+  EXPECT_EQ(Row(page, 1, "MonoBehaviour.key"), "key|A|B|C|A|conflict1.MonoBehaviour.key.fileID|");
 }
 
 TEST(Report, TellsThingsOfOneNameApart) {
