@@ -161,7 +161,7 @@ bool ConflictRecords::Remember(const Places& places, RecordEntry& entry,
   if (IsFile(folder_)) unlink(folder_.c_str());
   if (mkdir(folder_.c_str(), 0777) != 0 && !IsFolder(folder_)) return false;
   entry.hash = hash();
-  if (!WriteEntry(places.entry, entry)) return false;
+  if (entry.hash.empty() || !WriteEntry(places.entry, entry)) return false;
   const bool are_placed = !hooks_folder.empty() || PlaceHooks(repository_);
   const std::vector<std::string> foreign = ForeignGuards(repository_, hooks_folder);
   if (!foreign.empty()) {

@@ -93,4 +93,6 @@ ProgramCall HashCall(const std::string& path, std::string text) {
   return call;
 }
 
+std::string HashIn(const ProgramResult& result) { return result.status == 0 ? Line(result) : std::string(); }
+
 }  // namespace vexel_yaml

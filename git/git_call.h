@@ -42,6 +42,9 @@ std::string TopFolder();
 /// Prints the blob that git would make of a text that is this path's content in the work tree.
 ProgramCall HashCall(const std::string& path, std::string text);
 
+/// What that has printed; empty where it has failed.
+std::string HashIn(const ProgramResult& result);
+
 /// The variable that names another index.
 inline constexpr char kIndexVariable[] = "GIT_INDEX_FILE";
 

@@ -57,7 +57,10 @@ bool HasMarkers(const std::string& asset) {
 std::string HashOfAsset(const std::string& asset) { return HashOfAsset(asset, TextOf("./" + asset)); }
 
 std::string HashOfAsset(const std::string& asset, std::string text) {
-  return Line(RunProgram(HashCall(asset, std::move(text))));
+  std::string hash = HashIn(RunProgram(HashCall(asset, std::move(text))));
+  // Two that are unknown aren't the same.
+  if (hash.empty()) throw CommandError("git cannot say the blob of " + asset);
+  return hash;
 }
 
 }  // namespace vexel_yaml

@@ -30,7 +30,8 @@ std::string EditedObjects(const std::string& asset, const std::string& merged, c
 /// Whether the work tree's file has what a merge of texts leaves at a conflict.
 bool HasMarkers(const std::string& asset);
 
-/// The blob that git would make of the work tree's file or of a text in its place; empty where there is none.
+/// The blob that git would make of the work tree's file or of a text in its place.
+/// Throws CommandError where it can't tell.
 std::string HashOfAsset(const std::string& asset);
 std::string HashOfAsset(const std::string& asset, std::string text);
 

@@ -127,7 +127,7 @@ class DriverRun {
                                FindSideNames(repository_),
                                {{{}, "not merged, but left as ours has it", {}, false}},
                                {}};
-    const auto hash = [&] { return Line(RunProgram(HashCall(versions_.asset, TextOf(versions_.right)))); };
+    const auto hash = [&] { return HashIn(RunProgram(HashCall(versions_.asset, TextOf(versions_.right)))); };
     try {
       if (records_.LeaveUnmerged(entry, hash, settings_)) return;
     } catch (const FileError& error) {
@@ -150,7 +150,7 @@ class DriverRun {
     // Git answers while it is asked other things.
     Program hash(HashCall(versions_.asset, merge_->GetText()));
     const std::string record = records_.Leave(
-        entry_, *merge_, merge_->GetText(), [&] { return Line(hash.Wait()); }, settings_);
+        entry_, *merge_, merge_->GetText(), [&] { return HashIn(hash.Wait()); }, settings_);
     if (record.empty()) {
       Complain("cannot write the record of " + versions_.asset);
     } else if (entry_.CountPending() > 0) {

@@ -1,6 +1,7 @@
 #include "git/undecided_places.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <fstream>
 #include <set>
 #include <sstream>
@@ -8,6 +9,7 @@
 #include "fixups/engine_keys.h"
 #include "git/git_call.h"
 #include "git/work_files.h"
+#include "platform/file_error.h"
 #include "yaml/read_yaml.h"
 #include "yaml/write_objects.h"
 #include "yaml/yaml_error.h"
@@ -100,8 +102,9 @@ bool HasList(const std::string& path) {
   constexpr auto kSize = static_cast<std::streamoff>(kEnd.size() + 2);
   std::ifstream file(path, std::ios::binary);
   std::string end(kSize, ' ');
-  return file.seekg(-kSize, std::ios::end) && file.read(end.data(), kSize) &&
-         end.find(kEnd) != std::string::npos;
+  const bool is_read = file.seekg(-kSize, std::ios::end) && file.read(end.data(), kSize);
+  if (file.bad()) throw FileError(FileError::Step::kReading, path, errno);
+  return is_read && end.find(kEnd) != std::string::npos;
 }
 
 Places TakeList(const std::string& path) {

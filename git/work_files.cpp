@@ -134,7 +134,10 @@ bool IsAsset(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
   if (!file && FileExists(path)) throw FileError(FileError::Step::kReading, path, errno);
   std::string beginning(5, '\0');
-  return file.read(beginning.data(), 5) && beginning == "%YAML";
+  file.read(beginning.data(), 5);
+  // Git would merge as text what is taken for a file of another kind.
+  if (file.bad()) throw FileError(FileError::Step::kReading, path, errno);
+  return beginning == "%YAML";
 }
 
 bool MakeCopy(std::string& pattern, std::string_view text) {

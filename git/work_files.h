@@ -45,7 +45,7 @@ std::string TextOf(const std::string& path);
 
 /// Whether the file is in the engine's text format, and not one of its plain .meta files, binary, or a
 /// pointer to a file elsewhere.
-/// Throws FileError for one that can't be opened.
+/// Throws FileError for one that can't be read.
 bool IsAsset(const std::string& path);
 
 /// Makes a new file from a pattern that ends in "XXXXXX", which becomes a name that was free. False where it

@@ -113,13 +113,16 @@ void Program::Exchange(std::string& output) {
     if (count > 0) written_ += static_cast<size_t>(count);
     // A program that reads no further has its reasons, which its status tells.
     const bool failed = count < 0 && errno != EINTR && errno != EAGAIN;
+    is_broken_ |= failed && errno != EPIPE;
     if (failed || written_ == input_.size()) Close(input_descriptor_);
   }
   if (ready[1].revents != 0) {
     std::array<char, 65536> piece;
     const ssize_t count = read(output_descriptor_, piece.data(), piece.size());
     if (count > 0) output.append(piece.data(), static_cast<size_t>(count));
-    if (count == 0 || (count < 0 && errno != EINTR)) Close(output_descriptor_);
+    const bool failed = count < 0 && errno != EINTR;
+    is_broken_ |= failed;
+    if (failed || count == 0) Close(output_descriptor_);
   }
 }
 
@@ -130,7 +133,7 @@ ProgramResult Program::Wait() {
   pid_t ended = -1;
   while (process_ >= 0 && (ended = waitpid(process_, &status, 0)) < 0 && errno == EINTR) {
   }
-  if (ended < 0) return {127, std::move(output)};
+  if (ended < 0 || is_broken_) return {127, std::move(output)};
   return {WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status), std::move(output)};
 }
 

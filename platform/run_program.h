@@ -27,7 +27,8 @@ struct ProgramCall {
 };
 
 struct ProgramResult {
-  /// As a shell has it: 127 for a program that can't be started, 128 and the number for a signal.
+  /// As a shell has it: 127 for a program that can't be started, 128 and the number for a signal. Also 127
+  /// where its input can't be handed over or its output can't be read to the end: a part is not the whole.
   int status;
   std::string output;
 };
@@ -49,6 +50,7 @@ class Program {
 
   std::string input_;
   size_t written_ = 0;
+  bool is_broken_ = false;
   int input_descriptor_ = -1;
   int output_descriptor_ = -1;
   pid_t process_ = -1;
