@@ -4,6 +4,7 @@
 
 #include "git/conflict_records.h"
 #include "git/git_call.h"
+#include "git/next_step.h"
 #include "git/page_call.h"
 #include "git/prompt.h"
 #include "git/repository.h"
@@ -65,6 +66,9 @@ int SettleForMergetool(const AssetVersions& versions, const Choice& choice) {
       settlement.entry, *settlement.merge, merged, [&] { return hash; }, settings);
   if (record.empty()) Complain("cannot write the record of " + asset);
   if (!is_merged) Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset);
+  // Git itself goes on to the next file.
+  const GitStep next = is_merged ? FindNextStep(repository, {asset}) : GitStep();
+  if (next.open.empty()) SayNextStep(next);
   return is_merged ? AssetMerge::kMerged : AssetMerge::kConflicts;
 }
 

@@ -48,7 +48,9 @@ Prompt::Reply Prompt::Ask(const Question& question) {
     Print(Painted("theirs, ours or base [" + letters + "]? ", kPrompt));
     std::string line;
     if (!ReadLine(line)) return {Answer::kQuit, false};
-    const char letter = line.size() == 1 && letters.find(line) != std::string::npos ? line[0] : '?';
+    // Whoever has learnt the letters for a whole object may use them for the last conflict of it, too.
+    const bool is_known = (letters + "TOB").find(line) != std::string::npos;
+    const char letter = line.size() == 1 && is_known ? line[0] : '?';
     const bool is_for_thing = letter >= 'A' && letter <= 'Z';
     switch (letter) {
       case 't':

@@ -3,6 +3,7 @@
 #include <optional>
 
 #include "git/git_call.h"
+#include "git/next_step.h"
 #include "git/page_call.h"
 #include "git/repository.h"
 #include "git/resolve_arguments.h"
@@ -55,9 +56,12 @@ int RunResolve(const std::vector<std::string>& arguments) {
   const MergeSettings settings = SettingsQuery().Get();
   const Repository repository;
   Resolving resolving(repository, settings, choice);
+  bool is_any_done = false;
   for (const std::string& asset : assets) {
     try {
-      if (!resolving.Resolve(asset)) is_done = false;
+      const bool is_resolved = resolving.Resolve(asset);
+      is_any_done |= is_resolved;
+      is_done &= is_resolved;
     } catch (const FileError& error) {
       // The others can be settled all the same.
       Complain(error.what());
@@ -69,6 +73,7 @@ int RunResolve(const std::vector<std::string>& arguments) {
     }
   }
   resolving.Sweep();
+  if (is_any_done) SayNextStep(FindNextStep(repository));
   return is_done ? 0 : 1;
 }
 

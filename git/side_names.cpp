@@ -130,11 +130,17 @@ std::string Picked(const Step& step) {
 
 }  // namespace
 
+std::string MergingRebase(const Repository& repository) {
+  for (const char* folder : {"rebase-merge", "rebase-apply"}) {
+    if (IsAtStep(repository, folder)) return folder;
+  }
+  return {};
+}
+
 SideNames FindSideNames(const Repository& repository) {
   if (const std::string head = MergedHead(); !head.empty()) return {head, {}};
-  for (const char* folder : {"rebase-merge", "rebase-apply"}) {
-    if (IsAtStep(repository, folder)) return InRebase(repository, folder);
-  }
+  if (const std::string folder = MergingRebase(repository); !folder.empty())
+    return InRebase(repository, folder);
   if (const std::string step = FirstLine(repository.Path("sequencer/todo")); !step.empty())
     return {Picked(StepIn(step)), {}};
   // Once a merge has stopped.

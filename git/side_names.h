@@ -16,4 +16,8 @@ struct SideNames {
 /// that are under way. In a rebase, whose own commits are "theirs", both have one.
 SideNames FindSideNames(const Repository& repository);
 
+/// The folder in git's of a rebase that merges one of its own commits right now, and hasn't stopped for
+/// somebody's edits; empty where there is none.
+std::string MergingRebase(const Repository& repository);
+
 }  // namespace vexel_yaml

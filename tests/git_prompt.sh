@@ -35,6 +35,8 @@ check "nor who quits" refuses answer q
 check "nor who says nothing" refuses answer ''
 check "the file is as it was" cmp "$file" "$work/undecided"
 check "in conflict" is_open
+check "the letter for a whole object does for its only conflict, too" answer TT
+again
 check "an answer that is none is asked for again, with help" refuses answer 'xtq'
 check "the question stays" test "$(asked)" -eq 2 -a "$(grep -c '^q - quit' "$work/out")" -eq 1
 check "what was settled is kept" is_at 2 1 1
@@ -43,12 +45,29 @@ check "and asked about alone" answer To
 check "in one question for the whole object" test "$(asked)" -eq 1
 check "the answers stand" is_at 2 2 2
 check "the file is staged" test -z "$(git ls-files -u)"
+check "how to go on is said" grep -qFx 'To finish the merge: git commit' "$work/err"
 check "a mind can be changed before the commit" answer sosq
 check "knowing what it was" grep -qFx '  now     theirs' "$work/out"
 check "for one place alone" is_at 2 3 2
 check "who quits then changes nothing" answer sq
 check "and is told that nothing is left" grep -q "Resolved $file$" "$work/out"
 check "it is still staged" is_at 2 3 2
+
+# How to go on is another command in each of these.
+for operation in rebase cherry-pick 'revert --no-edit'; do
+  git reset -q --hard && git checkout -q --detach ours
+  # shellcheck disable=SC2086
+  check "a ${operation%% *} stops" refuses git $operation theirs >/dev/null 2>&1
+  check "it is settled" answer ttt
+  check "how to go on with it is said" grep -qx "To go on with the .*: git ${operation%% *} --continue" "$work/err"
+  check "it goes on" env GIT_EDITOR=true git "${operation%% *}" --continue >/dev/null 2>&1
+  check "to its end" refuses git "${operation%% *}" --abort >/dev/null 2>&1
+done
+git checkout -q ours && lamps 5 5 5 >"$file" && git stash -q && git checkout -q theirs
+check "what was stashed comes into conflict" refuses git stash pop >/dev/null 2>&1
+check "it is settled, too" answer ttt
+check "and nothing is left to do" refuses grep -q '^To ' "$work/err"
+git reset -q --hard && git stash drop -q && git checkout -q ours
 
 again
 check "answers can be taken back" answer tkotkB

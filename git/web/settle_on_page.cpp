@@ -11,6 +11,7 @@
 #include "git/git_call.h"
 #include "git/merged_commits.h"
 #include "git/mergetool.h"
+#include "git/next_step.h"
 #include "git/repository.h"
 #include "git/resolve_arguments.h"
 #include "git/resolving.h"
@@ -135,6 +136,8 @@ class ResolvedFile {
     return true;
   }
 
+  bool IsStored() const { return is_stored_; }
+
  private:
   // Merged once more with what has been decided, as by any other way to settle it.
   void Store(const std::string& record) {
@@ -147,6 +150,7 @@ class ResolvedFile {
       choice.force = force_;
       return Resolving(repository_, settings_, choice).Resolve(asset_);
     });
+    is_stored_ = true;
   }
 
   const Repository& repository_;
@@ -155,6 +159,7 @@ class ResolvedFile {
   const bool force_;
   const StageFiles stages_;
   PageChoice choice_{asset_};
+  bool is_stored_ = false;
   ScratchFolder scratch_{repository_};
 };
 
@@ -178,6 +183,8 @@ int ResolveOnPage(const std::vector<std::string>& arguments) {
   if (files.empty()) return 1;
   const int status = ShowPage(std::move(files), options);
   ConflictRecords(repository).Sweep();
+  if (std::ranges::any_of(resolved, [](const auto& file) { return file->IsStored(); }))
+    SayNextStep(FindNextStep(repository));
   return is_done ? status : 1;
 }
 

@@ -1,0 +1,28 @@
+#pragma once
+
+#include <set>
+#include <string>
+#include <vector>
+
+#include "git/repository.h"
+
+namespace vexel_yaml {
+
+/// How somebody goes on in git who has settled conflicts.
+struct GitStep {
+  /// What the command does, such as "finish the merge".
+  std::string purpose;
+  /// For people to type, such as "git commit"; empty where git isn't in the middle of anything.
+  std::string command;
+  /// The files that are in conflict still, which the command is about then.
+  std::vector<std::string> open = {};
+};
+
+/// Finds it. `settled` are files that git has in conflict, and which count as settled: they are about to be
+/// staged.
+GitStep FindNextStep(const Repository& repository, const std::set<std::string>& settled = {});
+
+/// Says it, if there is one.
+void SayNextStep(const GitStep& step);
+
+}  // namespace vexel_yaml
