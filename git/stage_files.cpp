@@ -94,7 +94,7 @@ bool StageFiles::Write(ScratchFolder& folder, AssetVersions& versions) const {
   versions = {asset_, {}, {}, {}};
   for (const Stage& stage : stages_) {
     if (!stage.mode.starts_with("100")) {
-      Complain(asset_ + " is no file on every side: 'git add' or 'git rm' it");
+      Complain(asset_ + " is no file on every side: 'git add' keeps what is there, 'git rm' removes it");
       return false;
     }
     const ProgramResult text = Git({"cat-file", "--filters", "--path=" + asset_, stage.blob});
@@ -106,7 +106,7 @@ bool StageFiles::Write(ScratchFolder& folder, AssetVersions& versions) const {
     version = folder.Write(name, text.output);
   }
   if (versions.left.empty() || versions.right.empty()) {
-    Complain(asset_ + " was removed or renamed on one side: 'git add' or 'git rm' it");
+    Complain(asset_ + " was removed or renamed on one side: 'git add' keeps it, 'git rm' removes it");
     return false;
   }
   if (versions.base.empty()) {

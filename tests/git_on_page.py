@@ -112,7 +112,10 @@ def check_resolve():
     expect("a save over edits", (status, "edited by hand" in answer["error"]), (409, True))
     expect("the edited file", Path("B.vexel").read_text(), SCENE.format(7, 7))
     run("git", "checkout", "-q", "-m", "--", "B.vexel")
-    expect("a save without them", page.save(1)[0], 200)
+    status, answer = page.save(1)
+    expect("a save without them", status, 200)
+    step = answer["next_step"]
+    expect("what else is in conflict", ("in notes.txt," in step["text"], step["command"]), (True, "git status"))
     expect("the end", process.wait(30), 0)
     run("git", "add", "notes.txt")
     run("git", "commit", "-q", "-m", "merged")
@@ -123,9 +126,44 @@ def check_resolve():
     expect("what was chosen, when it comes again", Path("A.vexel").read_text(), SCENE.format(4, 10))
     process, page = opened("resolve", "--web", "A.vexel")
     expect("what is left to do", page.state()["pending"], 0)
-    page.post("give-up")
+    status, answer = page.post("give-up")
+    expect("what is left", (answer["left"], answer["next_step"]["command"]),
+           (["A.vexel"], "vexel-merge-git resolve --web 'A.vexel'"))
     expect("giving up", process.wait(30), 1)
     expect("the file that was given up", is_unmerged("A.vexel"), True)
+
+
+def check_going_on():
+    run("git", "config", "rerere.enabled", "false")
+    for command, wanted in (("rebase", "git rebase --continue"), ("cherry-pick", "git cherry-pick --continue")):
+        run("git", "reset", "-q", "--hard")
+        run("git", "checkout", "-q", "-B", "moved", "ours")
+        run("git", command, "theirs", status=1)
+        run("git", "checkout", "-q", "--ours", "notes.txt")
+        run("git", "add", "notes.txt")
+        process, page = opened("resolve", "--web")
+        expect("conflicts of files not yet read", [file["pending"] for file in page.state()["files"]], [1, 1])
+        page.take("theirs")
+        page.save()
+        page.take("theirs", file=1)
+        expect(f"how a {command} goes on", page.save(1)[1]["next_step"]["command"], wanted)
+        process.wait(30)
+        run("git", *wanted.split()[1:], GIT_EDITOR="true")
+
+
+def check_what_cannot_be_shown():
+    for branch, value in (("adds", 3), ("also", 4)):
+        run("git", "checkout", "-q", "-f", "-B", branch, "start")
+        write(value, 10, "B.vexel", "C.vexel")
+        run("git", "add", "-A")
+        run("git", "commit", "-q", "-m", branch)
+    run("git", "merge", "-q", "adds", status=1)
+    process, page = opened("resolve", "--web")
+    told = page.state()["not_shown"]
+    expect("both added it", [text.startswith("both sides have added C.vexel; take one: ") for text in told], [True])
+    page.take("theirs")
+    expect("it is left to do", "what is left, in C.vexel," in page.save()[1]["next_step"]["text"], True)
+    expect("the end with something left", process.wait(30), 1)
 
 
 def lamp(state, field):
@@ -174,8 +212,9 @@ def check_unreadable():
     state = page.state("")
     expect("what is shown first", (state["title"], state["pending"]), ("B.vexel", 1))
     state = page.state(0)
-    expect("a file that can't be read", (state["cards"], state["error"] == "", state["files"][0]["error"] == ""),
-           ([], False, False))
+    expect("a file that can't be read", (state["cards"], state["error"] == ""), ([], False))
+    expect("it goes by the name that people know", ("'A.vexel (ours)'" in state["error"], "/" in state["error"]),
+           (True, False))
     page.take("theirs", file=1)
     status, answer = page.save(1)
     expect("the other file is saved", (status, answer["next"], len(answer["unread"])), (200, None, 1))
@@ -266,6 +305,8 @@ def main():
         check_resolve()
         check_hand_edits()
         check_unreadable()
+        check_going_on()
+        check_what_cannot_be_shown()
         run("git", "reset", "-q", "--hard")
         run("git", "checkout", "-q", "ours")
         check_mergetool(browser)

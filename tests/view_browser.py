@@ -312,7 +312,10 @@ def from_conflict_to_commit(bench):
     view.open(0, "the second file")
     page.click("#save")
     view.ends_with(0, "all are saved")
-    git("commit", "-q", "--no-edit")
+    page.wait("document.getElementById('command').checkVisibility()", "it says how to go on")
+    command = view.text("#command code").split()
+    expect("by a command", command[0], "git")
+    git(*command[1:], "--no-edit")
     expect("what is committed", [line for name in ("Harbour", "Island") for line in git("show", f"HEAD:{name}.vexel")
                                  .splitlines() if "Intensity" in line], ["  m_Intensity: 1", "  m_Intensity: 7"])
 

@@ -74,7 +74,9 @@ def settles_as_merge_does(*mode):
     expect("the order", [card["key"] for card in state["cards"]], [card["key"] for card in before["cards"]])
     view.choose(**{LIGHT: "theirs"})
 
-    expect("the save", view.post("save"), (200, {"saved": True, "next": None, "unread": []}))
+    status, answer = view.post("save")
+    expect("the save", (status, answer["saved"], answer["next"], answer["unread"]), (200, True, None, []))
+    expect("how to go on outside of version control", answer["next_step"]["command"], "")
     status, merged = view.end()
     expect("the status of the saved merge", status, 0)
     again = view.folder / "again"

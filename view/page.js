@@ -71,13 +71,20 @@ function placeDivider() {
   else divider.remove();
 }
 
+function wordsOf(file) {
+  if (file.error !== "") return "can't be read";
+  if (file.saved) return "saved";
+  if (file.pending === null) return state.mode === "merge" ? "not read yet" : "";
+  return file.pending > 0 ? `${file.pending} open` : "";
+}
+
 function showFiles() {
   const several = state.files.length > 1;
   byId("files").hidden = !several;
   byId("next-file").hidden = !several;
   if (!several) return;
   byId("files").firstElementChild.replaceChildren(...state.files.map((file, index) => {
-    const words = file.error !== "" ? "can't be read" : file.saved ? "saved" : file.pending > 0 ? `${file.pending} open` : "";
+    const words = wordsOf(file);
     const choice = button(file.title, {file: index});
     if (words !== "") choice.append(" ", make("span", file.saved ? "badge" : "badge conflict", words));
     if (index === state.file) choice.setAttribute("aria-current", "true");
@@ -99,6 +106,10 @@ function showRest() {
   for (const choice of choices) choice.disabled = open === 0;
 }
 
+function listTexts(list, texts) {
+  list.replaceChildren(...texts.map((text) => make("li", "", text)));
+}
+
 function showHead() {
   const merging = state.mode === "merge";
   const settled = state.conflicts - state.pending;
@@ -111,7 +122,9 @@ function showHead() {
   byId("error").textContent = state.error === "" ? "" : `${failed}: ${state.error}`;
   byId("notes").hidden = state.notes.length === 0;
   byId("notes").firstElementChild.textContent = plural(state.notes.length, "note");
-  byId("notes").lastElementChild.replaceChildren(...state.notes.map((note) => make("li", "", note)));
+  listTexts(byId("notes").lastElementChild, state.notes);
+  byId("not-shown").hidden = state.not_shown.length === 0;
+  listTexts(byId("not-shown").lastElementChild, state.not_shown);
   document.body.classList.toggle("review", !merging);
   const nothing = state.error === "" ? "Nothing is in conflict" : "There is no result";
   byId("settled").textContent = state.conflicts === 0 ? nothing : `${settled} of ${state.conflicts} settled`;
@@ -314,54 +327,6 @@ function step(which, words) {
     applyChanges(await ask(which, shownNow()), new Set());
     say(`${words} ${state.pending} open.`);
   });
-}
-
-// Empty where it can be saved.
-function whyNotSaved() {
-  if (state.mode !== "merge") return "There is nothing to save: two versions are compared.";
-  if (state.error !== "") return `There is no result to save: ${state.error}.`;
-  if (state.files[state.file].saved) return "It is saved already.";
-  return state.pending > 0 ? `It can't be saved yet: ${plural(state.pending, "conflict")} still open.` : "";
-}
-
-function save() {
-  if (whyNotSaved() !== "") return say(whyNotSaved(), {important: true});
-  act(async () => {
-    const {title} = state;
-    const {next, unread} = await ask("save", shownNow());
-    const also = unread.length === 0 ? "" : ` What can't be read is not: ${unread.join("; ")}.`;
-    if (next === null) end("Saved", `${title} is saved.${also} You can close this window.`);
-    else await load(next, `${title} is saved.`);
-  });
-}
-
-const unsavedFiles = () => state.files.filter((file) => file.unsaved).map((file) => file.title);
-
-function giveUp() {
-  const unsaved = unsavedFiles();
-  const really = () => act(async () => {
-    await ask("give-up", {});
-    end(state.mode === "merge" ? "Given up" : "Closed", "You can close this window.");
-  });
-  if (unsaved.length === 0) return really();
-  const question = byId("question");
-  const stay = unsaved.length === 1 ? "the file stays as it was" : "these files stay as they were";
-  question.children[1].textContent = `What you chose for ${unsaved.join(", ")} is lost, and ${stay}.${
-    state.files.some((file) => file.saved) ? " Files that are saved stay saved." : ""}`;
-  question.returnValue = "";
-  question.onclose = () => question.returnValue === "give up" && really();
-  question.showModal();
-}
-
-function end(title, text) {
-  ended = true;
-  connection.close();
-  for (const part of [byId("bars"), main, notice, byId("hint"), byId("files"), byId("notes")]) part.hidden = true;
-  document.title = `${title}: ${state.title}`;
-  byId("end").firstElementChild.textContent = title;
-  byId("end").lastElementChild.textContent = text;
-  byId("end").hidden = false;
-  byId("end").focus();
 }
 
 function lost() {

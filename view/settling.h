@@ -36,6 +36,10 @@ struct ViewFile {
   /// The places of conflicts that are settled elsewhere, such as by hand in the file, with what stands there:
   /// they are shown, and there is nothing to choose.
   std::map<std::string, std::string> settled_by_hand = {};
+  /// Whether the paths tell people nothing, so that the title is named in their place.
+  bool has_temporary_paths = false;
+  /// How many conflicts are open, as far as that is known before the file is read.
+  std::optional<size_t> known_pending = {};
   /// What is to be said about the file beside the merge's own notes; may be empty.
   std::string note = {};
   /// Finds the names of other assets; may be empty.

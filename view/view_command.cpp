@@ -147,7 +147,12 @@ int View(Arguments arguments) {
   arguments.file.store = [&](const std::string& text, const std::string& record) {
     StoreResult(arguments.merged, text, arguments.record, record);
   };
-  return RunViewServer({arguments.file}, arguments.server);
+  ViewGuide guide;
+  guide.when_saved = [] {
+    return NextStep{"What opened this page, such as your version control, goes on by itself now."};
+  };
+  guide.when_given_up = {"Whatever opened this page opens it again."};
+  return RunViewServer({arguments.file}, arguments.server, std::move(guide));
 }
 
 }  // namespace

@@ -106,9 +106,9 @@ class Lifetime {
 // What the page asks for.
 class ViewServer {
  public:
-  ViewServer(std::vector<ViewFile> files, const ViewServerOptions& options)
+  ViewServer(std::vector<ViewFile> files, const ViewServerOptions& options, ViewGuide guide)
       : is_review_(files.front().is_review),
-        session_(std::move(files)),
+        session_(std::move(files), std::move(guide)),
         lifetime_(seconds(options.idle_seconds)) {
     server_.set_default_headers({{"Content-Security-Policy", Policy()},
                                  {"X-Content-Type-Options", "nosniff"},
@@ -211,9 +211,9 @@ class ViewServer {
       });
     } else if (place == "give-up") {
       Reply(response, [&] {
-        session_.GiveUp();
+        std::string left = session_.GiveUp();
         lifetime_.End();
-        return std::string("{}");
+        return left;
       });
     } else {
       response.status = 404;
@@ -245,8 +245,8 @@ class ViewServer {
 
 }  // namespace
 
-int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options) {
-  return ViewServer(std::move(files), options).Run(options.opens_browser);
+int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options, ViewGuide guide) {
+  return ViewServer(std::move(files), options, std::move(guide)).Run(options.opens_browser);
 }
 
 }  // namespace vexel_yaml

@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "view/settling.h"
+#include "view/view_guide.h"
 
 namespace vexel_yaml {
 
@@ -21,6 +22,6 @@ struct ViewServerOptions {
 /// Returns 0 where all files were saved, or where nothing was to be saved (two versions that are compared),
 /// else 1. A file that can't be read is shown as such, and named on standard error in the end. The rules and
 /// the type information are loaded. Throws std::runtime_error where no file can be read or no port opened.
-int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options);
+int RunViewServer(std::vector<ViewFile> files, const ViewServerOptions& options, ViewGuide guide);
 
 }  // namespace vexel_yaml

@@ -148,6 +148,23 @@ class ViewSession::OpenFile {
 
 namespace {
 
+// With the file that people know in place of its versions, where these are temporary.
+std::string InKnownWords(std::string text, const ViewFile& file) {
+  const std::pair<std::string, std::string> versions[] = {
+      {file.base_path, "before"}, {file.left_path, "theirs"}, {file.right_path, "ours"}};
+  for (const auto& [path, side] : versions) {
+    if (!file.has_temporary_paths || path.empty()) continue;
+    const std::string known = file.title + (file.is_review ? "" : " (" + side + ")");
+    for (size_t at = 0; (at = text.find(path, at)) != std::string::npos; at += known.size())
+      text.replace(at, path.size(), known);
+  }
+  return OnOneLine(text);
+}
+
+Json JsonOf(const NextStep& step) {
+  return {{"text", OnOneLine(step.text)}, {"command", OnOneLine(step.command)}};
+}
+
 Json NamesOf(const ViewFile& file) {
   const auto base = OnOneLine(file.base_name);
   const auto theirs = OnOneLine(file.theirs_name);
@@ -172,7 +189,7 @@ Json StandOf(const ViewFile& file, Settling& settling) {
           {"conflicts", settling.CountConflicts()},
           {"can_undo", settling.GetChoices().CanUndo()},
           {"can_redo", settling.GetChoices().CanRedo()},
-          {"error", OnOneLine(settling.GetError())},
+          {"error", InKnownWords(settling.GetError(), file)},
           {"notes", std::move(notes)}};
 }
 
@@ -184,8 +201,8 @@ Json NothingFor(const std::string& error) {
 
 }  // namespace
 
-ViewSession::ViewSession(std::vector<ViewFile> files)
-    : files_(std::move(files)), open_(files_.size()), errors_(files_.size()) {
+ViewSession::ViewSession(std::vector<ViewFile> files, ViewGuide guide)
+    : files_(std::move(files)), guide_(std::move(guide)), open_(files_.size()), errors_(files_.size()) {
   Open(FirstToSettle() % files_.size());
 }
 
@@ -199,9 +216,9 @@ ViewSession::OpenFile* ViewSession::TryToOpen(size_t file) {
   } catch (const std::bad_alloc&) {
     throw;
   } catch (const YAMLError& error) {
-    errors_[file] = OnOneLine(Explained(error));
+    errors_[file] = InKnownWords(Explained(error), files_[file]);
   } catch (const std::exception& error) {
-    errors_[file] = OnOneLine(Explained(error));
+    errors_[file] = InKnownWords(Explained(error), files_[file]);
   }
   return open_[file].get();
 }
@@ -245,14 +262,17 @@ Json ViewSession::Head(size_t file) {
   Json files = Json::array();
   for (size_t i = 0; i < files_.size(); ++i) {
     OpenFile* open = open_[i].get();
+    const Json known = files_[i].known_pending ? Json(*files_[i].known_pending) : Json();
     files.push_back({{"title", OnOneLine(files_[i].title)},
-                     {"pending", open == nullptr ? Json() : Json(open->GetSettling().CountPending())},
+                     {"pending", open != nullptr ? Json(open->GetSettling().CountPending()) : known},
                      {"saved", open != nullptr && open->IsSaved()},
                      {"error", errors_[i]},
                      {"unsaved", open != nullptr && open->HasUnsavedChoices()}});
   }
   head["files"] = std::move(files);
   head["file"] = file;
+  head["not_shown"] = Json::array();
+  for (const std::string& other : guide_.not_shown) head["not_shown"].push_back(OnOneLine(other));
   return head;
 }
 
@@ -322,9 +342,15 @@ std::string ViewSession::Redo(std::string_view body) {
   return Change(Parse(body), [](Settling& settling) { settling.Redo(); });
 }
 
-void ViewSession::GiveUp() {
+std::string ViewSession::GiveUp() {
   if (is_over_) throw RequestError(409, "It was given up, or saved");
   is_over_ = true;
+  Json left = Json::array();
+  for (size_t i = 0; i < files_.size(); ++i) {
+    if (!files_[i].is_review && !(open_[i] != nullptr && open_[i]->IsSaved()))
+      left.push_back(OnOneLine(files_[i].title));
+  }
+  return Dump({{"left", std::move(left)}, {"next_step", JsonOf(guide_.when_given_up)}});
 }
 
 std::string ViewSession::Save(std::string_view body) {
@@ -338,7 +364,9 @@ std::string ViewSession::Save(std::string_view body) {
   }
   const size_t next = FirstToSettle(NumberAt(request, "file"));
   is_over_ = next == files_.size();
-  return Dump({{"saved", true}, {"next", is_over_ ? Json() : Json(next)}, {"unread", GetUnread()}});
+  Json answer = {{"saved", true}, {"next", is_over_ ? Json() : Json(next)}, {"unread", GetUnread()}};
+  if (is_over_ && guide_.when_saved) answer["next_step"] = JsonOf(guide_.when_saved());
+  return Dump(answer);
 }
 
 }  // namespace vexel_yaml

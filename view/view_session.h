@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "view/settling.h"
+#include "view/view_guide.h"
 
 namespace vexel_yaml {
 
@@ -30,7 +31,7 @@ class ViewSession {
  public:
   /// Reads files until one can be read, and throws RequestError with what is wrong with the first if none
   /// can.
-  explicit ViewSession(std::vector<ViewFile> files);
+  ViewSession(std::vector<ViewFile> files, ViewGuide guide);
   ~ViewSession();
 
   /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved.
@@ -41,9 +42,10 @@ class ViewSession {
   std::string Choose(std::string_view body);
   std::string Undo(std::string_view body);
   std::string Redo(std::string_view body);
-  /// Returns which file comes next, if any. Where none does, it is over.
+  /// Returns which file comes next, if any. Where none does, it is over, and how to go on is said.
   std::string Save(std::string_view body);
-  void GiveUp();
+  /// Returns what isn't saved, and how to come back to it.
+  std::string GiveUp();
 
   /// Whether nothing can be changed or saved any more.
   bool IsOver() const { return is_over_; }
@@ -68,6 +70,7 @@ class ViewSession {
   std::string Change(const nlohmann::ordered_json& request, Step step);
 
   const std::vector<ViewFile> files_;
+  const ViewGuide guide_;
   // Null for what can't be read, or nobody has looked at yet.
   std::vector<std::unique_ptr<OpenFile>> open_;
   // Empty for what can be read, or nobody has looked at yet.

@@ -45,8 +45,8 @@ void LoadForPage(const MergeSettings& settings) {
   AsCommandErrors([&] { LoadRulesAndTypes(settings); });
 }
 
-int ShowPage(std::vector<ViewFile> files, const ViewServerOptions& options) {
-  return AsCommandErrors([&] { return RunViewServer(std::move(files), options); });
+int ShowPage(std::vector<ViewFile> files, const ViewServerOptions& options, ViewGuide guide) {
+  return AsCommandErrors([&] { return RunViewServer(std::move(files), options, std::move(guide)); });
 }
 
 }  // namespace vexel_yaml

@@ -16,6 +16,6 @@ void LoadForPage(const MergeSettings& settings);
 
 /// Shows the files. Returns the exit status. Throws CommandError where the first one can't be read, or there
 /// is no port.
-int ShowPage(std::vector<ViewFile> files, const ViewServerOptions& options);
+int ShowPage(std::vector<ViewFile> files, const ViewServerOptions& options, ViewGuide guide);
 
 }  // namespace vexel_yaml

@@ -1,9 +1,9 @@
 #include "git/web/review.h"
 
+#include "git/asset_names.h"
 #include "git/git_call.h"
 #include "git/merged_commits.h"
 #include "git/repository.h"
-#include "git/asset_names.h"
 #include "git/shown_text.h"
 #include "git/stage_files.h"
 #include "git/web/page_options.h"
@@ -81,6 +81,7 @@ class Review {
     file.base_name = range_.from_name;
     file.theirs_name = range_.to_name;
     file.asset_search = FindAssetNames;
+    file.has_temporary_paths = true;
     files.push_back(std::move(file));
   }
 
@@ -113,7 +114,7 @@ int ReviewOnPage(const std::vector<std::string>& arguments) {
   std::vector<ViewFile> files;
   for (const std::string& asset : OursAmong(changed)) review.Add(asset, files);
   if (files.empty()) throw CommandError("no file of ours has changed in " + parsed.range);
-  return ShowPage(std::move(files), options);
+  return ShowPage(std::move(files), options, {});
 }
 
 }  // namespace vexel_yaml

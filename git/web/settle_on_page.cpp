@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <utility>
 
+#include "git/asset_names.h"
 #include "git/captured_errors.h"
 #include "git/decided_lines.h"
 #include "git/git_call.h"
@@ -15,8 +16,8 @@
 #include "git/repository.h"
 #include "git/resolve_arguments.h"
 #include "git/resolving.h"
-#include "git/asset_names.h"
 #include "git/shown_text.h"
+#include "git/web/next_steps.h"
 #include "git/web/page_options.h"
 #include "git/work_files.h"
 #include "platform/file_error.h"
@@ -27,6 +28,9 @@
 namespace vexel_yaml {
 
 namespace {
+
+// What errors begin with on a terminal.
+constexpr std::string_view kError = "error: ";
 
 // Runs `settle`, and throws what it has said unless it succeeds, for the page to show.
 template <typename Settle>
@@ -73,8 +77,11 @@ ViewFile PageFile(const AssetVersions& versions, const MergeSettings& settings,
   file.theirs_name = names.theirs;
   file.ours_name = names.ours;
   file.asset_search = FindAssetNames;
-  const std::string record = ConflictRecords(repository).Find(versions.asset);
+  file.has_temporary_paths = true;
+  const ConflictRecords records(repository);
+  const std::string record = records.Find(versions.asset);
   if (record.empty()) return file;
+  file.known_pending = records.Entry(versions.asset).CountPending();
   try {
     file.resolutions = ReadResolutions(ScratchFolder(repository).Write("decided", DecidedIn(record)));
   } catch (const YAMLError& error) {
@@ -121,8 +128,24 @@ class ResolvedFile {
                bool force)
       : repository_(repository), settings_(settings), asset_(asset), force_(force), stages_(asset) {}
 
-  // False where that can't be settled on a page, which has been said.
-  bool Open(std::vector<ViewFile>& files) {
+  // False where that can't be settled on a page. Why is said, and added to `not_shown`.
+  bool Open(std::vector<ViewFile>& files, std::vector<std::string>& not_shown) {
+    std::string said;
+    bool is_open = false;
+    {
+      const CapturedErrors captured;
+      is_open = TryToOpen(files);
+      said = captured.Text();
+    }
+    std::cerr << said << std::flush;
+    if (!is_open) not_shown.push_back(said.starts_with(kError) ? said.substr(kError.size()) : said);
+    return is_open;
+  }
+
+  bool IsStored() const { return is_stored_; }
+
+ private:
+  bool TryToOpen(std::vector<ViewFile>& files) {
     AssetVersions versions;
     if (!stages_.Write(scratch_, versions)) return false;
     if (!versions.HasAsset()) {
@@ -136,9 +159,6 @@ class ResolvedFile {
     return true;
   }
 
-  bool IsStored() const { return is_stored_; }
-
- private:
   // Merged once more with what has been decided, as by any other way to settle it.
   void Store(const std::string& record) {
     if (!stages_.AreSame()) {
@@ -176,12 +196,16 @@ int ResolveOnPage(const std::vector<std::string>& arguments) {
   LoadForPage(settings);
   std::vector<std::unique_ptr<ResolvedFile>> resolved;
   std::vector<ViewFile> files;
+  ViewGuide guide;
   for (const std::string& asset : assets) {
     resolved.push_back(std::make_unique<ResolvedFile>(repository, settings, asset, parsed.choice.force));
-    is_done = resolved.back()->Open(files) && is_done;
+    if (resolved.back()->Open(files, guide.not_shown)) continue;
+    is_done = false;
   }
   if (files.empty()) return 1;
-  const int status = ShowPage(std::move(files), options);
+  guide.when_saved = [&] { return AfterAll(FindNextStep(repository)); };
+  guide.when_given_up = ToComeBack("vexel-merge-git resolve --web", parsed.files);
+  const int status = ShowPage(std::move(files), options, std::move(guide));
   ConflictRecords(repository).Sweep();
   if (std::ranges::any_of(resolved, [](const auto& file) { return file->IsStored(); }))
     SayNextStep(FindNextStep(repository));
@@ -199,7 +223,10 @@ int MergetoolOnPage(const std::vector<std::string>& arguments) {
   file.store = [&](const std::string&, const std::string& record) {
     OrThrow([&] { return SettleForMergetool(versions, choice.Next(record)) == AssetMerge::kMerged; });
   };
-  return ShowPage({file}, PageOptions({}, true));
+  ViewGuide guide;
+  guide.when_saved = [&] { return AfterOne(FindNextStep(repository, {versions.asset})); };
+  guide.when_given_up = ToComeBack("git mergetool", {versions.asset});
+  return ShowPage({file}, PageOptions({}, true), std::move(guide));
 }
 
 }  // namespace vexel_yaml
