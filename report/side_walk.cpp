@@ -9,6 +9,7 @@ namespace {
 constexpr size_t kMostOfValue = 160;
 constexpr size_t kMostOfElement = 100;
 constexpr size_t kMostElements = 3;
+constexpr std::string_view kOthers = "\u2026";
 
 const YAMLMapping* BodyOf(const YAMLNode* object) {
   const YAMLMapping* mapping = object == nullptr ? nullptr : object->AsMapping();
@@ -76,9 +77,9 @@ std::pair<size_t, size_t> Moved(const std::vector<uint32_t>& origins, size_t fro
 
 // The part of a list that is in another order now, with dots for the rest.
 std::string OrderText(const std::vector<std::string>& list, std::pair<size_t, size_t> moved) {
-  std::string text = moved.first > 0 ? std::string(kEllipsis) : std::string();
+  std::string text = moved.first > 0 ? std::string(kOthers) : std::string();
   for (size_t i = moved.first; i < moved.second; ++i) text += (text.empty() ? "" : ", ") + list[i];
-  return moved.second < list.size() ? text + ", " + std::string(kEllipsis) : text;
+  return moved.second < list.size() ? text + ", " + std::string(kOthers) : text;
 }
 
 const YAMLNode* ElementAt(const YAMLSequence& sequence, size_t index) {
@@ -168,6 +169,7 @@ void SideWalk::WalkList(const ChangeSequenceOperation& operation, const YAMLSequ
   const YAMLSequenceRemapper* remapper = operation.GetRemapper();
   const std::vector<uint32_t> origins = Origins(remapper, from.Size(), to.Size());
   ReportCell edits{ReportCell::Kind::kEdited, {}, {}};
+  edits.node = &to;
   bool shortened = false;
   const auto add = [&](std::string_view word, const YAMLNode* value, const std::string& named) {
     const std::string whole = OnOneLine(ValueText(value, names_, std::string::npos));

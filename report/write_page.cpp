@@ -70,8 +70,8 @@ std::string_view FirstLines(std::string_view text) {
 void WriteText(std::ostream& out, const ReportCell& cell) {
   const std::string& text = cell.ForPeople();
   const std::string_view start = FirstLines(text);
-  const bool is_whole_list =
-      !cell.shown.empty() && cell.node != nullptr && cell.node->AsSequence() != nullptr;
+  const bool is_whole_list = cell.kind != ReportCell::Kind::kEdited && !cell.shown.empty() &&
+                             cell.node != nullptr && cell.node->AsSequence() != nullptr;
   const std::string_view more = is_whole_list ? std::string_view() : cell.full;
   const std::string_view full = start.size() < text.size() ? text : more;
   if (full.empty()) {

@@ -154,7 +154,7 @@ commit ours wall 3 10 30 21
 again
 check "a list is asked about" refuses answer ss
 check "by its elements' names" grep -qFx '  was     [Object 1, Object 2, Object 3]' "$work/out"
-check "so that orders differ" grep -qFx '  ours    new order: ..., Object 3, Object 2' "$work/out"
+check "so that orders differ" grep -qFx '  ours    new order: …, Object 3, Object 2' "$work/out"
 check "another asset goes by its file" grep -qFx '  theirs  Brick2.mat' "$work/out"
 
 end_of_checks "people are asked"

@@ -170,8 +170,9 @@ TEST(Report, TellsThingsOfOneNameApart) {
   const std::string page =
       PageOf(scene("10", lamps("123")), scene("20", lamps("213")), scene("30", lamps("132")), {"--safe"});
   EXPECT_THAT(Row(page, 1, "MonoBehaviour.key"), HasSubstr("|A (10)|A (20)|B (30)|"));
-  EXPECT_THAT(Row(page, 1, "MonoBehaviour.keys"),
-              HasSubstr("|A (10)\nA (20)\nB|new order: A (20), A (10), ...|new order: ..., B, A (20)|"));
+  EXPECT_THAT(
+      Row(page, 1, "MonoBehaviour.keys"),
+      HasSubstr("|A (10)\nA (20)\nB|new order: A (20), A (10), \u2026|new order: \u2026, B, A (20)|"));
 }
 
 // Left removes the lamp that right renames, and adds another one to the pier that right removes.
