@@ -101,7 +101,7 @@ _vexel_merge_report() {
       *) if _vexel_option_value; then return; fi ;;
     esac
     if [[ "$cur" == -* ]]; then
-      _vexel_offer -o --title -i --rules --typeInfo --safe --json --conflicts --text --version --help
+      _vexel_offer -o --title -i --rules --typeInfo --safe --summary --json --conflicts --text --version --help
       return
     fi
   fi

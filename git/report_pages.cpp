@@ -1,7 +1,6 @@
 #include "git/report_pages.h"
 
 #include <algorithm>
-#include <cctype>
 #include <filesystem>
 #include <iterator>
 #include <optional>
@@ -13,6 +12,7 @@
 #include "git/git_call.h"
 #include "git/merged_commits.h"
 #include "git/path_names.h"
+#include "git/report_index.h"
 #include "git/repository.h"
 #include "git/settings.h"
 #include "git/shown_text.h"
@@ -70,30 +70,6 @@ Paths Remembered(Paths paths) {
   return paths;
 }
 
-// Nothing that a file is called becomes markup, and what is no character isn't shown.
-std::string InMarkup(const std::string& text) {
-  std::string markup;
-  for (const char c : OnOneLine(text)) {
-    markup += c == '<' ? "&lt;" : c == '&' ? "&amp;" : c == '"' ? "&quot;" : std::string(1, c);
-  }
-  return markup;
-}
-
-// A path as a relative address, whatever bytes it has.
-std::string LinkTo(const std::string& path) {
-  constexpr char kDigits[] = "0123456789ABCDEF";
-  std::string link = "./";
-  for (const char c : path) {
-    const auto byte = static_cast<unsigned char>(c);
-    if (std::isalnum(byte) != 0 || c == '/' || c == '.' || c == '-' || c == '_') {
-      link += c;
-    } else {
-      link += {'%', kDigits[byte >> 4U], kDigits[byte & 0xFU]};
-    }
-  }
-  return link;
-}
-
 // Made pages, one asset after the other.
 class PageMaker {
  public:
@@ -108,6 +84,7 @@ class PageMaker {
     const std::string target = page_.empty() ? DefaultPage(asset) : page_;
     Paths call = {GetDataFilesDir() + "vexel-merge-report", "--rules", settings_.rules};
     if (settings_.is_safe) call.emplace_back("--safe");
+    call.emplace_back("--summary");
     if (!settings_.type_info.empty()) call.insert(call.end(), {"--typeInfo", settings_.type_info});
     // What is settled in the record of the conflict at hand shows as settled.
     const std::string record = merged_ ? std::string() : records_.Find(asset);
@@ -129,23 +106,18 @@ class PageMaker {
       return false;
     }
     Tell(shown_page_.empty() ? target : shown_page_);
-    pages_.emplace_back(asset, target);
+    // The last line is about the page, others are about the merge.
+    const Paths lines = Pieces(result.output, '\n');
+    const std::string folder = PagesFolder();
+    if (target.starts_with(folder)) pages_.push_back({asset, target.substr(folder.size()), lines.back()});
     return true;
   }
 
   // Writes a page with links to all of them, if there are several.
   void MakeIndex() const {
     if (pages_.size() < 2) return;
-    const std::string folder = PagesFolder();
-    std::string text =
-        "<!DOCTYPE html>\n<html lang=\"en\"><meta charset=\"utf-8\"><meta name=\"color-scheme\" "
-        "content=\"light dark\"><title>Merged scenes</title>\n<h1>" +
-        std::to_string(pages_.size()) + " merged scenes</h1>\n<ul>\n";
-    for (const auto& [asset, page] : pages_) {
-      text += "<li><a href=\"" + LinkTo(page.substr(folder.size())) + "\">" + InMarkup(asset) + "</a></li>\n";
-    }
-    const std::string index = folder + "index.html";
-    if (!PutFile(index, text + "</ul>\n</html>\n")) throw CommandError("cannot write " + index);
+    const std::string index = PagesFolder() + "index.html";
+    if (!PutFile(index, IndexPage(pages_))) throw CommandError("cannot write " + index);
     Tell(index);
   }
 
@@ -209,8 +181,7 @@ class PageMaker {
   const Repository repository_;
   const ConflictRecords records_{repository_};
   ScratchFolder scratch_{repository_};
-  // Assets and their pages.
-  std::vector<std::pair<std::string, std::string>> pages_;
+  std::vector<IndexedPage> pages_;
 };
 
 }  // namespace

@@ -12,6 +12,7 @@
 #include "platform/temporary_files.h"
 #include "report/conflict_list.h"
 #include "report/merged_files.h"
+#include "report/object_counts.h"
 #include "report/readable_headers.h"
 #include "report/report_json.h"
 #include "report/value_text.h"
@@ -39,6 +40,9 @@ constexpr std::string_view kUsage =
     "         --rules FILE    other merge rules than the default ones\n"
     "         --typeInfo FILE check components, with the type information in FILE\n"
     "         --committed FILE show beside the result what became of it in the end\n"
+    "         --summary       print of the page how many objects were added, changed and removed, and how "
+    "many "
+    "conflicts are open\n"
     "         --safe          merge scenes as scenes, as VexelYAMLMerge merge --safe does\n"
     "         --version, --help\n";
 
@@ -48,6 +52,7 @@ struct Arguments {
   Mode mode = Mode::kPage;
   std::string output;
   std::string title;
+  bool prints_summary = false;
   ReportConfig config;
   std::string text_file;
 };
@@ -93,6 +98,8 @@ Arguments Parse(const std::vector<std::string>& arguments) {
       parsed.mode = Mode::kJson;
     } else if (argument == "--text") {
       parsed.mode = Mode::kText;
+    } else if (argument == "--summary") {
+      parsed.prints_summary = true;
     } else if (argument == "--safe") {
       parsed.config.safe = true;
     } else if (std::string* target = ValueTarget(argument, parsed)) {
@@ -113,6 +120,8 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   for (size_t i = 0; i < paths.size(); ++i) *paths[i] = given[i];
   if (parsed.mode == Mode::kPage && parsed.output.empty()) parsed.output = DefaultPage();
   if (parsed.mode == Mode::kJson && parsed.output.empty()) parsed.output = "-";
+  if (parsed.prints_summary && (parsed.mode != Mode::kPage || parsed.output == "-"))
+    throw std::runtime_error("--summary goes with a page in a file; see vexel-merge-report --help");
   return parsed;
 }
 
@@ -142,7 +151,13 @@ void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostr
   }
   const PageHead head = {title,       config.base_path,          config.left_path, config.right_path,
                          files.error, files.committed != nullptr};
-  WritePage(out, head, CollectReport(files));
+  ObjectNames names = NamesOf(files);
+  std::vector<ReportObject> objects = CollectReport(files, names, {});
+  WritePage(out, head, objects);
+  if (!arguments.prints_summary) return;
+  const ObjectCounts counts = CountObjects(MakeCards(std::move(objects), names));
+  std::cout << counts.added << '\t' << counts.changed << '\t' << counts.removed << '\t' << counts.pending
+            << '\n';
 }
 
 void WriteReportFile(const Arguments& arguments, const MergedFiles& files) {

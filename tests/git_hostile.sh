@@ -59,7 +59,8 @@ vexel-merge-git resolve . >/dev/null 2>"$work/err" || :
 check "a record that nobody has edited settles nothing" test "$(conflicts)" -eq "$number"
 check "pages are made" vexel-merge-git report -- "$long" file.vexel "$inside" >/dev/null
 check "each page has a place, whatever the others are called" test "$(find .git/vexel-merge-report -type f ! -name index.html | wc -l)" -eq 3
-check "and the index a link to each" test "$(grep -c '<a href="[^"<>]*.html">[^<]*</a>' .git/vexel-merge-report/index.html)" -eq 3
+check "and the index says of each what happened" test "$(grep -c '</a></th>\(<td class="number">[0-9]*</td>\)\{4\}' .git/vexel-merge-report/index.html)" -eq 3
+check "with a link" test "$(grep -c '<a href="[^"<>]*.html">[^<]*</a>' .git/vexel-merge-report/index.html)" -eq 3
 rm -r .git/vexel-merge-report && vexel-merge-git report -- "$inside" >/dev/null
 check "also where a folder came first" vexel-merge-git report -- file.vexel >/dev/null
 for link in report.html dir/../report.html folder.link/page; do

@@ -1,0 +1,23 @@
+#include "report/object_counts.h"
+
+#include <algorithm>
+
+namespace vexel_yaml {
+
+ObjectCounts CountObjects(const std::vector<ReportCard>& cards) {
+  ObjectCounts counts;
+  for (const ReportCard& card : cards) {
+    // A component that came is a change of its game object.
+    const auto whole = std::ranges::find(card.objects, card.file_id, &ReportObject::file_id);
+    const bool is_added = whole != card.objects.end() && whole->added;
+    const bool is_removed = whole != card.objects.end() && whole->removed;
+    ++(is_added ? counts.added : is_removed ? counts.removed : counts.changed);
+    for (const ReportObject& object : card.objects) {
+      counts.pending += static_cast<size_t>(
+          std::ranges::count_if(object.rows, [](const ReportRow& row) { return row.pending; }));
+    }
+  }
+  return counts;
+}
+
+}  // namespace vexel_yaml
