@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <filesystem>
 #include <optional>
 
@@ -200,8 +201,9 @@ std::string ConflictRecords::Place(RecordEntry entry, const AssetMerge& merge, s
   if (!Remember(places, entry, hash, hooks_folder)) return {};
   if (!PutFile(places.merged, merged) || !PutFile(places.kept, text)) return {};
   if (!is_beside) {
-    if (is_ours && IsForUs(name)) unlink(places.beside.c_str());
-    return places.kept;
+    // Where it stays, it would be read.
+    const bool is_gone = !is_ours || !IsForUs(name) || unlink(places.beside.c_str()) == 0 || errno == ENOENT;
+    return is_gone ? places.kept : std::string();
   }
   if ((is_ours || is_free) && is_for_us && MakeFoldersFor(places.beside) && PutFile(places.beside, text)) {
     return places.beside;

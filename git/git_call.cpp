@@ -70,7 +70,7 @@ std::vector<std::string> OursAmong(const std::vector<std::string>& paths, const 
 
 std::string TopFolder() {
   const ProgramResult result = Git({"rev-parse", "--show-toplevel"});
-  if (result.status != 0) throw CommandError("", kGitRefused);
+  if (result.status != 0) throw Refusal(result);
   return Line(result);
 }
 
@@ -91,6 +91,11 @@ ProgramCall HashCall(const std::string& path, std::string text) {
   call.errors = ProgramCall::Errors::kDropped;
   call.input = std::move(text);
   return call;
+}
+
+CommandError Refusal(const ProgramResult& result) {
+  return result.status == 127 ? CommandError("git cannot be run, or its answer not be read")
+                              : CommandError("", kGitRefused);
 }
 
 std::string HashIn(const ProgramResult& result) { return result.status == 0 ? Line(result) : std::string(); }

@@ -5,6 +5,7 @@
 #include <string_view>
 #include <vector>
 
+#include "git/shown_text.h"
 #include "platform/run_program.h"
 
 namespace vexel_yaml {
@@ -44,6 +45,9 @@ ProgramCall HashCall(const std::string& path, std::string text);
 
 /// What that has printed; empty where it has failed.
 std::string HashIn(const ProgramResult& result);
+
+/// What ends a command for which git has failed, and has said why, or could not be asked at all.
+CommandError Refusal(const ProgramResult& result);
 
 /// The variable that names another index.
 inline constexpr char kIndexVariable[] = "GIT_INDEX_FILE";

@@ -11,6 +11,7 @@
 #include "git/shown_text.h"
 #include "git/undecided_places.h"
 #include "git/work_files.h"
+#include "platform/ending_signals.h"
 
 namespace vexel_yaml {
 
@@ -51,7 +52,10 @@ int SettleForMergetool(const AssetVersions& versions, const Choice& choice) {
   const std::string start = TextOf("./" + asset);
   const SideNames names = FindSideNames(repository);
   const Settlement settlement = Settle(versions, {records, settings, choice, names});
-  const int status = settlement.status;
+  // The result and its record, or neither.
+  const SignalsHeld held;
+  const bool is_written = settlement.status != AssetMerge::kMerged || PutAsset(asset, settlement.text);
+  const int status = is_written ? settlement.status : AssetMerge::kFailed;
   if (status != AssetMerge::kMerged && IsFile("./" + asset)) {
     // Git puts the old file back where we fail.
     const std::string text = TextOf("./" + asset);

@@ -38,7 +38,7 @@ std::string FindFolder() {
   // Of a linked work tree or a submodule.
   if (std::string linked = PathIn(".git", ".", "gitdir: "); IsFolder(linked)) return linked;
   const ProgramResult result = Git({"rev-parse", "--absolute-git-dir"});
-  if (result.status != 0) throw CommandError("", kGitRefused);
+  if (result.status != 0) throw Refusal(result);
   return Line(result);
 }
 

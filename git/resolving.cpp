@@ -5,6 +5,7 @@
 #include "git/git_call.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
+#include "platform/ending_signals.h"
 
 namespace vexel_yaml {
 
@@ -59,23 +60,27 @@ bool Resolving::TakeAsIs(const std::string& asset) {
     Complain(asset + " has conflict markers");
     return false;
   }
+  const SignalsHeld held;
   records_.TakeAsIs(asset, HashOfAsset(asset));
   if (!Stage(asset)) return false;
   Tell("Resolved " + asset);
   return true;
 }
 
-// Its record stays, in case that somebody changes their mind before the commit.
+// Its record stays, in case that somebody changes their mind before the commit. Neither of the two without
+// the other.
 bool Resolving::Finish(const Settlement& settlement) {
+  const SignalsHeld held;
   const std::string& asset = settlement.entry.asset;
-  LeaveRecord(settlement);
-  if (!Stage(asset)) return false;
+  if (!PutAsset(asset, settlement.text)) return false;
+  if (!LeaveRecord(settlement) || !Stage(asset)) return false;
   Tell("Resolved " + asset);
   return true;
 }
 
 // What is settled already counts when the rest is settled in the engine.
 bool Resolving::LeaveRest(const Settlement& settlement, StageFiles& stages) {
+  const SignalsHeld held;
   const std::string& asset = settlement.entry.asset;
   if (!PutAsset(asset, settlement.text) || !stages.Unstage()) return false;
   LeaveRecord(settlement);
@@ -84,12 +89,13 @@ bool Resolving::LeaveRest(const Settlement& settlement, StageFiles& stages) {
   return false;
 }
 
-void Resolving::LeaveRecord(const Settlement& settlement) {
+bool Resolving::LeaveRecord(const Settlement& settlement) {
   const std::string& asset = settlement.entry.asset;
   const std::string record = records_.Leave(
       settlement.entry, *settlement.merge, settlement.merge->GetText(), [&] { return HashOfAsset(asset); },
       settings_);
   if (record.empty()) Complain("cannot write the record of " + asset);
+  return !record.empty();
 }
 
 }  // namespace vexel_yaml

@@ -25,7 +25,7 @@ class Resolving {
   bool TakeAsIs(const std::string& asset);
   bool Finish(const Settlement& settlement);
   bool LeaveRest(const Settlement& settlement, StageFiles& stages);
-  void LeaveRecord(const Settlement& settlement);
+  bool LeaveRecord(const Settlement& settlement);
 
   const Repository& repository_;
   const MergeSettings& settings_;

@@ -283,13 +283,7 @@ bool PutAsset(const std::string& asset, std::string_view text) {
 }
 
 Settlement Settle(const AssetVersions& versions, const SettleContext& context) {
-  if (IsPlain(versions.asset)) {
-    Settlement settlement = Settling(versions, context).Run();
-    if (settlement.status != AssetMerge::kMerged || PutAsset(versions.asset, settlement.text)) {
-      return settlement;
-    }
-    return {};
-  }
+  if (IsPlain(versions.asset)) return Settling(versions, context).Run();
   Complain(versions.asset + " lies behind a symbolic link, or is one or a folder, in the work tree");
   return {};
 }

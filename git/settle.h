@@ -54,8 +54,8 @@ struct Settlement {
   RecordEntry entry;
 };
 
-/// Merges the file of the work tree once more, with what the user decides now, and writes it there where
-/// nothing is pending. What went wrong has been said.
+/// Merges the file of the work tree once more, with what the user decides now, and leaves it to the caller to
+/// write the result. What went wrong has been said.
 ///
 /// What somebody has edited by hand since the last merge is merged into it, and a conflict that is settled
 /// like that is none. Only where such an edit meets what is chosen now, nothing is done.

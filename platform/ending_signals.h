@@ -1,7 +1,5 @@
 #pragma once
 
-#include <pthread.h>
-
 #include <array>
 #include <csignal>
 
@@ -12,18 +10,18 @@ namespace vexel_yaml {
 inline constexpr std::array kEndingSignals = {SIGHUP,  SIGINT,  SIGQUIT, SIGTERM, SIGABRT,
                                               SIGALRM, SIGUSR1, SIGUSR2, SIGXFSZ, SIGXCPU};
 
-/// Holds these signals back from the calling thread in its lifetime, for steps that must not end half way.
+/// Tidies up before one of these signals ends the process, unless the caller has switched it off (nohup).
+void HandleEndingSignals();
+
+/// Holds these signals back in its lifetime, for steps that must not end half way: from the whole process,
+/// whose other threads may be waiting for something else, and from the programs that this thread starts. The
+/// end comes with the last one that holds them. A failed check alone (SIGABRT) ends the process at once.
 class SignalsHeld {
  public:
-  SignalsHeld() {
-    sigset_t held;
-    sigemptyset(&held);
-    for (const int signal_number : kEndingSignals) sigaddset(&held, signal_number);
-    pthread_sigmask(SIG_BLOCK, &held, &previous_);
-  }
+  SignalsHeld();
   SignalsHeld(const SignalsHeld&) = delete;
   SignalsHeld& operator=(const SignalsHeld&) = delete;
-  ~SignalsHeld() { pthread_sigmask(SIG_SETMASK, &previous_, nullptr); }
+  ~SignalsHeld();
 
  private:
   sigset_t previous_;

@@ -8,7 +8,6 @@
 #include <array>
 #include <atomic>
 #include <cerrno>
-#include <csignal>
 #include <cstdlib>
 #include <utility>
 
@@ -51,27 +50,10 @@ Slot* FreeSlot() {
   return added;
 }
 
-extern "C" void RemoveTempFilesAndDie(int signal_number) {
-  UnlinkTempFiles();
-  std::signal(signal_number, SIG_DFL);
-  raise(signal_number);
-}
-
-void HandleSignals() {
-  for (const int signal_number : kEndingSignals) {
-    struct sigaction action = {};
-    // A signal that the caller has switched off (nohup) stays off.
-    if (sigaction(signal_number, nullptr, &action) != 0 || action.sa_handler == SIG_IGN) continue;
-    action.sa_handler = RemoveTempFilesAndDie;
-    sigaction(signal_number, &action, nullptr);
-  }
-}
-
 // Returns 0 or an errno.
 int Remember(const std::string& path) {
   AutoLock lock(slots_mutex);
-  static bool handled = false;
-  if (!std::exchange(handled, true)) HandleSignals();
+  HandleEndingSignals();
   Slot* slot = FreeSlot();
   if (path.size() >= slot->path.size()) return ENAMETOOLONG;
   *std::copy(path.begin(), path.end(), slot->path.begin()) = '\0';

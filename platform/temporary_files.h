@@ -27,8 +27,7 @@ bool MakeTempFolder(const std::string& path);
 /// Remembers a file of this name that is about to be made. Returns false where there is no room for it.
 bool RememberTempFile(const std::string& path);
 
-/// Forgets a file again that has become one of the user's. May be called from any thread, as the others here
-/// but `OpenTempFile`: with a signal on another thread, the file it is just making would stay.
+/// Forgets a file again that has become one of the user's. May be called from any thread, as the others here.
 void ForgetTempFile(const std::string& path);
 
 /// Removes a file or an empty folder that may be remembered. Does nothing for an empty path.

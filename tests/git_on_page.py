@@ -58,7 +58,8 @@ def settle_as_browser(side, address):
     # The first address leads to the page's own.
     page = Page(urllib.request.urlopen(address, timeout=60).geturl())
     page.take(side)
-    page.save()
+    if page.save()[0] != 200:
+        page.post("give-up")
 
 
 def run(*command, status=0, **env):

@@ -7,6 +7,7 @@
 
 #include "fixups/post_process.h"
 #include "merge/conflict_record_file.h"
+#include "platform/ending_signals.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
 #include "report/record_patterns.h"
@@ -64,6 +65,7 @@ void StoreResult(const std::string& path, const std::string& text, const std::st
   // What is written in place may still find no room.
   const bool is_in_place = result.IsInPlace();
   if (is_in_place) result.Commit();
+  const SignalsHeld held;
   if (record_file) record_file->Commit();
   if (!is_in_place) result.Commit();
 }

@@ -47,8 +47,8 @@ int OpenFileOf(const char* variable, int flags) {
 __attribute__((constructor)) void Start() {
   const std::string_view program = program_invocation_short_name;
   const char* fault = std::getenv("FAULT");
-  constexpr std::array<std::string_view, 3> kPrograms = {"VexelYAMLMerge", "vexel-merge-git",
-                                                         "vexel-merge-report"};
+  constexpr std::array<std::string_view, 4> kPrograms = {"VexelYAMLMerge", "vexel-merge-git",
+                                                         "vexel-merge-report", "vexel-merge-view"};
   if (fault == nullptr || std::ranges::find(kPrograms, program) == kPrograms.end()) return;
   std::sscanf(fault, "%15s %d %ld %d", failing_kind.data(), &error, &first, &goes_on);
   log_file = OpenFileOf("FAULT_LOG", kAppend);

@@ -69,7 +69,9 @@ class Bench:
                 (work / f"in/{side}.{extension}").write_text(scene(objects, *values))
         self.out.mkdir()
         path = f"{Path(arguments.programs).resolve()}:{os.environ['PATH']}"
-        self.environment = dict(os.environ, PATH=path, HOME=str(work), GIT_CONFIG_NOSYSTEM="1")
+        browser = f"{sys.executable} {HERE.parent}/git_on_page.py --browser theirs"
+        self.environment = dict(os.environ, PATH=path, HOME=str(work), GIT_CONFIG_NOSYSTEM="1", CI="",
+                                DISPLAY=":none", BROWSER=browser)
         self.preload = {"LD_PRELOAD": os.path.abspath(arguments.library), "FAULT_COUNT": str(work / "count"),
                         "FAULT_LOG": str(work / "log")}
 
@@ -79,6 +81,8 @@ class Bench:
     # On the branch left, with an asset that the branch right changes elsewhere, and the branch clash there, too.
     def make_repository(self):
         self.shell("git init -q -b base out && cd out && git config user.name Test && git config user.email t@localhost"
+                   " && git config alias.settle '!vexel-merge-git resolve --theirs a.vexel'"
+                   " && git config alias.settle-page '!vexel-merge-git resolve --web a.vexel'"
                    " && vexel-merge-git enable --patterns '*.vexel' && cp ../in/base.vexel a.vexel && git add -A"
                    " && git commit -q -m base && for side in right clash left; do git checkout -q -b $side base &&"
                    " cp ../in/$side.vexel a.vexel && git commit -q -a -m $side; done && cp -a .git ../git")
@@ -95,6 +99,7 @@ class Bench:
             path.unlink()
         if is_git:
             self.shell("cd out && rm -rf .git && cp -a ../git .git && git checkout -q -f left && git clean -fdxq")
+            self.shell("cd out && ! git merge -q --no-edit clash" if " settle" in command else "true")
         for argument in command.split():
             if argument.startswith("out/old"):
                 (self.work / argument).write_bytes(b"old\n" * 500)
@@ -135,14 +140,21 @@ def judge(command, kind, error, old, clean, result):
                 and not is_guarded(name, old, result)]
     if error != -SIGKILL:
         problems += [f"{path} is left" for path in result.left if f"unlink {path}" not in result.failed]
-    if error < 0 and result.status == error:
+    is_ended = error < 0 and result.status in (error, 128 - error)
+    settled = {name for name in clean.files.keys() | old.keys() if clean.files.get(name) != old.get(name)}
+    part = {name for name in settled if result.files.get(name) != old.get(name)}
+    if " settle" in command and error == -SIGTERM and part and part != settled:
+        problems.append(f"of what is settled there is only {part}")
+    if is_ended:
         return problems
     new = {name for name in clean.files if result.files.get(name) != old.get(name)}
     if "old.vexel" in new and new != clean.files.keys():
         problems.append("the destination is new, but the other files are not")
     if kind != "rename" and len([name for name in new if "_base" in name or "_right" in name]) == 1:
         problems.append("only one premerged file is new")
-    is_whole = (result.status, result.stdout, result.files) == (clean.status, clean.stdout, clean.files)
+    # A page never has the same address twice.
+    is_whole = (result.status, result.files) == (clean.status, clean.files) and (
+        result.stdout == clean.stdout or " settle-page" in command)
     # Of a file that can't be opened or closed, these commands say nothing: their callers expect it so. One that
     # exists could have been opened.
     is_silent = kind in ["open", "close"] + ["create"] * (not old) and any("out/" in place for place in result.failed)
@@ -166,6 +178,8 @@ def check_calls(bench, commands, arguments):
         old, clean = bench.run(command, kind)
         assert clean.status in (0, 1, 2) and not clean.left, clean
         seen.update([kind] if clean.calls else [])
+        if " settle-page" in command:
+            errors = [error for error in errors if error == -SIGTERM]
         for error, goes_on in [(error, goes_on) for error in errors for goes_on in {False, error not in ONCE}]:
             chance = random.Random(f"{name} {kind} {error} {goes_on}")
             # Under git, how many calls there are is a matter of time, but the first one is always the same.
