@@ -7,8 +7,8 @@
 
 #include "fixups/component_dependencies.h"
 #include "fixups/engine_keys.h"
-#include "rules/path_step.h"
 #include "scene/holders.h"
+#include "scene/new_targets.h"
 #include "scene/object_links.h"
 #include "scene/place_walk.h"
 #include "scene/same_fields.h"
@@ -41,40 +41,6 @@ std::unordered_set<const YAMLScalar*> OwnTargets(const YAMLNode* object) {
       const YAMLScalar* target = GetLocalTarget(&reference);
       if (&reference != father && target != owner) targets.insert(target);
     });
-  }
-  return targets;
-}
-
-// Counts the references at and below a node by their places, with the target behind each path; the elements
-// of a list share one.
-void CountPlaces(const YAMLNode* node, FieldPath& path, std::map<FieldPath, size_t>& places) {
-  if (node == nullptr) return;
-  if (const YAMLMapping* mapping = node->AsMapping()) {
-    if (const YAMLScalar* target = GetLocalTarget(mapping)) {
-      const PathStep step(path, target);
-      ++places[path];
-    }
-    if (mapping->HasDuplicateKeys()) return;
-    for (const auto& [key, value] : *mapping) {
-      const PathStep step(path, key);
-      CountPlaces(value, path, places);
-    }
-  } else if (const YAMLSequence* sequence = node->AsSequence()) {
-    for (const YAMLNode* item : sequence->GetItems()) CountPlaces(item, path, places);
-  }
-}
-
-// What an object refers to where it did not in base.
-std::unordered_set<const YAMLScalar*> NewTargets(const YAMLNode* object, const YAMLNode* base) {
-  std::map<FieldPath, size_t> places;
-  std::map<FieldPath, size_t> before;
-  FieldPath path;
-  CountPlaces(GetBody(object), path, places);
-  CountPlaces(GetBody(base), path, before);
-  std::unordered_set<const YAMLScalar*> targets;
-  for (const auto& [place, count] : places) {
-    const auto known = before.find(place);
-    if (known == before.end() || known->second < count) targets.insert(place.back());
   }
   return targets;
 }
@@ -216,7 +182,7 @@ class DeedSearch {
       // What was added to a thing comes and goes with it; a part of it may have been moved out, though.
       const bool is_inside = reached != nullptr && deleted_.Find(reached) == deleted_.Find(target);
       if (is_inside && reached != file_id) continue;
-      if (!added) added = NewTargets(other_.Get(file_id), base_.Get(file_id));
+      if (!added) added = FindNewTargets(file_id, base_.Get(file_id), other_.Get(file_id));
       if (added->contains(target)) Add(Deed::Kind::kRefers, file_id, target);
     }
   }
@@ -231,10 +197,11 @@ class DeedSearch {
       for (const AlignedElement& element : list.elements) {
         if (element.base == kNoIndex || element.left != kNoIndex || element.right == kNoIndex) continue;
         const YAMLNode* entry = list.base.GetItems()[element.base];
+        const YAMLNode* now = list.other->GetItems()[element.right];
         const YAMLScalar* target = TargetOf(entry, is_deleted);
-        if (target == nullptr) continue;
+        if (target == nullptr || IsAnotherReference(entry, now)) continue;
         list.path.push_back(YAMLScalar::Lookup(IntToString(static_cast<int>(element.base))));
-        const bool is_edited = !HaveSameFields(list.path, entry, list.other->GetItems()[element.right]);
+        const bool is_edited = !HaveSameFields(list.path, entry, now);
         list.path.pop_back();
         if (is_edited) Add(Deed::Kind::kRefers, file_id, target);
       }

@@ -193,7 +193,7 @@ class ListMaker {
     const auto& [base, left, right] = versions;
     const ThreeOrders<const YAMLScalar*> orders = {base.targets, left.targets, right.targets};
     const std::unordered_set<const YAMLScalar*> wanted(members.begin(), members.end());
-    MergedOrder<const YAMLScalar*> merged = MergeOrder(orders, wanted, MergeResolve::kLeft);
+    MergedOrder<const YAMLScalar*> merged = MergeOrder(orders, wanted);
     // The order of components means nothing.
     if (merged.is_conflict && place.key != YAMLScalar::mComponent) {
       const auto change = [](const ListVersion& side) {

@@ -76,7 +76,7 @@ struct Occurrences {
 
 class Aligner {
  public:
-  // `has_slots`: whether elements with keys may be known by their place, too.
+  // `has_slots`: whether elements may be known by their place, too.
   Aligner(NumberedLists lists, bool has_keys, bool has_slots)
       : lists_(std::move(lists)),
         has_keys_(has_keys),
@@ -91,11 +91,11 @@ class Aligner {
     if (are_unique) {
       MatchById(left, left_);
       MatchById(right, right_);
-      if (has_slots_) MatchSlots(left, right);
     } else if (!MatchBetweenAnchors(base, left, right)) {
       return std::nullopt;
     }
-    if (!has_keys_ && !MatchByPlace(left_, lists_.left, right_, lists_.right)) return std::nullopt;
+    if (has_slots_ && !MatchByPlace(left_, lists_.left, right_, lists_.right)) return std::nullopt;
+    if (has_keys_ && has_slots_ && ArePutElsewhere(base, right)) return std::nullopt;
     if (!are_unique && (HasMoves(lists_.left, left_) || HasMoves(lists_.right, right_))) return std::nullopt;
     if (!PairAdditions()) return std::nullopt;
     return Result();
@@ -109,13 +109,17 @@ class Aligner {
     }
   }
 
-  // Not what one side put where the other put it elsewhere: that is an order.
-  void MatchSlots(const Occurrences& left, const Occurrences& right) {
-    MatchReplacedByBoth(left_, lists_.left, right_, lists_.right, [&](uint32_t in_left, uint32_t in_right) {
-      const uint32_t left_in_right = right.index[lists_.left[in_left]];
-      const uint32_t right_in_left = left.index[lists_.right[in_right]];
-      return (left_in_right == kNoIndex && right_in_left == kNoIndex) || left_in_right == in_right;
-    });
+  // Whether both sides added one element, but not in the same place: as slots these are two.
+  bool ArePutElsewhere(const Occurrences& base, const Occurrences& right) const {
+    const std::vector<Place> left_places = left_.Places(), right_places = right_.Places();
+    for (uint32_t i = 0; i < lists_.left.size(); ++i) {
+      const uint32_t partner = right.index[lists_.left[i]];
+      if (partner == kNoIndex || base.index[lists_.left[i]] != kNoIndex) continue;
+      const uint32_t slot = left_.ToBase(i);
+      if (slot != right_.ToBase(partner)) return true;
+      if (slot == kNoIndex && !AreSame(left_places[i], right_places[partner])) return true;
+    }
+    return false;
   }
 
   // Among equal elements only those are told apart that stand between the same unique ones: on each stretch
@@ -196,9 +200,12 @@ class Aligner {
     ListAlignment result;
     result.has_keys = has_keys_;
     for (uint32_t i = 0; i < lists_.base.size(); ++i) {
-      const uint32_t in_left = left_.ToSide(i);
-      const bool is_replaced = has_keys_ && in_left != kNoIndex && lists_.left[in_left] != lists_.base[i];
-      result.elements.push_back({i, in_left, right_.ToSide(i), is_replaced});
+      const uint32_t in_left = left_.ToSide(i), in_right = right_.ToSide(i);
+      const auto is_other = [&](const Ids& ids, uint32_t index) {
+        return has_keys_ && index != kNoIndex && ids[index] != lists_.base[i];
+      };
+      result.elements.push_back(
+          {i, in_left, in_right, is_other(lists_.left, in_left), is_other(lists_.right, in_right)});
     }
     std::vector<bool> is_paired(lists_.right.size(), false);
     for (uint32_t i = 0; i < lists_.left.size(); ++i) {
@@ -228,7 +235,7 @@ std::optional<ListAlignment> AlignLists(const FieldPath& path, const YAMLSequenc
   std::optional<NumberedLists> by_keys = NumberByKeys(path, base, left, right);
   const bool has_keys = by_keys.has_value();
   const bool has_slots =
-      has_keys && &YAMLSequenceRemapper::ChooseKeyPaths(path) == &YAMLSequenceRemapper::defaultPath;
+      !has_keys || &YAMLSequenceRemapper::ChooseKeyPaths(path) == &YAMLSequenceRemapper::defaultPath;
   return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(base, left, right), has_keys, has_slots)
       .Align();
 }

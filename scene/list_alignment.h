@@ -16,8 +16,11 @@ struct AlignedElement {
   uint32_t base = kNoIndex;
   uint32_t left = kNoIndex;
   uint32_t right = kNoIndex;
-  /// Whether both sides put something in the place of an element that has a key: other elements.
-  bool is_replaced = false;
+  /// Whether the side has an element with another key there: it put something in the place of base's.
+  bool is_replaced_by_left = false;
+  bool is_replaced_by_right = false;
+
+  bool IsReplaced() const { return is_replaced_by_left || is_replaced_by_right; }
 };
 
 struct ListAlignment {
@@ -30,13 +33,13 @@ struct ListAlignment {
 
 /// Lines up the elements of the list at `path` in three versions.
 ///
-/// A list of references may be a set or a row of slots. What both sides put in the place of one reference is
-/// taken for a slot, of which there are not suddenly two: runs of equal length, of others that the other side
-/// doesn't have.
+/// A list that no rule says more of may be a set of references or a row of slots. Elements are known by their
+/// keys first, wherever they stand, and then what a side put in the place of one is taken for a slot, of
+/// which there are not suddenly two.
 ///
-/// Without keys, several answers are often possible. None is given where they would make a merge differ: a
-/// run of elements that both sides replaced by different numbers of others, equal elements of which one went,
-/// a move among them.
+/// Without keys, and in slots, several answers are often possible. None is given where they would make a
+/// merge differ: a run of elements that both sides replaced by different numbers of others, equal elements of
+/// which one went, a move among them, one element that both sides put into different slots.
 std::optional<ListAlignment> AlignLists(const FieldPath& path, const YAMLSequence& base,
                                         const YAMLSequence& left, const YAMLSequence& right);
 

@@ -1,3 +1,4 @@
+#include <algorithm>
 #include <string>
 
 #include "rules/path_step.h"
@@ -66,7 +67,7 @@ class ListMerge {
       if (settler_.AreSame(values.base, values.right)) return CopyOf(values.left);
       if (settler_.AreSame(values.left, values.right)) return CopyOf(values.left);
       // What only its place tells is taken as a whole: it may be another element.
-      if (!alignment_.has_keys || element.is_replaced || values.left == nullptr || values.right == nullptr) {
+      if (!alignment_.has_keys || element.IsReplaced() || values.left == nullptr || values.right == nullptr) {
         return CopyOf(values.Get(settler_.Decide(ConflictType::kBothChange, values)));
       }
     }
@@ -91,10 +92,32 @@ class ListMerge {
       if (element.left != kNoIndex) orders.left[element.left] = i;
       if (element.right != kNoIndex) orders.right[element.right] = i;
     }
-    MergedOrder<uint32_t> merged = MergeOrder(orders, members, MergeResolve::kLeft);
-    if (!merged.is_conflict || IsSet(settler_.GetPath())) return std::move(merged.order);
+    MergedOrder<uint32_t> merged = MergeOrder(orders, members);
+    const bool is_conflict = merged.is_conflict ||
+                             Moves(&AlignedElement::left, &AlignedElement::is_replaced_by_right) ||
+                             Moves(&AlignedElement::right, &AlignedElement::is_replaced_by_left);
+    if (!is_conflict || IsSet(settler_.GetPath())) return std::move(merged.order);
     const MergeResolve side = settler_.Decide(ConflictType::kBothChange, {&base_, &left_, &right_});
     return MergeOrder(orders, members, side).order;
+  }
+
+  // Whether a side moved an element, or others past it, in whose place the other side put something: in a row
+  // of slots that is another slot.
+  bool Moves(uint32_t AlignedElement::*side, bool AlignedElement::*is_replaced_by_other) const {
+    std::vector<const AlignedElement*> kept;
+    for (const AlignedElement& element : alignment_.elements) {
+      if (element.base != kNoIndex && element.*side != kNoIndex) kept.push_back(&element);
+    }
+    std::vector<uint32_t> first_behind(kept.size() + 1, kNoIndex);
+    for (size_t i = kept.size(); i-- > 0;) first_behind[i] = std::min(first_behind[i + 1], kept[i]->*side);
+    uint32_t last_before = 0;
+    for (size_t i = 0; i < kept.size(); ++i) {
+      const uint32_t index = kept[i]->*side;
+      const bool is_moved = index < last_before || index > first_behind[i + 1];
+      if (is_moved && kept[i]->*is_replaced_by_other) return true;
+      last_before = std::max(last_before, index);
+    }
+    return false;
   }
 
   const YAMLSequence& base_;

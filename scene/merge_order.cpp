@@ -1,6 +1,7 @@
 #include "scene/merge_order.h"
 
 #include <algorithm>
+#include <array>
 #include <iterator>
 #include <unordered_map>
 
@@ -37,7 +38,7 @@ bool MovesAny(const std::vector<Name>& base, const std::vector<Name>& changed) {
 
 // Whose order the elements of base stand in.
 template <typename Name>
-MergeResolve ChooseSide(const ThreeOrders<Name>& versions, MergeResolve side, bool& is_conflict) {
+MergeResolve ChooseSide(const ThreeOrders<Name>& versions, bool& is_conflict) {
   const Names<Name> left = SetOf(versions.left), right = SetOf(versions.right);
   Names<Name> common;
   for (const Name name : versions.base) {
@@ -46,11 +47,21 @@ MergeResolve ChooseSide(const ThreeOrders<Name>& versions, MergeResolve side, bo
   const bool left_moves = Differ(versions.base, versions.left, common);
   const bool right_moves = Differ(versions.base, versions.right, common);
   is_conflict = left_moves && right_moves && Differ(versions.left, versions.right, common);
-  if (is_conflict) return side;
   if (left_moves) return MergeResolve::kLeft;
   if (right_moves) return MergeResolve::kRight;
   if (MovesAny(versions.base, versions.left)) return MergeResolve::kLeft;
   return MovesAny(versions.base, versions.right) ? MergeResolve::kRight : MergeResolve::kBase;
+}
+
+// Whether what each side added stands in the order that it gave it.
+template <typename Name>
+bool HasAdditionsAsPlaced(const ThreeOrders<Name>& versions, const std::vector<Name>& order) {
+  const Names<Name> base = SetOf(versions.base);
+  return std::ranges::none_of(std::array{&versions.left, &versions.right}, [&](const auto* version) {
+    Names<Name> added = SetOf(Only(order, SetOf(*version)));
+    std::erase_if(added, [&](Name name) { return base.contains(name); });
+    return Differ(order, *version, added);
+  });
 }
 
 // An order that grows: elements are hung behind those that they follow.
@@ -94,30 +105,45 @@ class GrowingOrder {
   std::unordered_map<Name, std::vector<Name>> followers_;
 };
 
+// The elements of base as `side` has them, with the additions of right placed first, or those of left.
+template <typename Name>
+std::vector<Name> OrderAs(const ThreeOrders<Name>& versions, const Names<Name>& members, MergeResolve side,
+                          bool is_right_first) {
+  const std::vector<Name>& reference = side == MergeResolve::kLeft    ? versions.left
+                                       : side == MergeResolve::kRight ? versions.right
+                                                                      : versions.base;
+  // Removed elements stay in it until the end: what one side put in their place would else be mixed with
+  // what the other put nearby.
+  GrowingOrder<Name> growing(Only(reference, SetOf(versions.base)));
+  growing.Place(is_right_first ? versions.right : versions.left);
+  growing.Place(is_right_first ? versions.left : versions.right);
+  growing.Place(versions.base);
+  return Only(growing.Flatten(), members);
+}
+
 }  // namespace
 
 template <typename Name>
 MergedOrder<Name> MergeOrder(const ThreeOrders<Name>& versions, const std::unordered_set<Name>& members,
-                             MergeResolve side) {
+                             std::optional<MergeResolve> side) {
   MergedOrder<Name> merged;
-  const MergeResolve chosen = ChooseSide(versions, side, merged.is_conflict);
-  const std::vector<Name>& reference = chosen == MergeResolve::kLeft    ? versions.left
-                                       : chosen == MergeResolve::kRight ? versions.right
-                                                                        : versions.base;
-  // Removed elements stay in it until the end: what one side put in their place would else be mixed with
-  // what the other put nearby.
-  GrowingOrder<Name> growing(Only(reference, SetOf(versions.base)));
-  for (const std::vector<Name>* version : {&versions.left, &versions.right, &versions.base}) {
-    growing.Place(*version);
+  const MergeResolve chosen = side ? *side : ChooseSide(versions, merged.is_conflict);
+  const bool is_right_first = chosen == MergeResolve::kRight;
+  merged.order = OrderAs(versions, members, chosen, is_right_first);
+  if (side || HasAdditionsAsPlaced(versions, merged.order)) return merged;
+  std::vector<Name> other = OrderAs(versions, members, chosen, !is_right_first);
+  if (HasAdditionsAsPlaced(versions, other)) {
+    merged.order = std::move(other);
+  } else {
+    merged.is_conflict = true;
   }
-  merged.order = Only(growing.Flatten(), members);
   return merged;
 }
 
 template MergedOrder<const YAMLScalar*> MergeOrder(const ThreeOrders<const YAMLScalar*>&,
                                                    const std::unordered_set<const YAMLScalar*>&,
-                                                   MergeResolve);
+                                                   std::optional<MergeResolve>);
 template MergedOrder<uint32_t> MergeOrder(const ThreeOrders<uint32_t>&, const std::unordered_set<uint32_t>&,
-                                          MergeResolve);
+                                          std::optional<MergeResolve>);
 
 }  // namespace vexel_yaml

@@ -44,27 +44,35 @@ bool Revert(const ListPlace& list, const IsSought& is_sought) {
     if (element.base == kNoIndex || element.left != kNoIndex || element.right == kNoIndex) continue;
     const YAMLNode* before = list.base.GetItems()[element.base];
     if (TargetOf(before, is_sought) == nullptr) continue;
+    if (IsAnotherReference(before, list.other->GetItems()[element.right])) continue;
     list.other->Set(static_cast<int>(element.right), before->Clone())->Free();
     is_changed = true;
   }
   return is_changed;
 }
 
-// Takes new entries out of the other side's list that are nothing but a reference. (Of others the reference
-// is cleared, and the rest stays.)
+// Takes new entries out of the other side's list that are nothing but a reference. In the place of one that
+// filled a slot stands again what base has there. (Of others the reference is cleared, and the rest stays.)
 bool TakeOut(const ListPlace& list, const IsSought& is_sought) {
   std::vector<YAMLNode*> items = list.other->GetItems();
-  for (const AlignedElement& element : list.elements) {
-    if (element.base != kNoIndex || element.left != kNoIndex) continue;
-    YAMLNode*& entry = items[element.right];
+  bool is_changed = false;
+  const auto refers = [&](const YAMLNode* entry) {
     const YAMLScalar* target = GetLocalTarget(entry);
-    if (target == nullptr || !is_sought(target)) continue;
+    return target != nullptr && is_sought(target);
+  };
+  for (const AlignedElement& element : list.elements) {
+    const bool is_added = element.base == kNoIndex;
+    if (element.right == kNoIndex || (is_added && element.left != kNoIndex)) continue;
+    YAMLNode*& entry = items[element.right];
+    const YAMLNode* before = is_added ? nullptr : list.base.GetItems()[element.base];
+    if (!refers(entry) || GetLocalTarget(before) == GetLocalTarget(entry)) continue;
     entry->Free();
-    entry = nullptr;
+    entry = before == nullptr || refers(before) ? nullptr : before->Clone();
+    is_changed = true;
   }
-  if (std::erase(items, nullptr) == 0) return false;
+  std::erase(items, nullptr);
   list.other->SwapItems(std::move(items));
-  return true;
+  return is_changed;
 }
 
 // Takes the entries out of all lists at and below a node that are nothing but a sought reference.

@@ -70,4 +70,9 @@ const YAMLScalar* TargetOf(const YAMLNode* entry, const IsSought& is_sought) {
   return nullptr;
 }
 
+bool IsAnotherReference(const YAMLNode* before, const YAMLNode* now) {
+  const YAMLScalar* target = GetLocalTarget(before);
+  return target != nullptr && target != GetLocalTarget(now);
+}
+
 }  // namespace vexel_yaml

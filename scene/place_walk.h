@@ -57,4 +57,8 @@ class PlaceWalk {
 /// override of a prefab instance. Null for none.
 const YAMLScalar* TargetOf(const YAMLNode* entry, const IsSought& is_sought);
 
+/// Whether an entry that is nothing but a reference became one to something else: not an edit of what it
+/// stood for, but another entry in its place.
+bool IsAnotherReference(const YAMLNode* before, const YAMLNode* now);
+
 }  // namespace vexel_yaml

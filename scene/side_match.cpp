@@ -130,11 +130,9 @@ namespace {
 // Whether it is known what each side did to the elements that both of two gaps hold.
 bool AreClear(const GapMatcher& left, const GapMatcher::Gap& a, const GapMatcher& right,
               const GapMatcher::Gap& b) {
+  if (a.fate != Fate::kUnclear && b.fate != Fate::kUnclear) return true;
   const bool same_run = a.begin == b.begin && a.end == b.end;
-  if (a.fate == Fate::kUnclear || b.fate == Fate::kUnclear) {
-    return same_run && a.count != 0 && std::ranges::equal(left.Instead(a), right.Instead(b));
-  }
-  return same_run || a.fate == Fate::kRemoved || b.fate == Fate::kRemoved;
+  return same_run && a.count != 0 && std::ranges::equal(left.Instead(a), right.Instead(b));
 }
 
 }  // namespace
@@ -150,25 +148,6 @@ bool MatchByPlace(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMa
     i = std::min(a->end, b->end) - 1;
   }
   return true;
-}
-
-void MatchReplacedByBoth(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMatch& right,
-                         const std::vector<uint32_t>& right_ids,
-                         const std::function<bool(uint32_t left, uint32_t right)>& may_pair) {
-  SideMatch left_by_place = left, right_by_place = right;
-  const GapMatcher left_gaps(left_by_place, left_ids), right_gaps(right_by_place, right_ids);
-  for (uint32_t i = 0; i < left.BaseSize(); ++i) {
-    const GapMatcher::Gap* a = left_gaps.Find(i);
-    const GapMatcher::Gap* b = right_gaps.Find(i);
-    if (a == nullptr || b == nullptr || a->begin != b->begin || a->end != b->end) continue;
-    bool is_replaced = a->fate == Fate::kEdited && b->fate == Fate::kEdited;
-    for (uint32_t k = 0; is_replaced && k < a->count; ++k) is_replaced = may_pair(a->first + k, b->first + k);
-    for (uint32_t k = 0; is_replaced && k < a->count; ++k) {
-      left.Pair(a->begin + k, a->first + k);
-      right.Pair(b->begin + k, b->first + k);
-    }
-    i = a->end - 1;
-  }
 }
 
 }  // namespace vexel_yaml

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <cstdint>
-#include <functional>
 #include <vector>
 
 #include "scene/list_alignment.h"
@@ -61,19 +60,13 @@ class SideMatch {
   std::vector<uint32_t> to_base_;
 };
 
-/// The same only where both sides replaced the same run, and `may_pair` holds for what they put there, index
-/// by index.
-void MatchReplacedByBoth(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMatch& right,
-                         const std::vector<uint32_t>& right_ids,
-                         const std::function<bool(uint32_t left, uint32_t right)>& may_pair);
-
 /// Whether two elements, each added by another side, were put between the same elements of base.
 bool AreSame(const Place& a, const Place& b);
 
 /// Pairs what each side put in the place of others: a run of elements of base that it lacks, between two that
 /// it has, with a run of as many. `left_ids` and `right_ids` number the sides' elements.
 /// Returns false where both sides did something to an element of base and it can't be told what: they
-/// replaced different runs, or by different numbers of elements.
+/// replaced a run by different numbers of elements.
 bool MatchByPlace(SideMatch& left, const std::vector<uint32_t>& left_ids, SideMatch& right,
                   const std::vector<uint32_t>& right_ids);
 

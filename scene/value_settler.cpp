@@ -104,7 +104,7 @@ void ValueSettler::SettleEntries(const ThreeMappings& versions) {
     }
   }
   if (is_everywhere_same) return;
-  const auto order = MergeOrder(orders, settled, MergeResolve::kLeft).order;
+  const auto order = MergeOrder(orders, settled).order;
   for (YAMLMapping* version : {&versions.base, &versions.left, &versions.right}) version->Reorder(order);
 }
 
@@ -212,7 +212,7 @@ OwnedNode ValueSettler::MergeAddedMappings(const YAMLMapping& left, const YAMLMa
   std::unordered_set<const YAMLScalar*> keys(orders.left.begin(), orders.left.end());
   keys.insert(orders.right.begin(), orders.right.end());
   OwnedNodePtr<YAMLMapping> merged(YAMLAlloc<YAMLMapping>::create(left.IsFlow()));
-  for (const YAMLScalar* key : MergeOrder(orders, keys, MergeResolve::kLeft).order) {
+  for (const YAMLScalar* key : MergeOrder(orders, keys).order) {
     const PathStep step(path_, key);
     const YAMLNode *a = left.Get(key), *b = right.Get(key);
     const bool are_both = a != nullptr && b != nullptr;

@@ -15,7 +15,7 @@ FieldPath Letters(const std::string& text) {
 }
 
 std::string Merged(const std::string& base, const std::string& left, const std::string& right,
-                   const std::string& members, MergeResolve side = MergeResolve::kBase) {
+                   const std::string& members, std::optional<MergeResolve> side = std::nullopt) {
   const FieldPath wanted = Letters(members);
   const auto merged = MergeOrder<const YAMLScalar*>({Letters(base), Letters(left), Letters(right)},
                                                     {wanted.begin(), wanted.end()}, side);
@@ -28,13 +28,16 @@ TEST(MergeOrder, ElementsStandWhereTheSideThatPlacedThemHasThem) {
   EXPECT_EQ(Merged("abc", "cab", "abxc", "abcx"), "cabx");
   EXPECT_EQ(Merged("abc", "bca", "ac", "ac"), "ca");
   EXPECT_EQ(Merged("ab", "lmab", "rabs", "abrslm"), "lmrabs");
-  EXPECT_EQ(Merged("a", "axy", "ayzx", "axyz"), "axyz") << "both added x and y";
+  EXPECT_EQ(Merged("ab", "axyb", "bxay", "abxy"), "bxay") << "both added x and y";
 }
 
 TEST(MergeOrder, TwoDifferentMovesAreAConflict) {
-  EXPECT_EQ(Merged("abc", "cab", "bac", "abc"), "conflict abc");
-  EXPECT_EQ(Merged("abc", "cabx", "ybac", "abcxy", MergeResolve::kRight), "conflict ybxac");
-  EXPECT_EQ(Merged("abcd", "bacd", "dbca", "bcda"), "conflict abcd");
+  EXPECT_EQ(Merged("abc", "cab", "bac", "abc"), "conflict cab");
+  EXPECT_EQ(Merged("abc", "cab", "bac", "abc", MergeResolve::kBase), "abc");
+  EXPECT_EQ(Merged("abc", "cabx", "ybac", "abcxy", MergeResolve::kRight), "ybxac");
+  EXPECT_EQ(Merged("a", "axy", "ayzx", "axyz"), "conflict axyz");
+  EXPECT_EQ(Merged("a", "axy", "ayzx", "axyz", MergeResolve::kRight), "ayzx");
+  EXPECT_EQ(Merged("abcd", "bacd", "dbca", "bcda"), "conflict bacd");
   EXPECT_EQ(Merged("abcd", "bacd", "dbc", "bcd"), "dbc") << "left moved only what right removed";
 }
 
@@ -47,7 +50,7 @@ TEST(MergeOrder, ALongRunOfAdditionsKeepsItsOrder) {
   ThreeOrders<uint32_t> versions;
   std::unordered_set<uint32_t> members;
   for (uint32_t i = 0; i < 100000; ++i) members.insert(versions.left.emplace_back(i));
-  EXPECT_EQ(MergeOrder(versions, members, MergeResolve::kBase).order, versions.left);
+  EXPECT_EQ(MergeOrder(versions, members).order, versions.left);
 }
 
 }  // namespace

@@ -94,6 +94,20 @@ TEST(SafeMerge, ThePlacesOfADeletedThingFollowIt) {
               "[" + other + "]");
 }
 
+TEST(SafeMerge, ASlotStaysASlotWhateverBecomesOfADeletedThing) {
+  const std::string lamp = "{fileID: 10}", other = "{fileID: 20}", none = "{fileID: 0}";
+  const auto list = [](const std::string& a, const std::string& b) { return "[" + a + ", " + b + "]"; };
+  EXPECT_THAT(FieldOf(list(lamp, other), list(none, other), list(lamp, other)),
+              ElementsAre(list(lamp, other), list(none, other), list(lamp, other)));
+  EXPECT_THAT(FieldOf(list("{fileID: 5}", other), list("{fileID: 5}", other), list(lamp, other)),
+              ElementsAre(list(lamp, other), list("{fileID: 5}", other), list(lamp, other)));
+  // Left filled the slot as well: only as long as the lamp stays is that a conflict.
+  const std::string base = Script("  f: [{fileID: 5}]\n") + Lamp(10), right = Script("  f: [{fileID: 10}]\n");
+  const SafelyMerged merged(base, Script("  f: [{fileID: 0}]\n"), right + Lamp(10), "left 10\n");
+  EXPECT_THAT(merged.Pending(), IsEmpty());
+  EXPECT_EQ(merged.At("5", "f"), "[{fileID: 0}]");
+}
+
 TEST(SafeMerge, WhatTheDeleterDidElsewhereStays) {
   const std::string lamp = "{fileID: 10}", other = "{fileID: 20}";
   // Another reference in its place, an entry that only mentions the lamp deeper, and an override.

@@ -113,6 +113,16 @@ TEST(SettleScene, ANewReferenceIsAnEditThoughTheObjectHadAnother) {
   };
   const std::string right = Script(5, "target: {fileID: 0}\n  lamps: []");
   EXPECT_THAT(Settled(fields("0") + Thing(10), fields("10") + Thing(10), right).Pending(), ElementsAre("10"));
+  // In another element of the list, and in an element that moved.
+  const auto list = [](const std::string& a, const std::string& b) {
+    return Script(
+        5, "slots:\n  - {name: a, target: {fileID: " + a + "}}\n  - {name: b, target: {fileID: " + b + "}}");
+  };
+  EXPECT_THAT(Settled(list("10", "0") + Thing(10), list("0", "10") + Thing(10), list("0", "0")).Pending(),
+              ElementsAre("10"));
+  const std::string swapped =
+      Script(5, "slots:\n  - {name: b, target: {fileID: 0}}\n  - {name: a, target: {fileID: 10}}");
+  EXPECT_THAT(Settled(list("10", "0") + Thing(10), swapped + Thing(10), "").Pending(), ElementsAre("5"));
 }
 
 TEST(CheckMergedScene, AReferenceThatASideLeftBehindIsCleared) {

@@ -14,7 +14,7 @@ LISTS = {"MeshRenderer": ("m_Materials",), "MonoBehaviour": ("waves", "delays", 
 BUILDING = {"add": 8, "add_instance": 2, "add_component": 8, "override": 2, "insert": 4, "set_field": 4, "move": 1}
 EDITING = {"add": 3, "add_instance": 1, "add_component": 3, "remove_component": 2, "delete": 4, "duplicate": 1,
            "move": 5, "override": 3, "revert_override": 1, "set_field": 8, "drop_field": 1,
-           "insert": 3, "remove": 2, "replace": 3, "shift": 4}
+           "insert": 3, "remove": 2, "replace": 6, "shift": 4}
 
 
 def _clear(value, gone):
@@ -67,7 +67,7 @@ class Editor:
         if "guid" in old:
             return old | {"guid": "a" + self._pick("0123456789")}
         if "fileID" in old:
-            return {"fileID": self._pick(self.scene)}
+            return {"fileID": self._pick([*self.scene, "0"])}
         keys = [self._pick(old)] if "x" in old or "r" in old or self._pick((0, 1)) else list(old)
         return old | {key: self._value(old[key]) for key in keys}
 
@@ -102,7 +102,8 @@ class Editor:
                          "m_Shadows": {"m_Type": "2", "m_Strength": "1"}},
                "MeshRenderer": {"m_Materials": [{"fileID": "2100000", "guid": f"a{n}", "type": "2"} for n in (1, 2)]},
                "BoxCollider": {"m_Size": {"x": "1", "y": "1", "z": "1"}},
-               "MonoBehaviour": {"speed": "1", "target": NONE, "settings": {"gust": "1", "calm": "0"}, "lamps": [],
+               "MonoBehaviour": {"speed": "1", "target": NONE, "settings": {"gust": "1", "calm": "0"},
+                                 "lamps": [self._value(NONE) for _ in range(3)],
                                  "delays": ["1", "2", "3"], "waves": [{"name": name, "wait": "3", "count": "1"}
                                                                       for name in ("ship", "gull", "rain")]}}[kind]
         self._new(component, NUMBERS[kind], kind, {"m_GameObject": {"fileID": game_object}, "m_Enabled": "1", **own})

@@ -40,8 +40,25 @@ def _missing_in_list(path, base, side, other, merged):
         if after < wanted and mine > before or after > wanted and mine < before:
             found = True
             yield path, item
-    if not found and (merged != side if other == base else order_lost(base, side, other, merged)):
+    if not found and slot_lost(base, side, other, merged):
+        yield path, "slot"
+    elif not found and (merged != side if other == base else order_lost(base, side, other, merged)):
         yield path, "order"
+
+
+def _filled_slots(base, side):
+    """What `side` put in the place of elements, by index, or None where it did anything else to the list."""
+    filled = {n: item for n, item in enumerate(side) if base[n:n + 1] != [item]}
+    return filled if len(side) == len(base) and not any(item in base for item in filled.values()) else None
+
+
+def slot_lost(base, side, other, merged):
+    """Whether one of the slots that `side` filled or took away, and nothing else, has something else in it."""
+    filled, others = _filled_slots(base, side), _filled_slots(base, other)
+    if filled is not None and others is not None:
+        return any(merged[n:n + 1] != [item] for n, item in filled.items())
+    takes_away = [item for item in base if item in side] == side
+    return takes_away and any(base[n] not in side and item in merged for n, item in (others or {}).items())
 
 
 def order_lost(base, side, other, merged):
@@ -62,9 +79,9 @@ def _children_reordered(before, after):
 
 
 def _without(value, gone):
-    """A value without the entries of lists that are nothing but a reference to what is gone."""
+    """A value without the entries of lists that are nothing but a reference to what is gone, or cleared as such."""
     if isinstance(value, list):
-        return [_without(item, gone) for item in value if target_of(item) not in gone]
+        return [_without(item, gone) for item in value if target_of(item) not in gone and not (gone and item == NONE)]
     return {key: _without(below, gone) for key, below in value.items()} if isinstance(value, dict) else value
 
 
@@ -129,6 +146,15 @@ def is_covered(fact, base, side, other, pending):
     for key in path[1:]:
         old = _get(old, key)
     targets = [target for target in (target_of(value), value == NONE and target_of(old)) if target]
+    # What became of a slot goes with what filled it, and what it held comes back.
+    new = side[file_id].fields if file_id in side else {}
+    for key in path[1:]:
+        new = _get(new, key)
+    if isinstance(new, list):
+        befores = old or []
+        changed = [item for item in new if item not in befores] if value != NONE else \
+                  [item for item in befores if item not in new]
+        targets += filter(None, map(target_of, changed))
     if any(target not in side for target in targets):
         return True  # The editor cleared the reference, since its object was deleted.
     things |= {part for target in targets for version in three for part in owners(version, target)}

@@ -8,7 +8,7 @@ from pathlib import Path
 import yaml
 
 import facts
-from scene import Object, owners, parse, whole, write
+from scene import NONE, Object, owners, parse, whole, write
 from soundness import faults
 
 SIDES = ("left", "right")
@@ -101,7 +101,8 @@ def stands_as_in_base(versions, merged, path):
         return parts[0] == parts[1]
     before, after = (value_at(scene, path) for scene in (versions["base"], merged))
     if isinstance(before, list):  # Its order is what the choice is about; what only one side added is there, too.
-        before, after = ([item for item in one if item in two] for one, two in ((before, after), (after, before)))
+        before, after = ([item for item in one if item in two and item != NONE]
+                         for one, two in ((before, after), (after, before)))
     # A reference to what is gone is cleared, whatever was chosen for it.
     return before is None or before == after or path[-1] == "fileID" and before not in merged
 
