@@ -68,9 +68,10 @@ const YAMLScalar* FindCutObject(const VexelObjects& base, const VexelObjects& si
   const Slot* last = LastOf(side);
   if (last == nullptr) return nullptr;
   if (base.EndsInLineBreak() && !side.EndsInLineBreak()) return last->key;
-  const YAMLNode* whole = base.Get(last->key);
-  if (whole == nullptr) return nullptr;
-  const YAMLNode* body = last->value->AsMapping()->First();
+  if (!base.HasKey(last->key)) return nullptr;
+  // Copies, since an object that was read is no longer known as the same by its text.
+  const OwnedNodePtr<YAMLNode> object(last->value->Clone()), whole(base.Get(last->key)->Clone());
+  const YAMLNode* body = object->AsMapping()->First();
   const YAMLNode* whole_body = whole->AsMapping()->First();
   // Removing the last lines of the last object is an edit like others, unless none are left.
   const bool is_cut = body == YAMLScalar::empty
