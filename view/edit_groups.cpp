@@ -1,7 +1,5 @@
 #include "view/edit_groups.h"
 
-#include <array>
-
 #include "scene/object_links.h"
 #include "view/scene_excerpt.h"
 
@@ -9,10 +7,20 @@ namespace vexel_yaml {
 
 EditGroups::EditGroups(const SceneDocuments& scene) {
   const std::unique_ptr<SceneDocuments> copy = scene.Copy();
-  const std::array<const VexelObjects*, 3> versions = {&copy->base, &copy->left, &copy->right};
+  const Versions versions = {&copy->base, &copy->left, &copy->right};
   Group members = FindEdited(*copy);
+  JoinLinked(versions, members);
+  JoinReferring(versions, members);
+  JoinCircles(versions);
+  for (const YAMLScalar* file_id : members) {
+    Group& group = groups_[Root(file_id)];
+    group.push_back(file_id);
+    group_of_.emplace(file_id, &group);
+  }
+}
+
+void EditGroups::JoinLinked(const Versions& versions, Group& members) {
   std::unordered_set<const YAMLScalar*> known(members.begin(), members.end());
-  std::unordered_set<const YAMLScalar*> moved;
   for (const YAMLScalar* file_id : Group(members)) {
     std::array<ObjectLinks, 3> links;
     for (size_t i = 0; i < links.size(); ++i) links[i] = ReadLinks(versions[i]->Get(file_id));
@@ -20,7 +28,7 @@ EditGroups::EditGroups(const SceneDocuments& scene) {
       return link.kind != links[0].kind || link.father != links[0].father || link.owner != links[0].owner;
     };
     const bool has_moved = is_elsewhere(links[1]) || is_elsewhere(links[2]);
-    if (has_moved) moved.insert(file_id);
+    if (has_moved) moved_.insert(file_id);
     for (const ObjectLinks& link : links) {
       if (link.owner != nullptr) Join(file_id, link.owner);
       if (!has_moved) continue;
@@ -32,9 +40,13 @@ EditGroups::EditGroups(const SceneDocuments& scene) {
       }
     }
   }
+}
+
+void EditGroups::JoinReferring(const Versions& versions, const Group& members) {
+  const std::unordered_set<const YAMLScalar*> known(members.begin(), members.end());
   // What hangs where it always did shares nothing with its father: half a scene may hang there.
   const auto just_hangs = [&](const YAMLScalar* node, const YAMLScalar* father) {
-    return !moved.contains(node) && !moved.contains(father) && FatherIn(copy->base, node) == father;
+    return !moved_.contains(node) && !moved_.contains(father) && FatherIn(*versions[0], node) == father;
   };
   for (const YAMLScalar* file_id : members) {
     for (const VexelObjects* version : versions) {
@@ -46,20 +58,18 @@ EditGroups::EditGroups(const SceneDocuments& scene) {
       });
     }
   }
-  // Moves may form circles, whatever stands between them.
-  for (const YAMLScalar* file_id : moved) {
+}
+
+// Moves may form circles, whatever stands between them.
+void EditGroups::JoinCircles(const Versions& versions) {
+  for (const YAMLScalar* file_id : moved_) {
     for (const VexelObjects* version : versions) {
       std::unordered_set<const YAMLScalar*> passed;
       for (const YAMLScalar* step = FatherIn(*version, file_id);
            step != nullptr && passed.insert(step).second; step = FatherIn(*version, step)) {
-        if (moved.contains(step)) Join(file_id, step);
+        if (moved_.contains(step)) Join(file_id, step);
       }
     }
-  }
-  for (const YAMLScalar* file_id : members) {
-    Group& group = groups_[Root(file_id)];
-    group.push_back(file_id);
-    group_of_.emplace(file_id, &group);
   }
 }
 
