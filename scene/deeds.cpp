@@ -207,7 +207,7 @@ class DeedSearch {
       }
     };
     PlaceWalk(
-        is_deleted, [](const YAMLMapping&, const YAMLMapping&) {}, look_at)
+        is_deleted, [](const YAMLMapping&, const YAMLMapping&, const YAMLMapping*) {}, look_at)
         .Walk(file_id, base_.Get(file_id), const_cast<YAMLNode*>(kept_.Get(file_id)),
               const_cast<YAMLNode*>(other_.Get(file_id)));
   }

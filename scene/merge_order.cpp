@@ -1,7 +1,6 @@
 #include "scene/merge_order.h"
 
 #include <algorithm>
-#include <array>
 #include <iterator>
 #include <unordered_map>
 
@@ -53,15 +52,19 @@ MergeResolve ChooseSide(const ThreeOrders<Name>& versions, bool& is_conflict) {
   return MovesAny(versions.base, versions.right) ? MergeResolve::kRight : MergeResolve::kBase;
 }
 
-// Whether what each side added stands in the order that it gave it.
+// Whether what each side added stands where it put it: among its other additions and, unless only the other
+// side moved some, among the elements of base.
 template <typename Name>
-bool HasAdditionsAsPlaced(const ThreeOrders<Name>& versions, const std::vector<Name>& order) {
+bool HasAdditionsAsPlaced(const ThreeOrders<Name>& versions, const std::vector<Name>& order,
+                          MergeResolve mover) {
   const Names<Name> base = SetOf(versions.base);
-  return std::ranges::none_of(std::array{&versions.left, &versions.right}, [&](const auto* version) {
-    Names<Name> added = SetOf(Only(order, SetOf(*version)));
-    std::erase_if(added, [&](Name name) { return base.contains(name); });
-    return Differ(order, *version, added);
-  });
+  const auto is_as_placed = [&](const std::vector<Name>& version, MergeResolve other) {
+    Names<Name> placed = SetOf(Only(order, SetOf(version)));
+    if (mover == other) std::erase_if(placed, [&](Name name) { return base.contains(name); });
+    return !Differ(order, version, placed);
+  };
+  return is_as_placed(versions.left, MergeResolve::kRight) &&
+         is_as_placed(versions.right, MergeResolve::kLeft);
 }
 
 // An order that grows: elements are hung behind those that they follow.
@@ -130,9 +133,9 @@ MergedOrder<Name> MergeOrder(const ThreeOrders<Name>& versions, const std::unord
   const MergeResolve chosen = side ? *side : ChooseSide(versions, merged.is_conflict);
   const bool is_right_first = chosen == MergeResolve::kRight;
   merged.order = OrderAs(versions, members, chosen, is_right_first);
-  if (side || HasAdditionsAsPlaced(versions, merged.order)) return merged;
+  if (side || HasAdditionsAsPlaced(versions, merged.order, chosen)) return merged;
   std::vector<Name> other = OrderAs(versions, members, chosen, !is_right_first);
-  if (HasAdditionsAsPlaced(versions, other)) {
+  if (HasAdditionsAsPlaced(versions, other, chosen)) {
     merged.order = std::move(other);
   } else {
     merged.is_conflict = true;

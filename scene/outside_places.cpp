@@ -1,6 +1,7 @@
 #include "scene/outside_places.h"
 
 #include <algorithm>
+#include <iterator>
 #include <map>
 
 #include "fixups/reference_search.h"
@@ -12,20 +13,48 @@ namespace vexel_yaml {
 namespace {
 
 using FileIDs = std::vector<const YAMLScalar*>;
-// Puts the entries of base that a list lacks back behind those that precede them there.
-bool BringBack(const ListPlace& list, const IsSought& is_sought) {
+
+bool IsEmptyReference(const YAMLNode* node) {
+  const YAMLMapping* reference = node == nullptr ? nullptr : node->AsMapping();
+  return reference != nullptr && reference->Size() == 1 && reference->HasKey(YAMLScalar::fileID) &&
+         GetLocalTarget(reference) == nullptr;
+}
+
+// What is to stand with the deleter in the place of an entry or reference of base that it took out or
+// cleared: the same where what it stands for stays, else what the other side put there. Null for nothing.
+const YAMLNode* Restored(const YAMLNode* before, const YAMLNode* instead, const IsSought& stays,
+                         const IsSought& goes) {
+  if (TargetOf(before, stays) != nullptr) return before;
+  const auto goes_with = [&](const YAMLNode* reference) {
+    const YAMLScalar* target = GetLocalTarget(reference);
+    return target != nullptr && goes(target);
+  };
+  return instead != nullptr && goes_with(before) && !goes_with(instead) ? instead : nullptr;
+}
+
+// Puts entries that the deleter's list lacks back behind those that precede them in base.
+bool BringBack(const ListPlace& list, const IsSought& stays, const IsSought& goes) {
   std::map<int64_t, std::vector<YAMLNode*>> behind;
   int64_t previous = -1;
+  bool is_changed = false;
   for (const AlignedElement& element : list.elements) {
     if (element.base == kNoIndex) continue;
-    const YAMLNode* entry = list.base.GetItems()[element.base];
-    if (element.left != kNoIndex) {
-      previous = element.left;
-    } else if (TargetOf(entry, is_sought) != nullptr) {
-      behind[previous].push_back(entry->Clone());
+    const bool is_there = element.left != kNoIndex;
+    if (is_there) previous = element.left;
+    if (is_there && !IsEmptyReference(list.deleter.GetItems()[element.left])) continue;
+    const bool is_in_other = list.other != nullptr && element.right != kNoIndex;
+    const YAMLNode* restored =
+        Restored(list.base.GetItems()[element.base],
+                 is_in_other ? list.other->GetItems()[element.right] : nullptr, stays, goes);
+    if (restored == nullptr) continue;
+    is_changed = true;
+    if (is_there) {
+      list.deleter.Set(static_cast<int>(element.left), restored->Clone())->Free();
+    } else {
+      behind[previous].push_back(restored->Clone());
     }
   }
-  if (behind.empty()) return false;
+  if (behind.empty()) return is_changed;
   std::vector<YAMLNode*> items = behind[-1];
   for (size_t index = 0; index < list.deleter.Size(); ++index) {
     items.push_back(list.deleter.GetItems()[index]);
@@ -98,11 +127,6 @@ bool TakeOutBelow(YAMLNode* node, const IsSought& is_sought) {
   return is_changed;
 }
 
-bool IsEmptyReference(const YAMLMapping& reference) {
-  return reference.Size() == 1 && reference.HasKey(YAMLScalar::fileID) &&
-         GetLocalTarget(&reference) == nullptr;
-}
-
 }  // namespace
 
 OutsidePlaces::OutsidePlaces(const SceneEdits& edits, const ScenePlan& plan) {
@@ -128,6 +152,8 @@ OutsidePlaces::OutsidePlaces(const SceneEdits& edits, const ScenePlan& plan) {
     }
     fate.changed_by_deleter = changes.changed;
     fate.changed_by_other = other_changes.changed;
+    std::ranges::copy_if(changes.changed, std::back_inserter(fate.changed_by_both),
+                         [&](const YAMLScalar* file_id) { return other_changes.Changed(file_id); });
   }
 }
 
@@ -162,14 +188,16 @@ void OutsidePlaces::SettleFate(const Fate& fate, const VexelObjects& base, Vexel
   };
   const IsSought goes = [&](const YAMLScalar* target) { return fate.going.contains(target); };
   PlaceWalk walk([&](const YAMLScalar* target) { return stays(target) || goes(target); },
-                 [&](const YAMLMapping& reference, YAMLMapping& now) {
-                   if (!stays(GetLocalTarget(&reference)) || !IsEmptyReference(now)) return;
+                 [&](const YAMLMapping& reference, YAMLMapping& now, const YAMLMapping* instead) {
+                   if (!IsEmptyReference(&now)) return;
+                   const YAMLNode* restored = Restored(&reference, instead, stays, goes);
+                   if (restored == nullptr) return;
                    now.Clear();
-                   reference.CloneInto(now);
+                   restored->AsMapping()->CloneInto(now);
                    deleter_changed = true;
                  },
                  [&](const ListPlace& list) {
-                   deleter_changed |= BringBack(list, stays);
+                   deleter_changed |= BringBack(list, stays, goes);
                    if (list.other == nullptr) return;
                    other_changed |= Revert(list, loses_edits);
                    other_changed |= TakeOut(list, goes);
@@ -185,8 +213,8 @@ void OutsidePlaces::SettleFate(const Fate& fate, const VexelObjects& base, Vexel
   const FileIDs going(fate.going.begin(), fate.going.end());
   const ReferenceSearch was_there(fate.removed);
   const ReferenceSearch is_to_go(going);
-  // (Where nothing stays, what the deleter did to its own objects stands.)
-  for (const YAMLScalar* file_id : fate.staying.empty() ? FileIDs() : fate.changed_by_deleter) {
+  // (Where nothing stays, what the deleter alone did stands.)
+  for (const YAMLScalar* file_id : fate.staying.empty() ? fate.changed_by_both : fate.changed_by_deleter) {
     const YAMLNode* object = base.Get(file_id);
     if (object != nullptr && was_there.MayRefer(*object)) settle(file_id);
   }

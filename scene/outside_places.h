@@ -16,8 +16,9 @@ class OutsidePlaces {
   OutsidePlaces(const SceneEdits& edits, const ScenePlan& plan);
 
   /// Brings the places of what stays after all back into the version of the side that deleted it, and takes
-  /// those of what goes out of the other side's. Both are then no edits of these sides any more. To be called
-  /// when the plan has been carried out.
+  /// those of what goes out of the other side's. Both are then no edits of these sides any more. What the
+  /// other side put in the place of an entry that only went with its thing stands against no edit, either. To
+  /// be called when the plan has been carried out.
   void Settle(const SceneVersions& versions) const;
 
  private:
@@ -29,6 +30,7 @@ class OutsidePlaces {
     std::vector<const YAMLScalar*> added_by_other;  // That stays.
     std::vector<const YAMLScalar*> changed_by_deleter;
     std::vector<const YAMLScalar*> changed_by_other;
+    std::vector<const YAMLScalar*> changed_by_both;
     FileIDSet staying;
     FileIDSet as_in_base;  // Of these.
     FileIDSet going;

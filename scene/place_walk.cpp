@@ -22,7 +22,7 @@ void PlaceWalk::WalkNodes(const YAMLNode* base, YAMLNode* deleter, YAMLNode* oth
 void PlaceWalk::WalkMappings(const YAMLMapping& base, YAMLMapping& deleter, YAMLMapping* other) {
   if (base.HasDuplicateKeys() || deleter.HasDuplicateKeys()) return;
   if (other != nullptr && other->HasDuplicateKeys()) other = nullptr;
-  if (GetLocalTarget(&base) != nullptr) return on_field_(base, deleter);
+  if (GetLocalTarget(&base) != nullptr) return on_field_(base, deleter, other);
   for (const auto& [key, value] : base) {
     path_.push_back(key);
     if (!IsLink(path_, kind_)) {

@@ -27,8 +27,10 @@ using IsSought = std::function<bool(const YAMLScalar* target)>;
 /// whose elements can't be told apart.
 class PlaceWalk {
  public:
-  /// Gets a reference to another object in base, and what stands there now.
-  using OnField = std::function<void(const YAMLMapping& reference, YAMLMapping& deleter)>;
+  /// Gets a reference to another object in base, and what stands there now, null where the other side has
+  /// nothing of the kind.
+  using OnField =
+      std::function<void(const YAMLMapping& reference, YAMLMapping& deleter, const YAMLMapping* other)>;
   /// Comes after the calls for what is in the list's elements, and may change both lists.
   using OnList = std::function<void(const ListPlace& list)>;
 

@@ -37,6 +37,7 @@ TEST(MergeOrder, TwoDifferentMovesAreAConflict) {
   EXPECT_EQ(Merged("abc", "cabx", "ybac", "abcxy", MergeResolve::kRight), "ybxac");
   EXPECT_EQ(Merged("a", "axy", "ayzx", "axyz"), "conflict axyz");
   EXPECT_EQ(Merged("a", "axy", "ayzx", "axyz", MergeResolve::kRight), "ayzx");
+  EXPECT_EQ(Merged("abc", "bxy", "aycb", "bxy"), "conflict ybx") << "right moved b behind y";
   EXPECT_EQ(Merged("abcd", "bacd", "dbca", "bcda"), "conflict bacd");
   EXPECT_EQ(Merged("abcd", "bacd", "dbc", "bcd"), "dbc") << "left moved only what right removed";
 }

@@ -101,6 +101,12 @@ TEST(SafeMerge, ASlotStaysASlotWhateverBecomesOfADeletedThing) {
               ElementsAre(list(lamp, other), list(none, other), list(lamp, other)));
   EXPECT_THAT(FieldOf(list("{fileID: 5}", other), list("{fileID: 5}", other), list(lamp, other)),
               ElementsAre(list(lamp, other), list("{fileID: 5}", other), list(lamp, other)));
+  // What right put in the place of what went with the lamp.
+  EXPECT_THAT(FieldOf(lamp, none, other), ::testing::Each(other));
+  EXPECT_THAT(FieldOf(list(lamp, other), "[" + other + "]", list("{fileID: 5}", other)),
+              ::testing::Each(list("{fileID: 5}", other)));
+  EXPECT_THAT(FieldOf(list(lamp, other), list(none, other), list("{fileID: 5}", other)),
+              ::testing::Each(list("{fileID: 5}", other)));
   // Left filled the slot as well: only as long as the lamp stays is that a conflict.
   const std::string base = Script("  f: [{fileID: 5}]\n") + Lamp(10), right = Script("  f: [{fileID: 10}]\n");
   const SafelyMerged merged(base, Script("  f: [{fileID: 0}]\n"), right + Lamp(10), "left 10\n");

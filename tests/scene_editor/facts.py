@@ -115,7 +115,9 @@ def left_behind(base, side, other, merged):
     and doesn't any more, as (object, target). What `side` put in the place of a reference is its own edit."""
     def clears(before, after, target):
         if isinstance(before, list) and isinstance(after, list):
-            return len(after) < len(before) and {"fileID": target} in before and {"fileID": target} not in after
+            # Among equal elements it can't be told which one went.
+            is_clear = len(after) < len(before) and all(before.count(item) == 1 for item in before)
+            return is_clear and {"fileID": target} in before and {"fileID": target} not in after
         if target_of(before) == target:
             return after == NONE
         return isinstance(before, dict) and isinstance(after, dict) and any(
@@ -152,8 +154,9 @@ def is_covered(fact, base, side, other, pending):
         new = _get(new, key)
     if isinstance(new, list):
         befores = old or []
-        changed = [item for item in new if item not in befores] if value != NONE else \
-                  [item for item in befores if item not in new]
+        changed = [item for item in new if item not in befores]
+        if value in (NONE, "slot"):
+            changed = changed * (value != NONE) + [item for item in befores if item not in new]
         targets += filter(None, map(target_of, changed))
     if any(target not in side for target in targets):
         return True  # The editor cleared the reference, since its object was deleted.
