@@ -15,6 +15,8 @@ struct ObjectCounts {
   size_t removed = 0;
   /// Conflicts that nobody has settled.
   size_t pending = 0;
+
+  void Add(const ReportCard& card);
 };
 
 ObjectCounts CountObjects(const std::vector<ReportCard>& cards);

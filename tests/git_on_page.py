@@ -37,6 +37,9 @@ class Page:
     def state(self, file=0):
         return json.load(urllib.request.urlopen(f"{self.address}/state?file={file}", timeout=60))
 
+    def summary(self, file):
+        return json.load(urllib.request.urlopen(f"{self.address}/summary?file={file}", timeout=60))
+
     def post(self, what, **body):
         host, secret = self.address.removeprefix("http://").split("/")
         connection = http.client.HTTPConnection(host, timeout=60)
@@ -250,6 +253,10 @@ def check_review():
     state = page.state()
     expect("the mode", (state["mode"], state["names"]), ("review", {"base": "before HEAD", "result": "HEAD"}))
     expect("the changed files", [file["title"] for file in state["files"]], ["A.vexel", "B.vexel", "New.vexel"])
+    expect("what is known of a file that isn't read", "objects" in state["files"][2], False)
+    expect("what happened in the files", [page.summary(file)["objects"] for file in range(3)],
+           [{"added": 0, "changed": 1, "removed": 0}, {"added": 0, "changed": 0, "removed": 1},
+            {"added": 1, "changed": 0, "removed": 0}])
     row = state["cards"][0]["objects"][0]["rows"][0]
     expect("a change", (row["field"], row["base"]["text"], row["result"]["text"]), ("m_Intensity", "2", "9"))
     for file, kind in ((1, "removed"), (2, "added")):

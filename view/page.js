@@ -71,10 +71,18 @@ function placeDivider() {
   else divider.remove();
 }
 
+// What happened in it, such as "2 changed, 1 added"; empty for what isn't read yet.
+function objectsOf({objects}) {
+  if (objects === undefined) return "";
+  const some = ["changed", "added", "removed"].filter((word) => objects[word] > 0);
+  return some.map((word) => `${objects[word]} ${word}`).join(", ") || "nothing changed";
+}
+
 function wordsOf(file) {
   if (file.error !== "") return "can't be read";
   if (file.saved) return "saved";
-  if (file.pending === null) return state.mode === "merge" ? "not read yet" : "";
+  if (state.mode !== "merge") return objectsOf(file);
+  if (file.pending === null) return "not read yet";
   return file.pending > 0 ? `${file.pending} open` : "";
 }
 
@@ -86,10 +94,23 @@ function showFiles() {
   byId("files").firstElementChild.replaceChildren(...state.files.map((file, index) => {
     const words = wordsOf(file);
     const choice = button(file.title, {file: index});
-    if (words !== "") choice.append(" ", make("span", file.saved ? "badge" : "badge conflict", words));
+    const isPlain = file.saved || (state.mode !== "merge" && file.error === "");
+    if (words !== "") choice.append(" ", make("span", isPlain ? "badge" : "badge conflict", words));
     if (index === state.file) choice.setAttribute("aria-current", "true");
     return make("li", "", choice);
   }));
+}
+
+// In a review the list of files is its index: the others are read while the first one is looked at.
+async function readOthers() {
+  for (let i = 0; i < state.files.length && !ended; i += 1) {
+    if (state.files[i].objects !== undefined || state.files[i].error !== "") continue;
+    const file = await ask(`summary?file=${i}`);
+    state.files[i] = file;
+    const words = wordsOf(file);
+    const choice = byId("files").querySelectorAll("button")[i];
+    choice.append(" ", make("span", file.error === "" ? "badge" : "badge conflict", words));
+  }
 }
 
 function showRest() {

@@ -136,4 +136,7 @@ window.addEventListener("pagehide", () => {
 window.addEventListener("pageshow", (event) => event.persisted && location.reload());
 
 connection = watch(there, lost);
-act(() => load());
+act(async () => {
+  await load();
+  if (state.mode !== "merge") readOthers().catch(() => {});
+});

@@ -180,6 +180,8 @@ class ViewServer {
       response.set_content(kViewPage.data(), kViewPage.size(), "text/html; charset=utf-8");
     } else if (place == "state") {
       Reply(response, [&] { return session_.State(request.get_param_value("file")); });
+    } else if (place == "summary") {
+      Reply(response, [&] { return session_.Summary(request.get_param_value("file")); });
     } else if (place == "events") {
       SendEvents(response);
     } else {

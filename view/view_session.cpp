@@ -10,6 +10,7 @@
 #include <utility>
 
 #include "report/named_note.h"
+#include "report/object_counts.h"
 #include "report/report_json.h"
 #include "report/value_text.h"
 #include "view/card_order.h"
@@ -108,6 +109,11 @@ class ViewSession::OpenFile {
 
   Settling& GetSettling() { return settling_; }
   bool HasUnsavedChoices() const { return !is_saved_ && settling_.GetChoices().CanUndo(); }
+  ObjectCounts Count() const {
+    ObjectCounts counts;
+    for (const auto& [key, told] : told_) counts.Add(told.card);
+    return counts;
+  }
   const std::vector<std::string>& GetKeys() const { return keys_; }
   const std::string& GetText(const std::string& key) const { return told_.at(numbers_.at(key)).text; }
   bool IsSaved() const { return is_saved_; }
@@ -260,15 +266,7 @@ Json ViewSession::Head(size_t file) {
   Json head = HeadOf(files_[file]);
   head.update(shown == nullptr ? NothingFor(errors_[file]) : StandOf(files_[file], shown->GetSettling()));
   Json files = Json::array();
-  for (size_t i = 0; i < files_.size(); ++i) {
-    OpenFile* open = open_[i].get();
-    const Json known = files_[i].known_pending ? Json(*files_[i].known_pending) : Json();
-    files.push_back({{"title", OnOneLine(files_[i].title)},
-                     {"pending", open != nullptr ? Json(open->GetSettling().CountPending()) : known},
-                     {"saved", open != nullptr && open->IsSaved()},
-                     {"error", errors_[i]},
-                     {"unsaved", open != nullptr && open->HasUnsavedChoices()}});
-  }
+  for (size_t i = 0; i < files_.size(); ++i) files.push_back(Entry(i));
   head["files"] = std::move(files);
   head["file"] = file;
   head["not_shown"] = Json::array();
@@ -276,15 +274,38 @@ Json ViewSession::Head(size_t file) {
   return head;
 }
 
-std::string ViewSession::State(std::string_view file) {
+Json ViewSession::Entry(size_t file) const {
+  OpenFile* open = open_[file].get();
+  const std::optional<size_t>& known = files_[file].known_pending;
+  Json entry = {{"title", OnOneLine(files_[file].title)},
+                {"pending", known ? Json(*known) : Json()},
+                {"saved", open != nullptr && open->IsSaved()},
+                {"error", errors_[file]},
+                {"unsaved", open != nullptr && open->HasUnsavedChoices()}};
+  if (open == nullptr) return entry;
+  entry["pending"] = open->GetSettling().CountPending();
+  const ObjectCounts counts = open->Count();
+  entry["objects"] = {{"added", counts.added}, {"changed", counts.changed}, {"removed", counts.removed}};
+  return entry;
+}
+
+size_t ViewSession::NumberOf(std::string_view file) {
+  if (file.empty()) return FirstToSettle() % files_.size();
   size_t number = 0;
   const char* const end = file.data() + file.size();
-  if (file.empty()) {
-    number = FirstToSettle() % files_.size();
-  } else {
-    const auto [rest, error] = std::from_chars(file.data(), end, number);
-    if (error != std::errc() || rest != end) throw RequestError(400, "file is no number");
-  }
+  const auto [rest, error] = std::from_chars(file.data(), end, number);
+  if (error != std::errc() || rest != end) throw RequestError(400, "file is no number");
+  return number;
+}
+
+std::string ViewSession::Summary(std::string_view file) {
+  const size_t number = NumberOf(file);
+  TryToOpen(number);
+  return Dump(Entry(number));
+}
+
+std::string ViewSession::State(std::string_view file) {
+  const size_t number = NumberOf(file);
   const OpenFile* open = TryToOpen(number);
   std::vector<std::string_view> cards;
   if (open != nullptr) {

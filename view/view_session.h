@@ -37,6 +37,8 @@ class ViewSession {
   /// Everything about a file; `file` is its number in digits, or empty for the first one that isn't saved.
   /// One that can't be read has an error in place of cards.
   std::string State(std::string_view file);
+  /// What the list of files says of one, which is read for that.
+  std::string Summary(std::string_view file);
   /// These take a request's body, which names the file and its revision, and return what has changed. A page
   /// that shows an older revision is refused.
   std::string Choose(std::string_view body);
@@ -66,6 +68,8 @@ class ViewSession {
   // Goes around once; the number of all files where nothing is left.
   size_t FirstToSettle(size_t from = 0);
   nlohmann::ordered_json Head(size_t file);
+  nlohmann::ordered_json Entry(size_t file) const;
+  size_t NumberOf(std::string_view file);
   template <typename Step>
   std::string Change(const nlohmann::ordered_json& request, Step step);
 
