@@ -69,6 +69,8 @@ class Settling {
     const std::string& asset = versions_.asset;
     record_ = context_.records.Find(asset);
     entry_ = context_.records.Entry(asset);
+    // Of a single pick, git tells what it is only once it has stopped.
+    if (entry_.names.theirs.empty()) entry_.names = context_.names;
     if (!record_.empty()) {
       merged_ = context_.records.MergedText(asset);
       return true;

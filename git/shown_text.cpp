@@ -60,10 +60,11 @@ std::string Shown(const std::string& name) { return isatty(STDERR_FILENO) != 0 ?
 
 std::string ListOf(const std::vector<std::string>& names) {
   constexpr size_t kMostNames = 5;
+  // The last one has room where "1 more" would stand.
+  const size_t shown = names.size() == kMostNames + 1 ? names.size() : std::min(names.size(), kMostNames);
   std::string text;
-  for (size_t i = 0; i < std::min(names.size(), kMostNames); ++i)
-    text += (i == 0 ? "" : ", ") + OnOneLine(names[i]);
-  if (names.size() > kMostNames) text += " and " + std::to_string(names.size() - kMostNames) + " more";
+  for (size_t i = 0; i < shown; ++i) text += (i == 0 ? "" : ", ") + OnOneLine(names[i]);
+  if (names.size() > shown) text += " and " + std::to_string(names.size() - shown) + " more";
   return text;
 }
 

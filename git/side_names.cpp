@@ -151,7 +151,8 @@ SideNames FindSideNames(const Repository& repository) {
   for (const auto& [file, word] :
        {std::pair("CHERRY_PICK_HEAD", "pick"), std::pair("REVERT_HEAD", "revert")}) {
     const std::string head = FirstLine(repository.Path(file));
-    if (!head.empty()) return {Picked({word, head, {}}), {}};
+    if (head.empty()) continue;
+    return {Picked({word, head, Line(GitQuietly({"show", "--no-patch", "--format=%s", head}))}), {}};
   }
   return {};
 }

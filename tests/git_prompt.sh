@@ -59,6 +59,7 @@ for operation in rebase cherry-pick 'revert --no-edit'; do
   # shellcheck disable=SC2086
   check "a ${operation%% *} stops" refuses git $operation theirs >/dev/null 2>&1
   check "it is settled" answer ttt
+  [ "$operation" = rebase ] || check "who theirs is, by the subject" grep -q '; theirs is \(without \)\?"theirs"$' "$work/out"
   check "how to go on with it is said" grep -qx "To go on with the .*: git ${operation%% *} --continue" "$work/err"
   check "it goes on" env GIT_EDITOR=true git "${operation%% *}" --continue >/dev/null 2>&1
   check "to its end" refuses git "${operation%% *}" --abort >/dev/null 2>&1
