@@ -16,6 +16,7 @@
 #include "git/repository.h"
 #include "git/settings.h"
 #include "git/shown_text.h"
+#include "git/side_people.h"
 #include "git/stage_files.h"
 #include "git/work_files.h"
 #include "platform/files.h"
@@ -92,11 +93,13 @@ class PageMaker {
       scratch_.Write("decided", DecidedIn(record));
       call.insert(call.end(), {"-i", "decided"});
     }
-    std::string title = asset + (merged_ ? std::string() : WhoseSides(asset));
+    std::string title = asset;
     if (merged_) title += ", the parents of " + ShortHash(merged_->commit) + " merged anew";
     // What was decided or edited by hand is in the commit alone.
     if (merged_ && !WriteVersion(merged_->commit, "committed", asset, scratch_).empty())
       call.insert(call.end(), {"--committed", "committed"});
+    const SideNames names = NamesFor(asset);
+    call.insert(call.end(), {"--theirs", names.theirs, "--ours", names.ours});
     call.insert(call.end(), {"-o", target, "--title", title, versions.base, versions.left, versions.right});
     // From their folder, since the page shows the paths that were given.
     const ProgramResult result = RunProgram(
@@ -122,12 +125,10 @@ class PageMaker {
   }
 
  private:
-  // In a rebase, what is the user's own is on the left.
-  std::string WhoseSides(const std::string& asset) const {
+  SideNames NamesFor(const std::string& asset) const {
+    if (merged_) return PeopleBehind(*merged_, asset);
     const RecordEntry entry = records_.Entry(asset);
-    const SideNames names = entry.asset.empty() ? FindSideNames(repository_) : entry.names;
-    return (names.theirs.empty() ? "" : ", left (theirs): " + names.theirs) +
-           (names.ours.empty() ? "" : ", right (ours): " + names.ours);
+    return WithPeople(entry.asset.empty() ? FindSideNames(repository_) : entry.names, repository_, asset);
   }
 
   bool WriteMerged(const std::string& asset, AssetVersions& versions) {

@@ -390,9 +390,4 @@ std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& n
   return Collector(files, names, sides).Collect();
 }
 
-std::vector<ReportObject> CollectReport(const MergedFiles& files) {
-  ObjectNames names = NamesOf(files);
-  return CollectReport(files, names, {});
-}
-
 }  // namespace vexel_yaml

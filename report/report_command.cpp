@@ -36,6 +36,7 @@ constexpr std::string_view kUsage =
     "\n"
     "options: -o FILE         where the page goes (report.html), or the JSON; - for standard output\n"
     "         --title TEXT    the page's title\n"
+    "         --theirs NAME   who or what is behind <left>; likewise --ours for <right>\n"
     "         -i FILE         settle conflicts as FILE says\n"
     "         --rules FILE    other merge rules than the default ones\n"
     "         --typeInfo FILE check components, with the type information in FILE\n"
@@ -53,6 +54,9 @@ struct Arguments {
   std::string output;
   std::string title;
   bool prints_summary = false;
+  bool names_sides = false;
+  std::string theirs;
+  std::string ours;
   ReportConfig config;
   std::string text_file;
 };
@@ -66,6 +70,8 @@ int Fail(const std::string& message) {
 std::string* ValueTarget(std::string_view option, Arguments& parsed) {
   if (option == "-o") return &parsed.output;
   if (option == "--title") return &parsed.title;
+  if (option == "--theirs") return &parsed.theirs;
+  if (option == "--ours") return &parsed.ours;
   if (option == "-i") return &parsed.config.merge_file;
   if (option == "--committed") return &parsed.config.committed_path;
   if (option == "--rules") return &parsed.config.rules_file;
@@ -105,6 +111,7 @@ Arguments Parse(const std::vector<std::string>& arguments) {
     } else if (std::string* target = ValueTarget(argument, parsed)) {
       if (++index == arguments.size()) throw std::runtime_error("option " + argument + " needs a value");
       *target = arguments[index];
+      parsed.names_sides |= argument == "--theirs" || argument == "--ours";
     } else {
       throw std::runtime_error("unknown option " + argument + "; see vexel-merge-report --help");
     }
@@ -149,10 +156,21 @@ void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostr
     out << ReportJson(files, title);
     return;
   }
-  const PageHead head = {title,       config.base_path,          config.left_path, config.right_path,
-                         files.error, files.committed != nullptr};
+  const PageHead head = {title,
+                         config.base_path,
+                         config.left_path,
+                         config.right_path,
+                         files.error,
+                         files.committed != nullptr,
+                         arguments.names_sides,
+                         OnOneLine(arguments.theirs),
+                         OnOneLine(arguments.ours)};
+  SideWords words;
+  if (arguments.names_sides)
+    words = {head.theirs_name.empty() ? "Their side" : head.theirs_name,
+             head.ours_name.empty() ? "Our side" : head.ours_name};
   ObjectNames names = NamesOf(files);
-  std::vector<ReportObject> objects = CollectReport(files, names, {});
+  std::vector<ReportObject> objects = CollectReport(files, names, words);
   WritePage(out, head, objects);
   if (!arguments.prints_summary) return;
   const ObjectCounts counts = CountObjects(MakeCards(std::move(objects), names));

@@ -13,8 +13,6 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-constexpr std::string_view kSettled = "settled: ";
-
 std::string_view KindWord(ReportCell::Kind kind) {
   switch (kind) {
     case ReportCell::Kind::kUnchanged:
@@ -29,19 +27,6 @@ std::string_view KindWord(ReportCell::Kind kind) {
       return "removed";
   }
   return {};
-}
-
-// The sides by the words that people use for them in a merge.
-std::string_view SideWord(std::string_view word) {
-  return word == "left" ? "theirs" : word == "right" ? "ours" : word;
-}
-
-std::string StateText(std::string_view state) {
-  for (const std::string_view start : {kSettled, std::string_view("from ")}) {
-    if (!state.starts_with(start)) continue;
-    return std::string(start) + std::string(SideWord(state.substr(start.size())));
-  }
-  return std::string(state);
 }
 
 Json ValueJson(const ReportCell& cell, bool is_switch, ObjectNames& names) {
@@ -110,12 +95,12 @@ Json RowJson(const ReportRow& row, ObjectNames& names, bool shows_committed) {
   json["field"] = row.path.size() < 2 ? std::string() : Cleaned(row.path.back()->GetText());
   json["label"] = OnOneLine(row.overridden.empty() ? FieldLabel(row.path) : PropertyLabel(row.overridden));
   json["property"] = Cleaned(PropertyName(row));
-  json["state"] = StateText(row.state);
+  json["state"] = InWordsOfPeople(row.state);
   json["note"] = OnOneLine(row.note);
   json["pending"] = row.pending;
   json["repaired"] = row.repaired;
   const bool is_settled = row.state.starts_with(kSettled);
-  json["choice"] = is_settled ? Json(SideWord(row.state.substr(kSettled.size()))) : Json();
+  json["choice"] = is_settled ? Json(InWordsOfPeople(row.state.substr(kSettled.size()))) : Json();
   const bool is_switch = IsSwitchRow(row);
   for (size_t i = 0; i < std::size(kCells); ++i) {
     json[std::string(kCellNames[i])] = CellJson(row.*kCells[i], is_switch, names);

@@ -72,6 +72,13 @@ void JudgeRow(ReportRow& row, const SideWords& sides) {
                           : "Neither side's new order was taken";
 }
 
+std::string InWordsOfPeople(std::string_view state) {
+  const size_t word = state.rfind(' ') + 1;
+  const std::string_view side = state.substr(word);
+  const std::string_view known = side == "left" ? "theirs" : side == "right" ? "ours" : side;
+  return std::string(state.substr(0, word)) + std::string(known);
+}
+
 void TellApart(ReportRow& row, ObjectNames& names) {
   ReportCell* const cells[] = {&row.base, &row.left, &row.right, &row.result, &row.committed};
   const auto looks_like_another = [&](const ReportCell* cell) {

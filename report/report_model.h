@@ -86,8 +86,6 @@ struct SideWords {
 /// Everything a merge did, object by object: those with conflicts first, then by their names. `names` must
 /// know the objects of the versions and of the result.
 std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names, const SideWords& sides);
-/// The same with names of its own.
-std::vector<ReportObject> CollectReport(const MergedFiles& files);
 /// What knows the objects of the versions and of the result.
 ObjectNames NamesOf(const MergedFiles& files);
 
@@ -99,6 +97,12 @@ inline constexpr std::string_view kChangedInside = "changed inside";
 /// Tells what became of a place that no record settles, from what its cells say, and notes it where an order
 /// got lost.
 void JudgeRow(ReportRow& row, const SideWords& sides);
+
+/// How the state of a conflict begins that is settled.
+inline constexpr std::string_view kSettled = "settled: ";
+
+/// A side, or a state that ends in one, with theirs for left and ours for right.
+std::string InWordsOfPeople(std::string_view state);
 
 /// Gives values of a row that only look the same what tells them apart.
 void TellApart(ReportRow& row, ObjectNames& names);

@@ -56,6 +56,10 @@ std::string_view KindWord(ReportCell::Kind kind) {
   return {};
 }
 
+std::string Capital(std::string_view word) {
+  return static_cast<char>(word.front() - 'a' + 'A') + std::string(word.substr(1));
+}
+
 // The first lines of a text of many lines.
 std::string_view FirstLines(std::string_view text) {
   size_t end = 0;
@@ -120,7 +124,11 @@ void WriteRecordPath(std::ostream& out, std::string_view path) {
   out << Escaped{path} << "</code>";
 }
 
-void WriteRow(std::ostream& out, const ReportRow& row, bool shows_committed) {
+std::string StateWords(const PageHead& head, std::string_view state) {
+  return head.are_theirs_and_ours ? InWordsOfPeople(state) : std::string(state);
+}
+
+void WriteRow(std::ostream& out, const PageHead& head, const ReportRow& row) {
   out << "<tr data-path=\"" << Escaped{PathToString({row.path.begin() + 1, row.path.end()})} << "\""
       << RowClass(row) << "><th scope=\"row\">" << Escaped{FieldLabel(row)};
   if (!row.note.empty()) out << "<small>" << Escaped{row.note} << "</small>";
@@ -129,9 +137,9 @@ void WriteRow(std::ostream& out, const ReportRow& row, bool shows_committed) {
   WriteCell(out, "left", row.left);
   WriteCell(out, "right", row.right);
   WriteCell(out, "result", row.result);
-  if (shows_committed) WriteCell(out, "committed", row.committed);
+  if (head.shows_committed) WriteCell(out, "committed", row.committed);
   out << "<td class=\"state\">";
-  if (!row.state.empty()) out << "<span>" << row.state << "</span>";
+  if (!row.state.empty()) out << "<span>" << StateWords(head, row.state) << "</span>";
   if (row.repaired && row.state != "repaired") out << " <span>repaired</span>";
   if (row.pending) WriteRecordPath(out, row.record_path);
   out << "</td></tr>\n";
@@ -152,14 +160,31 @@ constexpr Kind kKinds[] = {{"conflict", "conflicts", &ReportObject::pending},
 struct Side {
   std::string_view name;
   std::string_view label;
+  std::string_view word;
+  std::string PageHead::*owner;
   bool ReportObject::*flag;
   ReportCell ReportRow::*cell;
 };
 
-constexpr Side kLeft = {"left", "Left (theirs)", &ReportObject::left, &ReportRow::left};
-constexpr Side kRight = {"right", "Right (mine)", &ReportObject::right, &ReportRow::right};
+constexpr Side kLeft = {
+    "left", "Left (theirs)", "theirs", &PageHead::theirs_name, &ReportObject::left, &ReportRow::left};
+constexpr Side kRight = {"right",          "Right (mine)", "ours", &PageHead::ours_name, &ReportObject::right,
+                         &ReportRow::right};
 
-void WriteObject(std::ostream& out, const ReportObject& object, bool shows_committed) {
+void WriteSideHead(std::ostream& out, const PageHead& head, const Side& side) {
+  const std::string& owner = head.*side.owner;
+  out << "<th class=\"" << side.name << "\">";
+  if (!head.are_theirs_and_ours) {
+    out << Capital(side.name);
+  } else if (owner.empty()) {
+    out << Capital(side.word);
+  } else {
+    out << Escaped{owner} << "<small>" << side.word << "</small>";
+  }
+  out << "</th>";
+}
+
+void WriteObject(std::ostream& out, const PageHead& head, const ReportObject& object) {
   const Escaped file_id{object.file_id->GetText()};
   out << "<section class=\"object\" data-file-id=\"" << file_id << "\" data-sides=\""
       << (object.left ? "left" : "") << (object.left && object.right ? " " : "")
@@ -177,10 +202,12 @@ void WriteObject(std::ostream& out, const ReportObject& object, bool shows_commi
   for (const Kind& kind : kKinds) {
     if (object.*kind.flag) out << " <span class=\"badge " << kind.name << "\">" << kind.name << "</span>";
   }
-  out << "</h2>\n<table><thead><tr><th>Field</th><th>Base</th><th class=\"left\">Left</th><th "
-         "class=\"right\">Right</th><th>Result</th>"
-      << (shows_committed ? "<th>Committed</th>" : "") << "<th>State</th></tr></thead><tbody>\n";
-  for (const ReportRow& row : object.rows) WriteRow(out, row, shows_committed);
+  out << "</h2>\n<table><thead><tr><th>Field</th><th>Base</th>";
+  WriteSideHead(out, head, kLeft);
+  WriteSideHead(out, head, kRight);
+  out << "<th>Result</th>" << (head.shows_committed ? "<th>Committed</th>" : "")
+      << "<th>State</th></tr></thead><tbody>\n";
+  for (const ReportRow& row : object.rows) WriteRow(out, head, row);
   out << "</tbody></table></section>\n";
 }
 
@@ -201,10 +228,12 @@ size_t CountRows(const std::vector<ReportObject>& objects, auto matches) {
   return count;
 }
 
-void WriteSideSummary(std::ostream& out, const Side& side, const std::string& path,
+void WriteSideSummary(std::ostream& out, const PageHead& head, const Side& side, const std::string& path,
                       const std::vector<ReportObject>& objects) {
-  out << "<tr class=\"" << side.name << "\"><th scope=\"row\">" << side.label << "</th><td class=\"path\">"
-      << Escaped{path} << "</td>";
+  const std::string owner = (head.*side.owner).empty() ? "" : " (" + head.*side.owner + ")";
+  const std::string label = head.are_theirs_and_ours ? Capital(side.word) + owner : std::string(side.label);
+  out << "<tr class=\"" << side.name << "\"><th scope=\"row\">" << Escaped{label}
+      << "</th><td class=\"path\">" << Escaped{path} << "</td>";
   for (const auto kind : {ReportCell::Kind::kAdded, ReportCell::Kind::kChanged, ReportCell::Kind::kRemoved}) {
     const auto count = std::ranges::count_if(
         objects, [&](const ReportObject& object) { return WholeChange(object, side) == kind; });
@@ -225,8 +254,8 @@ void WriteSummary(std::ostream& out, const PageHead& head, const std::vector<Rep
          "scope=\"col\">removed</th></tr></thead><tbody>\n<tr class=\"base\"><th scope=\"row\">Base</th><td "
          "class=\"path\">"
       << Escaped{head.base_path} << "</td><td></td><td></td><td></td></tr>\n";
-  WriteSideSummary(out, kLeft, head.left_path, objects);
-  WriteSideSummary(out, kRight, head.right_path, objects);
+  WriteSideSummary(out, head, kLeft, head.left_path, objects);
+  WriteSideSummary(out, head, kRight, head.right_path, objects);
   out << "</tbody></table>\n<ul class=\"states\" aria-label=\"Changes by state\">\n";
   const size_t pending = CountRows(objects, [](const ReportRow& row) { return row.pending; });
   const std::string word = pending == 1 ? "conflict" : "conflicts";
@@ -236,7 +265,7 @@ void WriteSummary(std::ostream& out, const PageHead& head, const std::vector<Rep
   WriteState(out, "repaired", "repaired",
              CountRows(objects, [](const ReportRow& row) { return row.repaired; }));
   for (const std::string_view state : {"from left", "from right", "same on both", "merged", "not taken"}) {
-    WriteState(out, state,
+    WriteState(out, StateWords(head, state),
                state == "from left"    ? "left"
                : state == "from right" ? "right"
                                        : "",
@@ -246,11 +275,12 @@ void WriteSummary(std::ostream& out, const PageHead& head, const std::vector<Rep
 }
 
 // Hidden until the script has made the controls work.
-void WriteFilters(std::ostream& out, size_t object_count) {
+void WriteFilters(std::ostream& out, const PageHead& head, size_t object_count) {
   out << "<form id=\"filters\" hidden>\n<label>Side <select id=\"side\"><option "
          "value=\"all\">all</option><option "
-         "value=\"left\">left</option><option value=\"right\">right</option><option "
-         "value=\"both\">both</option></select></label>\n<fieldset><legend>Only</legend>";
+         "value=\"left\">"
+      << StateWords(head, kLeft.name) << "</option><option value=\"right\">" << StateWords(head, kRight.name)
+      << "</option><option value=\"both\">both</option></select></label>\n<fieldset><legend>Only</legend>";
   for (const Kind& kind : kKinds) {
     out << "<label class=\"" << kind.name << "\"><input type=\"checkbox\" name=\"kind\" value=\"" << kind.name
         << "\"> " << kind.label << "</label>";
@@ -279,9 +309,9 @@ void WritePage(std::ostream& out, const PageHead& head, const std::vector<Report
   }
   WriteSummary(out, head, objects);
   out << "</header>\n";
-  if (!objects.empty()) WriteFilters(out, objects.size());
-  out << "<main>\n";
-  for (const ReportObject& object : objects) WriteObject(out, object, head.shows_committed);
+  if (!objects.empty()) WriteFilters(out, head, objects.size());
+  out << (head.are_theirs_and_ours ? "<main class=\"named\">\n" : "<main>\n");
+  for (const ReportObject& object : objects) WriteObject(out, head, object);
   if (objects.empty()) {
     out << "<p class=\"empty\">Nothing changed.</p>\n";
   } else {

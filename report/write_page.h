@@ -16,6 +16,10 @@ struct PageHead {
   std::string error;
   /// Whether it is shown what was committed in the end.
   bool shows_committed = false;
+  /// Whether the sides are called theirs and ours, and not left and right; who is behind them may be known.
+  bool are_theirs_and_ours = false;
+  std::string theirs_name = {};
+  std::string ours_name = {};
 };
 
 /// Writes one HTML page that needs no other file and no network. Texts may come from strangers: none of them

@@ -283,7 +283,7 @@ git checkout -q doors && git branch a-namesake all
 check "a rebase stops" stops git rebase -q all
 check "it says whose is whose" says \
   "CONFLICT $file: Lamp > Light > m_Intensity: was 2, theirs (\"Work on lights\" of doors, which is rebased) 4, ours (all, its new base) 9"
-check "so does the page" grep -qF 'right (ours): all, its new base' "$(vexel-merge-git report)"
+check "so does the page" grep -qF 'Ours (all, its new base)' "$(vexel-merge-git report)"
 git add "$file" 2>/dev/null
 check "it doesn't go on undecided" stops git rebase --continue
 git config rerere.enabled true

@@ -146,6 +146,8 @@ def check_going_on():
         run("git", "checkout", "-q", "--ours", "notes.txt")
         run("git", "add", "notes.txt")
         process, page = opened("resolve", "--web")
+        if command == "cherry-pick":
+            expect("the picked commit's subject", page.state()["names"]["theirs"], '"theirs"')
         expect("conflicts of files not yet read", [file["pending"] for file in page.state()["files"]], [1, 1])
         page.take("theirs")
         page.save()

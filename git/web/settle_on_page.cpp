@@ -17,6 +17,7 @@
 #include "git/resolve_arguments.h"
 #include "git/resolving.h"
 #include "git/shown_text.h"
+#include "git/side_people.h"
 #include "git/web/next_steps.h"
 #include "git/web/page_options.h"
 #include "git/work_files.h"
@@ -50,28 +51,9 @@ void OrThrow(Settle settle) {
   std::cerr << said << std::flush;
 }
 
-// Who is behind a side, as far as git tells, such as "Ann, feature/lights".
-std::string WithAuthors(const std::string& from, const std::string& to, const std::string& asset,
-                        const std::string& name) {
-  constexpr size_t kMostAuthors = 2;
-  const std::vector<std::string> authors = Authors(from + ".." + to, {asset});
-  std::string text;
-  for (size_t i = 0; i < std::min(authors.size(), kMostAuthors); ++i) text += authors[i] + ", ";
-  if (authors.size() > kMostAuthors) text += "..., ";
-  return text + name;
-}
-
-SideNames NamesFor(const Repository& repository, const std::string& asset) {
-  SideNames names = FindSideNames(repository);
-  if (names.ours.empty()) names.ours = Line(GitQuietly({"symbolic-ref", "--quiet", "--short", "HEAD"}));
-  if (!IsFile(repository.Path("MERGE_HEAD"))) return names;
-  return {WithAuthors("HEAD", "MERGE_HEAD", asset, names.theirs),
-          WithAuthors("MERGE_HEAD", "HEAD", asset, names.ours)};
-}
-
 ViewFile PageFile(const AssetVersions& versions, const MergeSettings& settings,
                   const Repository& repository) {
-  const SideNames names = NamesFor(repository, versions.asset);
+  const SideNames names = WithPeople(FindSideNames(repository), repository, versions.asset);
   ViewFile file = {versions.asset, versions.base, versions.left, versions.right};
   file.safe = settings.is_safe;
   file.theirs_name = names.theirs;

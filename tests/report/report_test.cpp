@@ -130,6 +130,16 @@ TEST(Report, ShowsWhatEachSideDidAndNothingOfAFileAsMarkup) {
   EXPECT_THAT(Row(page, 24, "Transform.m_Father"), HasSubstr("|none|Pier|unchanged|Pier|from left|"));
 }
 
+TEST(Report, CallsTheSidesByTheirNames) {
+  const auto body = [](const std::string& value) { return Object(114, 1, "MonoBehaviour", "t: " + value); };
+  const std::string page =
+      PageOf(body("[a, c]"), body("[c, a]"), body("[a, c, d]"), {"--theirs", "Ann, <wide>"});
+  EXPECT_THAT(page, AllOf(HasSubstr("<th class=\"left\">Ann, &lt;wide&gt;<small>theirs</small></th>"),
+                          HasSubstr("<th class=\"right\">Ours</th>"), Not(HasSubstr(">Left"))));
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.t"),
+              AllOf(HasSubstr("Ann, &lt;wide&gt;&#39;s new order was not taken"), HasSubstr("|from ours|")));
+}
+
 TEST(Report, ShowsEveryChangeAtItsOwnPlace) {
   const auto body = [](const std::string& fields) { return Object(114, 1, "MonoBehaviour", fields); };
   const auto list = [&](const std::string& text) { return body("m_Things: [{fileID: 2}, " + text + "]"); };
