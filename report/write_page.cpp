@@ -276,7 +276,7 @@ void WriteSummary(std::ostream& out, const PageHead& head, const std::vector<Rep
 
 // Hidden until the script has made the controls work.
 void WriteFilters(std::ostream& out, const PageHead& head, size_t object_count) {
-  out << "<form id=\"filters\" hidden>\n<label>Side <select id=\"side\"><option "
+  out << "<form id=\"filters\" aria-label=\"Filters\" hidden>\n<label>Side <select id=\"side\"><option "
          "value=\"all\">all</option><option "
          "value=\"left\">"
       << StateWords(head, kLeft.name) << "</option><option value=\"right\">" << StateWords(head, kRight.name)
