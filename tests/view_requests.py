@@ -113,6 +113,8 @@ def a_name_changes_wherever_it_is_shown():
     _, delta = view.choose(**{"10.GameObject.m_Name": "theirs"})
     expect("what other cards call it", rows(delta, "changed")["31.MonoBehaviour.targets"]["result"]["shown"],
            "+ Big Crane\n+ Hook")
+    view.post("give-up")
+    view.end()
 
 
 def a_pattern_can_be_taken_back():
