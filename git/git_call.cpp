@@ -10,12 +10,22 @@
 
 namespace vexel_yaml {
 
+namespace {
+
+constexpr int kNotRun = 127;
+
+}  // namespace
+
 ProgramCall GitCall(std::vector<std::string> arguments) {
   arguments.insert(arguments.begin(), "git");
   return {.arguments = std::move(arguments)};
 }
 
-ProgramResult Git(std::vector<std::string> arguments) { return RunProgram(GitCall(std::move(arguments))); }
+ProgramResult Git(std::vector<std::string> arguments) {
+  ProgramResult result = RunProgram(GitCall(std::move(arguments)));
+  if (result.status == kNotRun) Complain("git cannot be run, or its answer not be read");
+  return result;
+}
 
 ProgramResult GitQuietly(std::vector<std::string> arguments) {
   ProgramCall call = GitCall(std::move(arguments));
@@ -94,8 +104,7 @@ ProgramCall HashCall(const std::string& path, std::string text) {
 }
 
 CommandError Refusal(const ProgramResult& result) {
-  return result.status == 127 ? CommandError("git cannot be run, or its answer not be read")
-                              : CommandError("", kGitRefused);
+  return CommandError("", result.status == kNotRun ? 1 : kGitRefused);
 }
 
 std::string HashIn(const ProgramResult& result) { return result.status == 0 ? Line(result) : std::string(); }

@@ -10,7 +10,7 @@
 
 namespace vexel_yaml {
 
-/// Runs git, and returns what it prints; its errors are shown.
+/// Runs git, and returns what it prints; its errors are shown, also that it can't be run.
 ProgramResult Git(std::vector<std::string> arguments);
 
 /// The same without its errors.
@@ -46,7 +46,7 @@ ProgramCall HashCall(const std::string& path, std::string text);
 /// What that has printed; empty where it has failed.
 std::string HashIn(const ProgramResult& result);
 
-/// What ends a command for which git has failed, and has said why, or could not be asked at all.
+/// What ends a command for which `Git` has failed, which has been said.
 CommandError Refusal(const ProgramResult& result);
 
 /// The variable that names another index.
