@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <unordered_map>
+#include <unordered_set>
 
 #include "rules/element_keys.h"
 #include "scene/element_ids.h"
@@ -19,36 +20,54 @@ struct NumberedLists {
   Ids left;
   Ids right;
   size_t id_count = 0;
+  // What refers to nothing. An empty slot is known by its place alone, so each has a number of its own.
+  std::unordered_set<uint32_t> empty = {};
 };
 
-// False where an element has no key, or shares it.
-bool NumberByKeys(const ElementKeyReader& reader, const YAMLSequence& list,
-                  std::unordered_map<const YAMLScalar*, uint32_t>& known, Ids& ids) {
-  std::vector<bool> seen;
-  for (const YAMLNode* element : list.GetItems()) {
-    const YAMLScalar* key = reader.Read(element);
-    if (key == nullptr) return false;
-    const uint32_t id = known.emplace(key, static_cast<uint32_t>(known.size())).first->second;
-    if (seen.size() <= id) seen.resize(known.size());
-    if (seen[id]) return false;
-    seen[id] = true;
-    ids.push_back(id);
+class KeyNumbers {
+ public:
+  KeyNumbers(const std::vector<FieldPath>& key_paths, bool has_slots, NumberedLists& lists)
+      : reader_(key_paths), has_slots_(has_slots), lists_(lists) {}
+
+  // False where an element has no key, or shares it.
+  bool Number(const YAMLSequence& list, Ids& ids) {
+    std::unordered_set<const YAMLScalar*> seen;
+    for (const YAMLNode* element : list.GetItems()) {
+      const YAMLScalar* key = reader_.Read(element);
+      if (key == nullptr || !seen.insert(key).second) return false;
+      if (has_slots_ && key == YAMLScalar::zero) {
+        ids.push_back(static_cast<uint32_t>(lists_.id_count++));
+        lists_.empty.insert(ids.back());
+        continue;
+      }
+      const auto [known, is_new] = known_.emplace(key, static_cast<uint32_t>(lists_.id_count));
+      if (is_new) ++lists_.id_count;
+      ids.push_back(known->second);
+    }
+    return true;
   }
-  return true;
+
+ private:
+  const ElementKeyReader reader_;
+  const bool has_slots_;
+  NumberedLists& lists_;
+  std::unordered_map<const YAMLScalar*, uint32_t> known_;
+};
+
+// Whether what one side put in the place of an element may be taken for its slot.
+bool HasSlots(const std::vector<FieldPath>& key_paths) {
+  return key_paths.empty() || &key_paths == &YAMLSequenceRemapper::defaultPath;
 }
 
-std::optional<NumberedLists> NumberByKeys(const FieldPath& path, const YAMLSequence& base,
+std::optional<NumberedLists> NumberByKeys(const std::vector<FieldPath>& key_paths, const YAMLSequence& base,
                                           const YAMLSequence& left, const YAMLSequence& right) {
-  const std::vector<FieldPath>& key_paths = YAMLSequenceRemapper::ChooseKeyPaths(path);
   if (key_paths.empty()) return std::nullopt;
-  const ElementKeyReader reader(key_paths);
   NumberedLists lists;
-  std::unordered_map<const YAMLScalar*, uint32_t> known;
-  if (!NumberByKeys(reader, base, known, lists.base) || !NumberByKeys(reader, left, known, lists.left) ||
-      !NumberByKeys(reader, right, known, lists.right)) {
+  KeyNumbers numbers(key_paths, HasSlots(key_paths), lists);
+  if (!numbers.Number(base, lists.base) || !numbers.Number(left, lists.left) ||
+      !numbers.Number(right, lists.right)) {
     return std::nullopt;
   }
-  lists.id_count = known.size();
   return lists;
 }
 
@@ -91,6 +110,8 @@ class Aligner {
     if (are_unique) {
       MatchById(left, left_);
       MatchById(right, right_);
+      MatchEmpty(lists_.left, left_);
+      MatchEmpty(lists_.right, right_);
     } else if (!MatchBetweenAnchors(base, left, right)) {
       return std::nullopt;
     }
@@ -107,6 +128,25 @@ class Aligner {
       const uint32_t partner = side.index[lists_.base[i]];
       if (partner != kNoIndex) match.Pair(i, partner);
     }
+  }
+
+  // An empty slot among others that came and went is still the same where their number tells no places.
+  void MatchEmpty(const Ids& ids, SideMatch& match) const {
+    const auto is_empty = [this](uint32_t id) { return lists_.empty.contains(id); };
+    const auto in_base = std::ranges::find_if(lists_.base, is_empty),
+               in_side = std::ranges::find_if(ids, is_empty);
+    if (in_base == lists_.base.end() || in_side == ids.end()) return;
+    const auto before = static_cast<uint32_t>(in_base - lists_.base.begin());
+    const auto after = static_cast<uint32_t>(in_side - ids.begin());
+    const Place place = match.Places()[after];
+    if (place.previous >= before || place.next <= before) return;
+    uint32_t begin = after, end = after + 1;
+    while (begin > 0 && match.ToBase(begin - 1) == kNoIndex) --begin;
+    while (end < ids.size() && match.ToBase(end) == kNoIndex) ++end;
+    uint32_t first = before, last = before + 1;
+    while (first > 0 && match.ToSide(first - 1) == kNoIndex) --first;
+    while (last < lists_.base.size() && match.ToSide(last) == kNoIndex) ++last;
+    if (end - begin != last - first) match.Pair(before, after);
   }
 
   // Whether both sides added one element, but not in the same place: as slots these are two.
@@ -202,7 +242,8 @@ class Aligner {
     for (uint32_t i = 0; i < lists_.base.size(); ++i) {
       const uint32_t in_left = left_.ToSide(i), in_right = right_.ToSide(i);
       const auto is_other = [&](const Ids& ids, uint32_t index) {
-        return has_keys_ && index != kNoIndex && ids[index] != lists_.base[i];
+        if (!has_keys_ || index == kNoIndex || ids[index] == lists_.base[i]) return false;
+        return !lists_.empty.contains(ids[index]) || !lists_.empty.contains(lists_.base[i]);
       };
       result.elements.push_back(
           {i, in_left, in_right, is_other(lists_.left, in_left), is_other(lists_.right, in_right)});
@@ -232,11 +273,11 @@ class Aligner {
 
 std::optional<ListAlignment> AlignLists(const FieldPath& path, const YAMLSequence& base,
                                         const YAMLSequence& left, const YAMLSequence& right) {
-  std::optional<NumberedLists> by_keys = NumberByKeys(path, base, left, right);
+  const std::vector<FieldPath>& key_paths = YAMLSequenceRemapper::ChooseKeyPaths(path);
+  std::optional<NumberedLists> by_keys = NumberByKeys(key_paths, base, left, right);
   const bool has_keys = by_keys.has_value();
-  const bool has_slots =
-      !has_keys || &YAMLSequenceRemapper::ChooseKeyPaths(path) == &YAMLSequenceRemapper::defaultPath;
-  return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(base, left, right), has_keys, has_slots)
+  return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(base, left, right), has_keys,
+                 !has_keys || HasSlots(key_paths))
       .Align();
 }
 

@@ -1,9 +1,9 @@
-#include <algorithm>
 #include <string>
 
 #include "rules/path_step.h"
 #include "scene/list_alignment.h"
 #include "scene/merge_order.h"
+#include "scene/row_of_slots.h"
 #include "scene/value_settler.h"
 #include "yaml/yaml_alloc.h"
 
@@ -36,7 +36,7 @@ class ListMerge {
             const ListAlignment& alignment, ValueSettler& settler)
       : base_(base), left_(left), right_(right), alignment_(alignment), settler_(settler) {}
 
-  OwnedNode Merge() {
+  OwnedNodePtr<YAMLSequence> Merge() {
     std::vector<OwnedNode> merged;
     std::unordered_set<uint32_t> members;
     for (uint32_t i = 0; i < alignment_.elements.size(); ++i) {
@@ -93,31 +93,9 @@ class ListMerge {
       if (element.right != kNoIndex) orders.right[element.right] = i;
     }
     MergedOrder<uint32_t> merged = MergeOrder(orders, members);
-    const bool is_conflict = merged.is_conflict ||
-                             Moves(&AlignedElement::left, &AlignedElement::is_replaced_by_right) ||
-                             Moves(&AlignedElement::right, &AlignedElement::is_replaced_by_left);
-    if (!is_conflict || IsSet(settler_.GetPath())) return std::move(merged.order);
+    if (!merged.is_conflict || IsSet(settler_.GetPath())) return std::move(merged.order);
     const MergeResolve side = settler_.Decide(ConflictType::kBothChange, {&base_, &left_, &right_});
     return MergeOrder(orders, members, side).order;
-  }
-
-  // Whether a side moved an element, or others past it, in whose place the other side put something: in a row
-  // of slots that is another slot.
-  bool Moves(uint32_t AlignedElement::*side, bool AlignedElement::*is_replaced_by_other) const {
-    std::vector<const AlignedElement*> kept;
-    for (const AlignedElement& element : alignment_.elements) {
-      if (element.base != kNoIndex && element.*side != kNoIndex) kept.push_back(&element);
-    }
-    std::vector<uint32_t> first_behind(kept.size() + 1, kNoIndex);
-    for (size_t i = kept.size(); i-- > 0;) first_behind[i] = std::min(first_behind[i + 1], kept[i]->*side);
-    uint32_t last_before = 0;
-    for (size_t i = 0; i < kept.size(); ++i) {
-      const uint32_t index = kept[i]->*side;
-      const bool is_moved = index < last_before || index > first_behind[i + 1];
-      if (is_moved && kept[i]->*is_replaced_by_other) return true;
-      last_before = std::max(last_before, index);
-    }
-    return false;
   }
 
   const YAMLSequence& base_;
@@ -131,9 +109,16 @@ class ListMerge {
 
 OwnedNode MergeLists(const YAMLSequence& base, const YAMLSequence& left, const YAMLSequence& right,
                      ValueSettler& settler) {
-  if (YAMLSequenceRemapper::IsMergeablePath(settler.GetPath())) {
-    const auto alignment = AlignLists(settler.GetPath(), base, left, right);
-    if (alignment) return ListMerge(base, left, right, *alignment, settler).Merge();
+  const FieldPath& path = settler.GetPath();
+  if (YAMLSequenceRemapper::IsMergeablePath(path)) {
+    const auto alignment = AlignLists(path, base, left, right);
+    if (alignment && !FillsWhatMoved(*alignment)) {
+      const size_t conflicts = settler.CountConflicts();
+      OwnedNodePtr<YAMLSequence> merged = ListMerge(base, left, right, *alignment, settler).Merge();
+      // Somebody looks at it anyway.
+      if (settler.CountConflicts() > conflicts) return merged;
+      if (IsSet(path) || IsMergeOfSlots(base, left, right, *merged, settler)) return merged;
+    }
   }
   const ThreeValues lists = {&base, &left, &right};
   return CopyOf(lists.Get(settler.Decide(ConflictType::kBothChange, lists)));

@@ -48,6 +48,9 @@ class ValueSettler {
   /// Records a conflict at the path; returns the side that is to stand there: base, left or right.
   MergeResolve Decide(ConflictType type, const ThreeValues& values);
 
+  /// How many conflicts were found up to now, settled ones included.
+  size_t CountConflicts() const { return resolver_.GetRecords().size(); }
+
   /// Whether two nodes at the path differ by no edit.
   bool AreSame(const YAMLNode* a, const YAMLNode* b);
 
