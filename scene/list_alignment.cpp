@@ -130,7 +130,8 @@ class Aligner {
     }
   }
 
-  // An empty slot among others that came and went is still the same where their number tells no places.
+  // An empty slot among others that came and went is still the same where it kept its place among them, or
+  // their number tells no places.
   void MatchEmpty(const Ids& ids, SideMatch& match) const {
     const auto is_empty = [this](uint32_t id) { return lists_.empty.contains(id); };
     const auto in_base = std::ranges::find_if(lists_.base, is_empty),
@@ -146,7 +147,7 @@ class Aligner {
     uint32_t first = before, last = before + 1;
     while (first > 0 && match.ToSide(first - 1) == kNoIndex) --first;
     while (last < lists_.base.size() && match.ToSide(last) == kNoIndex) ++last;
-    if (end - begin != last - first) match.Pair(before, after);
+    if (end - begin != last - first || after - begin == before - first) match.Pair(before, after);
   }
 
   // Whether both sides added one element, but not in the same place: as slots these are two.

@@ -107,6 +107,9 @@ TEST(SafeMerge, ASlotStaysASlotWhateverBecomesOfADeletedThing) {
               ::testing::Each(list("{fileID: 5}", other)));
   EXPECT_THAT(FieldOf(list(lamp, other), list(none, other), list("{fileID: 5}", other)),
               ::testing::Each(list("{fileID: 5}", other)));
+  // What left put in beside it doesn't keep the lamp away.
+  EXPECT_EQ(FieldOf("[" + lamp + ", " + none + "]", "[{fileID: 5}]", "[" + lamp + ", " + none + "]")[2],
+            list(lamp, "{fileID: 5}"));
   // Left filled the slot as well: only as long as the lamp stays is that a conflict.
   const std::string base = Script("  f: [{fileID: 5}]\n") + Lamp(10), right = Script("  f: [{fileID: 10}]\n");
   const SafelyMerged merged(base, Script("  f: [{fileID: 0}]\n"), right + Lamp(10), "left 10\n");
