@@ -116,7 +116,8 @@ def left_behind(base, side, other, merged):
     def clears(before, after, target):
         if isinstance(before, list) and isinstance(after, list):
             # Among equal elements it can't be told which one went.
-            is_clear = len(after) < len(before) and all(before.count(item) == 1 for item in before)
+            is_clear = len(after) < len(before) and all(
+                items.count(item) == 1 for items in (before, after) for item in items)
             return is_clear and {"fileID": target} in before and {"fileID": target} not in after
         if target_of(before) == target:
             return after == NONE
