@@ -112,7 +112,8 @@ class PageMaker {
     // The last line is about the page, others are about the merge.
     const Paths lines = Pieces(result.output, '\n');
     const std::string folder = PagesFolder();
-    if (target.starts_with(folder)) pages_.push_back({asset, target.substr(folder.size()), lines.back()});
+    if (target.starts_with(folder))
+      pages_.push_back({asset, target.substr(folder.size()), lines.empty() ? std::string() : lines.back()});
     return true;
   }
 
