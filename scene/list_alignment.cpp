@@ -20,7 +20,9 @@ struct NumberedLists {
   Ids left;
   Ids right;
   size_t id_count = 0;
-  // What refers to nothing. An empty slot is known by its place alone, so each has a number of its own.
+  // Whether all elements are references, or have the file ID of one.
+  bool are_references = false;
+  // What refers to nothing. An empty slot is known by its place alone: with keys, each has its own number.
   std::unordered_set<uint32_t> empty = {};
 };
 
@@ -68,13 +70,27 @@ std::optional<NumberedLists> NumberByKeys(const std::vector<FieldPath>& key_path
       !numbers.Number(right, lists.right)) {
     return std::nullopt;
   }
+  lists.are_references = HasSlots(key_paths);
   return lists;
 }
 
-NumberedLists NumberByContent(const YAMLSequence& base, const YAMLSequence& left, const YAMLSequence& right) {
+NumberedLists NumberByContent(const std::vector<FieldPath>& key_paths, const YAMLSequence& base,
+                              const YAMLSequence& left, const YAMLSequence& right) {
   ElementIds ids;
   NumberedLists lists = {ids.Of(base), ids.Of(left), ids.Of(right)};
   lists.id_count = ids.Count();
+  lists.are_references = !key_paths.empty() && HasSlots(key_paths);
+  const ElementKeyReader reader(key_paths);
+  const auto look_at = [&](const YAMLSequence& list, const Ids& numbers) {
+    for (size_t i = 0; lists.are_references && i < numbers.size(); ++i) {
+      const YAMLScalar* key = reader.Read(list.GetItems()[i]);
+      if (key == nullptr) lists.are_references = false;
+      if (key == YAMLScalar::zero) lists.empty.insert(numbers[i]);
+    }
+  };
+  look_at(base, lists.base);
+  look_at(left, lists.left);
+  look_at(right, lists.right);
   return lists;
 }
 
@@ -116,7 +132,8 @@ class Aligner {
       return std::nullopt;
     }
     if (has_slots_ && !MatchByPlace(left_, lists_.left, right_, lists_.right)) return std::nullopt;
-    if (has_keys_ && has_slots_ && ArePutElsewhere(base, right)) return std::nullopt;
+    if (lists_.are_references && ArePutElsewhere(base, left, right)) return std::nullopt;
+    if (has_keys_ && IsEmptyMoved()) return std::nullopt;
     if (!are_unique && (HasMoves(lists_.left, left_) || HasMoves(lists_.right, right_))) return std::nullopt;
     if (!PairAdditions()) return std::nullopt;
     return Result();
@@ -150,14 +167,30 @@ class Aligner {
     if (end - begin != last - first || after - begin == before - first) match.Pair(before, after);
   }
 
-  // Whether both sides added one element, but not in the same place: as slots these are two.
-  bool ArePutElsewhere(const Occurrences& base, const Occurrences& right) const {
+  // Whether the empty slot of base went on both sides, and came elsewhere on one of them.
+  bool IsEmptyMoved() const {
+    const auto comes_anew = [this](const Ids& ids, const SideMatch& match) {
+      for (uint32_t i = 0; i < ids.size(); ++i) {
+        if (lists_.empty.contains(ids[i]) && match.ToBase(i) == kNoIndex) return true;
+      }
+      return false;
+    };
+    for (uint32_t i = 0; i < lists_.base.size(); ++i) {
+      if (!lists_.empty.contains(lists_.base[i])) continue;
+      const bool is_gone = left_.ToSide(i) == kNoIndex && right_.ToSide(i) == kNoIndex;
+      if (is_gone && (comes_anew(lists_.left, left_) || comes_anew(lists_.right, right_))) return true;
+    }
+    return false;
+  }
+
+  // Whether both sides added one reference, but not in the same place: as slots these are two.
+  bool ArePutElsewhere(const Occurrences& base, const Occurrences& left, const Occurrences& right) const {
     const std::vector<Place> left_places = left_.Places(), right_places = right_.Places();
     for (uint32_t i = 0; i < lists_.left.size(); ++i) {
-      const uint32_t partner = right.index[lists_.left[i]];
-      if (partner == kNoIndex || base.index[lists_.left[i]] != kNoIndex) continue;
+      const uint32_t id = lists_.left[i], partner = right.index[id];
+      if (partner == kNoIndex || base.count[id] != 0 || lists_.empty.contains(id)) continue;
       const uint32_t slot = left_.ToBase(i);
-      if (slot != right_.ToBase(partner)) return true;
+      if (left.count[id] > 1 || right.count[id] > 1 || slot != right_.ToBase(partner)) return true;
       if (slot == kNoIndex && !AreSame(left_places[i], right_places[partner])) return true;
     }
     return false;
@@ -277,7 +310,7 @@ std::optional<ListAlignment> AlignLists(const FieldPath& path, const YAMLSequenc
   const std::vector<FieldPath>& key_paths = YAMLSequenceRemapper::ChooseKeyPaths(path);
   std::optional<NumberedLists> by_keys = NumberByKeys(key_paths, base, left, right);
   const bool has_keys = by_keys.has_value();
-  return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(base, left, right), has_keys,
+  return Aligner(has_keys ? std::move(*by_keys) : NumberByContent(key_paths, base, left, right), has_keys,
                  !has_keys || HasSlots(key_paths))
       .Align();
 }
