@@ -1,5 +1,6 @@
 #include "git/mergetool.h"
 
+#include <algorithm>
 #include <optional>
 
 #include "git/conflict_records.h"
@@ -25,6 +26,14 @@ void KeepEdited(const std::string& asset, std::string_view text, const Repositor
     if (!MakeCopy(copy, text)) throw CommandError("cannot keep the edited " + asset);
   }
   Say("The edited file is kept as " + ShownRecord(copy));
+}
+
+// What was chosen now stands in the record alone, which the next try reads: git puts the old file back.
+void LeaveOpen(const RecordEntry& before, RecordEntry& entry) {
+  for (RecordedConflict& conflict : entry.conflicts) {
+    const auto known = std::ranges::find(before.conflicts, conflict.place, &RecordedConflict::place);
+    conflict.is_settled &= known != before.conflicts.end() && known->is_settled;
+  }
 }
 
 // Git has one tool for all files, and this is the one where nobody has set another.
@@ -66,8 +75,10 @@ int SettleForMergetool(const AssetVersions& versions, const Choice& choice) {
   const std::string hash = is_merged ? HashOfAsset(asset) : records.Entry(asset).hash;
   // Git keeps the old file where something is left.
   const std::string merged = is_merged ? settlement.merge->GetText() : records.MergedText(asset);
+  RecordEntry entry = settlement.entry;
+  if (!is_merged) LeaveOpen(records.Entry(asset), entry);
   const std::string record = records.Leave(
-      settlement.entry, *settlement.merge, merged, [&] { return hash; }, settings);
+      entry, *settlement.merge, merged, [&] { return hash; }, settings);
   if (record.empty()) Complain("cannot write the record of " + asset);
   if (!is_merged) Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset);
   // Git itself goes on to the next file.

@@ -47,7 +47,7 @@ std::string IndexPage(const std::vector<IndexedPage>& pages) {
       "<meta name=\"color-scheme\" content=\"light dark\">\n<title>" +
       title + "</title>\n<style>" + std::string(kPageStyle) + "</style>\n</head>\n<body>\n<header><h1>" +
       title +
-      "</h1></header>\n<main>\n<table class=\"index\"><caption>Objects that were touched, and open "
+      "</h1></header>\n<main>\n<table class=\"index\"><caption>Objects that were touched, and "
       "conflicts</caption>\n<thead><tr><th scope=\"col\">Scene</th>";
   for (const char* column : {"added", "changed", "removed", "conflicts"})
     text += std::string("<th scope=\"col\">") + column + "</th>";

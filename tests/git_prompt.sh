@@ -117,6 +117,17 @@ TERM=xterm terminal "vexel-merge-git resolve -p" <<<q >"$work/out" || :
 check "colours are the rule" grep -qF $'\e[36m  ours    4' "$work/out"
 check "a new commit stops" refuses git commit -q -m undecided >/dev/null 2>&1
 
+# Git puts the file back where its tool leaves something: what was chosen counts only for the next try.
+again
+printf '%s\n' t q q q | NO_COLOR=1 TERM=xterm terminal "env -u DISPLAY -u WAYLAND_DISPLAY git mergetool -y $file" >"$work/out" || :
+check "the merge tool asks" grep -q 'm_Range' "$work/out"
+git checkout -q --theirs Other.vexel && git add Other.vexel
+sed 's/m_Intensity: 1/m_Intensity: 8/; /^--- !v!108 &2/,$s/m_Range: 1/m_Range: 8/' "$file" >"$work/edited" || :
+cp "$work/edited" "$file" && git add "$file"
+check "what it was told isn't in the file" grep -q 'm_Range: 1' "$file"
+check "and doesn't count as settled" refuses git commit -q --no-edit 2>/dev/null
+
+
 # A choice that brings up another conflict: each side has moved one object, and both at once are a circle.
 # objects PARENT...: of objects 1 to 3, 0 for none.
 objects() {
