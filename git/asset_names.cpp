@@ -21,9 +21,8 @@ bool IsGuid(const std::string& text) {
 }  // namespace
 
 AssetNames FindAssetNames(const std::set<std::string>& guids) {
-  ProgramCall call = GitCall(
+  ProgramCall call = QuietCall(
       {"grep", "-z", "-o", "-G", "-I", "--full-name", "--no-color", "--no-line-number", "--no-column"});
-  call.errors = ProgramCall::Errors::kDropped;
   std::set<std::string> patterns;
   for (const std::string& guid : guids) {
     if (IsGuid(guid)) patterns.insert("^" + std::string(kBefore) + guid);

@@ -65,7 +65,7 @@ Paths AssetsBelow(const Paths& paths) {
   ProgramCall call = GitCall({"--literal-pathspecs", "ls-files", "-z", "--full-name", "--cached", "--others",
                               "--exclude-standard", "--error-unmatch", "--"});
   call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
-  const ProgramResult files = RunProgram(call);
+  const ProgramResult files = Ask(call);
   // Git has said which one isn't there.
   if (files.status != 0) throw CommandError("");
   const Paths found = Pieces(files.output, '\0');
@@ -107,7 +107,7 @@ class Check {
     if (parents.size() == 2) CheckMerge(name, parents, commit);
     if (conflicts_only_) return;
     const Paths changed = parents.empty()
-                              ? Pieces(Git({"ls-tree", "-r", "-z", "--name-only", commit}).output, '\0')
+                              ? Pieces(Answer(GitCall({"ls-tree", "-r", "-z", "--name-only", commit})), '\0')
                               : ChangedPaths(parents.front(), commit, {});
     for (const std::string& asset : OursAmong(changed)) {
       Paths before;
@@ -150,7 +150,7 @@ class Check {
 
   // Those that the commit itself names, which a shallow clone may lack.
   static size_t CountParents(const std::string& commit) {
-    const Paths lines = Pieces(Git({"cat-file", "commit", commit}).output, '\n');
+    const Paths lines = Pieces(Answer(GitCall({"cat-file", "commit", commit})), '\n');
     return static_cast<size_t>(
         std::count_if(lines.begin(), std::ranges::find(lines, ""),
                       [](const std::string& line) { return line.starts_with("parent "); }));

@@ -22,6 +22,7 @@
 #include "git/shown_text.h"
 #include "git/stage_files.h"
 #include "git/work_files.h"
+#include "platform/file_error.h"
 #include "platform/read_whole_file.h"
 
 namespace vexel_yaml {
@@ -35,8 +36,10 @@ constexpr std::string_view kMergedSuffix = ".merged";
 // Whether it still looks like one, also after somebody has taken one of the two lines out.
 bool IsRecord(const std::string& path) {
   if (!IsFile(path)) return false;
-  // What can't be read is somebody else's.
-  return std::ranges::any_of(Pieces(ReadWholeFile(path).value_or(""), '\n'), [](const std::string& line) {
+  const std::optional<std::string> text = ReadWholeFile(path);
+  // What may not be read is somebody else's.
+  if (!text && errno != EACCES) throw FileError(FileError::Step::kReading, path, errno);
+  return std::ranges::any_of(Pieces(text.value_or(""), '\n'), [](const std::string& line) {
     return line.starts_with("# What is in conflict in ") || line.starts_with(kDecidedHeading);
   });
 }
@@ -46,8 +49,7 @@ bool IsForUs(const std::string& path) {
   ProgramCall call = GitCall({"ls-files", "-z", "--", ":(literal)" + path});
   // A command of the user may be at work on another index.
   call.without = {kIndexVariable};
-  const ProgramResult tracked = RunProgram(call);
-  return tracked.status == 0 && tracked.output.empty();
+  return Answer(call).empty();
 }
 
 std::string WithName(const std::string& side, const std::string& name) {
@@ -115,16 +117,15 @@ void ConflictRecords::MarkSettledByHand(RecordEntry& entry, const std::string& t
 
 std::vector<RecordEntry> ConflictRecords::Entries() const {
   std::vector<RecordEntry> entries;
-  std::error_code error;
-  for (const auto& file : std::filesystem::directory_iterator(folder_, error)) {
-    if (file.path().extension() != kEntrySuffix) continue;
-    entries.push_back(ReadEntry(file.path().string()));
+  for (const std::filesystem::path file : PathsIn(folder_)) {
+    if (file.extension() != kEntrySuffix) continue;
+    entries.push_back(ReadEntry(file.string()));
     // A crash has left it without its text.
     if (!entries.back().asset.empty()) continue;
     entries.pop_back();
     for (const std::string_view suffix : {kSuffix, kMergedSuffix})
-      unlink(std::filesystem::path(file.path()).replace_extension(suffix).c_str());
-    unlink(file.path().c_str());
+      unlink(std::filesystem::path(file).replace_extension(suffix).c_str());
+    unlink(file.c_str());
   }
   std::ranges::sort(entries, {}, &RecordEntry::asset);
   return entries;
@@ -196,13 +197,14 @@ std::string ConflictRecords::Place(RecordEntry entry, const AssetMerge& merge, s
   if (is_beside) in_use.emplace(repository_, name);
   const bool is_ours = IsFile(places.entry) && IsRecord(places.beside);
   const bool is_free = access(places.beside.c_str(), F_OK) != 0;
-  const bool is_for_us = IsPlain(name) && (!in_use || !in_use->Get());
+  // Asked before anything is written.
+  const bool is_for_us = in_use ? IsPlain(name) && !in_use->Get() : is_ours && IsForUs(name);
   const std::string text = RecordText(entry, merge);
   if (!Remember(places, entry, hash, hooks_folder)) return {};
   if (!PutFile(places.merged, merged) || !PutFile(places.kept, text)) return {};
   if (!is_beside) {
     // Where it stays, it would be read.
-    const bool is_gone = !is_ours || !IsForUs(name) || unlink(places.beside.c_str()) == 0 || errno == ENOENT;
+    const bool is_gone = !is_for_us || unlink(places.beside.c_str()) == 0 || errno == ENOENT;
     return is_gone ? places.kept : std::string();
   }
   if ((is_ours || is_free) && is_for_us && MakeFoldersFor(places.beside) && PutFile(places.beside, text)) {
@@ -236,10 +238,9 @@ void ConflictRecords::Remove(const std::string& asset) const {
 
 // With the last record of this work tree: the hooks go, unless another one has a record.
 void ConflictRecords::RemoveHooks() const {
-  std::error_code error;
-  for (const auto& file : std::filesystem::directory_iterator(folder_, error)) {
+  for (const std::string& file : PathsIn(folder_)) {
     // What a killed process has left is no record.
-    if (file.path().filename().string().starts_with(".vexel-")) unlink(file.path().c_str());
+    if (file.substr(file.rfind('/') + 1).starts_with(".vexel-")) unlink(file.c_str());
   }
   if (rmdir(folder_.c_str()) != 0 || HaveAny()) return;
   if (GitQuietly({"config", "--get", "core.hooksPath"}).status != 0) TakeHooksAway(repository_);
@@ -247,11 +248,8 @@ void ConflictRecords::RemoveHooks() const {
 
 bool ConflictRecords::HaveAny() const {
   if (IsFolder(repository_.CommonPath("vexel-merge-records"))) return true;
-  std::error_code error;
-  for (const auto& tree : std::filesystem::directory_iterator(repository_.CommonPath("worktrees"), error)) {
-    if (IsFolder((tree.path() / "vexel-merge-records").string())) return true;
-  }
-  return false;
+  return std::ranges::any_of(PathsIn(repository_.CommonPath("worktrees")),
+                             [](const std::string& tree) { return IsFolder(tree + "/vexel-merge-records"); });
 }
 
 std::string ShownRecord(std::string_view record) {

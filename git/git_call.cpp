@@ -21,17 +21,28 @@ ProgramCall GitCall(std::vector<std::string> arguments) {
   return {.arguments = std::move(arguments)};
 }
 
-ProgramResult Git(std::vector<std::string> arguments) {
-  ProgramResult result = RunProgram(GitCall(std::move(arguments)));
-  if (result.status == kNotRun) Complain("git cannot be run, or its answer not be read");
+ProgramCall QuietCall(std::vector<std::string> arguments) {
+  ProgramCall call = GitCall(std::move(arguments));
+  call.errors = ProgramCall::Errors::kDropped;
+  return call;
+}
+
+ProgramResult Answered(ProgramResult result) {
+  if (result.status == kNotRun) throw CommandError("git cannot be run, or its answer not be read");
   return result;
 }
 
-ProgramResult GitQuietly(std::vector<std::string> arguments) {
-  ProgramCall call = GitCall(std::move(arguments));
-  call.errors = ProgramCall::Errors::kDropped;
-  return RunProgram(call);
+ProgramResult Ask(const ProgramCall& call) { return Answered(RunProgram(call)); }
+
+std::string Answer(const ProgramCall& call) {
+  ProgramResult result = Ask(call);
+  if (result.status != 0) throw Refusal();
+  return std::move(result.output);
 }
+
+ProgramResult Git(std::vector<std::string> arguments) { return Ask(GitCall(std::move(arguments))); }
+
+ProgramResult GitQuietly(std::vector<std::string> arguments) { return Ask(QuietCall(std::move(arguments))); }
 
 std::string Line(const ProgramResult& result) {
   return result.output.ends_with('\n') ? result.output.substr(0, result.output.size() - 1) : result.output;
@@ -52,7 +63,7 @@ std::optional<std::vector<std::string>> UnmergedBelow(const std::vector<std::str
   ProgramCall call = GitCall({"ls-files", "-z", "--unmerged", "--full-name", "--"});
   call.arguments.insert(call.arguments.end(), pathspecs.begin(), pathspecs.end());
   if (!in_users_index) call.without = {kIndexVariable};
-  const ProgramResult result = RunProgram(call);
+  const ProgramResult result = Ask(call);
   if (result.status != 0) return std::nullopt;
   std::vector<std::string> paths;
   for (const std::string& entry : Pieces(result.output, '\0')) {
@@ -69,7 +80,7 @@ std::vector<std::string> OursAmong(const std::vector<std::string>& paths, const 
   ProgramCall call = GitCall({"-C", top, "check-attr", "-z", "--stdin", "merge"});
   call.input.emplace();
   for (const std::string& path : paths) call.input->append(path).push_back('\0');
-  const std::vector<std::string> fields = Pieces(RunProgram(call).output, '\0');
+  const std::vector<std::string> fields = Pieces(Answer(call), '\0');
   std::vector<std::string> ours;
   // Path, attribute and value, three by three.
   for (size_t i = 0; i + 2 < fields.size(); i += 3) {
@@ -80,7 +91,7 @@ std::vector<std::string> OursAmong(const std::vector<std::string>& paths, const 
 
 std::string TopFolder() {
   const ProgramResult result = Git({"rev-parse", "--show-toplevel"});
-  if (result.status != 0) throw Refusal(result);
+  if (result.status != 0) throw Refusal();
   return Line(result);
 }
 
@@ -97,15 +108,12 @@ void GoToTop() {
 }
 
 ProgramCall HashCall(const std::string& path, std::string text) {
-  ProgramCall call = GitCall({"hash-object", "--path=" + path, "--stdin"});
-  call.errors = ProgramCall::Errors::kDropped;
+  ProgramCall call = QuietCall({"hash-object", "--path=" + path, "--stdin"});
   call.input = std::move(text);
   return call;
 }
 
-CommandError Refusal(const ProgramResult& result) {
-  return CommandError("", result.status == kNotRun ? 1 : kGitRefused);
-}
+CommandError Refusal() { return CommandError("", kGitRefused); }
 
 std::string HashIn(const ProgramResult& result) { return result.status == 0 ? Line(result) : std::string(); }
 

@@ -10,14 +10,25 @@
 
 namespace vexel_yaml {
 
-/// Runs git, and returns what it prints; its errors are shown, also that it can't be run.
+/// What git has answered, also by its status. That it can't be run, or its output not be read, is no answer:
+/// then this throws CommandError.
+ProgramResult Answered(ProgramResult result);
+
+/// Runs git, and returns that.
+ProgramResult Ask(const ProgramCall& call);
+
+/// What git prints. Throws CommandError where it fails, since no output would be an answer, too.
+std::string Answer(const ProgramCall& call);
+
+/// `Ask`, with git's errors shown.
 ProgramResult Git(std::vector<std::string> arguments);
 
 /// The same without its errors.
 ProgramResult GitQuietly(std::vector<std::string> arguments);
 
-/// How `Git` would be called.
+/// How `Git` and `GitQuietly` call git.
 ProgramCall GitCall(std::vector<std::string> arguments);
+ProgramCall QuietCall(std::vector<std::string> arguments);
 
 /// What git printed as one line, which may hold line breaks itself.
 std::string Line(const ProgramResult& result);
@@ -46,8 +57,8 @@ ProgramCall HashCall(const std::string& path, std::string text);
 /// What that has printed; empty where it has failed.
 std::string HashIn(const ProgramResult& result);
 
-/// What ends a command for which `Git` has failed, which has been said.
-CommandError Refusal(const ProgramResult& result);
+/// What ends a command for which git has failed, and has said why.
+CommandError Refusal();
 
 /// The variable that names another index.
 inline constexpr char kIndexVariable[] = "GIT_INDEX_FILE";

@@ -38,7 +38,7 @@ std::map<std::string, std::string> BlobsIn(const std::string& output) {
 std::optional<ConflictPaths> PathsInConflict(bool in_users_index) {
   ProgramCall call = GitCall({"ls-files", "-z", "-t", "--unmerged", "--resolve-undo"});
   if (!in_users_index) call.without = {kIndexVariable};
-  const ProgramResult result = RunProgram(call);
+  const ProgramResult result = Ask(call);
   if (result.status != 0) return std::nullopt;
   ConflictPaths paths;
   for (IndexLine& line : IndexLines(result.output)) {
@@ -53,7 +53,7 @@ std::optional<std::map<std::string, std::string>> IndexBlobs(const std::vector<s
   ProgramCall call = GitCall({"--literal-pathspecs", "ls-files", "-z", "--stage", "--"});
   if (paths.size() <= kMostArguments) call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
   if (!in_users_index) call.without = {kIndexVariable};
-  const ProgramResult result = RunProgram(call);
+  const ProgramResult result = Ask(call);
   if (result.status != 0) return std::nullopt;
   return BlobsIn(result.output);
 }
@@ -64,7 +64,7 @@ std::set<std::string> EditedFiles(const std::vector<std::string>& paths) {
       GitCall({"--literal-pathspecs", "diff-files", "--name-only", "-z", "--no-relative", "--"});
   if (paths.size() <= kMostArguments) call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
   call.without = {kIndexVariable};
-  const std::vector<std::string> edited = Pieces(RunProgram(call).output, '\0');
+  const std::vector<std::string> edited = Pieces(Answer(call), '\0');
   return {edited.begin(), edited.end()};
 }
 
@@ -73,10 +73,11 @@ std::map<std::string, std::string> StagedChanges(bool in_users_index) {
                               "--no-relative", "HEAD", "--"});
   call.errors = ProgramCall::Errors::kDropped;
   if (!in_users_index) call.without = {kIndexVariable};
-  const ProgramResult result = RunProgram(call);
+  const ProgramResult result = Ask(call);
   if (result.status != 0) {
     call.arguments = {"git", "ls-files", "-z", "--stage"};
-    return BlobsIn(RunProgram(call).output);
+    call.errors = ProgramCall::Errors::kShown;
+    return BlobsIn(Answer(call));
   }
   std::map<std::string, std::string> blobs;
   const std::vector<std::string> pieces = Pieces(result.output, '\0');

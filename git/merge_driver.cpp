@@ -58,18 +58,17 @@ class DriverRun {
     }
     int status = merge_->Run(settings_);
     if (status > AssetMerge::kFailed && !is_ancestor_) status = DecideAsBefore(status);
+    const bool is_to_confirm = status == AssetMerge::kMerged && !entry_.conflicts.empty() && keeps_records_ &&
+                               !settings_.stages_remembered;
+    const bool is_done = status == AssetMerge::kMerged && !is_to_confirm;
+    // Where that can't be, nothing is merged.
+    if (is_done) RemoveRecord();
     if (status != AssetMerge::kFailed && !PutMerged()) {
       Complain("cannot write the merged " + versions_.asset);
       status = AssetMerge::kFailed;
     }
     if (status == AssetMerge::kFailed) return LeaveUnmerged();
-    const bool is_to_confirm = status == AssetMerge::kMerged && !entry_.conflicts.empty() && keeps_records_ &&
-                               !settings_.stages_remembered;
-    if (status == AssetMerge::kMerged && !is_to_confirm) {
-      RemoveRecord();
-    } else if (!is_ancestor_) {
-      TellConflicts();
-    }
+    if (!is_done && !is_ancestor_) TellConflicts();
     return is_to_confirm ? AssetMerge::kConflicts : status;
   }
 
@@ -101,9 +100,11 @@ class DriverRun {
 
   // Git does what it does without us to files that are none of ours, but bear their names.
   int MergeAsText() {
-    const int status = GitQuietly({"merge-file", "-q", "--marker-size=" + marker_size_, "-L", "ours", "-L",
-                                   "base", "-L", "theirs", versions_.right, versions_.base, versions_.left})
-                           .status;
+    // Its status is the number of conflicts, up to 127.
+    const int status =
+        RunProgram(QuietCall({"merge-file", "-q", "--marker-size=" + marker_size_, "-L", "ours", "-L", "base",
+                              "-L", "theirs", versions_.right, versions_.base, versions_.left}))
+            .status;
     // Git would take a status above 128 for a driver that was killed, and give up.
     if (status > 127) Complain(versions_.asset + " can't be merged, not even as text");
     return status == 0 ? 0 : 1;
@@ -130,7 +131,7 @@ class DriverRun {
     const auto hash = [&] { return HashIn(RunProgram(HashCall(versions_.asset, TextOf(versions_.right)))); };
     try {
       if (records_.LeaveUnmerged(entry, hash, settings_)) return;
-    } catch (const FileError& error) {
+    } catch (const std::runtime_error& error) {
       Complain(error.what());
     }
     Complain("cannot write the record of " + versions_.asset);
@@ -141,7 +142,7 @@ class DriverRun {
     SayConflicts(versions_.asset, entry_.conflicts);
     try {
       if (keeps_records_) LeaveRecord();
-    } catch (const FileError& error) {
+    } catch (const std::runtime_error& error) {
       Complain("cannot write the record of " + versions_.asset + ": " + error.what());
     }
   }

@@ -18,7 +18,8 @@ namespace {
 
 std::map<std::string, std::string> Renamed(const std::string& from, const std::string& to) {
   const std::vector<std::string> fields = Pieces(
-      Git({"diff", "-z", "-M", "--diff-filter=R", "--name-status", "--no-relative", from, to}).output, '\0');
+      Answer(GitCall({"diff", "-z", "-M", "--diff-filter=R", "--name-status", "--no-relative", from, to})),
+      '\0');
   std::map<std::string, std::string> renamed;
   // How much is the same, the old name and the new one, three by three.
   for (size_t i = 0; i + 2 < fields.size(); i += 3) renamed.emplace(fields[i + 2], fields[i + 1]);
@@ -83,7 +84,7 @@ std::vector<std::string> ChangedPaths(const std::string& from, const std::string
   call.arguments.emplace_back("--");
   call.arguments.insert(call.arguments.end(), paths.begin(), paths.end());
   call.with = {"GIT_LITERAL_PATHSPECS=1"};
-  std::vector<std::string> changed = Pieces(RunProgram(call).output, '\0');
+  std::vector<std::string> changed = Pieces(Answer(call), '\0');
   std::ranges::sort(changed);
   return changed;
 }

@@ -22,8 +22,7 @@ std::string HashAt(std::string_view text) {
 }
 
 ProgramCall Quiet(std::vector<std::string> arguments) {
-  ProgramCall call = GitCall(std::move(arguments));
-  call.errors = ProgramCall::Errors::kDropped;
+  ProgramCall call = QuietCall(std::move(arguments));
   // A command of the user may be at work on another index.
   call.without = {kIndexVariable};
   return call;
@@ -60,10 +59,10 @@ NameInUse::NameInUse(const Repository& repository, const std::string& path) {
 bool NameInUse::Get() {
   if (!list_) {
     return std::ranges::any_of(objects_, [](const std::string& object) {
-      return RunProgram(Quiet({"cat-file", "-e", object})).status == 0;
+      return Ask(Quiet({"cat-file", "-e", object})).status == 0;
     });
   }
-  const std::vector<std::string> types = Pieces(list_->Wait().output, '\n');
+  const std::vector<std::string> types = Pieces(Answered(list_->Wait()).output, '\n');
   // A file of the last commit that is no longer in the index is none of the repository's.
   if (!types.empty() && types.front() == "tree") return true;
   return std::any_of(types.begin() + (types.empty() ? 0 : 1), types.end(), [](const std::string& type) {

@@ -58,7 +58,7 @@ Paths StagedConflicts(const Paths& pathspecs) {
   ProgramCall call = GitCall({"ls-files", "-z", "--resolve-undo", "--full-name", "--"});
   call.arguments.insert(call.arguments.end(), pathspecs.begin(), pathspecs.end());
   std::set<std::string> paths;
-  for (const std::string& entry : Pieces(RunProgram(call).output, '\0'))
+  for (const std::string& entry : Pieces(Answer(call), '\0'))
     paths.insert(entry.substr(entry.find('\t') + 1));
   return {paths.begin(), paths.end()};
 }

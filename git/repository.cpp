@@ -10,7 +10,6 @@
 #include "git/shown_text.h"
 #include "git/work_files.h"
 #include "platform/files.h"
-#include "platform/read_whole_file.h"
 
 namespace vexel_yaml {
 
@@ -24,7 +23,7 @@ std::string Variable(const char* name) {
 // The path in a small file of git's, behind `prefix`; relative ones start from `folder`. Empty where there is
 // none.
 std::string PathIn(const std::string& file, const std::string& folder, const std::string& prefix) {
-  std::string text = ReadWholeFile(file).value_or("");
+  std::string text = TextOf(file);
   while (text.ends_with('\n') || text.ends_with('\r')) text.pop_back();
   if (!text.starts_with(prefix)) return {};
   std::error_code error;
@@ -38,7 +37,7 @@ std::string FindFolder() {
   // Of a linked work tree or a submodule.
   if (std::string linked = PathIn(".git", ".", "gitdir: "); IsFolder(linked)) return linked;
   const ProgramResult result = Git({"rev-parse", "--absolute-git-dir"});
-  if (result.status != 0) throw Refusal(result);
+  if (result.status != 0) throw Refusal();
   return Line(result);
 }
 

@@ -15,12 +15,9 @@ namespace {
 constexpr int kNothingFound = 1;
 
 ProgramCall Question() {
-  ProgramCall call =
-      GitCall({"config", "-z", "--type=path", "--get-regexp",
-               R"(^(vexel\.(rules|typeinfo|safe)|core\.hookspath|rerere\.(enabled|autoupdate))$)"});
   // The question is asked again for each of them where this one fails.
-  call.errors = ProgramCall::Errors::kDropped;
-  return call;
+  return QuietCall({"config", "-z", "--type=path", "--get-regexp",
+                    R"(^(vexel\.(rules|typeinfo|safe)|core\.hookspath|rerere\.(enabled|autoupdate))$)"});
 }
 
 std::string PathSetting(const std::string& value, const std::string& key) {

@@ -39,8 +39,9 @@ std::string WithoutPrefix(const std::string& name, std::string_view prefix) {
 // The branch whose tip a commit is, or else the commit.
 std::string BranchAt(const std::string& commit) {
   if (commit.empty()) return {};
-  const ProgramResult branches = GitQuietly({"for-each-ref", "--count=1", "--format=%(refname:short)",
-                                             "--points-at=" + commit, "refs/heads", "refs/remotes"});
+  const ProgramResult branches =
+      RunProgram(QuietCall({"for-each-ref", "--count=1", "--format=%(refname:short)", "--points-at=" + commit,
+                            "refs/heads", "refs/remotes"}));
   const std::string branch = Line(branches);
   return Readable(branch.empty() ? commit : branch);
 }
@@ -152,7 +153,8 @@ SideNames FindSideNames(const Repository& repository) {
        {std::pair("CHERRY_PICK_HEAD", "pick"), std::pair("REVERT_HEAD", "revert")}) {
     const std::string head = FirstLine(repository.Path(file));
     if (head.empty()) continue;
-    return {Picked({word, head, Line(GitQuietly({"show", "--no-patch", "--format=%s", head}))}), {}};
+    return {Picked({word, head, Line(RunProgram(QuietCall({"show", "--no-patch", "--format=%s", head})))}),
+            {}};
   }
   return {};
 }

@@ -24,7 +24,8 @@ std::string WithAuthors(const std::string& from, const std::string& to, const st
 }  // namespace
 
 SideNames WithPeople(SideNames names, const Repository& repository, const std::string& asset) {
-  if (names.ours.empty()) names.ours = Line(GitQuietly({"symbolic-ref", "--quiet", "--short", "HEAD"}));
+  if (names.ours.empty())
+    names.ours = Line(RunProgram(QuietCall({"symbolic-ref", "--quiet", "--short", "HEAD"})));
   if (!IsFile(repository.Path("MERGE_HEAD"))) return names;
   return {WithAuthors("HEAD", "MERGE_HEAD", asset, names.theirs),
           WithAuthors("MERGE_HEAD", "HEAD", asset, names.ours)};

@@ -55,7 +55,8 @@ bool StageFiles::LackBase() const {
 
 std::string StageFiles::TextOf(const std::string& number) const {
   for (const Stage& stage : stages_) {
-    if (stage.number == number) return Git({"cat-file", "--filters", "--path=" + asset_, stage.blob}).output;
+    if (stage.number == number)
+      return Answer(GitCall({"cat-file", "--filters", "--path=" + asset_, stage.blob}));
   }
   return {};
 }
@@ -70,7 +71,7 @@ bool StageFiles::Unstage() {
   }
   ProgramCall call = GitCall({"update-index", "-z", "--index-info"});
   call.input = std::move(lines);
-  if (RunProgram(call).status != 0) return false;
+  if (Ask(call).status != 0) return false;
   is_staged_ = false;
   return true;
 }
@@ -79,7 +80,7 @@ std::vector<StageFiles::Stage> StageFiles::Stages(bool is_staged) const {
   std::vector<Stage> stages;
   const std::string which = is_staged ? "--resolve-undo" : "--unmerged";
   for (const std::string& entry :
-       Pieces(Git({"ls-files", "-z", which, "--", ":(literal)" + asset_}).output, '\0')) {
+       Pieces(Answer(GitCall({"ls-files", "-z", which, "--", ":(literal)" + asset_})), '\0')) {
     const size_t end = entry.find('\t');
     // Not what lies below a folder of this name.
     if (end == std::string::npos || entry.substr(end + 1) != asset_) continue;

@@ -130,6 +130,18 @@ std::string TextOf(const std::string& path) {
   return std::move(text).value_or("");
 }
 
+std::vector<std::string> PathsIn(const std::string& folder) {
+  std::vector<std::string> paths;
+  std::error_code error;
+  for (std::filesystem::directory_iterator file(folder, error); !error && file != end(file);
+       file.increment(error)) {
+    paths.push_back(file->path().string());
+  }
+  const bool is_there = error != std::errc::no_such_file_or_directory && error != std::errc::not_a_directory;
+  if (error && is_there) throw FileError(FileError::Step::kReading, folder, error.value());
+  return paths;
+}
+
 bool IsAsset(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
   if (!file && FileExists(path)) throw FileError(FileError::Step::kReading, path, errno);

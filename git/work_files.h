@@ -4,6 +4,7 @@
 
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace vexel_yaml {
 
@@ -42,6 +43,9 @@ bool IsEmpty(const std::string& path);
 
 /// The content of a file, empty where there is none. Throws FileError for one that can't be read.
 std::string TextOf(const std::string& path);
+
+/// What is in a folder; nothing where there is none. Throws FileError for one that can't be read.
+std::vector<std::string> PathsIn(const std::string& folder);
 
 /// Whether the file is in the engine's text format, and not one of its plain .meta files, binary, or a
 /// pointer to a file elsewhere.

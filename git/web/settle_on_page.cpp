@@ -42,7 +42,7 @@ void OrThrow(Settle settle) {
     const CapturedErrors captured;
     try {
       is_settled = settle();
-    } catch (const FileError& error) {
+    } catch (const std::runtime_error& error) {
       std::cerr << error.what();
     }
     said = captured.Text();

@@ -9,6 +9,7 @@
 //   PLACE")
 // What is written to standard error doesn't count: a message that nobody gets is no way to find anything out.
 
+#include <dirent.h>
 #include <dlfcn.h>
 #include <pthread.h>
 #include <sys/mman.h>
@@ -147,6 +148,7 @@ int NoteNew(int file, const char* path, int flags) {
 FAIL_OPEN(flags, open, (const char* path, int flags, int mode), path, flags, mode)
 FAIL_OPEN(kNew, mkstemp, (char* path), path)
 FAIL("open", path, nullptr, FILE*, fopen64, (const char* path, const char* mode), path, mode)
+FAIL("open", path, nullptr, DIR*, opendir, (const char* path), path)
 FAIL("read", file, -1, ssize_t, read, (int file, void* to, size_t size), file, to, fault.Shorten(size, kShortCount))
 FAIL(file == STDERR_FILENO ? "" : "write", file, -1, ssize_t, write, (int file, const void* from, size_t size), file,
      from, fault.Shorten(size, kShortCount))
