@@ -204,6 +204,13 @@ class Collector {
                         : record.resolution == MergeResolve::kRight ? row.right
                                                                     : row.base;
     if (IsInResult(Above(row.path), chosen)) row.result = std::move(chosen);
+    if (files_.committed == nullptr) return;
+    const auto committed = FindElement(row.path, files_.committed->base, files_.committed->left);
+    const YAMLNode* node = committed.value_or(nullptr);
+    if (node != nullptr && node->HasSameContent(*base)) return;
+    row.committed = !committed        ? ReportCell{Kind::kChanged, "see the list", {}}
+                    : node == nullptr ? ReportCell{Kind::kRemoved, {}, {}}
+                                      : ValueCell(row.path, node, Kind::kChanged, names_);
   }
 
   // Whether the merged list at `path` has what a choice asked for: a repair may have taken it out again.

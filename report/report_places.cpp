@@ -4,6 +4,7 @@
 
 #include "diff/yaml_mapping_diff.h"
 #include "report/object_names.h"
+#include "scene/list_alignment.h"
 #include "yaml/yaml_alloc.h"
 #include "yaml/yaml_sequence.h"
 
@@ -64,6 +65,25 @@ bool IsReferenceEdit(const Operation& edit) {
 }
 
 }  // namespace
+
+std::optional<const YAMLNode*> FindElement(const FieldPath& path, const VexelObjects& base,
+                                           const VexelObjects& later) {
+  const FieldPath place = Above(path);
+  const auto list_in = [&](const VexelObjects& version) {
+    const YAMLNode* list = NodeAt(&version, place);
+    return list == nullptr ? nullptr : list->AsSequence();
+  };
+  const YAMLSequence *before = list_in(base), *after = list_in(later);
+  const YAMLNode* element = NodeAt(&base, path);
+  if (before == nullptr || after == nullptr || element == nullptr) return std::nullopt;
+  const auto alignment = AlignLists(place, *before, *after, *after);
+  if (!alignment) return std::nullopt;
+  for (const AlignedElement& aligned : alignment->elements) {
+    if (aligned.base == kNoIndex || before->GetItems()[aligned.base] != element) continue;
+    return aligned.left == kNoIndex ? nullptr : after->GetItems()[aligned.left];
+  }
+  return std::nullopt;
+}
 
 const YAMLNode* ValueAfter(const YAMLNode* base, const Operation* edit) {
   if (edit == nullptr || edit->GetKind() == Operation::Kind::kRemove) return nullptr;

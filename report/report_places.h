@@ -1,8 +1,11 @@
 #pragma once
 
+#include <optional>
+
 #include <string>
 
 #include "diff/operation.h"
+#include "yaml/vexel_objects.h"
 #include "yaml/yaml_mapping.h"
 #include "yaml/yaml_scalar.h"
 
@@ -24,6 +27,11 @@ bool IsPartOfReference(const FieldPath& path);
 
 /// What an edit makes of a value; null for nothing. Never given back, like what operations hold.
 const YAMLNode* After(const YAMLNode* value, const Operation* edit);
+
+/// The element of a later version's list that stands for base's at `path`, null where it has gone. Nothing
+/// where that can't be told.
+std::optional<const YAMLNode*> FindElement(const FieldPath& path, const VexelObjects& base,
+                                           const VexelObjects& later);
 
 /// What stands in base's place after an edit, for edits of references, lists and whole values; else null.
 const YAMLNode* ValueAfter(const YAMLNode* base, const Operation* edit);

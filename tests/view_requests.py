@@ -103,6 +103,18 @@ def a_choice_settles_what_follows():
     expect("what is given up", view.end(), (1, "as it was\n"))
 
 
+def a_report_tells_what_became_of_an_element():
+    versions = {"base": "12", "theirs": "13", "ours": "14", "as_ours": "14", "without": "1", "as_base": "12"}
+    for name, materials in versions.items():
+        entries = "".join(f"  - {{fileID: 2, guid: a{material}, type: 2}}\n" for material in materials)
+        Path(f"{name}.vexel").write_text(f"{scene.HEADER}--- !v!23 &5\nMeshRenderer:\n  m_Materials:\n{entries}")
+    paths = [f"{name}.vexel" for name in versions]
+    for committed, (kind, guid) in zip(paths[3:], (("changed", "a4"), ("removed", ""), ("unchanged", "a2"))):
+        report = subprocess.run([REPORT, "--safe", "--json", "--committed", committed, *paths[:3]], capture_output=True, check=True)
+        cell = rows(json.loads(report.stdout))["5.MeshRenderer.m_Materials.1"]["committed"]
+        expect(f"an element of {committed}", (cell["kind"], guid in cell["text"]), (kind, True))
+
+
 def a_name_changes_wherever_it_is_shown():
     def scene_with(name, target):
         return (node(name, 1, 0, []) + node("Hook", 2, 0, []) + "--- !v!1 &30\nGameObject:\n  m_Name: Wall\n"
@@ -359,6 +371,7 @@ with tempfile.TemporaryDirectory() as WORK:
     settles_as_merge_does("--safe")
     settles_as_merge_does()
     a_choice_settles_what_follows()
+    a_report_tells_what_became_of_an_element()
     a_name_changes_wherever_it_is_shown()
     a_pattern_can_be_taken_back()
     shows_random_scenes_as_a_whole_merge_does()
