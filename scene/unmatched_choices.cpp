@@ -28,7 +28,7 @@ const std::string* FindNearest(const std::string& path, const std::vector<std::s
   // Of a short file ID one digit may be wrong.
   size_t distance = std::max<size_t>(path.size() / 2, 2);
   for (const std::string& candidate : existing) {
-    const auto [shorter, longer] = std::minmax(candidate.size(), path.size());
+    const auto [shorter, longer] = std::minmax({candidate.size(), path.size()});
     if (longer - shorter >= distance) continue;
     const size_t found = EditDistance(path, candidate);
     if (found >= distance) continue;
