@@ -11,6 +11,8 @@ namespace vexel_yaml {
 namespace {
 
 constexpr std::string_view kReference = "fileID: ";
+// Of its letters the rarest one in scenes: to look for that alone takes less time than memmem does.
+constexpr size_t kRareLetter = kReference.find('D');
 
 }  // namespace
 
@@ -32,20 +34,20 @@ size_t ReferenceSearch::FilterPlace(const char* end) {
 bool ReferenceSearch::MayRefer(const YAMLNode& object) const {
   const FoldedObject* folded = GetFolded(&object);
   if (folded == nullptr) return true;
-  const char* const end = folded->text.data() + folded->text.size();
-  const char* at = folded->text.data();
-  while (true) {
-    // Faster than string_view's: this goes through whole scenes.
-    at = static_cast<const char*>(
-        memmem(at, static_cast<size_t>(end - at), kReference.data(), kReference.size()));
-    if (at == nullptr) return false;
-    at += kReference.size();
-    const char* id_end = at;
-    while (id_end != end && *id_end != ',' && *id_end != '}' && *id_end != '\n') ++id_end;
-    if (filter_.test(FilterPlace(id_end)) && file_ids_.contains({at, static_cast<size_t>(id_end - at)})) {
+  const std::string_view text = folded->text;
+  size_t letter = kRareLetter;
+  while ((letter = text.find(kReference[kRareLetter], letter)) != std::string_view::npos) {
+    const size_t reference = letter++ - kRareLetter;
+    if (text.compare(reference, kReference.size(), kReference) != 0) continue;
+    const size_t id = reference + kReference.size();
+    size_t id_end = id;
+    while (id_end != text.size() && text[id_end] != ',' && text[id_end] != '}' && text[id_end] != '\n')
+      ++id_end;
+    if (filter_.test(FilterPlace(text.data() + id_end)) && file_ids_.contains(text.substr(id, id_end - id))) {
       return true;
     }
   }
+  return false;
 }
 
 }  // namespace vexel_yaml

@@ -33,8 +33,7 @@ void SettleClasses(YAMLMapping& base, YAMLMapping& left, YAMLMapping& right, Val
 void SettleValues(YAMLMapping& base, YAMLMapping& left, YAMLMapping& right, const HandsOff& hands_off,
                   RecordingConflictResolver& resolver) {
   ValueSettler settler(hands_off, resolver);
-  const bool left_edits = !settler.AreSame(&base, &left), right_edits = !settler.AreSame(&base, &right);
-  if (left_edits && right_edits && !AreOfOneClass(left, right)) {
+  if (!AreOfOneClass(left, right) && !settler.AreSame(&base, &left) && !settler.AreSame(&base, &right)) {
     SettleClasses(base, left, right, settler);
   } else {
     settler.SettleEntries({base, left, right});
