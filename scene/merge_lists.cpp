@@ -3,6 +3,7 @@
 #include "rules/path_step.h"
 #include "scene/list_alignment.h"
 #include "scene/merge_order.h"
+#include "scene/moved_elements.h"
 #include "scene/row_of_slots.h"
 #include "scene/value_settler.h"
 #include "yaml/yaml_alloc.h"
@@ -112,7 +113,7 @@ OwnedNode MergeLists(const YAMLSequence& base, const YAMLSequence& left, const Y
   const FieldPath& path = settler.GetPath();
   if (YAMLSequenceRemapper::IsMergeablePath(path)) {
     const auto alignment = AlignLists(path, base, left, right);
-    if (alignment && !FillsWhatMoved(*alignment)) {
+    if (alignment && !FillsWhatMoved(*alignment) && !EditsWhatMoved(*alignment, base, left, right, settler)) {
       const size_t conflicts = settler.CountConflicts();
       OwnedNodePtr<YAMLSequence> merged = ListMerge(base, left, right, *alignment, settler).Merge();
       // Somebody looks at it anyway.

@@ -7,24 +7,6 @@ namespace vexel_yaml {
 
 namespace {
 
-bool Moves(const ListAlignment& alignment, uint32_t AlignedElement::*side,
-           bool AlignedElement::*is_replaced_by_other) {
-  std::vector<const AlignedElement*> kept;
-  for (const AlignedElement& element : alignment.elements) {
-    if (element.base != kNoIndex && element.*side != kNoIndex) kept.push_back(&element);
-  }
-  std::vector<uint32_t> first_behind(kept.size() + 1, kNoIndex);
-  for (size_t i = kept.size(); i-- > 0;) first_behind[i] = std::min(first_behind[i + 1], kept[i]->*side);
-  uint32_t last_before = 0;
-  for (size_t i = 0; i < kept.size(); ++i) {
-    const uint32_t index = kept[i]->*side;
-    const bool is_moved = index < last_before || index > first_behind[i + 1];
-    if (is_moved && kept[i]->*is_replaced_by_other) return true;
-    last_before = std::max(last_before, index);
-  }
-  return false;
-}
-
 // A scalar, or a reference without any other field.
 bool IsPlain(const YAMLNode* element) {
   const YAMLMapping* mapping = element == nullptr ? nullptr : element->AsMapping();
@@ -36,11 +18,6 @@ bool IsPlain(const YAMLNode* element) {
 }
 
 }  // namespace
-
-bool FillsWhatMoved(const ListAlignment& alignment) {
-  return Moves(alignment, &AlignedElement::left, &AlignedElement::is_replaced_by_right) ||
-         Moves(alignment, &AlignedElement::right, &AlignedElement::is_replaced_by_left);
-}
 
 bool IsMergeOfSlots(const YAMLSequence& base, const YAMLSequence& left, const YAMLSequence& right,
                     const YAMLSequence& merged, ValueSettler& settler) {

@@ -177,6 +177,10 @@ TEST(SettleValues, WhatCantBeLinedUpIsOneConflict) {
   expect("[exclusions]\nexclude *.C.f\n", "[1, 2, 3]", "[2, 3]", "[1, 2]");
   expect("", "[1, 2, 3]", "[1, 4, 5, 3]", "[1, 6, 3]");
   expect("", "[0, 5, 0]", "[5, 0, 0]", "[0, 0]");
+  // One that a side moved and edited, and the other one too, or removed.
+  expect("", "[{n: 1, w: 1}, 5]", "[5, {n: 1, w: 2}]", "[5, {n: 1, w: 3}]");
+  expect("", "[{n: 1, w: 1}, 5]", "[5]", "[5, {n: 1, w: 3}]");
+  EXPECT_EQ(Field().Merge("[{n: 1, w: 1}, 5]", "[5]", "[5, {n: 2, w: 3}]"), "[5, {n: 2, w: 3}]");
 }
 
 TEST(SettleValues, EqualElementsAreNoProblemWhereTheyStandStill) {
