@@ -12,6 +12,7 @@
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/keep_until_exit.h"
 #include "platform/thread.h"
 #include "rules/setup.h"
 #include "yaml/read_files.h"
@@ -59,17 +60,11 @@ const YAMLMappingDiff* PrepareDiff(const FilePairConfig& config, FilePair& files
   return YAMLMappingDiff::Diff(files.first, files.second);
 }
 
-// Kept until the process ends, as the merge keeps its documents.
-FilePair& NewFilePair() {
-  static auto& pairs = *new std::vector<std::unique_ptr<FilePair>>;
-  return *pairs.emplace_back(std::make_unique<FilePair>());
-}
-
 }  // namespace
 
 int HandleStripCommand(const StripConfig& config) {
   TimerStat timer("Strip Command", config.timing ? &std::cout : nullptr);
-  FilePair& files = NewFilePair();
+  FilePair& files = KeepUntilExit(std::make_unique<FilePair>());
   const YAMLMappingDiff* diff = PrepareDiff(config, files, timer);
   StripUnchanged(files.second, *diff);
   StrippedTransitionsToMappings(files.second);
@@ -84,7 +79,7 @@ int HandleStripCommand(const StripConfig& config) {
 
 int HandleDiffCommand(const DiffConfig& config) {
   TimerStat timer("Diff Command", config.timing ? &std::cout : nullptr);
-  const YAMLMappingDiff* diff = PrepareDiff(config, NewFilePair(), timer);
+  const YAMLMappingDiff* diff = PrepareDiff(config, KeepUntilExit(std::make_unique<FilePair>()), timer);
 
   TimerStat step(timer, "Output diff");
   std::ostringstream text;

@@ -17,6 +17,7 @@
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/keep_until_exit.h"
 #include "platform/progress.h"
 #include "platform/run_main.h"
 #include "platform/thread.h"
@@ -31,18 +32,11 @@ namespace vexel_yaml {
 
 namespace {
 
-// What is kept until the process ends: giving back the nodes of three scenes one by one would take as long as
-// merging them.
 struct KeptDocuments {
   SceneDocuments read;
   std::unique_ptr<VexelObjects> merged;
   std::array<PremergeTarget, 2> premerged;
 };
-
-KeptDocuments& NewKeptDocuments() {
-  static auto& kept = *new std::vector<std::unique_ptr<KeptDocuments>>;
-  return *kept.emplace_back(std::make_unique<KeptDocuments>());
-}
 
 // One run of the merge command, step by step.
 class MergeRun {
@@ -189,7 +183,7 @@ int HandleMergeCommand(const MergeConfig& config, const std::string& path_for_to
   const Progress progress("Merging " +
                           (config.destination_path.empty() ? config.base_path : config.destination_path));
   SetupRulesAndTypes(config.rules_file, config.type_info_file, timer);
-  MergeRun run(config, NewKeptDocuments(), timer);
+  MergeRun run(config, KeepUntilExit(std::make_unique<KeptDocuments>()), timer);
   Progress::Step("reading");
   if (config.safe) {
     run.ReadSceneDocuments();

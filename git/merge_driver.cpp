@@ -15,6 +15,7 @@
 #include "git/undecided_places.h"
 #include "git/work_files.h"
 #include "platform/file_error.h"
+#include "platform/keep_until_exit.h"
 #include "platform/progress.h"
 #include "report/report_command.h"
 
@@ -48,8 +49,7 @@ class DriverRun {
     MarkUndecided(versions_);
     keeps_records_ = !is_ancestor_ && repository_.IsChanging();
     const bool is_ours = versions_.HasAsset();
-    // Kept until the process ends: giving three scenes back node by node takes as long as merging them.
-    merge_ = new AssetMerge(versions_);
+    merge_ = &KeepUntilExit(std::make_unique<AssetMerge>(versions_));
     if (is_ours) merge_->Read();
     settings_ = query.Get();
     if (!is_ours) {

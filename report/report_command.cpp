@@ -8,6 +8,7 @@
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
 #include "platform/files.h"
+#include "platform/keep_until_exit.h"
 #include "platform/read_whole_file.h"
 #include "platform/temporary_files.h"
 #include "report/conflict_list.h"
@@ -189,14 +190,8 @@ void WriteReportFile(const Arguments& arguments, const MergedFiles& files) {
   file.Commit();
 }
 
-// Kept until the process ends: giving three scenes back node by node takes longer than reporting on them.
-MergedFiles& NewMergedFiles() {
-  static auto& kept = *new std::vector<std::unique_ptr<MergedFiles>>;
-  return *kept.emplace_back(std::make_unique<MergedFiles>());
-}
-
 int Report(const Arguments& arguments) {
-  MergedFiles& files = NewMergedFiles();
+  MergedFiles& files = KeepUntilExit(std::make_unique<MergedFiles>());
   const std::string prefix = "Cannot merge file '" + arguments.config.base_path + "': ";
   try {
     MergeForReport(arguments.config, files);
