@@ -52,7 +52,7 @@ _vexel_paths_started() {
 # _vexel_option_value: completes the value of the option before the cursor, false where it takes none.
 _vexel_option_value() {
   case "$prev" in
-    -i | -o) _vexel_files ;;
+    -i | -o | --assets) _vexel_files ;;
     --rules) _vexel_files txt ;;
     --typeInfo) _vexel_files yaml vexel ;;
     --fallback)
@@ -94,14 +94,14 @@ _vexel_yaml_merge() {
 _vexel_merge_report() {
   local cur prev
   _vexel_words
-  if ! _vexel_paths_started 1 " -o --title -i --rules --typeInfo "; then
+  if ! _vexel_paths_started 1 " -o --title -i --assets --rules --typeInfo "; then
     case "$prev" in
       --title) return ;;
       -o) _vexel_files html && return ;;
       *) if _vexel_option_value; then return; fi ;;
     esac
     if [[ "$cur" == -* ]]; then
-      _vexel_offer -o --title -i --rules --typeInfo --safe --summary --json --conflicts --text --version --help
+      _vexel_offer -o --title -i --assets --rules --typeInfo --safe --summary --json --conflicts --text --version --help
       return
     fi
   fi

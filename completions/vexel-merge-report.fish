@@ -9,6 +9,7 @@ $command -f
 $command -s o -rF -d "Write the page to a file"
 $command -l title -x -d "Title of the page"
 $command -s i -rF -d "Settle conflicts as a record file says"
+$command -l assets -rF -d "Names of other assets"
 $command -l rules -rF -d "Other merge rules"
 $command -l typeInfo -rF -d "Type information"
 $command -l safe -d "Merge scenes as scenes"

@@ -4,6 +4,7 @@
 #include <string_view>
 
 #include "git/git_call.h"
+#include "report/value_text.h"
 
 namespace vexel_yaml {
 
@@ -13,9 +14,10 @@ constexpr std::string_view kSuffix = ".meta";
 constexpr std::string_view kBefore = "guid: ";
 // To compare each line with more of them takes longer than to read all guids.
 constexpr size_t kMostPatterns = 100;
+constexpr size_t kGuidLength = 32;
 
 bool IsGuid(const std::string& text) {
-  return text.size() == 32 && text.find_first_not_of("0123456789abcdef") == std::string::npos;
+  return text.size() == kGuidLength && text.find_first_not_of("0123456789abcdef") == std::string::npos;
 }
 
 }  // namespace
@@ -43,6 +45,19 @@ AssetNames FindAssetNames(const std::set<std::string>& guids) {
     if (guids.contains(guid)) names.emplace(std::move(guid), name.substr(0, name.size() - kSuffix.size()));
   }
   return names;
+}
+
+std::string AssetLines(const std::vector<std::string>& scenes) {
+  std::set<std::string> guids;
+  for (const std::string& scene : scenes) {
+    for (size_t at = scene.find(kBefore); at != std::string::npos; at = scene.find(kBefore, at)) {
+      at += kBefore.size();
+      guids.insert(scene.substr(at, kGuidLength));
+    }
+  }
+  std::string lines;
+  for (const auto& [guid, name] : FindAssetNames(guids)) lines += guid + ' ' + OnOneLine(name) + '\n';
+  return lines;
 }
 
 }  // namespace vexel_yaml

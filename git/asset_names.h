@@ -1,5 +1,7 @@
 #pragma once
 
+#include <string_view>
+
 #include "report/object_names.h"
 
 namespace vexel_yaml {
@@ -11,5 +13,8 @@ namespace vexel_yaml {
 /// folders. Reading them from the commits instead would take several times as long, and assets hardly ever
 /// change their guids.
 AssetNames FindAssetNames(const std::set<std::string>& guids);
+
+/// The names of all assets that these texts of scenes refer to, as `vexel-merge-report --assets` takes them.
+std::string AssetLines(const std::vector<std::string>& scenes);
 
 }  // namespace vexel_yaml

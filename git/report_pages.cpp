@@ -7,6 +7,7 @@
 #include <set>
 
 #include "git/asset_merge.h"
+#include "git/asset_names.h"
 #include "git/conflict_records.h"
 #include "git/decided_lines.h"
 #include "git/git_call.h"
@@ -94,10 +95,17 @@ class PageMaker {
       call.insert(call.end(), {"-i", "decided"});
     }
     std::string title = asset;
-    if (merged_) title += ", the parents of " + ShortHash(merged_->commit) + " merged anew";
+    if (merged_)
+      title += ": " + branches_.theirs + " merged into " + branches_.ours + " (" +
+               ShortHash(merged_->commit) + ")";
+    Paths files = {versions.base, versions.left, versions.right};
     // What was decided or edited by hand is in the commit alone.
-    if (merged_ && !WriteVersion(merged_->commit, "committed", asset, scratch_).empty())
+    if (merged_ && !WriteVersion(merged_->commit, "committed", asset, scratch_).empty()) {
       call.insert(call.end(), {"--committed", "committed"});
+      files.emplace_back("committed");
+    }
+    scratch_.Write("assets", AssetLines(TextsOf(files)));
+    call.insert(call.end(), {"--assets", "assets"});
     const SideNames names = NamesFor(asset);
     call.insert(call.end(), {"--theirs", names.theirs, "--ours", names.ours});
     call.insert(call.end(), {"-o", target, "--title", title, versions.base, versions.left, versions.right});
@@ -126,8 +134,14 @@ class PageMaker {
   }
 
  private:
+  std::vector<std::string> TextsOf(const Paths& files) const {
+    std::vector<std::string> texts;
+    for (const std::string& file : files) texts.push_back(TextOf(scratch_.GetPath() + '/' + file));
+    return texts;
+  }
+
   SideNames NamesFor(const std::string& asset) const {
-    if (merged_) return PeopleBehind(*merged_, asset);
+    if (merged_) return PeopleBehind(*merged_, branches_, asset);
     const RecordEntry entry = records_.Entry(asset);
     return WithPeople(entry.asset.empty() ? FindSideNames(repository_) : entry.names, repository_, asset);
   }
@@ -179,6 +193,7 @@ class PageMaker {
   const std::string shown_page_;
   const std::string page_;
   const std::optional<MergedCommits>& merged_;
+  const SideNames branches_ = merged_ ? BranchesOf(*merged_) : SideNames();
   const MergeSettings settings_ = SettingsQuery().Get();
   const Repository repository_;
   const ConflictRecords records_{repository_};

@@ -106,15 +106,6 @@ std::string NewBase(const Repository& repository, const std::string& folder) {
   return is_this ? Readable(start->substr(start->find(kStart) + kStart.size())) : BranchAt(onto);
 }
 
-// The branch as the message of a merge names it; empty where it names none.
-std::string MergedBranch(const Repository& repository) {
-  const std::string message = FirstLine(repository.Path("MERGE_MSG"));
-  const size_t begin = message.find('\'');
-  const size_t end = begin == std::string::npos ? begin : message.find('\'', begin + 1);
-  const bool is_merge = message.starts_with("Merge ") && end != std::string::npos;
-  return is_merge ? Readable(message.substr(begin + 1, end - begin - 1)) : std::string();
-}
-
 SideNames InRebase(const Repository& repository, const std::string& folder) {
   const std::string branch =
       Readable(WithoutPrefix(FirstLine(repository.Path(folder + "/head-name")), "refs/heads/"));
@@ -131,6 +122,16 @@ std::string Picked(const Step& step) {
 
 }  // namespace
 
+SideNames NamesInMessage(const std::string& message) {
+  constexpr std::string_view kInto = " into ";
+  const size_t begin = message.find('\'');
+  const size_t end = begin == std::string::npos ? begin : message.find('\'', begin + 1);
+  if (!message.starts_with("Merge ") || end == std::string::npos) return {};
+  const size_t into = message.find(kInto, end);
+  return {Readable(message.substr(begin + 1, end - begin - 1)),
+          into == std::string::npos ? std::string() : Readable(message.substr(into + kInto.size()))};
+}
+
 std::string MergingRebase(const Repository& repository) {
   for (const char* folder : {"rebase-merge", "rebase-apply"}) {
     if (IsAtStep(repository, folder)) return folder;
@@ -146,7 +147,7 @@ SideNames FindSideNames(const Repository& repository) {
     return {Picked(StepIn(step)), {}};
   // Once a merge has stopped.
   if (const std::string head = FirstLine(repository.Path("MERGE_HEAD")); !head.empty()) {
-    const std::string branch = MergedBranch(repository);
+    const std::string branch = NamesInMessage(FirstLine(repository.Path("MERGE_MSG"))).theirs;
     return {branch.empty() ? BranchAt(head) : branch, {}};
   }
   for (const auto& [file, word] :

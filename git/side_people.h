@@ -12,7 +12,11 @@ namespace vexel_yaml {
 /// feature/lights".
 SideNames WithPeople(SideNames names, const Repository& repository, const std::string& asset);
 
-/// The sides of a merge commit.
-SideNames PeopleBehind(const MergedCommits& merged, const std::string& asset);
+/// What people call the sides of a merge commit: as its message has them, or else by the branch that has
+/// theirs and the one that the merge was made on, or by their hashes.
+SideNames BranchesOf(const MergedCommits& merged);
+
+/// The same with who has changed the file there.
+SideNames PeopleBehind(const MergedCommits& merged, const SideNames& branches, const std::string& asset);
 
 }  // namespace vexel_yaml

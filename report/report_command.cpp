@@ -1,9 +1,11 @@
 #include "report/report_command.h"
 
+#include <algorithm>
 #include <filesystem>
 #include <iostream>
 #include <new>
 #include <optional>
+#include <sstream>
 
 #include "platform/error_channel.h"
 #include "platform/file_replacement.h"
@@ -41,6 +43,8 @@ constexpr std::string_view kUsage =
     "         -i FILE         settle conflicts as FILE says\n"
     "         --rules FILE    other merge rules than the default ones\n"
     "         --typeInfo FILE check components, with the type information in FILE\n"
+    "         --assets FILE   the names of other assets: a line each, with the guid, a blank and the file's "
+    "name\n"
     "         --committed FILE show beside the result what became of it in the end\n"
     "         --summary       print of the page how many objects were added, changed and removed, and how "
     "many "
@@ -59,6 +63,8 @@ struct Arguments {
   std::string theirs;
   std::string ours;
   ReportConfig config;
+  std::string assets_file;
+  AssetNames assets;
   std::string text_file;
 };
 
@@ -77,6 +83,7 @@ std::string* ValueTarget(std::string_view option, Arguments& parsed) {
   if (option == "--committed") return &parsed.config.committed_path;
   if (option == "--rules") return &parsed.config.rules_file;
   if (option == "--typeInfo") return &parsed.config.type_info_file;
+  if (option == "--assets") return &parsed.assets_file;
   return nullptr;
 }
 
@@ -133,6 +140,20 @@ Arguments Parse(const std::vector<std::string>& arguments) {
   return parsed;
 }
 
+// Throws FileError, and std::runtime_error where there is no such file.
+AssetNames ReadAssetNames(const std::string& path) {
+  if (path.empty()) return {};
+  const std::optional<std::string> text = ReadWholeFile(VexelToNativePath(path));
+  if (!text) throw std::runtime_error("Cannot open file '" + path + "'");
+  AssetNames names;
+  std::istringstream lines(*text);
+  for (std::string line; std::getline(lines, line);) {
+    const size_t blank = std::min(line.find(' '), line.size());
+    names.emplace(line.substr(0, blank), line.substr(std::min(blank + 1, line.size())));
+  }
+  return names;
+}
+
 int PrintText(const std::string& path) {
   try {
     const std::optional<std::string> text = ReadWholeFile(VexelToNativePath(path));
@@ -152,9 +173,11 @@ void PrintConflicts(const RecordingConflictResolver& resolver) {
 
 void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostream& out) {
   const ReportConfig& config = arguments.config;
+  ObjectNames names = NamesOf(files);
+  names.SetAssetNames(arguments.assets);
   const std::string title = arguments.title.empty() ? "Merge report" : arguments.title;
   if (arguments.mode == Mode::kJson) {
-    out << ReportJson(files, title);
+    out << ReportJson(files, names, title);
     return;
   }
   const PageHead head = {title,
@@ -170,7 +193,6 @@ void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostr
   if (arguments.names_sides)
     words = {head.theirs_name.empty() ? "Their side" : head.theirs_name,
              head.ours_name.empty() ? "Our side" : head.ours_name};
-  ObjectNames names = NamesOf(files);
   std::vector<ReportObject> objects = CollectReport(files, names, words);
   WritePage(out, head, objects);
   if (!arguments.prints_summary) return;
@@ -231,6 +253,7 @@ int RunReport(const std::vector<std::string>& command_line) {
   Arguments parsed;
   try {
     parsed = Parse(arguments);
+    parsed.assets = ReadAssetNames(parsed.assets_file);
   } catch (const std::exception& error) {
     return Fail(error.what());
   }

@@ -189,8 +189,7 @@ std::string ChoicePath(const ReportRow& row) {
 
 std::string CardJson(const ReportCard& card, ObjectNames& names) { return Dump(Card(card, names, false)); }
 
-std::string ReportJson(const MergedFiles& files, const std::string& title) {
-  ObjectNames names = NamesOf(files);
+std::string ReportJson(const MergedFiles& files, ObjectNames& names, const std::string& title) {
   Json cards = Json::array();
   size_t pending = 0;
   for (const ReportCard& card : MakeCards(CollectReport(files, names, {"theirs", "ours"}), names)) {

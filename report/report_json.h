@@ -18,6 +18,6 @@ std::string ChoicePath(const ReportRow& row);
 std::string CardJson(const ReportCard& card, ObjectNames& names);
 
 /// The whole report as JSON text.
-std::string ReportJson(const MergedFiles& files, const std::string& title);
+std::string ReportJson(const MergedFiles& files, ObjectNames& names, const std::string& title);
 
 }  // namespace vexel_yaml

@@ -73,7 +73,11 @@ git checkout -q -b moved start && git mv "$file" Docks.vexel && git commit -q -m
 check "a file that one side renames is merged" vexel-merge-git preview doors >"$work/out"
 check "by its new name" grep -qFx "Docks.vexel: merges without conflicts" "$work/out"
 check "as git does it" git merge -q --no-edit doors
-check "such a merge has a page" vexel-merge-git report HEAD >/dev/null
+check "such a merge has a page" vexel-merge-git report HEAD >"$work/pages"
+check "scripts go by their classes there" grep -qF '<span class="class">DoorOpener</span>' "$(cat "$work/pages")"
+check "sides by their branches" grep -qF '<title>Docks.vexel: doors merged into moved (' "$(cat "$work/pages")"
+git commit -q --amend -m "All doors"
+check "also where the message doesn't have them" grep -qF ': doors merged into moved (' "$(vexel-merge-git report HEAD)"
 git checkout -q --detach all
 
 check "a merge stops" stops git merge -q doors
