@@ -156,7 +156,7 @@ class ConflictNamer {
       conflict.was = "nothing";
       if (versions_.are_scenes) conflict.was += " (theirs stands until settled)";
     } else if (path.size() > 1 && base_value != nullptr) {
-      conflict.was = IsAboutFather(path) ? FatherText(*base_value) : WasText(path, *base_value);
+      conflict.was = IsAboutFather(path) ? FatherText(*base_value) : WasText(record, *base_value);
     }
     conflict.theirs = SideText(record, record.left, true);
     conflict.ours = SideText(record, record.right, false);
@@ -229,8 +229,11 @@ class ConflictNamer {
                                         : name + " (" + file_id->GetText() + ")";
   }
 
-  std::string WasText(const FieldPath& path, const YAMLNode& value) {
-    const std::string text = ValueText(path, value);
+  std::string WasText(const Record& record, const YAMLNode& value) {
+    const std::string text = ValueText(record.path, value);
+    const YAMLSequence* list = value.AsSequence();
+    if (list != nullptr && text.ends_with(kEllipsis))
+      return ListBeforeText(*list, record.left, record.right, names_);
     return value.AsScalar() == nullptr && text.ends_with(kEllipsis) ? std::string() : text;
   }
 

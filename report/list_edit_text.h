@@ -12,4 +12,9 @@ namespace vexel_yaml {
 std::string ListEditText(const ChangeSequenceOperation& edit, const YAMLNode* base, ObjectNames& names,
                          NamedWith with);
 
+/// A list before these edits, of which each may be null, on one line: what they touched,
+/// with dots for the rest.
+std::string ListBeforeText(const YAMLSequence& list, const Operation* left, const Operation* right,
+                           ObjectNames& names);
+
 }  // namespace vexel_yaml

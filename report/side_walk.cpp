@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include "report/list_order.h"
+
 namespace vexel_yaml {
 
 namespace {
@@ -9,7 +11,6 @@ namespace {
 constexpr size_t kMostOfValue = 160;
 constexpr size_t kMostOfElement = 100;
 constexpr size_t kMostElements = 3;
-constexpr std::string_view kOthers = "\u2026";
 
 const YAMLMapping* BodyOf(const YAMLNode* object) {
   const YAMLMapping* mapping = object == nullptr ? nullptr : object->AsMapping();
@@ -28,20 +29,6 @@ const YAMLMapping* FieldsToCount(const FieldPath& path, const YAMLNode* node) {
 std::string FullText(const YAMLNode& node) {
   const YAMLScalar* scalar = node.AsScalar();
   return scalar != nullptr ? scalar->GetText() : node.GetYAMLString();
-}
-
-// For each element of the changed list, the base element that it was, or kDropped.
-std::vector<uint32_t> Origins(const YAMLSequenceRemapper* remapper, size_t from_size, size_t to_size) {
-  std::vector<uint32_t> origins(std::max(from_size, to_size), YAMLSequenceRemapper::kDropped);
-  if (remapper == nullptr) {
-    for (size_t i = 0; i < from_size; ++i) origins[i] = static_cast<uint32_t>(i);
-    return origins;
-  }
-  const std::vector<uint32_t>& mapping = remapper->GetMapping();
-  for (size_t i = 0; i < mapping.size(); ++i) {
-    if (mapping[i] < origins.size()) origins[mapping[i]] = static_cast<uint32_t>(i);
-  }
-  return origins;
 }
 
 bool IsUnit(const YAMLNode* from, const YAMLNode* to) {
@@ -63,23 +50,6 @@ bool FitsIntoLine(const YAMLNode* element) {
   const YAMLMapping* mapping = element->AsMapping();
   return mapping != nullptr && !mapping->HasDuplicateKeys() &&
          (IsReference(mapping) || (mapping->Size() == 1 && IsReference(mapping->First())));
-}
-
-// The place in the changed list from which on, and that before which, something stands elsewhere than before.
-std::pair<size_t, size_t> Moved(const std::vector<uint32_t>& origins, size_t from_size, size_t to_size) {
-  size_t begin = 0;
-  while (begin < to_size && origins[begin] == begin) ++begin;
-  size_t end = to_size;
-  while (end > begin && from_size + end >= to_size && origins[end - 1] == from_size + end - 1 - to_size)
-    --end;
-  return {begin, end};
-}
-
-// The part of a list that is in another order now, with dots for the rest.
-std::string OrderText(const std::vector<std::string>& list, std::pair<size_t, size_t> moved) {
-  std::string text = moved.first > 0 ? std::string(kOthers) : std::string();
-  for (size_t i = moved.first; i < moved.second; ++i) text += (text.empty() ? "" : ", ") + list[i];
-  return moved.second < list.size() ? text + ", " + std::string(kOthers) : text;
 }
 
 const YAMLNode* ElementAt(const YAMLSequence& sequence, size_t index) {
@@ -213,8 +183,7 @@ void SideWalk::WalkList(const ChangeSequenceOperation& operation, const YAMLSequ
   in_list_ = was_in_list;
   edits.order = origins;
   std::erase(edits.order, YAMLSequenceRemapper::kDropped);
-  if (!std::ranges::is_sorted(edits.order))
-    add(kNewOrder, &to, OrderText(after, Moved(origins, from.Size(), to.Size())));
+  if (!std::ranges::is_sorted(edits.order)) add(kNewOrder, &to, OrderText(after, origins, from.Size()));
   if (edits.text.empty()) return;
   if (!shortened) edits.full.clear();
   if (edits.shown == edits.text) edits.shown.clear();

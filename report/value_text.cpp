@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <map>
+#include <set>
 #include <sstream>
 
 #include "diff/yaml_diff_output.h"
@@ -154,12 +155,11 @@ class NamedWriter {
   }
 
   std::vector<std::string> Elements(const YAMLSequence& list) {
-    std::map<std::string, size_t> counts;
-    for (const YAMLNode* item : list.GetItems()) ++counts[names_.DescribeTarget(ReferenceIn(item))];
+    const std::set<std::string> shared = SharedNames(list);
     std::vector<std::string> elements;
     for (const YAMLNode* item : list.GetItems()) {
       const YAMLNode* reference = ReferenceIn(item);
-      const bool has_id = has_ids_ || counts[names_.DescribeTarget(reference)] > 1;
+      const bool has_id = has_ids_ || shared.contains(names_.DescribeTarget(reference));
       const std::string name = TargetText(reference, has_id);
       elements.push_back(OnOneLine(name.empty() ? Text(item) : name));
     }
@@ -167,6 +167,20 @@ class NamedWriter {
   }
 
  private:
+  // The names that several things have to which the list refers.
+  std::set<std::string> SharedNames(const YAMLSequence& list) {
+    std::set<std::string> shared;
+    std::map<std::string, const YAMLNode*> references;
+    for (const YAMLNode* item : list.GetItems()) {
+      const YAMLNode* reference = ReferenceIn(item);
+      if (reference == nullptr) continue;
+      const std::string name = names_.DescribeTarget(reference);
+      const YAMLNode* first = references.emplace(name, reference).first->second;
+      if (!first->HasSameContent(*reference)) shared.insert(name);
+    }
+    return shared;
+  }
+
   std::string TargetText(const YAMLNode* reference, bool has_id) {
     std::string name = names_.DescribeTarget(reference);
     if (name.empty() || !has_id) return name;

@@ -169,4 +169,23 @@ check "by its elements' names" grep -qFx '  was     [Object 1, Object 2, Object 
 check "so that orders differ" grep -qFx '  ours    new order: …, Object 3, Object 2' "$work/out"
 check "another asset goes by its file" grep -qFx '  theirs  Brick2.mat' "$work/out"
 
+# A long list: what differs is shown, and where; a thing in two slots is one thing.
+bricks() {
+  objects 0 0 0
+  printf -- '--- !v!23 &40\nMeshRenderer:\n  m_Materials:\n'
+  printf -- '  - {fileID: 2, guid: %032d, type: 2}\n' "$@"
+}
+git reset -q --hard && git checkout -q main && bricks 1 2 3 4 5 6 7 8 9 8 >"$file"
+for guid in 4 5 6 7 8 9; do printf 'fileFormatVersion: 2\nguid: %032d\n' "$guid" >"Brick$guid.mat.meta"; done
+git add -A && git commit -q -m bricks
+commit theirs bricks 1 4 2 3 1 1 1 1 5 6 7 8 9 8
+commit ours bricks 1 3 4 5 6 7 8 2 9 8
+again
+check "a long list is asked about" refuses answer q
+check "by what was touched" grep -qFx '  was     […, Brick2.mat, Brick3.mat, Brick4.mat, Brick5.mat, …]' "$work/out"
+check "with its new order behind what is new" grep -qFx \
+  '  theirs  adds Brick1.mat, adds Brick1.mat, adds Brick1.mat, adds 1 more, new order: Brick1.mat, Brick4.mat, Brick2.mat, …' \
+  "$work/out"
+check "as far as it is one" grep -qFx '  ours    new order: …, Brick8.mat, Brick2.mat, Brick9.mat, …' "$work/out"
+
 end_of_checks "people are asked"
