@@ -107,7 +107,7 @@ std::string ListEditText(const ChangeSequenceOperation& edit, const YAMLNode* ba
     }
   };
   SideWalk(
-      names, found, [](const FieldPath&) {}, nullptr)
+      {names, names}, found, [](const FieldPath&) {}, nullptr)
       .WalkList(edit, *base->AsSequence(), *after->AsSequence());
   std::string text = InWords(lines, with);
   if (edited > 0) Append(text, "edits " + std::to_string(edited) + " of it");

@@ -74,6 +74,13 @@ bool IsReference(const YAMLNode* value) {
   return guid == nullptr ? mapping->Size() == 1 : guid->AsScalar() != nullptr;
 }
 
+const YAMLNode* ReferenceIn(const YAMLNode* element) {
+  if (IsReference(element)) return element;
+  const YAMLMapping* entry = element == nullptr ? nullptr : element->AsMapping();
+  if (entry == nullptr || entry->HasDuplicateKeys() || entry->Size() != 1) return nullptr;
+  return IsReference(entry->First()) ? entry->First() : nullptr;
+}
+
 void CollectGuids(const YAMLNode* value, std::set<std::string>& guids) {
   if (value == nullptr) return;
   if (const YAMLSequence* list = value->AsSequence()) {

@@ -85,9 +85,20 @@ class ObjectNames {
   AssetNames asset_names_;
 };
 
+/// For what is shown of one version among others: the names that are the same for all of them, so that exact
+/// texts can be compared, and those that this version has, for people.
+struct CellNames {
+  ObjectNames& common;
+  ObjectNames& own;
+};
+
 /// Whether a value is a reference and nothing more: an element of a list may hold a file ID among other
 /// fields.
 bool IsReference(const YAMLNode* value);
+
+/// The reference that an element of a list consists of, as it is or, as in a list of components, under a name
+/// of its own; else null.
+const YAMLNode* ReferenceIn(const YAMLNode* element);
 
 /// Adds the guids of the assets that a value refers to.
 void CollectGuids(const YAMLNode* value, std::set<std::string>& guids);

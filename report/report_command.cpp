@@ -19,6 +19,7 @@
 #include "report/readable_headers.h"
 #include "report/report_json.h"
 #include "report/value_text.h"
+#include "report/version_names.h"
 #include "report/write_page.h"
 #include "yaml/yaml_error.h"
 
@@ -173,7 +174,7 @@ void PrintConflicts(const RecordingConflictResolver& resolver) {
 
 void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostream& out) {
   const ReportConfig& config = arguments.config;
-  ObjectNames names = NamesOf(files);
+  VersionNames names = NamesOf(files);
   names.SetAssetNames(arguments.assets);
   const std::string title = arguments.title.empty() ? "Merge report" : arguments.title;
   if (arguments.mode == Mode::kJson) {
@@ -196,7 +197,7 @@ void WriteReport(const Arguments& arguments, const MergedFiles& files, std::ostr
   std::vector<ReportObject> objects = CollectReport(files, names, words);
   WritePage(out, head, objects);
   if (!arguments.prints_summary) return;
-  const ObjectCounts counts = CountObjects(MakeCards(std::move(objects), names));
+  const ObjectCounts counts = CountObjects(MakeCards(std::move(objects), names.Latest()));
   std::cout << counts.added << '\t' << counts.changed << '\t' << counts.removed << '\t' << counts.pending
             << '\n';
 }

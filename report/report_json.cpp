@@ -6,6 +6,7 @@
 #include "report/named_note.h"
 #include "report/typed_value.h"
 #include "report/value_text.h"
+#include "report/version_names.h"
 
 namespace vexel_yaml {
 
@@ -88,7 +89,7 @@ std::string PropertyName(const ReportRow& row) {
   return row.path.size() < 2 ? std::string() : PathToString({row.path.begin() + 1, row.path.end()});
 }
 
-Json RowJson(const ReportRow& row, ObjectNames& names, bool shows_committed) {
+Json RowJson(const ReportRow& row, VersionNames& names, bool shows_committed) {
   Json json = {{"key", Cleaned(PathToString(row.path))}};
   const std::string path = ChoicePath(row);
   if (!path.empty()) json["path"] = path;
@@ -103,16 +104,17 @@ Json RowJson(const ReportRow& row, ObjectNames& names, bool shows_committed) {
   json["choice"] = is_settled ? Json(InWordsOfPeople(row.state.substr(kSettled.size()))) : Json();
   const bool is_switch = IsSwitchRow(row);
   for (size_t i = 0; i < std::size(kCells); ++i) {
-    json[std::string(kCellNames[i])] = CellJson(row.*kCells[i], is_switch, names);
+    json[std::string(kCellNames[i])] = CellJson(row.*kCells[i], is_switch, names.In(kCells[i]).own);
   }
-  if (shows_committed) json["committed"] = CellJson(row.committed, is_switch, names);
+  if (shows_committed)
+    json["committed"] = CellJson(row.committed, is_switch, names.In(&ReportRow::committed).own);
   return json;
 }
 
-Json ObjectJson(const ReportObject& object, ObjectNames& names, bool shows_committed) {
+Json ObjectJson(const ReportObject& object, VersionNames& names, bool shows_committed) {
   Json rows = Json::array();
   for (const ReportRow& row : object.rows) rows.push_back(RowJson(row, names, shows_committed));
-  const std::string script = names.GetScriptClass(names.GetScriptGuid(object.file_id));
+  const std::string script = names.Latest().GetScriptClass(names.Latest().GetScriptGuid(object.file_id));
   return {{"id", Cleaned(object.file_id->GetText())},
           {"class", OnOneLine(object.class_name)},
           {"script", OnOneLine(script)},
@@ -120,7 +122,7 @@ Json ObjectJson(const ReportObject& object, ObjectNames& names, bool shows_commi
           {"rows", std::move(rows)}};
 }
 
-Json Card(const ReportCard& card, ObjectNames& names, bool shows_committed) {
+Json Card(const ReportCard& card, VersionNames& names, bool shows_committed) {
   Json sides = Json::array();
   Json kinds = Json::array();
   Json objects = Json::array();
@@ -187,17 +189,17 @@ std::string ChoicePath(const ReportRow& row) {
   return path;
 }
 
-std::string CardJson(const ReportCard& card, ObjectNames& names) { return Dump(Card(card, names, false)); }
+std::string CardJson(const ReportCard& card, VersionNames& names) { return Dump(Card(card, names, false)); }
 
-std::string ReportJson(const MergedFiles& files, ObjectNames& names, const std::string& title) {
+std::string ReportJson(const MergedFiles& files, VersionNames& names, const std::string& title) {
   Json cards = Json::array();
   size_t pending = 0;
-  for (const ReportCard& card : MakeCards(CollectReport(files, names, {"theirs", "ours"}), names)) {
+  for (const ReportCard& card : MakeCards(CollectReport(files, names, {"theirs", "ours"}), names.Latest())) {
     cards.push_back(Card(card, names, files.committed != nullptr));
     pending += cards.back()["pending"].get<size_t>();
   }
   Json notes = Json::array();
-  for (const SceneNote& note : files.notes) notes.push_back(NamedNote(note.text, names));
+  for (const SceneNote& note : files.notes) notes.push_back(NamedNote(note.text, names.Latest()));
   return Dump({{"version", kReportJsonVersion},
                {"title", OnOneLine(title)},
                {"pending", pending},

@@ -15,9 +15,9 @@ inline constexpr int kReportJsonVersion = 1;
 std::string ChoicePath(const ReportRow& row);
 
 /// One card as JSON text, which is valid whatever the values hold.
-std::string CardJson(const ReportCard& card, ObjectNames& names);
+std::string CardJson(const ReportCard& card, VersionNames& names);
 
 /// The whole report as JSON text.
-std::string ReportJson(const MergedFiles& files, ObjectNames& names, const std::string& title);
+std::string ReportJson(const MergedFiles& files, VersionNames& names, const std::string& title);
 
 }  // namespace vexel_yaml

@@ -5,6 +5,7 @@
 #include <unordered_map>
 
 #include "report/side_walk.h"
+#include "report/version_names.h"
 
 namespace vexel_yaml {
 
@@ -49,8 +50,8 @@ std::string_view StateOf(const ReportRow& row) {
   const bool right = row.right.kind != Kind::kUnchanged;
   if ((left || right) && row.result.kind == Kind::kUnchanged) return "not taken";
   if (left != right) return left ? "from left" : "from right";
-  bool is_left = row.result == row.left;
-  bool is_right = row.result == row.right;
+  bool is_left = row.result.HasSameValue(row.left);
+  bool is_right = row.result.HasSameValue(row.right);
   if (is_left && is_right && !row.result.parts_changed) return "same on both";
   if (row.result.kind == Kind::kEdited) {
     is_left = Holds(row.result, row.left);
@@ -72,6 +73,24 @@ void JudgeRow(ReportRow& row, const SideWords& sides) {
                           : "Neither side's new order was taken";
 }
 
+bool IsToldByElements(const ReportRow& list, const std::vector<ReportRow>& rows) {
+  if (list.base.node == nullptr || list.base.node->AsSequence() == nullptr) return false;
+  constexpr ReportCell ReportRow::*kVersions[] = {&ReportRow::left, &ReportRow::right, &ReportRow::committed};
+  return std::ranges::all_of(kVersions, [&](const auto version) {
+    const ReportCell& edits = list.*version;
+    if (edits.kind == Kind::kUnchanged) return true;
+    size_t told = 0;
+    for (const ReportRow& row : rows) {
+      const bool is_element = row.path.size() == list.path.size() + 1 &&
+                              std::equal(list.path.begin(), list.path.end(), row.path.begin());
+      const ReportCell& cell = row.*version;
+      if (!is_element || cell.kind == Kind::kUnchanged || cell.text == kSeeList) continue;
+      told += cell.kind == Kind::kChanged ? 2 : 1;
+    }
+    return edits.kind == Kind::kEdited && std::ranges::is_sorted(edits.order) && Edits(edits).size() <= told;
+  });
+}
+
 std::string InWordsOfPeople(std::string_view state) {
   const size_t word = state.rfind(' ') + 1;
   const std::string_view side = state.substr(word);
@@ -79,18 +98,22 @@ std::string InWordsOfPeople(std::string_view state) {
   return std::string(state.substr(0, word)) + std::string(known);
 }
 
-void TellApart(ReportRow& row, ObjectNames& names) {
-  ReportCell* const cells[] = {&row.base, &row.left, &row.right, &row.result, &row.committed};
-  const auto looks_like_another = [&](const ReportCell* cell) {
-    return !cell->shown.empty() && std::ranges::any_of(cells, [&](const ReportCell* other) {
-      return other->shown == cell->shown && (other->text != cell->text || other->full != cell->full);
+void TellApart(ReportRow& row, VersionNames& names) {
+  constexpr ReportCell ReportRow::*kColumns[] = {&ReportRow::base, &ReportRow::left, &ReportRow::right,
+                                                 &ReportRow::result, &ReportRow::committed};
+  const auto looks_like_another = [&](const auto column) {
+    const ReportCell& cell = row.*column;
+    return !cell.shown.empty() && std::ranges::any_of(kColumns, [&](const auto other_column) {
+      const ReportCell& other = row.*other_column;
+      return other.shown == cell.shown && (other.text != cell.text || other.full != cell.full);
     });
   };
-  if (std::ranges::none_of(cells, looks_like_another)) return;
-  for (ReportCell* cell : cells) {
+  if (std::ranges::none_of(kColumns, looks_like_another)) return;
+  for (const auto column : kColumns) {
+    ReportCell& cell = row.*column;
     // Of a list's edits, the exact text has the file IDs.
-    cell->shown.clear();
-    if (cell->kind != Kind::kEdited) ShowNamed(*cell, names, NamedWith::kFileIDs);
+    cell.shown.clear();
+    if (cell.kind != Kind::kEdited) ShowNamed(cell, names.In(column).own, NamedWith::kFileIDs);
   }
 }
 

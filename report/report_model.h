@@ -9,6 +9,8 @@
 
 namespace vexel_yaml {
 
+class VersionNames;
+
 /// What stands at one place in one version, or what was done there.
 struct ReportCell {
   /// kEdited: only parts of it changed, and the text says which.
@@ -31,9 +33,11 @@ struct ReportCell {
   /// The value itself, of which `text` is for people; null where there is none. Of the documents' life.
   const YAMLNode* node = nullptr;
 
-  bool operator==(const ReportCell& other) const {
-    return kind == other.kind && text == other.text && full == other.full && shown == other.shown;
+  /// Whatever things are called in the other version.
+  bool HasSameValue(const ReportCell& other) const {
+    return kind == other.kind && text == other.text && full == other.full;
   }
+  bool operator==(const ReportCell& other) const { return HasSameValue(other) && shown == other.shown; }
 };
 
 /// One place in an object.
@@ -85,9 +89,10 @@ struct SideWords {
 
 /// Everything a merge did, object by object: those with conflicts first, then by their names. `names` must
 /// know the objects of the versions and of the result.
-std::vector<ReportObject> CollectReport(const MergedFiles& files, ObjectNames& names, const SideWords& sides);
+std::vector<ReportObject> CollectReport(const MergedFiles& files, VersionNames& names,
+                                        const SideWords& sides);
 /// What knows the objects of the versions and of the result.
-ObjectNames NamesOf(const MergedFiles& files);
+VersionNames NamesOf(const MergedFiles& files);
 
 /// How the line of a list's edits begins that shows its new order.
 inline constexpr std::string_view kNewOrder = "new order: ";
@@ -98,6 +103,13 @@ inline constexpr std::string_view kChangedInside = "changed inside";
 /// got lost.
 void JudgeRow(ReportRow& row, const SideWords& sides);
 
+/// The text of an element that can't be told from others in a version of its list.
+inline constexpr std::string_view kSeeList = "see the list";
+
+/// Whether the rows of its elements tell all that a list's row does. An element that nothing identifies has
+/// gone for the list, and another one has come, where it was changed.
+bool IsToldByElements(const ReportRow& list, const std::vector<ReportRow>& rows);
+
 /// How the state of a conflict begins that is settled.
 inline constexpr std::string_view kSettled = "settled: ";
 
@@ -105,7 +117,7 @@ inline constexpr std::string_view kSettled = "settled: ";
 std::string InWordsOfPeople(std::string_view state);
 
 /// Gives values of a row that only look the same what tells them apart.
-void TellApart(ReportRow& row, ObjectNames& names);
+void TellApart(ReportRow& row, VersionNames& names);
 
 /// Why a record is about components that need or exclude one another, from its side's point of view; empty
 /// for other records.

@@ -24,7 +24,7 @@ void ReportRows::MarkAbove(const ReportRow& row) {
     path.pop_back();
     ReportRow* const whole = Find(path);
     if (whole == nullptr) continue;
-    for (const auto cell : {&ReportRow::left, &ReportRow::right, &ReportRow::result}) {
+    for (const auto cell : {&ReportRow::left, &ReportRow::right, &ReportRow::result, &ReportRow::committed}) {
       if ((row.*cell).kind == ReportCell::Kind::kUnchanged) continue;
       if ((whole->*cell).kind == ReportCell::Kind::kUnchanged) whole->*cell = ChangedInside();
       (whole->*cell).parts_changed = true;

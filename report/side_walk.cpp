@@ -47,9 +47,7 @@ const YAMLNode* ValueAt(const YAMLNode* node, const YAMLScalar* key) {
 bool FitsIntoLine(const YAMLNode* element) {
   if (element == nullptr) return true;
   if (const YAMLScalar* scalar = element->AsScalar()) return scalar->GetText().size() <= kMostOfElement;
-  const YAMLMapping* mapping = element->AsMapping();
-  return mapping != nullptr && !mapping->HasDuplicateKeys() &&
-         (IsReference(mapping) || (mapping->Size() == 1 && IsReference(mapping->First())));
+  return ReferenceIn(element) != nullptr;
 }
 
 const YAMLNode* ElementAt(const YAMLSequence& sequence, size_t index) {
@@ -68,7 +66,7 @@ void ShowNamed(ReportCell& cell, ObjectNames& names, NamedWith with) {
   }
 }
 
-ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, ObjectNames& names) {
+ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, CellNames names) {
   ReportCell cell{kind, {}, {}};
   cell.node = node;
   if (const YAMLMapping* fields = FieldsToCount(path, node)) {
@@ -77,13 +75,13 @@ ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Ki
     return cell;
   }
   const YAMLSequence* list = node == nullptr ? nullptr : node->AsSequence();
-  ShowNamed(cell, names, NamedWith::kNothing);
+  ShowNamed(cell, names.own, NamedWith::kNothing);
   if (list != nullptr && list->Size() > kMostElements) {
     cell.text = std::to_string(list->Size()) + " elements";
     cell.full = FullText(*list);
     return cell;
   }
-  cell.text = ValueText(node, names, kMostOfValue);
+  cell.text = ValueText(node, names.common, kMostOfValue);
   if (cell.shown == cell.text) cell.shown.clear();
   if (node == nullptr || !cell.text.ends_with(kEllipsis)) return cell;
   cell.full = FullText(*node);
@@ -142,7 +140,7 @@ void SideWalk::WalkList(const ChangeSequenceOperation& operation, const YAMLSequ
   edits.node = &to;
   bool shortened = false;
   const auto add = [&](std::string_view word, const YAMLNode* value, const std::string& named) {
-    const std::string whole = OnOneLine(ValueText(value, names_, std::string::npos));
+    const std::string whole = OnOneLine(ValueText(value, names_.common, std::string::npos));
     const std::string start = Shortened(whole, kMostOfElement);
     shortened |= start.size() < whole.size();
     const std::string_view line_break = edits.text.empty() ? "" : "\n";
@@ -150,8 +148,8 @@ void SideWalk::WalkList(const ChangeSequenceOperation& operation, const YAMLSequ
     edits.full.append(line_break).append(word).append(whole);
     edits.shown.append(line_break).append(word).append(named);
   };
-  const std::vector<std::string> before = NamedElements(from, names_);
-  const std::vector<std::string> after = NamedElements(to, names_);
+  const std::vector<std::string> before = NamedElements(from, names_.own);
+  const std::vector<std::string> after = NamedElements(to, names_.own);
   const auto add_edit = [&](std::string_view word, const YAMLSequence& list, size_t index) {
     const std::vector<std::string>& named = &list == &from ? before : after;
     add(word, ElementAt(list, index), index < named.size() ? Shortened(named[index], kMostOfElement) : "");

@@ -22,7 +22,7 @@ class SideWalk {
   /// Operations whose records have another path than the place that shows them.
   using Places = std::unordered_map<const Operation*, FieldPath>;
 
-  SideWalk(ObjectNames& names, Found found, Gone gone, Places* places)
+  SideWalk(CellNames names, Found found, Gone gone, Places* places)
       : names_(names), found_(std::move(found)), gone_(std::move(gone)), places_(places) {}
 
   /// Walks over the changes that make `to` of `from`, both whole files.
@@ -36,7 +36,7 @@ class SideWalk {
   void MarkGone(size_t index);
   void RememberInner(const Operation& operation);
 
-  ObjectNames& names_;
+  const CellNames names_;
   Found found_;
   Gone gone_;
   Places* places_;
@@ -49,6 +49,6 @@ class SideWalk {
 void ShowNamed(ReportCell& cell, ObjectNames& names, NamedWith with);
 
 /// What `node` is at `path`: a whole object counts its fields.
-ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, ObjectNames& names);
+ReportCell ValueCell(const FieldPath& path, const YAMLNode* node, ReportCell::Kind kind, CellNames names);
 
 }  // namespace vexel_yaml

@@ -124,15 +124,6 @@ class ValueWriter {
   std::string text_;
 };
 
-// The reference that an element of a list consists of, as it is or, as in a list of components, under a name
-// of its own; else null.
-const YAMLNode* ReferenceIn(const YAMLNode* element) {
-  if (IsReference(element)) return element;
-  const YAMLMapping* entry = element == nullptr ? nullptr : element->AsMapping();
-  if (entry == nullptr || entry->HasDuplicateKeys() || entry->Size() != 1) return nullptr;
-  return IsReference(entry->First()) ? entry->First() : nullptr;
-}
-
 std::string Joined(const std::vector<std::string>& texts, std::string_view separator) {
   std::string joined;
   for (const std::string& text : texts) joined.append(joined.empty() ? "" : separator).append(text);

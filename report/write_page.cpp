@@ -141,7 +141,8 @@ void WriteRow(std::ostream& out, const PageHead& head, const ReportRow& row) {
   out << "<td class=\"state\">";
   if (!row.state.empty()) out << "<span>" << StateWords(head, row.state) << "</span>";
   if (row.repaired && row.state != "repaired") out << " <span>repaired</span>";
-  if (row.pending) WriteRecordPath(out, row.record_path);
+  // Once it is committed, nobody settles it any more.
+  if (row.pending && !head.shows_committed) WriteRecordPath(out, row.record_path);
   out << "</td></tr>\n";
 }
 
@@ -310,7 +311,8 @@ void WritePage(std::ostream& out, const PageHead& head, const std::vector<Report
   WriteSummary(out, head, objects);
   out << "</header>\n";
   if (!objects.empty()) WriteFilters(out, head, objects.size());
-  out << (head.are_theirs_and_ours ? "<main class=\"named\">\n" : "<main>\n");
+  out << "<main class=\"" << (head.are_theirs_and_ours ? "named " : "")
+      << (head.shows_committed ? "with-committed" : "") << "\">\n";
   for (const ReportObject& object : objects) WriteObject(out, head, object);
   if (objects.empty()) {
     out << "<p class=\"empty\">Nothing changed.</p>\n";

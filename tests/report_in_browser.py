@@ -51,6 +51,13 @@ def main(reporter):
                               ".slice(0, 4).map(e => e.textContent.trim())")
             expect("base, left, right and result of the conflict", row, ["2", "3", "5", "2"])
 
+            subprocess.run([reporter, "-o", "committed.html", "--committed", "left", *versions], cwd=folder, check=True)
+            page.call("window/rect", width=1300, height=900)
+            page.call("url", url=f"file://{folder}/committed.html")
+            columns = page.script("return Array.from(document.querySelectorAll('[data-file-id=\"12\"] thead th'), e => e.offsetWidth)")
+            expect("each of the columns of a finished merge has room", [width for width in columns if width < 100], [])
+            page.call("url", url=f"file://{folder}/page.html")
+
             expect("at first", shown(page), (["12", "31", "32", "33"], "4 of 4 objects"))
             page.click("input[name=kind][value=conflict]")
             expect("conflicts", shown(page), (["12"], "1 of 4 objects"))

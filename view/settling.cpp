@@ -171,9 +171,8 @@ void Settling::TakeOver(const EditGroups::Group& group, const MergedFiles& part)
 }
 
 void Settling::RenewNames() {
-  std::vector<const VexelObjects*> versions = {&versions_.right, &versions_.left, &versions_.base};
-  if (files_.merged != nullptr) versions.insert(versions.begin(), files_.merged.get());
-  names_.emplace(std::move(versions));
+  names_.emplace(
+      VersionNames::Versions{&versions_.base, &versions_.left, &versions_.right, files_.merged.get()});
   names_->SetAssetNames(assets_);
 }
 
@@ -181,7 +180,7 @@ std::vector<ReportCard> Settling::MakeCardsOf(const MergedFiles& files) {
   std::vector<ReportObject> objects = CollectReport(files, *names_, NamesInNotes(file_));
   if (FindAssets(objects)) objects = CollectReport(files, *names_, NamesInNotes(file_));
   ShowSettledByHand(objects);
-  return MakeCards(std::move(objects), *names_);
+  return MakeCards(std::move(objects), names_->Latest());
 }
 
 // Its record is still pending, since none of the sides counts there.
@@ -216,7 +215,7 @@ bool Settling::FindAssets(const std::vector<ReportObject>& objects) {
   if (file_.asset_search == nullptr) return false;
   std::set<std::string> guids;
   for (const ReportObject& object : objects) {
-    guids.insert(names_->GetScriptGuid(object.file_id));
+    guids.insert(names_->Latest().GetScriptGuid(object.file_id));
     for (const ReportRow& row : object.rows) {
       for (const ReportCell* cell : {&row.base, &row.left, &row.right, &row.result})
         CollectGuids(cell->node, guids);

@@ -11,6 +11,7 @@
 
 #include "report/conflict_names.h"
 #include "report/report_cards.h"
+#include "report/version_names.h"
 #include "view/choices.h"
 #include "view/edit_groups.h"
 
@@ -79,7 +80,7 @@ class Settling {
   const std::vector<SceneNote>& GetNotes() const { return files_.notes; }
   /// What was merged since the last call, in that order. The cards' nodes live until the next step.
   std::vector<Shown> TakeShown() { return std::move(shown_); }
-  ObjectNames& GetNames() { return *names_; }
+  VersionNames& GetNames() { return *names_; }
 
   /// Keeps the result with `ViewFile::store`. Throws std::runtime_error with a text for people where
   /// something is pending, or where it can't be kept.
@@ -123,7 +124,7 @@ class Settling {
   Choices choices_;
   AssetNames assets_;
   std::set<std::string> looked_for_;
-  std::optional<ObjectNames> names_;
+  std::optional<VersionNames> names_;
   std::vector<Shown> shown_;
   std::unordered_map<const YAMLScalar*, Places> objects_;
   /// What can be chosen about, and in how many rows.

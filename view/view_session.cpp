@@ -189,7 +189,7 @@ Json StandOf(const ViewFile& file, Settling& settling) {
   Json notes = Json::array();
   if (!file.note.empty()) notes.push_back(OnOneLine(file.note));
   for (const SceneNote& note : settling.GetNotes())
-    notes.push_back(NamedNote(note.text, settling.GetNames()));
+    notes.push_back(NamedNote(note.text, settling.GetNames().Latest()));
   return {{"revision", settling.GetRevision()},
           {"pending", settling.CountPending()},
           {"conflicts", settling.CountConflicts()},

@@ -163,8 +163,18 @@ TEST(Report, ShowsWhatARecordIsAboutAsOneValue) {
   const std::string page =
       PageOf(keys + script("2", "10"), keys + script("5", "20"), keys + script("7", "30"), {"--safe"});
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.speeds.1"), "speeds.1|2|5|7|2|conflict1.MonoBehaviour.speeds.1|");
-  EXPECT_THAT(Row(page, 1, "MonoBehaviour.speeds"), HasSubstr("|in conflict|"));
+  EXPECT_THAT(page, Not(HasSubstr("data-path=\"MonoBehaviour.speeds\"")));
   EXPECT_EQ(Row(page, 1, "MonoBehaviour.key"), "key|A|B|C|A|conflict1.MonoBehaviour.key.fileID|");
+}
+
+TEST(Report, NamesThingsInEachColumnAsItsVersionDoes) {
+  const auto scene = [](const std::string& name, const std::string& key) {
+    return Lamp(10, name, 0) + Object(114, 1, "MonoBehaviour", "key: " + key + "\n  keys: [" + key + "]");
+  };
+  const std::string page =
+      PageOf(scene("A", "{fileID: 0}"), scene("A", "{fileID: 10}"), scene("B", "{fileID: 0}"), {"--safe"});
+  EXPECT_EQ(Row(page, 1, "MonoBehaviour.key"), "key|none|A|unchanged|B|from left|");
+  EXPECT_THAT(Row(page, 1, "MonoBehaviour.keys"), HasSubstr("+ A|unchanged|- none\n+ B|from left|"));
 }
 
 TEST(Report, TellsThingsOfOneNameApart) {
@@ -193,6 +203,15 @@ TEST(Report, TellsTheWholeFromItsParts) {
   EXPECT_THAT(Row(page, 5, ""), HasSubstr("|removed |changed inside|1 fieldm_Name: Lamp|conflict5|"));
   EXPECT_EQ(Row(page, 5, "GameObject.m_Name"), "m_Name|Lamp|removed |Bulb|Lamp|in conflict|");
   EXPECT_THAT(Row(page, 24, ""), HasSubstr("|from left|"));
+}
+
+TEST(Report, TakesAwayTogetherWhatWasRemovedTogether) {
+  const std::string pier = Lamp(10, "Pier", 0);
+  const std::string page =
+      PageOf(pier + Lamp(20, "Lamp", 14), pier, pier + Lamp(20, "Lamp", 14, "m_Range: 2"), {"--safe"});
+  EXPECT_THAT(Row(page, 20, ""), HasSubstr("|conflict20|"));
+  EXPECT_THAT(Row(page, 24, ""),
+              AllOf(HasSubstr("Goes with the conflict at Pier/Lamp|"), HasSubstr("|in conflict|")));
 }
 
 }  // namespace
