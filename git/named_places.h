@@ -18,7 +18,8 @@ struct NamedPlace {
 /// it is in.
 bool IsMeant(const NamedPlace& place, const std::string& wanted);
 
-/// What somebody may have meant who has named none of these places, with its question; else empty.
+/// What somebody may have meant who has named none of these places, as a question; where nothing is near,
+/// what there is.
 std::string SuggestionFor(const std::string& wanted, const std::vector<NamedPlace>& places);
 
 }  // namespace vexel_yaml

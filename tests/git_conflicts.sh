@@ -269,6 +269,11 @@ check "or that of its object" stops vexel-merge-git resolve --ours --path Lamp "
 check "which settles all of that" is_at 9 20 3 1
 check "a name that is nowhere is an error" stops vexel-merge-git resolve --ours --path PrefabInstnace "$file"
 check "which names the nearest one" says "error: no conflict in $file fits 'PrefabInstnace'; did you mean 'PrefabInstance 20'?"
+check "also for a part of one" stops vexel-merge-git resolve --ours --path Opener "$file"
+check "with all of it" says "error: no conflict in $file fits 'Opener'; did you mean 'Lamp > DoorOpener'?"
+check "what is far from everything is an error" stops vexel-merge-git resolve --ours --path Lighthouse "$file"
+check "which says what there is" says \
+  "error: no conflict in $file fits 'Lighthouse'; in conflict: PrefabInstance 20 > m_LocalPosition.x of 401, Lamp > DoorOpener > speed, Lamp > Light > m_Intensity"
 git merge --abort
 
 # Lines about a vector, and about what base lacks.

@@ -96,6 +96,10 @@ def settle_and_save(bench):
         "return getComputedStyle(document.querySelector(arguments[0] + ' .swatch span')).backgroundColor",
         view.tile(COLOUR, "theirs")), "rgb(255, 128, 0)")
 
+    expect("what a terminal calls it is there", page.script(
+        "return document.querySelector(`[data-path='${arguments[0]}'] th`).title", COLOUR),
+        f"Light.m_Color; in a terminal: --path '{COLOUR}'")
+
     page.keys([CONTROL, "s"])
     expect("which is said", view.text("#notice p"), "It can't be saved yet: 3 conflicts still open.")
     page.click(view.tile(LAMP, "theirs"))

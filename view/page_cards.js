@@ -80,6 +80,8 @@ function makeRow(object, row, {names, merging, alike, fresh}) {
   const head = make("th", "", row.label || row.field || "whole object");
   head.scope = "row";
   if (row.note) head.append(make("small", "", row.note));
+  // People read labels; commands and files have the field's own name.
+  head.title = [row.property, row.path && `in a terminal: --path '${row.path.replaceAll("'", "'\\''")}'`].filter(Boolean).join("; ");
   element.append(head);
   const settles = row.path !== undefined;
   if (settles) {
