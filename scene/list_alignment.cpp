@@ -1,11 +1,9 @@
 #include "scene/list_alignment.h"
 
 #include <algorithm>
-#include <unordered_map>
-#include <unordered_set>
 
-#include "rules/element_keys.h"
-#include "scene/element_ids.h"
+#include "rules/yaml_sequence_remapper.h"
+#include "scene/list_numbers.h"
 #include "scene/side_match.h"
 
 namespace vexel_yaml {
@@ -13,86 +11,6 @@ namespace vexel_yaml {
 namespace {
 
 using Ids = std::vector<uint32_t>;
-
-// Three lists as numbers: equal ones for what has the same key or, without keys, the same content.
-struct NumberedLists {
-  Ids base;
-  Ids left;
-  Ids right;
-  size_t id_count = 0;
-  // Whether all elements are references, or have the file ID of one.
-  bool are_references = false;
-  // What refers to nothing. An empty slot is known by its place alone: with keys, each has its own number.
-  std::unordered_set<uint32_t> empty = {};
-};
-
-class KeyNumbers {
- public:
-  KeyNumbers(const std::vector<FieldPath>& key_paths, bool has_slots, NumberedLists& lists)
-      : reader_(key_paths), has_slots_(has_slots), lists_(lists) {}
-
-  // False where an element has no key, or shares it.
-  bool Number(const YAMLSequence& list, Ids& ids) {
-    std::unordered_set<const YAMLScalar*> seen;
-    for (const YAMLNode* element : list.GetItems()) {
-      const YAMLScalar* key = reader_.Read(element);
-      if (key == nullptr || !seen.insert(key).second) return false;
-      if (has_slots_ && key == YAMLScalar::zero) {
-        ids.push_back(static_cast<uint32_t>(lists_.id_count++));
-        lists_.empty.insert(ids.back());
-        continue;
-      }
-      const auto [known, is_new] = known_.emplace(key, static_cast<uint32_t>(lists_.id_count));
-      if (is_new) ++lists_.id_count;
-      ids.push_back(known->second);
-    }
-    return true;
-  }
-
- private:
-  const ElementKeyReader reader_;
-  const bool has_slots_;
-  NumberedLists& lists_;
-  std::unordered_map<const YAMLScalar*, uint32_t> known_;
-};
-
-// Whether what one side put in the place of an element may be taken for its slot.
-bool HasSlots(const std::vector<FieldPath>& key_paths) {
-  return key_paths.empty() || &key_paths == &YAMLSequenceRemapper::defaultPath;
-}
-
-std::optional<NumberedLists> NumberByKeys(const std::vector<FieldPath>& key_paths, const YAMLSequence& base,
-                                          const YAMLSequence& left, const YAMLSequence& right) {
-  if (key_paths.empty()) return std::nullopt;
-  NumberedLists lists;
-  KeyNumbers numbers(key_paths, HasSlots(key_paths), lists);
-  if (!numbers.Number(base, lists.base) || !numbers.Number(left, lists.left) ||
-      !numbers.Number(right, lists.right)) {
-    return std::nullopt;
-  }
-  lists.are_references = HasSlots(key_paths);
-  return lists;
-}
-
-NumberedLists NumberByContent(const std::vector<FieldPath>& key_paths, const YAMLSequence& base,
-                              const YAMLSequence& left, const YAMLSequence& right) {
-  ElementIds ids;
-  NumberedLists lists = {ids.Of(base), ids.Of(left), ids.Of(right)};
-  lists.id_count = ids.Count();
-  lists.are_references = !key_paths.empty() && HasSlots(key_paths);
-  const ElementKeyReader reader(key_paths);
-  const auto look_at = [&](const YAMLSequence& list, const Ids& numbers) {
-    for (size_t i = 0; lists.are_references && i < numbers.size(); ++i) {
-      const YAMLScalar* key = reader.Read(list.GetItems()[i]);
-      if (key == nullptr) lists.are_references = false;
-      if (key == YAMLScalar::zero) lists.empty.insert(numbers[i]);
-    }
-  };
-  look_at(base, lists.base);
-  look_at(left, lists.left);
-  look_at(right, lists.right);
-  return lists;
-}
 
 // Where each number occurs in one list, and how often.
 struct Occurrences {
@@ -167,18 +85,22 @@ class Aligner {
     if (end - begin != last - first || after - begin == before - first) match.Pair(before, after);
   }
 
-  // Whether the empty slot of base went on both sides, and came elsewhere on one of them.
+  // Whether one side moved the empty slot of base, and the other did something else with it.
   bool IsEmptyMoved() const {
-    const auto comes_anew = [this](const Ids& ids, const SideMatch& match) {
+    const auto is_moved = [this](uint32_t base, const Ids& ids, const SideMatch& match) {
+      if (match.ToSide(base) != kNoIndex) return false;
       for (uint32_t i = 0; i < ids.size(); ++i) {
         if (lists_.empty.contains(ids[i]) && match.ToBase(i) == kNoIndex) return true;
       }
       return false;
     };
+    const auto is_kept = [this](uint32_t base, const Ids& ids, const SideMatch& match) {
+      return match.ToSide(base) != kNoIndex && lists_.empty.contains(ids[match.ToSide(base)]);
+    };
     for (uint32_t i = 0; i < lists_.base.size(); ++i) {
       if (!lists_.empty.contains(lists_.base[i])) continue;
-      const bool is_gone = left_.ToSide(i) == kNoIndex && right_.ToSide(i) == kNoIndex;
-      if (is_gone && (comes_anew(lists_.left, left_) || comes_anew(lists_.right, right_))) return true;
+      if (is_moved(i, lists_.left, left_) && !is_kept(i, lists_.right, right_)) return true;
+      if (is_moved(i, lists_.right, right_) && !is_kept(i, lists_.left, left_)) return true;
     }
     return false;
   }

@@ -147,6 +147,7 @@ TEST(SettleValues, WhatBothDidToOneSlotIsAConflict) {
   // Where the lists kept their length, what is more than the slots.
   expect("12", "23", "24", "f", "23", "24");
   EXPECT_EQ(plain.Merge(list("12"), list("123"), list("24")), list("234"));
+  expect("102", "120", "132", "f", "120", "132");
   // Of empty slots none is the same as another one.
   EXPECT_EQ(plain.Merge(list("01"), list("71"), list("80"), kLeft), list("70") + " !f.0");
   EXPECT_EQ(plain.Merge(list("012"), list("702"), list("710")), list("700"));
