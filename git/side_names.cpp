@@ -124,9 +124,13 @@ std::string Picked(const Step& step) {
 
 SideNames NamesInMessage(const std::string& message) {
   constexpr std::string_view kInto = " into ";
-  const size_t begin = message.find('\'');
-  const size_t end = begin == std::string::npos ? begin : message.find('\'', begin + 1);
-  if (!message.starts_with("Merge ") || end == std::string::npos) return {};
+  const size_t begin = std::min(message.find('\''), message.size());
+  const size_t end = message.find('\'', begin + 1);
+  // Others write messages with apostrophes, too.
+  const std::string_view what = std::string_view(message).substr(0, begin);
+  const bool is_gits = what.ends_with("branch ") || what.ends_with("branches ") || what.ends_with("tag ") ||
+                       what.ends_with("commit ");
+  if (!message.starts_with("Merge ") || !is_gits || end == std::string::npos) return {};
   const size_t into = message.find(kInto, end);
   return {Readable(message.substr(begin + 1, end - begin - 1)),
           into == std::string::npos ? std::string() : Readable(message.substr(into + kInto.size()))};

@@ -76,7 +76,7 @@ check "as git does it" git merge -q --no-edit doors
 check "such a merge has a page" vexel-merge-git report HEAD >"$work/pages"
 check "scripts go by their classes there" grep -qF '<span class="class">DoorOpener</span>' "$(cat "$work/pages")"
 check "sides by their branches" grep -qF '<title>Docks.vexel: doors merged into moved (' "$(cat "$work/pages")"
-git commit -q --amend -m "All doors"
+git commit -q --amend -m "Merge Ben's doors, and Ann's"
 check "also where the message doesn't have them" grep -qF ': doors merged into moved (' "$(vexel-merge-git report HEAD)"
 git checkout -q --detach all
 
