@@ -213,21 +213,28 @@ std::string ConflictRecords::Place(RecordEntry entry, const AssetMerge& merge, s
   return places.kept;
 }
 
-void ConflictRecords::TakeAsIs(const std::string& asset, const std::string& hash) const {
-  const FolderLock lock(repository_);
+RecordEntry ConflictRecords::EntryFor(const std::string& asset, const std::string& hash) const {
   RecordEntry entry = Entry(asset);
-  if (entry.asset.empty()) {
-    // What both sides have renamed is remembered by its old name.
-    for (RecordEntry& renamed : Entries()) {
-      if (renamed.hash == hash) entry = std::move(renamed);
-    }
+  if (!entry.asset.empty()) return entry;
+  for (RecordEntry& renamed : Entries()) {
+    if (renamed.hash == hash) return std::move(renamed);
   }
+  return entry;
+}
+
+void ConflictRecords::TakeAsIs(RecordEntry entry, const std::string& hash) const {
   if (entry.asset.empty()) return;
+  const FolderLock lock(repository_);
   entry.hash = hash;
   for (RecordedConflict& conflict : entry.conflicts) conflict.is_settled = true;
   const Places places = PlacesFor(entry.asset);
   WriteEntry(places.entry, entry);
   if (Find(entry.asset) == places.beside) unlink(places.beside.c_str());
+}
+
+std::vector<std::string> ConflictRecords::FilesOf(const std::string& asset) const {
+  const Places places = PlacesFor(asset);
+  return {places.beside, places.kept, places.entry, places.merged};
 }
 
 void ConflictRecords::Remove(const std::string& asset) const {
@@ -242,7 +249,7 @@ void ConflictRecords::RemoveHooks() const {
     // What a killed process has left is no record.
     if (file.substr(file.rfind('/') + 1).starts_with(".vexel-")) unlink(file.c_str());
   }
-  if (rmdir(folder_.c_str()) != 0 || HaveAny()) return;
+  if ((rmdir(folder_.c_str()) != 0 && errno != ENOENT) || HaveAny()) return;
   if (GitQuietly({"config", "--get", "core.hooksPath"}).status != 0) TakeHooksAway(repository_);
 }
 

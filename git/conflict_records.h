@@ -54,8 +54,16 @@ class ConflictRecords {
   bool LeaveUnmerged(RecordEntry entry, const std::function<std::string()>& hash,
                      const MergeSettings& settings) const;
 
-  /// Remembers that everything in the work tree's file is meant to be as it stands.
-  void TakeAsIs(const std::string& asset, const std::string& hash) const;
+  /// The entry of the asset or, since what both sides have renamed is remembered by its old name, of one that
+  /// the merge left as this blob; its asset is empty where there is neither.
+  RecordEntry EntryFor(const std::string& asset, const std::string& hash) const;
+
+  /// Remembers of such an entry that everything in the work tree's file, this blob, is meant to be as it
+  /// stands.
+  void TakeAsIs(RecordEntry entry, const std::string& hash) const;
+
+  /// What an asset's record is kept in, whether it is there or not.
+  std::vector<std::string> FilesOf(const std::string& asset) const;
 
   void Remove(const std::string& asset) const;
 

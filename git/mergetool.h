@@ -8,15 +8,22 @@
 
 namespace vexel_yaml {
 
-/// Called by git mergetool with base, ours, theirs and the file's path: settles it on a page where there is a
-/// display, else by asking in the terminal, else in the editor. What is none of our files goes to the tool
-/// that git would have taken. Git stages the result itself, and restores the file where this fails.
+/// Called by git mergetool, as MergetoolCall says: settles the file on a page where there is a display, else
+/// by asking in the terminal, else in the editor. What is none of our files goes to the tool that git would
+/// have taken. Git stages the result itself, and restores the file where this fails.
 int RunMergetool(const std::vector<std::string>& arguments);
 
-/// The versions that it is called with. Changes their files. Throws CommandError.
-AssetVersions MergetoolVersions(const std::vector<std::string>& arguments);
+struct MergetoolCall {
+  /// Base, ours and theirs come before the file's path.
+  AssetVersions versions;
+  /// The last file that git opens, from the top folder; empty where older settings don't tell.
+  std::string last;
+};
 
-/// Settles them as `choice` says. Returns the exit status.
-int SettleForMergetool(const AssetVersions& versions, const Choice& choice);
+/// What the arguments say. Changes the versions' files. Throws CommandError.
+MergetoolCall ParseMergetool(const std::vector<std::string>& arguments);
+
+/// Settles the file as `choice` says. Returns the exit status.
+int SettleForMergetool(const MergetoolCall& call, const Choice& choice);
 
 }  // namespace vexel_yaml

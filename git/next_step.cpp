@@ -1,5 +1,7 @@
 #include "git/next_step.h"
 
+#include <algorithm>
+
 #include "git/git_call.h"
 #include "git/shown_text.h"
 #include "git/side_names.h"
@@ -24,6 +26,17 @@ GitStep FindNextStep(const Repository& repository, const std::set<std::string>& 
   if (is_there("rebase-apply/applying")) return {"go on with the patches", "git am --continue"};
   if (is_there("rebase-merge") || is_there("rebase-apply")) return rebase;
   return {};
+}
+
+GitStep FindStepAfterMergetool(const Repository& repository, const std::string& settled,
+                               const std::string& last) {
+  GitStep step = FindNextStep(repository, {settled});
+  // Without files of its own, git goes through all of them in this order.
+  const bool goes_on =
+      last.empty() ? std::ranges::any_of(step.open, [&](const std::string& path) { return path > settled; })
+                   : last != settled;
+  if (goes_on && !step.open.empty()) step.command.clear();
+  return step;
 }
 
 void SayNextStep(const GitStep& step) {

@@ -22,6 +22,11 @@ struct GitStep {
 /// staged.
 GitStep FindNextStep(const Repository& repository, const std::set<std::string>& settled = {});
 
+/// The same where git mergetool has asked for one file. It opens one after the other by itself up to `last`,
+/// which is empty where that isn't known: as long as it goes on, the command is empty and some are open.
+GitStep FindStepAfterMergetool(const Repository& repository, const std::string& settled,
+                               const std::string& last);
+
 /// Says it, if there is one.
 void SayNextStep(const GitStep& step);
 

@@ -1,24 +1,31 @@
 #include "git/resolving.h"
 
+#include "git/all_or_nothing.h"
 #include "git/conflict_messages.h"
 #include "git/decision_memory.h"
 #include "git/git_call.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
-#include "platform/ending_signals.h"
 
 namespace vexel_yaml {
 
 namespace {
 
-// Adds the file, and gives it the line ends that the user has set for files of the work tree.
-bool Stage(const std::string& asset) {
-  const std::vector<std::string> add = {"add", "--", ":(literal)" + asset};
-  if (Git(add).status != 0) return false;
+bool Stage(const std::string& asset) { return Git({"add", "--", ":(literal)" + asset}).status == 0; }
+
+// The line ends that the user has set for files of the work tree.
+bool SetLineEnds(const std::string& asset) {
   const ProgramResult checked_out = Git({"cat-file", "--filters", ":0:" + asset});
   if (checked_out.status != 0) return false;
   if (checked_out.output == TextOf("./" + asset)) return true;
-  return PutAsset(asset, checked_out.output) && Git(add).status == 0;
+  return PutAsset(asset, checked_out.output) && Stage(asset);
+}
+
+// Of a file that is staged.
+bool TellResolved(const std::string& asset) {
+  const bool has_line_ends = SetLineEnds(asset);
+  Tell("Resolved " + asset);
+  return has_line_ends;
 }
 
 }  // namespace
@@ -33,7 +40,7 @@ bool Resolving::Resolve(const std::string& asset) {
   AssetVersions versions;
   const bool is_of_one_side = choice_.side == "left" || choice_.side == "right";
   if (stages.LackBase() && is_of_one_side && choice_.pattern.empty()) {
-    return PutAsset(asset, stages.TextOf(choice_.side == "left" ? "3" : "2")) && TakeAsIs(asset);
+    return TakeText(asset, stages.TextOf(choice_.side == "left" ? "3" : "2"));
   }
   if (!stages.Write(scratch_, versions)) return false;
   if (!versions.HasAsset()) {
@@ -56,37 +63,49 @@ bool Resolving::IsCommitted(const std::string& asset) const {
 }
 
 bool Resolving::TakeAsIs(const std::string& asset) {
-  if (HasMarkers(asset)) {
-    Complain(asset + " has conflict markers");
-    return false;
-  }
-  const SignalsHeld held;
-  records_.TakeAsIs(asset, HashOfAsset(asset));
-  if (!Stage(asset)) return false;
-  Tell("Resolved " + asset);
-  return true;
+  if (!HasMarkers(asset)) return TakeText(asset, TextOf("./" + asset));
+  Complain(asset + " has conflict markers");
+  return false;
 }
 
-// Its record stays, in case that somebody changes their mind before the commit. Neither of the two without
-// the other.
+bool Resolving::TakeText(const std::string& asset, const std::string& text) {
+  const std::string hash = HashOfAsset(asset, text);
+  const RecordEntry entry = records_.EntryFor(asset, hash);
+  const auto take = [&] {
+    if (text != TextOf("./" + asset) && !PutAsset(asset, text)) return false;
+    records_.TakeAsIs(entry, hash);
+    return Stage(asset);
+  };
+  return Change(asset, entry.asset.empty() ? asset : entry.asset, take) && TellResolved(asset);
+}
+
+// Its record stays, in case that somebody changes their mind before the commit.
 bool Resolving::Finish(const Settlement& settlement) {
-  const SignalsHeld held;
   const std::string& asset = settlement.entry.asset;
-  if (!PutAsset(asset, settlement.text)) return false;
-  if (!LeaveRecord(settlement) || !Stage(asset)) return false;
-  Tell("Resolved " + asset);
-  return true;
+  const auto finish = [&] {
+    return PutAsset(asset, settlement.text) && LeaveRecord(settlement) && Stage(asset);
+  };
+  return Change(asset, asset, finish) && TellResolved(asset);
 }
 
 // What is settled already counts when the rest is settled in the engine.
 bool Resolving::LeaveRest(const Settlement& settlement, StageFiles& stages) {
-  const SignalsHeld held;
   const std::string& asset = settlement.entry.asset;
-  if (!PutAsset(asset, settlement.text) || !stages.Unstage()) return false;
-  LeaveRecord(settlement);
+  const auto leave = [&] {
+    return PutAsset(asset, settlement.text) && LeaveRecord(settlement) && stages.Unstage();
+  };
+  if (!Change(asset, asset, leave)) return false;
   Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset + ":");
   SayConflicts(asset, settlement.entry.conflicts);
   return false;
+}
+
+// The file and its record go together, and with them what is staged, as the last step.
+bool Resolving::Change(const std::string& asset, const std::string& recorded,
+                       const std::function<bool()>& change) const {
+  std::vector<std::string> paths = records_.FilesOf(recorded);
+  paths.push_back("./" + asset);
+  return AllOrNothing(paths, change);
 }
 
 bool Resolving::LeaveRecord(const Settlement& settlement) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <string>
 
 #include "git/conflict_records.h"
@@ -23,6 +24,9 @@ class Resolving {
  private:
   bool IsCommitted(const std::string& asset) const;
   bool TakeAsIs(const std::string& asset);
+  bool TakeText(const std::string& asset, const std::string& text);
+  bool Change(const std::string& asset, const std::string& recorded,
+              const std::function<bool()>& change) const;
   bool Finish(const Settlement& settlement);
   bool LeaveRest(const Settlement& settlement, StageFiles& stages);
   bool LeaveRecord(const Settlement& settlement);

@@ -19,6 +19,10 @@ namespace {
 // command alone.
 constexpr std::string_view kTextconvFormat = "1";
 
+// The last one is the file that git's own script opens at the end, which has them all in a variable.
+constexpr std::string_view kMergetoolArguments =
+    " mergetool \"$BASE\" \"$LOCAL\" \"$REMOTE\" \"$MERGED\" \"$(printf %s \"$files\" | tail -n 1)\"";
+
 std::string Variable(const char* name) {
   const char* value = std::getenv(name);
   return value == nullptr ? std::string() : std::string(value);
@@ -118,7 +122,7 @@ std::vector<std::pair<std::string, std::string>> WantedConfiguration() {
                                       " \"$1\" 2>/dev/null || cat -- \"$1\"; }; f"},
           {"diff.vexel.cachetextconv", has_author ? "true" : "false"},
           {"diff.vexel.xfuncname", "^--- (.*)$"},
-          {"mergetool.vexel.cmd", call + R"( mergetool "$BASE" "$LOCAL" "$REMOTE" "$MERGED")"},
+          {"mergetool.vexel.cmd", call + std::string(kMergetoolArguments)},
           {"mergetool.vexel.trustExitCode", "true"},
           {"mergetool.vexel.hideResolved", "false"}};
 }

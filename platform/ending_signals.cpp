@@ -64,4 +64,6 @@ SignalsHeld::~SignalsHeld() {
   if (is_last && waiting != 0) raise(waiting);
 }
 
+void HoldSignalsToTheEnd() { [[maybe_unused]] static const auto* const held = new SignalsHeld; }
+
 }  // namespace vexel_yaml

@@ -27,4 +27,8 @@ class SignalsHeld {
   sigset_t previous_;
 };
 
+/// Holds them back for the rest of the process, which is about to end, and with success: for what its caller
+/// would undo otherwise.
+void HoldSignalsToTheEnd();
+
 }  // namespace vexel_yaml

@@ -116,4 +116,40 @@ git merge -q one >/dev/null 2>&1 || git merge --abort
 rm -f .gitattributes && ln -s ../outside/own .gitattributes && vexel-merge-git disable >/dev/null
 untouched "a hook and attributes that are links"
 check "no name was a command" test -z "$(find "$work" -name pwned)"
+
+# Git itself fails, at one call after the other: what is settled then is settled as a whole, or not at all.
+git init -q -b main "$work/failing" && cd "$work/failing" && vexel-merge-git enable >/dev/null
+scene 2 10 >A.vexel && git add -A && git commit -q -m base && git branch theirs
+scene 4 10 >A.vexel && git commit -q -a -m ours && git checkout -q theirs && scene 3 10 >A.vexel && git commit -q -a -m theirs
+git checkout -q main && { git merge -q theirs >/dev/null 2>&1 || :; }
+for stage in 1 2 3; do git show ":$stage:A.vexel" >"$work/version$stage"; done
+mkdir "$work/fake" && cp -a "$work/failing" "$work/conflict"
+cat >"$work/fake/git" <<FAKE
+#!/bin/sh
+echo >>"$work/calls"
+[ \$(wc -l <"$work/calls") != "\$FAILING" ] || { echo "fatal: a test" >&2; exit \$FAILURE; }
+exec "$(command -v git)" "\$@"
+FAKE
+chmod +x "$work/fake/git"
+state() { cat A.vexel && git ls-files -s && find . -name '*.path' -exec cat {} + && ls ./*.vexel-conflicts 2>/dev/null || :; }
+# settle NUMBER STATUS COMMAND...: with that call of git ending with that status
+settle() {
+  cd "$work" && rm -rf failing && cp -a conflict failing && cd failing && : >"$work/calls" && status=0
+  FAILING=$1 FAILURE=$2 PATH="$work/fake:$PATH" "${@:3}" >/dev/null 2>"$work/err" || status=$?
+}
+for command in "resolve --theirs A.vexel" "resolve --as-is A.vexel" "mergetool $work/version1 $work/version2 $work/version3 A.vexel"; do
+  sed -i 's/^# theirs.ours.base/theirs/' "$work/conflict/A.vexel.vexel-conflicts"
+  # shellcheck disable=SC2086
+  settle 0 0 vexel-merge-git $command
+  state >"$work/settled" && calls=$(wc -l <"$work/calls")
+  check "nothing fails by itself" test $status -eq 0
+  for ((call = 1; call <= calls; ++call)); do
+    for failure in 127 128; do
+      # shellcheck disable=SC2086
+      settle $call $failure vexel-merge-git $command
+      check "nothing is settled by halves: $command, call $call, status $failure" eval \
+        'cmp -s <(state) "$work/settled" || { cmp -s <(state) <(cd ../conflict && state) && [ $status -ne 0 ] && [ -s "$work/err" ]; }'
+    done
+  done
+done
 end_of_checks "git merges in a hostile repository"

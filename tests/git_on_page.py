@@ -61,7 +61,11 @@ def settle_as_browser(side, address):
     # The first address leads to the page's own.
     page = Page(urllib.request.urlopen(address, timeout=60).geturl())
     page.take(side)
-    if page.save()[0] != 200:
+    status, answer = page.save()
+    with Path(os.environ["HOME"], "next").open("a") as said:
+        said.write(answer.get("next_step", {}).get("command") or "git goes on")
+        said.write("\n")
+    if status != 200:
         page.post("give-up")
 
 
@@ -228,12 +232,20 @@ def check_unreadable():
     expect("what is still in conflict", [is_unmerged(file) for file in ("A.vexel", "B.vexel")], [True, False])
 
 
+def said_next():
+    said = Path(os.environ["HOME"], "next")
+    lines = said.read_text().splitlines()
+    said.unlink()
+    return lines
+
+
 def check_mergetool(browser):
     run("git", "config", "rerere.enabled", "false")
     conflict()
     tool = ("git", "-c", "mergetool.keepBackup=false", "mergetool", "--no-prompt")
     page = {"DISPLAY": ":none", "BROWSER": f"{browser} theirs"}
     run(*tool, "B.vexel", **page)
+    expect("how to go on where git has opened the last of the named files", said_next(), ["vexel-merge-git resolve"])
     expect("the file", (Path("B.vexel").read_text(), is_unmerged("B.vexel")), (SCENE.format(4, 10), False))
     run(*tool, "A.vexel", status=1, GIT_EDITOR="true", CI="true", **page)
     expect("a file on a build server", is_unmerged("A.vexel"), True)
@@ -243,6 +255,10 @@ def check_mergetool(browser):
     vim.chmod(0o755)
     run(*tool, "notes.txt", EDITOR="vim", PATH=f"{vim.parent}:{os.environ['PATH']}")
     expect("a file of another kind", (Path("notes.txt").read_text(), is_unmerged("notes.txt")), ("settled\n", False))
+    conflict()
+    run("git", "add", "notes.txt")
+    run(*tool, **page)
+    expect("how to go on where git opens another one", said_next(), ["git goes on", "git commit"])
 
 
 def check_review():

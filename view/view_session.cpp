@@ -386,7 +386,11 @@ std::string ViewSession::Save(std::string_view body) {
   const size_t next = FirstToSettle(NumberAt(request, "file"));
   is_over_ = next == files_.size();
   Json answer = {{"saved", true}, {"next", is_over_ ? Json() : Json(next)}, {"unread", GetUnread()}};
-  if (is_over_ && guide_.when_saved) answer["next_step"] = JsonOf(guide_.when_saved());
+  try {
+    if (is_over_ && guide_.when_saved) answer["next_step"] = JsonOf(guide_.when_saved());
+  } catch (const std::runtime_error&) {
+    // What is saved is saved, also where nobody knows how to go on.
+  }
   return Dump(answer);
 }
 

@@ -19,8 +19,8 @@ NextStep AfterAll(const GitStep& step) {
 }
 
 NextStep AfterOne(const GitStep& step) {
-  if (step.open.empty()) return AfterAll(step);
-  return InTerminal("Unless git goes on with the next file by itself: ", step.purpose, "git mergetool");
+  if (step.open.empty() || !step.command.empty()) return AfterAll(step);
+  return {"Git opens the next file now."};
 }
 
 NextStep ToComeBack(const std::string& command, const std::vector<std::string>& files) {

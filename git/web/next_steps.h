@@ -11,7 +11,7 @@ namespace vexel_yaml {
 /// How to go on in git once everything on the page is saved.
 NextStep AfterAll(const GitStep& step);
 
-/// The same where git itself goes on, which has asked for one file.
+/// The same for git mergetool, which may go on by itself.
 NextStep AfterOne(const GitStep& step);
 
 /// How to open these files again with a command, or all that are in conflict.

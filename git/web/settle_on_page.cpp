@@ -195,7 +195,8 @@ int ResolveOnPage(const std::vector<std::string>& arguments) {
 }
 
 int MergetoolOnPage(const std::vector<std::string>& arguments) {
-  const AssetVersions versions = MergetoolVersions(arguments);
+  const MergetoolCall call = ParseMergetool(arguments);
+  const AssetVersions& versions = call.versions;
   const MergeSettings settings = SettingsQuery().Get();
   const Repository repository;
   LoadForPage(settings);
@@ -203,10 +204,10 @@ int MergetoolOnPage(const std::vector<std::string>& arguments) {
   ViewFile file = PageFile(versions, settings, repository);
   if (!ShowHandEdits(versions, settings, repository, file)) return 1;
   file.store = [&](const std::string&, const std::string& record) {
-    OrThrow([&] { return SettleForMergetool(versions, choice.Next(record)) == AssetMerge::kMerged; });
+    OrThrow([&] { return SettleForMergetool(call, choice.Next(record)) == AssetMerge::kMerged; });
   };
   ViewGuide guide;
-  guide.when_saved = [&] { return AfterOne(FindNextStep(repository, {versions.asset})); };
+  guide.when_saved = [&] { return AfterOne(FindStepAfterMergetool(repository, versions.asset, call.last)); };
   guide.when_given_up = ToComeBack("git mergetool", {versions.asset});
   return ShowPage({file}, PageOptions({}, true), std::move(guide));
 }

@@ -83,6 +83,7 @@ class Bench:
         self.shell("git init -q -b base out && cd out && git config user.name Test && git config user.email t@localhost"
                    " && git config alias.settle '!vexel-merge-git resolve --theirs a.vexel'"
                    " && git config alias.settle-page '!vexel-merge-git resolve --web a.vexel'"
+                   " && git config mergetool.keepBackup false && git config alias.settle-page-of-tool 'mergetool -y a.vexel'"
                    " && vexel-merge-git enable --patterns '*.vexel' && cp ../in/base.vexel a.vexel && git add -A"
                    " && git commit -q -m base && for side in right clash left; do git checkout -q -b $side base &&"
                    " cp ../in/$side.vexel a.vexel && git commit -q -a -m $side; done && cp -a .git ../git")
