@@ -2,6 +2,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <string_view>
 
@@ -96,6 +97,13 @@ bool PlaceHooks(const Repository& repository) {
     if (!path.empty()) are_placed = PlaceHook(path, hook) && are_placed;
   }
   return are_placed;
+}
+
+bool HaveHooks(const Repository& repository) {
+  return std::ranges::any_of(kHooks, [&](const Hook& hook) {
+    const std::string path = HookPath(repository, hook);
+    return !path.empty() && IsOurs(path, hook);
+  });
 }
 
 void TakeHooksAway(const Repository& repository) {

@@ -18,6 +18,9 @@ bool PlaceHooks(const Repository& repository);
 /// whose hooks git calls, if it isn't the repository's.
 std::vector<std::string> ForeignGuards(const Repository& repository, const std::string& other_folder);
 
+/// Whether any of ours is there.
+bool HaveHooks(const Repository& repository);
+
 /// Takes back what is ours. What somebody has added to it stays.
 void TakeHooksAway(const Repository& repository);
 

@@ -6,6 +6,7 @@
 #include "git/folder_lock.h"
 #include "git/git_call.h"
 #include "git/index_state.h"
+#include "git/record_hook.h"
 #include "git/shown_text.h"
 #include "git/work_files.h"
 
@@ -21,7 +22,8 @@ struct ConflictRecords::IndexState {
 };
 
 void ConflictRecords::Sweep(bool is_committed) const {
-  if (!IsFolder(folder_)) return;
+  // Hooks alone are what a work tree has left that is gone, and its records with it.
+  if (!IsFolder(folder_) && (HaveAny() || !HaveHooks(repository_))) return;
   const FolderLock lock(repository_);
   if (repository_.IsLocked()) return;
   auto paths = PathsInConflict();

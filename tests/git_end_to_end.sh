@@ -278,4 +278,36 @@ check "a file ID is no number" test "$(grep -c '^# theirs.ours.base' "$record")"
 check "the rest is settled" vexel-merge-git resolve --right "$file" >/dev/null
 check "what only one side edited stays" test "$(grep -c ': 7$' "$file")" -eq 2
 
+
+# Patches, the second of which meets what has become of the first.
+git reset -q --hard && git checkout -q darker && scene 1 50 >"$file" && git commit -q -a -m "and wider" && git format-patch -q -o "$work/patches" start
+git checkout -q -B patched ":/^brighter"
+check "a series of patches stops" refuses git am -q -3 "$work"/patches/* >/dev/null 2>&1
+check "it is settled" vexel-merge-git resolve --theirs "$file" >/dev/null 2>"$work/err"
+check "how to go on is said" grep -qFx 'To go on with the patches: git am --continue' "$work/err"
+check "it goes on to its end" git am -q --continue >/dev/null 2>&1
+check "with the choice and the second patch" cmp -s "$file" <(scene 1 50)
+check "and without a trace" has_no_record
+
+# A linked work tree has conflicts, records and a report of its own, and the hooks of the repository.
+tree=$work/tree && git worktree add -q --detach "$tree" ":/^brighter"
+check "a merge in a linked work tree stops" refuses git -C "$tree" merge -q darker >/dev/null 2>&1
+check "with its record there alone" test -e "$tree/$record" -a ! -e "$record"
+check "a commit of it is stopped" refuses git -C "$tree" commit -q -a -m early >/dev/null 2>&1
+check "so is a check" refuses git -C "$tree" -c alias.check='!vexel-merge-git check' check >/dev/null 2>&1
+check "the main one has no conflict" vexel-merge-git check
+git checkout -q wider && scene 7 40 >"$file"
+check "and can commit" git commit -q -a -m elsewhere
+check "a merge there stops, too" refuses git merge -q darker >/dev/null 2>&1
+(cd "$tree" && vexel-merge-git resolve --theirs "$file" >/dev/null 2>&1)
+check "the one is settled" git -C "$tree" commit -q --no-edit
+check "the other one is not" refuses git commit -q -a -m early >/dev/null 2>&1
+check "and is, in its turn" vexel-merge-git resolve --ours "$file" >/dev/null 2>&1
+git commit -q --no-edit
+check "each has its choice" test "$(grep -h Intensity "$tree/$file" "$file" | tr -dc 0-9)" = 17
+check "nothing is left" has_no_record
+git -C "$tree" reset -q --hard HEAD~ && { git -C "$tree" merge -q darker >/dev/null 2>&1 || git worktree remove --force "$tree"; }
+vexel-merge-git status >/dev/null
+check "nor of a work tree that is gone" has_no_record
+
 end_of_checks "git merges through vexel-merge-git"
