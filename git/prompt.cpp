@@ -70,7 +70,11 @@ Prompt::Reply Prompt::Ask(const Question& question) {
         has_quit_ = true;
         return {Answer::kQuit, false};
       default:
-        Help(question);
+        if (line == "k") {
+          Tell("This is the first one: there is none before.");
+        } else {
+          Help(question);
+        }
     }
   }
 }

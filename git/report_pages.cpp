@@ -228,7 +228,8 @@ int RunReportPages(const std::vector<std::string>& arguments) {
                               : "no file of ours is in conflict; name a merge commit");
   }
   if (!page.empty() && assets.size() > 1) {
-    throw CommandError("-o takes one file's page; name its path behind --");
+    throw CommandError("-o takes the page of one file, and there are " + ListOf(assets) +
+                       ": name one behind --, or leave -o out");
   }
   if (!page.empty() && LeavesTop(page)) {
     throw CommandError(parsed.page + " lies behind a symbolic link of the work tree, or is one");

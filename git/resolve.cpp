@@ -4,6 +4,7 @@
 
 #include "git/git_call.h"
 #include "git/next_step.h"
+#include "git/nothing_open.h"
 #include "git/page_call.h"
 #include "git/repository.h"
 #include "git/resolve_arguments.h"
@@ -24,7 +25,7 @@ void AskForWay(ResolveArguments& arguments, Prompt& prompt) {
                 "editor (e) [w,p,e,q]? ",
                 "wpeq")
           : prompt.AskLetter("Settle here, conflict by conflict (p), or in the editor (e) [p,e,q]? ", "peq");
-  if (way == 'q') throw CommandError("nothing is settled");
+  if (way == 'q') throw CommandError("nothing is settled; to go on later: vexel-merge-git resolve");
   arguments.asks = way == 'p';
   arguments.shows_page = way == 'w';
 }
@@ -43,14 +44,19 @@ int RunResolve(const std::vector<std::string>& arguments) {
   ResolveArguments parsed = ParseResolve(arguments);
   if (parsed.shows_page) GoOnOnPage("resolve", arguments);
   Choice& choice = parsed.choice;
-  const bool is_free = choice.side.empty() && !parsed.asks && !choice.as_is && IsConversation();
-  if (parsed.files.empty() && !parsed.asks && !is_free) throw WrongUsage("resolve needs a file");
+  const bool is_free = choice.side.empty() && !parsed.asks && !choice.as_is;
+  const bool can_ask = is_free && IsConversation();
+  if (parsed.files.empty() && !parsed.asks && !is_free)
+    throw WrongUsage("a side and --as-is need a file, or . for all that is in conflict");
   bool is_done = true;
-  const std::set<std::string> assets = FindConflicts(parsed.files, is_done);
+  const std::set<std::string> assets = FindConflicts(parsed, is_done);
   GoToTop();
+  if (assets.empty() && parsed.files.empty()) return SayNothingOpen();
+  if (parsed.files.empty() && is_free && !can_ask)
+    throw CommandError("nobody can be asked without a terminal: say --web or -p, or name a file and a side");
   std::optional<Prompt> prompt;
-  if (!assets.empty() && (parsed.asks || is_free)) prompt.emplace(parsed.colour);
-  if (prompt && is_free) AskForWay(parsed, *prompt);
+  if (!assets.empty() && (parsed.asks || can_ask)) prompt.emplace(parsed.colour);
+  if (prompt && can_ask) AskForWay(parsed, *prompt);
   if (parsed.shows_page) GoOnOnPage("resolve", CallFor(choice, assets));
   if (parsed.asks && prompt) choice.prompt = &*prompt;
   const MergeSettings settings = SettingsQuery().Get();

@@ -32,12 +32,13 @@ std::vector<std::string> StagedConflict(const std::string& pathspec) {
 }
 
 // The conflicts of ours that somebody means who names a path, from here or, as git prints it, from the top.
-std::vector<std::string> NamedConflicts(const std::string& path, const std::string& top) {
+std::vector<std::string> NamedConflicts(const std::string& path, const std::string& top, bool reopens) {
   for (const char* magic : {":(literal)", ":(top,literal)"}) {
     std::vector<std::string> named =
         OursAmong(UnmergedBelow({magic + path}).value_or(std::vector<std::string>()), top);
     if (!named.empty()) return named;
   }
+  if (!reopens) return {};
   // One that is settled and staged can be settled otherwise, if it is meant for sure.
   for (const char* magic : {":(literal)", ":(top,literal)"}) {
     const std::vector<std::string> staged = OursAmong(StagedConflict(magic + path), top);
@@ -97,16 +98,15 @@ ResolveArguments ParseResolve(const std::vector<std::string>& arguments) {
   return parsed;
 }
 
-// All that is in conflict, where no file is named. What is not found has been said, and `is_complete` is
-// false.
-std::set<std::string> FindConflicts(const std::vector<std::string>& files, bool& is_complete) {
+std::set<std::string> FindConflicts(const ResolveArguments& arguments, bool& is_complete) {
+  const std::vector<std::string>& files = arguments.files;
+  const bool reopens = !files.empty() || arguments.asks || arguments.shows_page;
   const std::string top = TopFolder();
   std::set<std::string> assets;
   for (const std::string& file : files.empty() ? std::vector<std::string>{top} : files) {
-    const std::vector<std::string> named = NamedConflicts(file, top);
-    if (named.empty()) {
-      Complain(files.empty() ? "nothing is in conflict that has the attribute merge=vexel"
-                             : file + " is not in conflict, or has no attribute merge=vexel");
+    const std::vector<std::string> named = NamedConflicts(file, top, reopens);
+    if (named.empty() && !files.empty()) {
+      Complain(file + " is not in conflict, or has no attribute merge=vexel");
       is_complete = false;
     }
     assets.insert(named.begin(), named.end());

@@ -25,8 +25,9 @@ struct ResolveArguments {
 /// Throws CommandError.
 ResolveArguments ParseResolve(const std::vector<std::string>& arguments);
 
-/// The files in conflict, from the top folder, that somebody has named; all of them where none is named. What
-/// is not found has been said, and `is_complete` is false.
-std::set<std::string> FindConflicts(const std::vector<std::string>& files, bool& is_complete);
+/// The files in conflict, from the top folder, that somebody has named, also one that is settled and staged;
+/// all of them where none is named, or with -p and --web the only one that was. What is named and not found
+/// has been said, and `is_complete` is false.
+std::set<std::string> FindConflicts(const ResolveArguments& arguments, bool& is_complete);
 
 }  // namespace vexel_yaml

@@ -53,7 +53,8 @@ bool Resolving::Resolve(const std::string& asset) {
   if (settings_.remembers_decisions) {
     DecisionMemory(repository_).Remember(settlement.entry.conflicts, settlement.merge->GetChoices());
   }
-  return settlement.status == AssetMerge::kMerged ? Finish(settlement) : LeaveRest(settlement, stages);
+  if (settlement.status == AssetMerge::kMerged && !choice_.stays_open) return Finish(settlement);
+  return LeaveRest(settlement, stages) && choice_.stays_open;
 }
 
 // Git still knows the stages then.
@@ -95,9 +96,11 @@ bool Resolving::LeaveRest(const Settlement& settlement, StageFiles& stages) {
     return PutAsset(asset, settlement.text) && LeaveRecord(settlement) && stages.Unstage();
   };
   if (!Change(asset, asset, leave)) return false;
-  Say(CountOfConflicts(settlement.entry.CountPending()) + " left in " + asset + ":");
+  const size_t pending = settlement.entry.CountPending();
+  Say(pending == 0 ? "Nothing is open any more in " + asset + ", and it is not staged yet"
+                   : CountOfConflicts(pending) + " left in " + asset + ":");
   SayConflicts(asset, settlement.entry.conflicts);
-  return false;
+  return true;
 }
 
 // The file and its record go together, and with them what is staged, as the last step.

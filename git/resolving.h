@@ -15,8 +15,8 @@ class Resolving {
   Resolving(const Repository& repository, const MergeSettings& settings, const Choice& choice)
       : repository_(repository), settings_(settings), choice_(choice) {}
 
-  /// Resolves a file, and stages it if nothing is left. Returns whether that is so; what else was done, or
-  /// went wrong, has been said.
+  /// Resolves a file, and stages it if nothing is left. Returns whether that is so, or what was chosen is
+  /// kept where the choice leaves it open; what else was done, or went wrong, has been said.
   bool Resolve(const std::string& asset);
 
   void Sweep() const { records_.Sweep(); }

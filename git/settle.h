@@ -30,6 +30,8 @@ struct Choice {
   std::optional<std::string> decided = std::nullopt;
   /// The work tree's file as whoever has decided that has seen it: no other edits are kept unasked.
   std::optional<std::string> seen = std::nullopt;
+  /// Whether the file stays in conflict even if nothing in it is left open.
+  bool stays_open = false;
 };
 
 /// What settling needs to know of the repository.

@@ -50,6 +50,10 @@ class Page:
     def save(self, file=0):
         return self.post("save", file=file, revision=self.state(file)["revision"])
 
+    def choose(self, row, side):
+        choices = [{"path": row["path"], "choice": side}]
+        expect("a choice", self.post("choose", file=0, revision=self.state()["revision"], choices=choices)[0], 200)
+
     def take(self, side, file=0):
         state = self.state(file)
         rows = [row for card in state["cards"] for part in card["objects"] for row in part["rows"] if row["pending"]]
@@ -136,9 +140,46 @@ def check_resolve():
     expect("what is left to do", page.state()["pending"], 0)
     status, answer = page.post("give-up")
     expect("what is left", (answer["left"], answer["next_step"]["command"]),
-           (["A.vexel"], "vexel-merge-git resolve --web 'A.vexel'"))
+           (["A.vexel"], "vexel-merge-git resolve 'A.vexel'"))
     expect("giving up", process.wait(30), 1)
     expect("the file that was given up", is_unmerged("A.vexel"), True)
+
+
+# What is settled can be kept without the rest: by its button, in giving up, and when the page is closed.
+def check_keeping():
+    run("git", "config", "rerere.enabled", "false")
+    run("git", "reset", "-q", "--hard")
+    commit("more", 5, 50, "A.vexel")
+    commit("less", 1, 20, "A.vexel")
+    run("git", "merge", "-q", "more", status=1)
+    process, page = opened("resolve", "--web", "A.vexel")
+    rows = [lamp(page.state(), field) for field in ("m_Intensity", "m_Range")]
+    page.choose(rows[0], "theirs")
+    expect("what isn't saved", page.state()["files"][0]["unsaved"], True)
+    status, answer = page.post("keep", file=0, revision=page.state()["revision"])
+    expect("what is kept", (status, answer["pending"], answer["files"][0]["unsaved"]), (200, 1, False))
+    expect("the file", (Path("A.vexel").read_text(), is_unmerged("A.vexel")), (SCENE.format(5, 10), True))
+    page.choose(rows[1], "base")
+    page.post("give-up")
+    expect("giving up the rest", process.wait(30), 1)
+    process, page = opened("resolve", "--web")
+    expect("what is found again", [lamp(page.state(), row["field"]).get("choice") for row in rows], ["theirs", None])
+    page.choose(rows[0], "ours")
+    page.post("give-up", keep=True)
+    expect("giving up, but keeping", (process.wait(30), Path("A.vexel").read_text()), (1, SCENE.format(1, 10)))
+    process, page = opened("resolve", "--web")
+    page.choose(rows[1], "theirs")
+    with urllib.request.urlopen(f"{page.address}/events", timeout=60):
+        page.post("bye")
+    expect("a page that is closed", (process.wait(30), Path("A.vexel").read_text()), (1, SCENE.format(1, 50)))
+    expect("it is not staged unasked", is_unmerged("A.vexel"), True)
+    process, page = opened("resolve", "--web")
+    write(7, 7, "A.vexel")
+    page.choose(rows[1], "ours")
+    expect("what would lose edits is not kept", page.post("give-up", keep=True)[0], 409)
+    write(1, 50, "A.vexel")
+    page.choose(rows[1], "theirs")
+    expect("what was kept can be saved", (page.save()[0], process.wait(30), is_unmerged("A.vexel")), (200, 0, False))
 
 
 def check_going_on():
@@ -331,6 +372,7 @@ def main():
         check_resolve()
         check_hand_edits()
         check_unreadable()
+        check_keeping()
         check_going_on()
         check_what_cannot_be_shown()
         run("git", "reset", "-q", "--hard")

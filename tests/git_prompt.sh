@@ -46,6 +46,8 @@ check "in one question for the whole object" test "$(asked)" -eq 1
 check "the answers stand" is_at 2 2 2
 check "the file is staged" test -z "$(git ls-files -u)"
 check "how to go on is said" grep -qFx 'To finish the merge: git commit' "$work/err"
+check "and again, without a file" vexel-merge-git resolve 2>"$work/err"
+check "with what was settled" test "$(sed 's/.*: //' "$work/err" | xargs)" = "$file vexel-merge-git resolve $file git commit"
 check "a mind can be changed before the commit" answer sosq
 check "knowing what it was" grep -qFx '  now     theirs' "$work/out"
 check "for one place alone" is_at 2 3 2
@@ -71,6 +73,10 @@ check "and nothing is left to do" refuses grep -q '^To ' "$work/err"
 git reset -q --hard && git stash drop -q && git checkout -q ours
 
 again
+check "without a terminal, somebody is told to say how to settle it" refuses vexel-merge-git resolve 2>"$work/err"
+check "in words" grep -q 'nobody can be asked without a terminal' "$work/err"
+check "nobody goes back from the first one" refuses answer kq
+check "nor needs the whole help for that" grep -qF 'This is the first one: there is none before.' "$work/out"
 check "answers can be taken back" answer tkotkB
 check "the last one counts" is_at 3 1 1
 again

@@ -346,7 +346,8 @@ def ends_where_nobody_can_be_let_in():
         return view.program.kill()
     listening[0].shutdown(socket.SHUT_RDWR)
     expect("the end", view.end(), (1, "as it was\n"))
-    expect("what is said", view.program.stderr.read(), "No more requests of the page can be accepted\n")
+    expect("what is said", view.program.stderr.read(),
+           f"No more requests of the page can be accepted\nNothing is saved: {view.merged} is as it was\n")
     events.close()
 
 

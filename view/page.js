@@ -116,7 +116,9 @@ async function readOthers() {
 function showRest() {
   const open = openShown().length;
   const rest = byId("rest");
-  const what = open === state.pending ? `all ${open} open` : `the ${open} open that are shown`;
+  const isAll = open === state.pending;
+  const count = open === 1 ? "the one" : isAll ? `all ${open}` : `the ${open}`;
+  const what = `${count} open${isAll ? "" : open === 1 ? " that is shown" : " that are shown"}`;
   rest.hidden = state.mode !== "merge" || state.conflicts < 2;
   rest.firstElementChild.textContent = `${capital(what)}:`;
   rest.setAttribute("aria-label", `Take for ${what}`);
@@ -159,6 +161,8 @@ function showHead() {
   byId("previous").disabled = byId("next").disabled = state.conflicts === 0;
   byId("names").textContent = merging ? `${capital(sideTitle(state.names, "theirs"))}, ${sideTitle(state.names, "ours")}` : "";
   byId("save").disabled = whyNotSaved() !== "";
+  byId("keep").hidden = !canKeep();
+  byId("keep").disabled = !state.files[state.file].unsaved;
   byId("save").title = whyNotSaved();
   byId("give-up").textContent = merging ? "Give up" : "Close";
   const options = byId("side").options;

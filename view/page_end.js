@@ -17,23 +17,36 @@ function save() {
   });
 }
 
-const unsavedFiles = () => state.files.filter((file) => file.unsaved).map((file) => file.title);
+// Where it can't be saved yet, what is settled can be kept, if the program says so.
+function keep() {
+  act(async () => {
+    state = await ask("keep", shownNow());
+    showHead();
+    say(`Saved for later: ${state.conflicts - state.pending} of ${state.conflicts} settled. The rest stays open.`, {important: true});
+  });
+}
+
+const canKeep = () => state.pending > 0 && state.files[state.file].can_keep;
+const saveOrKeep = () => (canKeep() ? keep() : save());
+
+const unsavedFiles = () => state.files.filter((file) => file.unsaved);
 
 function giveUp() {
   const unsaved = unsavedFiles();
-  const really = () => act(async () => {
-    const {left, next_step: step} = await ask("give-up", {});
+  const really = (isKept) => act(async () => {
+    const {left, next_step: step} = await ask("give-up", {keep: isKept});
     const words = left.length === 1 ? "This file is still in conflict:" : "These files are still in conflict:";
-    if (left.length > 0) end("Given up", words, left, step);
+    if (left.length > 0) end(isKept ? "Saved for later" : "Given up", words, left, step);
     else end("Closed", "");
   });
-  if (unsaved.length === 0) return really();
+  if (unsaved.length === 0) return really(false);
   const question = byId("question");
   const stay = unsaved.length === 1 ? "the file stays as it was" : "these files stay as they were";
-  question.children[1].textContent = `What you chose for ${unsaved.join(", ")} is lost, and ${stay}.${
+  question.children[1].textContent = `What you chose for ${unsaved.map((file) => file.title).join(", ")} is lost, and ${stay}.${
     state.files.some((file) => file.saved) ? " Files that are saved stay saved." : ""}`;
+  question.querySelector("[value=keep]").hidden = !unsaved.every((file) => file.can_keep);
   question.returnValue = "";
-  question.onclose = () => question.returnValue === "give up" && really();
+  question.onclose = () => question.returnValue !== "" && really(question.returnValue === "keep");
   question.showModal();
 }
 

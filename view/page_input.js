@@ -86,6 +86,7 @@ byId("next").addEventListener("click", () => goBy(1));
 byId("undo").addEventListener("click", () => step("undo", "Undone."));
 byId("redo").addEventListener("click", () => step("redo", "Done again."));
 byId("save").addEventListener("click", save);
+byId("keep").addEventListener("click", keep);
 byId("give-up").addEventListener("click", giveUp);
 byId("keys").addEventListener("click", () => byId("help").showModal());
 
@@ -103,7 +104,7 @@ const letterKeys = {
 const controlKeys = {
   z: (shift) => byId(shift ? "redo" : "undo").click(),
   y: () => byId("redo").click(),
-  s: save,
+  s: saveOrKeep,
 };
 
 document.addEventListener("keydown", (event) => {
@@ -126,7 +127,7 @@ bars.observe(byId("bars"));
 bars.observe(byId("bar"));
 
 window.addEventListener("beforeunload", (event) => {
-  if (!ended && !main.inert && state !== null && unsavedFiles().length > 0) event.preventDefault();
+  if (!ended && !main.inert && state !== null && unsavedFiles().some((file) => !file.can_keep)) event.preventDefault();
 });
 // As JSON it names its origin, without which the program refuses it.
 window.addEventListener("pagehide", () => {

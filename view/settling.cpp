@@ -8,7 +8,6 @@
 #include "report/report_json.h"
 #include "scene/object_links.h"
 #include "scene/scene_versions.h"
-#include "view/finished_file.h"
 #include "view/scene_excerpt.h"
 
 namespace vexel_yaml {
@@ -256,22 +255,28 @@ void Settling::ForgetPlaces(const YAMLScalar* file_id) {
   objects_.erase(found);
 }
 
-void Settling::Save() {
-  if (file_.is_review) throw std::runtime_error("Two versions that are only compared have no result");
+FinishedFile Settling::Finish() const {
   if (!files_.error.empty()) throw std::runtime_error("There is no result: " + files_.error);
-  if (pending_ > 0) {
-    throw std::runtime_error(pending_ == 1 ? "1 conflict is not settled yet"
-                                           : std::to_string(pending_) + " conflicts are not settled yet");
-  }
   try {
-    const FinishedFile finished = FinishFile(whole_, file_.safe, AllResolutions());
-    const auto is_by_hand = [&](const std::string& path) { return file_.settled_by_hand.contains(path); };
-    if (!std::ranges::all_of(finished.pending, is_by_hand))
-      throw std::runtime_error("The whole file has conflicts that its changed parts don't show");
-    file_.store(finished.text, finished.record);
+    return FinishFile(whole_, file_.safe, AllResolutions());
   } catch (const YAMLError& error) {
     throw std::runtime_error(Explained(error));
   }
 }
+
+void Settling::Save() {
+  if (file_.is_review) throw std::runtime_error("Two versions that are only compared have no result");
+  if (pending_ > 0) {
+    throw std::runtime_error(pending_ == 1 ? "1 conflict is not settled yet"
+                                           : std::to_string(pending_) + " conflicts are not settled yet");
+  }
+  const FinishedFile finished = Finish();
+  const auto is_by_hand = [&](const std::string& path) { return file_.settled_by_hand.contains(path); };
+  if (!std::ranges::all_of(finished.pending, is_by_hand))
+    throw std::runtime_error("The whole file has conflicts that its changed parts don't show");
+  file_.store(finished.text, finished.record);
+}
+
+void Settling::Keep() { file_.keep(Finish().record); }
 
 }  // namespace vexel_yaml

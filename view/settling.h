@@ -14,6 +14,7 @@
 #include "report/version_names.h"
 #include "view/choices.h"
 #include "view/edit_groups.h"
+#include "view/finished_file.h"
 
 namespace vexel_yaml {
 
@@ -48,6 +49,9 @@ struct ViewFile {
   /// Keeps a finished file and the text of its record; throws a std::exception or YAMLError that says why it
   /// could not, and then nothing has changed.
   std::function<void(const std::string& text, const std::string& record)> store = {};
+  /// Keeps what is settled so far for the next time, from the record's text, as `store` does. Empty where
+  /// nothing may be written before all is settled.
+  std::function<void(const std::string& record)> keep = {};
 };
 
 /// The settling of one file: read once, merged anew with every choice, as far as that choice goes. For one
@@ -85,6 +89,8 @@ class Settling {
   /// Keeps the result with `ViewFile::store`. Throws std::runtime_error with a text for people where
   /// something is pending, or where it can't be kept.
   void Save();
+  /// Keeps what is settled so far with `ViewFile::keep`, which there must be. Throws as Save does.
+  void Keep();
 
  private:
   // What can be chosen about in one object.
@@ -93,6 +99,7 @@ class Settling {
     std::vector<std::string> paths;
   };
 
+  FinishedFile Finish() const;
   void TakeOverResolutions();
   std::vector<RecordingConflictResolver::RecordResolve> AllResolutions() const;
   void Merge(const std::vector<Choices::Change>& changes);

@@ -152,7 +152,9 @@ int View(Arguments arguments) {
     return NextStep{"What opened this page, such as your version control, goes on by itself now."};
   };
   guide.when_given_up = {"Whatever opened this page opens it again."};
-  return RunViewServer({arguments.file}, arguments.server, std::move(guide));
+  const int status = RunViewServer({arguments.file}, arguments.server, std::move(guide));
+  if (status != 0) WriteErrorLine(OnOneLine("Nothing is saved: " + arguments.merged + " is as it was"));
+  return status;
 }
 
 }  // namespace

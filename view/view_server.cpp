@@ -144,6 +144,9 @@ class ViewServer {
     lifetime_.End();
     server_.End();
     serving.Join();
+    if (!session_.IsOver()) {
+      for (const std::string& error : session_.KeepUnsaved()) WriteErrorLine(error);
+    }
     const std::vector<std::string> unread = session_.GetUnread();
     for (const std::string& error : unread) WriteErrorLine(error);
     return session_.IsFinished() || (is_review_ && unread.empty()) ? 0 : 1;
@@ -211,9 +214,11 @@ class ViewServer {
         if (session_.IsOver()) lifetime_.End();
         return saved;
       });
+    } else if (place == "keep") {
+      Reply(response, [&] { return session_.Keep(body); });
     } else if (place == "give-up") {
       Reply(response, [&] {
-        std::string left = session_.GiveUp();
+        std::string left = session_.GiveUp(body);
         lifetime_.End();
         return left;
       });

@@ -14,51 +14,13 @@
 #include "report/report_json.h"
 #include "report/value_text.h"
 #include "view/card_order.h"
+#include "view/page_request.h"
 
 namespace vexel_yaml {
 
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-Json Parse(std::string_view body) {
-  Json json = Json::parse(body, nullptr, false);
-  if (!json.is_object()) throw RequestError(400, "The request is no JSON object");
-  return json;
-}
-
-size_t NumberAt(const Json& json, const char* key) {
-  const auto found = json.find(key);
-  if (found == json.end() || !found->is_number_unsigned())
-    throw RequestError(400, std::string(key) + " is no number");
-  return found->get<size_t>();
-}
-
-std::string TextAt(const Json& json, const char* key) {
-  const auto found = json.find(key);
-  if (found == json.end() || !found->is_string()) throw RequestError(400, std::string(key) + " is missing");
-  return found->get<std::string>();
-}
-
-Choices::Change ChangeIn(const Json& json) {
-  if (!json.is_object()) throw RequestError(400, "A choice is no JSON object");
-  const std::string path = TextAt(json, "path");
-  const auto choice = json.find("choice");
-  if (choice != json.end() && choice->is_null()) return {path, std::nullopt};
-  const std::string word = TextAt(json, "choice");
-  if (word == "theirs") return {path, MergeResolve::kLeft};
-  if (word == "ours") return {path, MergeResolve::kRight};
-  if (word == "base") return {path, MergeResolve::kBase};
-  throw RequestError(400, "A choice is theirs, ours, base or null");
-}
-
-std::vector<Choices::Change> ChangesIn(const Json& json) {
-  const auto choices = json.find("choices");
-  if (choices == json.end() || !choices->is_array()) throw RequestError(400, "choices is no list");
-  std::vector<Choices::Change> changes;
-  for (const Json& choice : *choices) changes.push_back(ChangeIn(choice));
-  return changes;
-}
 
 std::string Dump(const Json& json) { return json.dump(-1, ' ', false, Json::error_handler_t::replace); }
 
@@ -108,7 +70,11 @@ class ViewSession::OpenFile {
   }
 
   Settling& GetSettling() { return settling_; }
-  bool HasUnsavedChoices() const { return !is_saved_ && settling_.GetChoices().CanUndo(); }
+  bool HasUnsavedChoices() const {
+    const bool has_any =
+        kept_revision_ == 0 ? settling_.GetChoices().CanUndo() : kept_revision_ != settling_.GetRevision();
+    return !is_saved_ && has_any;
+  }
   ObjectCounts Count() const {
     ObjectCounts counts;
     for (const auto& [key, told] : told_) counts.Add(told.card);
@@ -120,6 +86,10 @@ class ViewSession::OpenFile {
   void Save() {
     settling_.Save();
     is_saved_ = true;
+  }
+  void Keep() {
+    settling_.Keep();
+    kept_revision_ = settling_.GetRevision();
   }
 
  private:
@@ -150,6 +120,8 @@ class ViewSession::OpenFile {
   std::vector<std::string> keys_;
   std::unordered_map<std::string, const YAMLScalar*> numbers_;
   bool is_saved_ = false;
+  // 0 where nothing was kept.
+  size_t kept_revision_ = 0;
 };
 
 namespace {
@@ -281,7 +253,8 @@ Json ViewSession::Entry(size_t file) const {
                 {"pending", known ? Json(*known) : Json()},
                 {"saved", open != nullptr && open->IsSaved()},
                 {"error", errors_[file]},
-                {"unsaved", open != nullptr && open->HasUnsavedChoices()}};
+                {"unsaved", open != nullptr && open->HasUnsavedChoices()},
+                {"can_keep", files_[file].keep != nullptr}};
   if (open == nullptr) return entry;
   entry["pending"] = open->GetSettling().CountPending();
   const ObjectCounts counts = open->Count();
@@ -347,7 +320,7 @@ std::string ViewSession::Change(const Json& request, Step step) {
 }
 
 std::string ViewSession::Choose(std::string_view body) {
-  const Json request = Parse(body);
+  const Json request = ParseRequest(body);
   const std::vector<Choices::Change> changes = ChangesIn(request);
   return Change(request, [&](Settling& settling) {
     if (!settling.Choose(changes))
@@ -356,15 +329,41 @@ std::string ViewSession::Choose(std::string_view body) {
 }
 
 std::string ViewSession::Undo(std::string_view body) {
-  return Change(Parse(body), [](Settling& settling) { settling.Undo(); });
+  return Change(ParseRequest(body), [](Settling& settling) { settling.Undo(); });
 }
 
 std::string ViewSession::Redo(std::string_view body) {
-  return Change(Parse(body), [](Settling& settling) { settling.Redo(); });
+  return Change(ParseRequest(body), [](Settling& settling) { settling.Redo(); });
 }
 
-std::string ViewSession::GiveUp() {
+std::string ViewSession::Keep(std::string_view body) {
+  const Json request = ParseRequest(body);
+  OpenFile& open = OpenToChange(request);
+  const size_t file = NumberAt(request, "file");
+  if (files_[file].keep == nullptr) throw RequestError(409, "Nothing is written before all is settled");
+  OrRefuse([&] { open.Keep(); });
+  return Dump(Head(file));
+}
+
+std::vector<std::string> ViewSession::KeepUnsaved() {
+  std::vector<std::string> errors;
+  for (size_t i = 0; i < files_.size(); ++i) {
+    if (files_[i].keep == nullptr || open_[i] == nullptr || !open_[i]->HasUnsavedChoices()) continue;
+    try {
+      open_[i]->Keep();
+    } catch (const std::runtime_error& error) {
+      errors.push_back(OnOneLine(files_[i].title) + ": " + OnOneLine(error.what()));
+    }
+  }
+  return errors;
+}
+
+std::string ViewSession::GiveUp(std::string_view body) {
   if (is_over_) throw RequestError(409, "It was given up, or saved");
+  if (ParseRequest(body).value("keep", false)) {
+    const std::vector<std::string> errors = KeepUnsaved();
+    if (!errors.empty()) throw RequestError(409, errors.front());
+  }
   is_over_ = true;
   Json left = Json::array();
   for (size_t i = 0; i < files_.size(); ++i) {
@@ -375,14 +374,9 @@ std::string ViewSession::GiveUp() {
 }
 
 std::string ViewSession::Save(std::string_view body) {
-  const Json request = Parse(body);
-  try {
-    OpenToChange(request).Save();
-  } catch (const RequestError&) {
-    throw;
-  } catch (const std::runtime_error& error) {
-    throw RequestError(409, OnOneLine(error.what()));
-  }
+  const Json request = ParseRequest(body);
+  OpenFile& open = OpenToChange(request);
+  OrRefuse([&] { open.Save(); });
   const size_t next = FirstToSettle(NumberAt(request, "file"));
   is_over_ = next == files_.size();
   Json answer = {{"saved", true}, {"next", is_over_ ? Json() : Json(next)}, {"unread", GetUnread()}};

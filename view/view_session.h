@@ -2,25 +2,15 @@
 
 #include <memory>
 #include <nlohmann/json_fwd.hpp>
-#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "view/page_request.h"
 #include "view/settling.h"
 #include "view/view_guide.h"
 
 namespace vexel_yaml {
-
-/// A request that can't be carried out, with the status that HTTP has for it and a text for people.
-class RequestError : public std::runtime_error {
- public:
-  RequestError(int status, const std::string& message) : std::runtime_error(message), status_(status) {}
-  int GetStatus() const { return status_; }
-
- private:
-  int status_;
-};
 
 /// What went wrong, as JSON text.
 std::string ErrorJson(std::string_view message);
@@ -46,8 +36,13 @@ class ViewSession {
   std::string Redo(std::string_view body);
   /// Returns which file comes next, if any. Where none does, it is over, and how to go on is said.
   std::string Save(std::string_view body);
-  /// Returns what isn't saved, and how to come back to it.
-  std::string GiveUp();
+  /// Keeps what is settled so far, and leaves the rest open. Returns what the page is to know then.
+  std::string Keep(std::string_view body);
+  /// Ends it, and keeps what is settled so far if the body says so. Returns what isn't saved, and how to come
+  /// back to it.
+  std::string GiveUp(std::string_view body);
+  /// The same for whoever has closed the page, where that can be kept. Returns what went wrong.
+  std::vector<std::string> KeepUnsaved();
 
   /// Whether nothing can be changed or saved any more.
   bool IsOver() const { return is_over_; }

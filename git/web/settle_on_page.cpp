@@ -13,6 +13,7 @@
 #include "git/merged_commits.h"
 #include "git/mergetool.h"
 #include "git/next_step.h"
+#include "git/nothing_open.h"
 #include "git/repository.h"
 #include "git/resolve_arguments.h"
 #include "git/resolving.h"
@@ -98,6 +99,9 @@ class PageChoice {
     return choice;
   }
 
+  // After a choice that has been written.
+  void LookAgain() { seen_ = TextOf(path_); }
+
  private:
   const std::string path_;
   std::string seen_;
@@ -124,6 +128,7 @@ class ResolvedFile {
     return is_open;
   }
 
+  // Or a part of what was chosen is kept.
   bool IsStored() const { return is_stored_; }
 
  private:
@@ -136,13 +141,15 @@ class ResolvedFile {
     }
     ViewFile file = PageFile(versions, settings_, repository_);
     if (!force_ && !ShowHandEdits(versions, settings_, repository_, file)) return false;
-    file.store = [this](const std::string&, const std::string& record) { Store(record); };
+    file.store = [this](const std::string&, const std::string& record) { Store(record, false); };
+    // What was settled and staged before stays so until it is saved anew.
+    if (!stages_.IsStaged()) file.keep = [this](const std::string& record) { Store(record, true); };
     files.push_back(std::move(file));
     return true;
   }
 
   // Merged once more with what has been decided, as by any other way to settle it.
-  void Store(const std::string& record) {
+  void Store(const std::string& record, bool stays_open) {
     if (!stages_.AreSame()) {
       throw std::runtime_error(asset_ +
                                " is no longer in the conflict that it was in when the page was opened");
@@ -150,8 +157,10 @@ class ResolvedFile {
     OrThrow([&] {
       Choice choice = choice_.Next(record);
       choice.force = force_;
+      choice.stays_open = stays_open;
       return Resolving(repository_, settings_, choice).Resolve(asset_);
     });
+    choice_.LookAgain();
     is_stored_ = true;
   }
 
@@ -171,8 +180,9 @@ int ResolveOnPage(const std::vector<std::string>& arguments) {
   const ResolveArguments parsed = ParseResolve(arguments);
   const ViewServerOptions options = PageOptions(parsed.port, parsed.opens_browser);
   bool is_done = true;
-  const std::set<std::string> assets = FindConflicts(parsed.files, is_done);
+  const std::set<std::string> assets = FindConflicts(parsed, is_done);
   GoToTop();
+  if (assets.empty() && parsed.files.empty()) return SayNothingOpen();
   const MergeSettings settings = SettingsQuery().Get();
   const Repository repository;
   LoadForPage(settings);
@@ -186,11 +196,12 @@ int ResolveOnPage(const std::vector<std::string>& arguments) {
   }
   if (files.empty()) return 1;
   guide.when_saved = [&] { return AfterAll(FindNextStep(repository)); };
-  guide.when_given_up = ToComeBack("vexel-merge-git resolve --web", parsed.files);
+  guide.when_given_up = ToComeBack("vexel-merge-git resolve", parsed.files);
   const int status = ShowPage(std::move(files), options, std::move(guide));
   ConflictRecords(repository).Sweep();
-  if (std::ranges::any_of(resolved, [](const auto& file) { return file->IsStored(); }))
-    SayNextStep(FindNextStep(repository));
+  const bool is_any_stored = std::ranges::any_of(resolved, [](const auto& file) { return file->IsStored(); });
+  if (!is_any_stored) Say("Nothing is settled: all is as it was");
+  SayNextStep(FindNextStep(repository));
   return is_done ? status : 1;
 }
 
@@ -209,7 +220,11 @@ int MergetoolOnPage(const std::vector<std::string>& arguments) {
   ViewGuide guide;
   guide.when_saved = [&] { return AfterOne(FindStepAfterMergetool(repository, versions.asset, call.last)); };
   guide.when_given_up = ToComeBack("git mergetool", {versions.asset});
-  return ShowPage({file}, PageOptions({}, true), std::move(guide));
+  const int status = ShowPage({file}, PageOptions({}, true), std::move(guide));
+  if (status != 0)
+    Say("Nothing is saved: " + versions.asset +
+        " is as it was. To settle it later: " + guide.when_given_up.command);
+  return status;
 }
 
 }  // namespace vexel_yaml
