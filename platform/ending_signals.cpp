@@ -5,6 +5,7 @@
 
 #include <atomic>
 
+#include "platform/keep_until_exit.h"
 #include "platform/temporary_files.h"
 
 namespace vexel_yaml {
@@ -64,6 +65,6 @@ SignalsHeld::~SignalsHeld() {
   if (is_last && waiting != 0) raise(waiting);
 }
 
-void HoldSignalsToTheEnd() { [[maybe_unused]] static const auto* const held = new SignalsHeld; }
+void HoldSignalsToTheEnd() { KeepUntilExit(std::make_unique<SignalsHeld>()); }
 
 }  // namespace vexel_yaml
