@@ -58,7 +58,10 @@ def slot_lost(base, side, other, merged):
     if filled is not None and others is not None:
         return any(merged[n:n + 1] != [item] for n, item in filled.items())
     takes_away = [item for item in base if item in side] == side
-    return takes_away and any(base[n] not in side and item in merged for n, item in (others or {}).items())
+    # What was put into several slots may stand in another one.
+    stays = [item for n, item in (others or {}).items() if base[n] in side]
+    return takes_away and any(base[n] not in side and item in merged and item not in stays
+                              for n, item in (others or {}).items())
 
 
 def order_lost(base, side, other, merged):
