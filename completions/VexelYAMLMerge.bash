@@ -94,14 +94,16 @@ _vexel_yaml_merge() {
 _vexel_merge_report() {
   local cur prev
   _vexel_words
-  if ! _vexel_paths_started 1 " -o --title -i --assets --rules --typeInfo "; then
+  if ! _vexel_paths_started 1 " -o --title --theirs --ours -i --assets --rules --typeInfo --committed "; then
     case "$prev" in
-      --title) return ;;
+      --title | --theirs | --ours) return ;;
+      --committed) _vexel_files vexel prefab meta && return ;;
       -o) _vexel_files html && return ;;
       *) if _vexel_option_value; then return; fi ;;
     esac
     if [[ "$cur" == -* ]]; then
-      _vexel_offer -o --title -i --assets --rules --typeInfo --safe --summary --json --conflicts --text --version --help
+      _vexel_offer -o --title --theirs --ours -i --assets --rules --typeInfo --committed --safe --summary --json \
+        --conflicts --text --version --help
       return
     fi
   fi

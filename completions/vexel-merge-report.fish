@@ -8,6 +8,9 @@ set -l command complete -c vexel-merge-report
 $command -f
 $command -s o -rF -d "Write the page to a file"
 $command -l title -x -d "Title of the page"
+$command -l theirs -x -d "Who is behind left"
+$command -l ours -x -d "Who is behind right"
+$command -l committed -rF -d "What became of the result"
 $command -s i -rF -d "Settle conflicts as a record file says"
 $command -l assets -rF -d "Names of other assets"
 $command -l rules -rF -d "Other merge rules"

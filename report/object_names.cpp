@@ -183,6 +183,13 @@ const YAMLScalar* ObjectNames::ParentOf(const YAMLScalar* transform) const {
   return ReferenceAt(Modification(prefab), YAMLScalar::mTransformParent);
 }
 
+const YAMLScalar* ObjectNames::GetParent(const YAMLScalar* file_id) const {
+  const YAMLScalar* whole = GetWhole(file_id);
+  const YAMLScalar* transform = TransformOf(whole);
+  const YAMLScalar* parent = ParentOf(transform == nullptr ? whole : transform);
+  return parent == nullptr ? nullptr : GetWhole(parent);
+}
+
 const ObjectNames::Step& ObjectNames::StepAt(const YAMLScalar* transform) {
   const auto [entry, is_new] = steps_.try_emplace(transform);
   if (is_new) {

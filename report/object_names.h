@@ -43,6 +43,9 @@ class ObjectNames {
   /// it along, or else the object itself.
   const YAMLScalar* GetWhole(const YAMLScalar* file_id) const;
 
+  /// What that hangs on, again as a whole; null for nothing.
+  const YAMLScalar* GetParent(const YAMLScalar* file_id) const;
+
   /// The name that the object itself has; empty for none.
   std::string GetOwnName(const YAMLScalar* file_id) const;
 

@@ -150,7 +150,7 @@ std::string RecordRows::OverriddenBy(const FieldPath& place) const {
 // What nothing is decided about as long as a record is pending: the values around its place, and the
 // objects that its edits name.
 void RecordRows::NoteWhatWaits(const Record& record, FieldPath place) {
-  if (place.size() == 1) pending_things_.emplace(names_.Latest().GetPath(place.front()), place.front());
+  if (place.size() == 1) pending_things_.insert(place.front());
   for (place = Above(place); place.size() > 1; place = Above(place)) around_pending_.insert(place);
   for (const Operation* operation : {record.left, record.right}) {
     if (operation == nullptr || operation->GetKind() != Operation::Kind::kChangeMapping) continue;
@@ -178,16 +178,18 @@ bool RecordRows::IsWaiting(ReportRow& row) {
 }
 
 // The thing whose conflict decides about an object; null for none.
-const YAMLScalar* RecordRows::FindHolder(const YAMLScalar* file_id) {
+const YAMLScalar* RecordRows::FindHolder(const YAMLScalar* file_id) const {
   const auto waiting = waiting_.find(file_id);
   if (waiting != waiting_.end()) return waiting->second;
-  for (std::string path = names_.Latest().GetPath(file_id); !path.empty();) {
-    const auto thing = pending_things_.find(path);
-    if (thing != pending_things_.end()) return thing->second;
-    const size_t end = path.rfind('/');
-    path.resize(end == std::string::npos ? 0 : end);
+  if (pending_things_.empty()) return nullptr;
+  const ObjectNames& names = names_.Latest();
+  std::unordered_set<const YAMLScalar*> seen;
+  const YAMLScalar* step = names.GetWhole(file_id);
+  while (step != nullptr && !pending_things_.contains(step)) {
+    // Of a hierarchy that is a circle nothing hangs on anything else.
+    step = seen.insert(step).second ? names.GetParent(step) : nullptr;
   }
-  return nullptr;
+  return step;
 }
 
 // A record may be about a place that no walk has shown: an object as a whole, or a part of one that both

@@ -3,6 +3,7 @@
 #include <map>
 #include <set>
 #include <unordered_map>
+#include <unordered_set>
 
 #include "report/record_patterns.h"
 #include "report/report_rows.h"
@@ -39,7 +40,7 @@ class RecordRows {
   bool IsInResult(const FieldPath& path, const ReportCell& cell) const;
   std::string OverriddenBy(const FieldPath& place) const;
   void NoteWhatWaits(const Record& record, FieldPath place);
-  const YAMLScalar* FindHolder(const YAMLScalar* file_id);
+  const YAMLScalar* FindHolder(const YAMLScalar* file_id) const;
   bool IsAboutObjects(const Operation& operation) const;
   void AddOperation(const Operation* operation, ReportRow& row, ReportCell ReportRow::*column);
 
@@ -52,8 +53,8 @@ class RecordRows {
   std::set<FieldPath> around_pending_;
   // Objects, and the thing whose conflict decides about each.
   std::unordered_map<const YAMLScalar*, const YAMLScalar*> waiting_;
-  // The things that are pending as a whole, by their paths: what hangs below goes with them.
-  std::unordered_map<std::string, const YAMLScalar*> pending_things_;
+  // The things that are pending as a whole: what hangs below goes with them.
+  std::unordered_set<const YAMLScalar*> pending_things_;
   // How many records there are about parts of each reference.
   std::map<FieldPath, size_t> reference_records_;
 };
