@@ -49,10 +49,11 @@ def choices(programs, files, merged):
         state = ask("GET", "state")
         rows = [row for card in state["cards"] for part in card["objects"] for row in part["rows"]]
         times = []
+        revision = state["revision"]
         for row in (row for row in rows if row["pending"]):
-            body = json.dumps({"file": 0, "choices": [{"path": row["path"], "choice": "ours"}]})
+            body = json.dumps({"file": 0, "revision": revision, "choices": [{"path": row["path"], "choice": "ours"}]})
             begin = time.perf_counter()
-            ask("POST", "choose", body)
+            revision = ask("POST", "choose", body)["revision"]
             times.append(time.perf_counter() - begin)
         if len(times) < CONFLICTS:
             raise BrokenRun(f"the page shows {len(times)} conflicts instead of {CONFLICTS}")

@@ -92,16 +92,12 @@ Resolutions Settling::AllResolutions() const {
 }
 
 void Settling::Merge(const std::vector<Choices::Change>& changes) {
-  // Above that the whole excerpt takes no longer.
-  constexpr size_t kFewGroups = 8;
   ++revision_;
   std::set<const EditGroups::Group*> groups;
   for (const Choices::Change& change : changes) {
     groups.insert(groups_ ? groups_->Find(StringToPath(change.path).front()) : nullptr);
   }
-  const bool are_known = !groups.contains(nullptr) && groups.size() <= kFewGroups && files_.error.empty();
-  const auto merge = [this](const EditGroups::Group* group) { return MergeGroup(*group); };
-  if (!are_known || !std::ranges::all_of(groups, merge)) MergeAll();
+  if (!files_.error.empty() || !MergeGroups(groups)) MergeAll();
 }
 
 void Settling::MergeAll() {
@@ -114,6 +110,7 @@ void Settling::MergeAll() {
   RenewNames();
   shown_.clear();
   objects_.clear();
+  shown_names_.Clear();
   places_.clear();
   group_of_card_.clear();
   pending_ = 0;
@@ -123,8 +120,29 @@ void Settling::MergeAll() {
   shown_.push_back({std::move(cards)});
 }
 
-// Whether nothing outside of the group has to do with it. Else everything has to be merged.
-bool Settling::MergeGroup(const EditGroups::Group& group) {
+// Whether that is all there is to do. Else everything has to be merged.
+bool Settling::MergeGroups(const std::set<const EditGroups::Group*>& groups) {
+  // Above that the whole excerpt takes no longer.
+  constexpr size_t kFewGroups = 8;
+  std::unordered_set<const YAMLScalar*> renamed;
+  const auto merge = [&](const EditGroups::Group* group) { return MergeGroup(*group, renamed); };
+  const auto merge_all = [&](const std::set<const EditGroups::Group*>& some) {
+    return !some.contains(nullptr) && some.size() <= kFewGroups && std::ranges::all_of(some, merge);
+  };
+  if (!merge_all(groups)) return false;
+  if (renamed.empty()) return true;
+  std::set<const EditGroups::Group*> showing;
+  for (const YAMLScalar* file_id : shown_names_.Showing(names_->Latest(), renamed)) {
+    showing.insert(groups_->Find(file_id));
+  }
+  // A single one has told the new names already.
+  if (groups.size() == 1) showing.erase(*groups.begin());
+  return merge_all(showing);
+}
+
+// Whether nothing outside of the group has to do with it. Adds the wholes that have other names or places
+// now.
+bool Settling::MergeGroup(const EditGroups::Group& group, std::unordered_set<const YAMLScalar*>& renamed) {
   std::unique_ptr<MergedFiles>& part = parts_[&group];
   if (part == nullptr) {
     part = std::make_unique<MergedFiles>();
@@ -138,7 +156,8 @@ bool Settling::MergeGroup(const EditGroups::Group& group) {
     return resolution.pattern.front() != YAMLScalar::star && is_elsewhere(resolution.pattern.front());
   });
   MergeRead(*part, std::move(resolutions));
-  if (part->merged == nullptr || !HasSameNames(group, *part)) return false;
+  if (part->merged == nullptr) return false;
+  FindRenamed(group, *part, renamed);
   TakeOver(group, *part);
   std::vector<ReportCard> cards = MakeCardsOf(*part);
   if (!AreOfTheirGroups(cards, &group)) return false;
@@ -151,14 +170,16 @@ bool Settling::MergeGroup(const EditGroups::Group& group) {
   return true;
 }
 
-// Whether a merge of a group leaves its objects their names and places, which others may show.
-bool Settling::HasSameNames(const EditGroups::Group& group, const MergedFiles& part) {
+void Settling::FindRenamed(const EditGroups::Group& group, const MergedFiles& part,
+                           std::unordered_set<const YAMLScalar*>& renamed) {
   const ObjectNames before({files_.merged.get()});
   const ObjectNames after({part.merged.get()});
-  return std::ranges::all_of(group, [&](const YAMLScalar* file_id) {
-    return before.GetOwnName(file_id) == after.GetOwnName(file_id) &&
-           FatherIn(*files_.merged, file_id) == FatherIn(*part.merged, file_id);
-  });
+  for (const YAMLScalar* file_id : group) {
+    if (before.GetOwnName(file_id) != after.GetOwnName(file_id) ||
+        FatherIn(*files_.merged, file_id) != FatherIn(*part.merged, file_id)) {
+      renamed.insert(names_->Latest().GetWhole(file_id));
+    }
+  }
 }
 
 void Settling::TakeOver(const EditGroups::Group& group, const MergedFiles& part) {
@@ -232,6 +253,7 @@ bool Settling::FindAssets(const std::vector<ReportObject>& objects) {
 void Settling::AddPlaces(const std::vector<ReportCard>& cards) {
   for (const ReportCard& card : cards) {
     for (const ReportObject& object : card.objects) {
+      shown_names_.Add(object);
       Places& places = objects_[object.file_id];
       for (const ReportRow& row : object.rows) {
         places.pending += row.pending ? 1 : 0;
@@ -246,6 +268,7 @@ void Settling::AddPlaces(const std::vector<ReportCard>& cards) {
 }
 
 void Settling::ForgetPlaces(const YAMLScalar* file_id) {
+  shown_names_.Forget(file_id);
   const auto found = objects_.find(file_id);
   if (found == objects_.end()) return;
   pending_ -= found->second.pending;

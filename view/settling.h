@@ -15,6 +15,7 @@
 #include "view/choices.h"
 #include "view/edit_groups.h"
 #include "view/finished_file.h"
+#include "view/shown_names.h"
 
 namespace vexel_yaml {
 
@@ -104,8 +105,10 @@ class Settling {
   std::vector<RecordingConflictResolver::RecordResolve> AllResolutions() const;
   void Merge(const std::vector<Choices::Change>& changes);
   void MergeAll();
-  bool MergeGroup(const EditGroups::Group& group);
-  bool HasSameNames(const EditGroups::Group& group, const MergedFiles& part);
+  bool MergeGroups(const std::set<const EditGroups::Group*>& groups);
+  bool MergeGroup(const EditGroups::Group& group, std::unordered_set<const YAMLScalar*>& renamed);
+  void FindRenamed(const EditGroups::Group& group, const MergedFiles& part,
+                   std::unordered_set<const YAMLScalar*>& renamed);
   void TakeOver(const EditGroups::Group& group, const MergedFiles& part);
   void RenewNames();
   std::vector<ReportCard> MakeCardsOf(const MergedFiles& files);
@@ -134,6 +137,7 @@ class Settling {
   std::optional<VersionNames> names_;
   std::vector<Shown> shown_;
   std::unordered_map<const YAMLScalar*, Places> objects_;
+  ShownNames shown_names_;
   /// What can be chosen about, and in how many rows.
   std::map<std::string, size_t> places_;
   size_t revision_ = 1;
