@@ -79,7 +79,7 @@ int RunResolve(const std::vector<std::string>& arguments) {
     }
   }
   resolving.Sweep();
-  if (is_any_done) SayNextStep(FindNextStep(repository));
+  if (is_any_done || (prompt && prompt->HasQuit())) SayNextStep(FindNextStep(repository));
   return is_done ? 0 : 1;
 }
 

@@ -5,6 +5,7 @@
 
 #include "git/conflict_records.h"
 #include "git/git_call.h"
+#include "git/next_step.h"
 #include "git/record_hook.h"
 #include "git/repository.h"
 #include "git/settings.h"
@@ -124,6 +125,8 @@ int RunStatus(const std::vector<std::string>& arguments) {
   const ConflictRecords records(repository);
   records.Sweep();
   TellConflicts(records);
+  const GitStep next = FindNextStep(repository);
+  if (!next.command.empty()) Tell("next           " + next.command + ", to " + next.purpose);
   const auto foreign = ForeignGuards(repository, SettingsQuery().Get().hooks_folder);
   if (!foreign.empty()) {
     Tell("hooks          your own are in use (" + Joined(foreign) +

@@ -32,6 +32,9 @@ cp "$file" "$work/undecided"
 check "who only skips decides nothing" refuses answer sssx
 check "which is said" grep -qFx "Nothing is settled in $file" "$work/err"
 check "nor who quits" refuses answer q
+next="vexel-merge-git resolve"
+check "who is told how to go on" grep -qFx "To settle what is left, in $file: $next" "$work/err"
+check "by the status, too" grep -qFx "next           $next, to settle what is left, in $file" <(vexel-merge-git status)
 check "nor who says nothing" refuses answer ''
 check "the file is as it was" cmp "$file" "$work/undecided"
 check "in conflict" is_open
