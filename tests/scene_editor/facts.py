@@ -118,10 +118,13 @@ def left_behind(base, side, other, merged):
     and doesn't any more, as (object, target). What `side` put in the place of a reference is its own edit."""
     def clears(before, after, target):
         if isinstance(before, list) and isinstance(after, list):
-            # Among equal elements it can't be told which one went.
+            entry = {"fileID": target}
+            # Among equal elements it can't be told which one went, unless nothing else did.
             is_clear = len(after) < len(before) and all(
                 items.count(item) == 1 for items in (before, after) for item in items)
-            return is_clear and {"fileID": target} in before and {"fileID": target} not in after
+            is_all = after in ([item for item in before if item != entry],
+                               [NONE if item == entry else item for item in before])
+            return (is_clear or is_all) and entry in before and entry not in after
         if target_of(before) == target:
             return after == NONE
         return isinstance(before, dict) and isinstance(after, dict) and any(
